@@ -1,0 +1,13 @@
+# Warnings and sanitizers, the same for every target.
+# Not -Wpedantic: messages use syslog's %m. The public headers are compiled with it by their own test.
+add_compile_options(-Wall -Wextra -Wconversion -Wshadow)
+if(MERO_WERROR)
+  add_compile_options(-Werror)
+endif()
+
+if(MERO_SANITIZE)
+  # The vptr check needs run-time type information, which the libraries do without.
+  set(sanitizers -fsanitize=address,undefined -fno-sanitize=vptr -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  add_compile_options(${sanitizers})
+  add_link_options(${sanitizers})
+endif()

@@ -1,0 +1,16 @@
+// The clock as the known networks keep it.
+#ifndef MERO_COMMON_CLOCK_H
+#define MERO_COMMON_CLOCK_H
+
+#include <algorithm>
+#include <cstdint>
+#include <limits>
+
+// The 32-bit time nearest to `seconds`: from 2038 on the greatest, never a wrapped one.
+constexpr int32_t SaturatedTime(int64_t seconds) {
+  constexpr int64_t kLeast = std::numeric_limits<int32_t>::min();
+  constexpr int64_t kGreatest = std::numeric_limits<int32_t>::max();
+  return static_cast<int32_t>(std::clamp(seconds, kLeast, kGreatest));
+}
+
+#endif  // MERO_COMMON_CLOCK_H

@@ -1,0 +1,34 @@
+// The one way to the system log.
+#ifndef MERO_COMMON_LOG_H
+#define MERO_COMMON_LOG_H
+
+#include <syslog.h>
+
+#include <cstddef>
+
+// The bare name of a source file, "wireless_conf_set" of "wireless_conf_set.cpp".
+template <size_t kSize>
+struct UnitName {
+  char text[kSize] = {};
+
+  consteval UnitName(const char (&file)[kSize]) {
+    for (size_t i = 0; i < kSize && file[i] != '.'; ++i) text[i] = file[i];
+  }
+};
+
+template <UnitName kUnit>
+constexpr const char* TextOfUnit() {
+  return kUnit.text;
+}
+
+// Reports `format` for a unit and a source line that are given. All three are expressions, so that a failure can be
+// reported and returned in one statement.
+#define LOG_AS(unit, line, format, ...) syslog(LOG_ERR, "%s:%d " format, unit, line __VA_OPT__(, ) __VA_ARGS__)
+
+// Reports `format` for this unit, with the line number that the message is known by.
+#define LOG_LINE(line, format, ...) LOG_AS(TextOfUnit<__FILE_NAME__>(), line, format __VA_OPT__(, ) __VA_ARGS__)
+
+// Reports `format` for this unit and line.
+#define LOG(format, ...) LOG_LINE(__LINE__, format __VA_OPT__(, ) __VA_ARGS__)
+
+#endif  // MERO_COMMON_LOG_H

@@ -1,0 +1,54 @@
+// Bounded copies of text.
+#ifndef MERO_COMMON_TEXT_H
+#define MERO_COMMON_TEXT_H
+
+#include <algorithm>
+#include <cstddef>
+#include <cstring>
+#include <string_view>
+
+// Copies what fits of `text` and terminates it; a null byte in the text ends it.
+inline void CopyText(char* szTo, size_t cbTo, std::string_view text) {
+  if (cbTo == 0) return;
+  const size_t size = std::min({cbTo - 1, text.size(), text.find('\0')});
+  if (size > 0) std::memcpy(szTo, text.data(), size);
+  szTo[size] = '\0';
+}
+
+template <size_t kSize>
+void CopyText(char (&szTo)[kSize], std::string_view text) {
+  CopyText(szTo, kSize, text);
+}
+
+// A part of a text, from one offset up to another or to its end. What lies outside the text is no part of it; unlike
+// string_view::substr(), which would bring in the exceptions of the C++ library.
+constexpr std::string_view Slice(std::string_view text, size_t begin, size_t end = std::string_view::npos) {
+  end = std::min(end, text.size());
+  begin = std::min(begin, end);
+  return {text.data() + begin, end - begin};
+}
+
+// White space and letters as ASCII has them: the caller's locale has no say in what is in a file or on the air.
+constexpr bool IsSpace(char c) {
+  return c == ' ' || (c >= '\t' && c <= '\r');
+}
+
+constexpr char ToLower(char c) {
+  return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
+constexpr std::string_view TrimEnd(std::string_view text) {
+  while (!text.empty() && IsSpace(text.back())) text.remove_suffix(1);
+  return text;
+}
+
+constexpr std::string_view Trim(std::string_view text) {
+  while (!text.empty() && IsSpace(text.front())) text.remove_prefix(1);
+  return TrimEnd(text);
+}
+
+constexpr bool EqualIgnoringCase(std::string_view a, std::string_view b) {
+  return std::equal(a.begin(), a.end(), b.begin(), b.end(), [](char x, char y) { return ToLower(x) == ToLower(y); });
+}
+
+#endif  // MERO_COMMON_TEXT_H

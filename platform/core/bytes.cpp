@@ -1,0 +1,28 @@
+// A growing run of bytes.
+#include "platform/core/bytes.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+
+Bytes::~Bytes() {
+  std::free(data_);
+}
+
+bool Bytes::Reserve(size_t capacity) {
+  if (capacity <= capacity_) return true;
+  void* data = std::realloc(data_, capacity);
+  if (data == nullptr) return false;
+  data_ = static_cast<char*>(data);
+  capacity_ = capacity;
+  return true;
+}
+
+bool Bytes::Append(std::string_view text) {
+  if (text.empty()) return true;
+  const size_t size = size_ + text.size();
+  if (size > capacity_ && !Reserve(std::max(size, 2 * capacity_))) return false;
+  std::memcpy(data_ + size_, text.data(), text.size());
+  size_ = size;
+  return true;
+}

@@ -1,0 +1,49 @@
+// A growing run of bytes: a file that was read, or the content that it is to get.
+#ifndef MERO_PLATFORM_BYTES_H
+#define MERO_PLATFORM_BYTES_H
+
+#include <cstddef>
+#include <string_view>
+#include <utility>
+
+class Bytes {
+ public:
+  Bytes() = default;
+  Bytes(Bytes&& other) noexcept
+      : data_(std::exchange(other.data_, nullptr)),
+        size_(std::exchange(other.size_, 0)),
+        capacity_(std::exchange(other.capacity_, 0)) {}
+  Bytes& operator=(Bytes&& other) noexcept {
+    std::swap(data_, other.data_);
+    std::swap(size_, other.size_);
+    std::swap(capacity_, other.capacity_);
+    return *this;
+  }
+  ~Bytes();
+
+  std::string_view view() const {
+    return {data_, size_};
+  }
+  size_t capacity() const {
+    return capacity_;
+  }
+  char* data() {
+    return data_;
+  }
+
+  // False when memory ran out; what was there stays.
+  [[nodiscard]] bool Reserve(size_t capacity);
+  [[nodiscard]] bool Append(std::string_view text);
+
+  // Takes in `size` bytes that were written behind the end, within the capacity.
+  void Grow(size_t size) {
+    size_ += size;
+  }
+
+ private:
+  char* data_ = nullptr;
+  size_t size_ = 0;
+  size_t capacity_ = 0;
+};
+
+#endif  // MERO_PLATFORM_BYTES_H

@@ -1,0 +1,47 @@
+// The record of the last join.
+#include "platform/core/connection_record.h"
+
+#include <charconv>
+#include <optional>
+#include <string_view>
+
+#include "common/connection_files.h"
+#include "common/text.h"
+#include "platform/core/file_read.h"
+
+namespace {
+
+// Takes the last line off a text. The record is read from its end, since the name on its first line may hold anything,
+// also line feeds.
+std::string_view TakeLastLine(std::string_view& text) {
+  if (text.ends_with('\n')) text.remove_suffix(1);
+  const size_t begin = text.rfind('\n') + 1;  // 0 when there is none
+  const std::string_view line = Slice(text, begin);
+  text.remove_suffix(line.size());
+  return line;
+}
+
+// A number from 0 to `greatest`; 0, which is unknown throughout, for anything else.
+int NumberUpTo(int greatest, std::string_view text) {
+  int number = 0;
+  const char* end = text.data() + text.size();
+  const bool whole = std::from_chars(text.data(), end, number).ptr == end;
+  return whole && number >= 0 && number <= greatest ? number : 0;
+}
+
+}  // namespace
+
+Result<ConnectionRecord> RecordOfConnectionTo(const Bssid& accessPoint) {
+  Result<Bytes> file = ReadFile(kConnectionRecordPath);
+  if (file.error() == ENOENT) return ConnectionRecord{};
+  if (!file.ok()) return file.status();
+
+  std::string_view text = file->view();
+  const std::string_view bssid = TakeLastLine(text);
+  (void)TakeLastLine(text);  // the encryption
+  const std::string_view auth = TakeLastLine(text);
+  const std::string_view protocol = TakeLastLine(text);
+  if (ParseBssid(bssid) != accessPoint) return ConnectionRecord{};
+  return ConnectionRecord{static_cast<WIRELESS_PROTOCOL>(NumberUpTo(WIRELESS_PROTO_11BN, protocol)),
+                          static_cast<WIRELESS_AUTH>(NumberUpTo(WIRELESS_AUTH_WPA2EAP, auth))};
+}

@@ -1,0 +1,18 @@
+// The record of the last join, as the driver's own word about the current connection qualifies it.
+#ifndef MERO_PLATFORM_CONNECTION_RECORD_H
+#define MERO_PLATFORM_CONNECTION_RECORD_H
+
+#include "platform.h"
+#include "platform/core/literals.h"
+#include "platform/core/result.h"
+
+struct ConnectionRecord {
+  WIRELESS_PROTOCOL protocol = WIRELESS_PROTO_UNKNOWN;
+  WIRELESS_AUTH auth = WIRELESS_AUTH_UNKNOWN;
+};
+
+// What was recorded about the connection to an access point; unknown values when the record is of another one, is
+// missing or is malformed.
+Result<ConnectionRecord> RecordOfConnectionTo(const Bssid& accessPoint);
+
+#endif  // MERO_PLATFORM_CONNECTION_RECORD_H

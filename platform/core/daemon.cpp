@@ -1,0 +1,76 @@
+// Daemons that keep their pid in a file.
+#include "platform/core/daemon.h"
+
+#include <poll.h>
+#include <unistd.h>
+
+extern "C" {
+#include <sys/pidfd.h>  // says nothing of the language of its functions
+}
+
+#include <charconv>
+#include <csignal>
+#include <cstdio>
+
+#include "common/text.h"
+#include "platform/core/descriptor.h"
+#include "platform/core/file_read.h"
+
+namespace {
+
+constexpr int kPatience = 2000;  // milliseconds
+
+// The pid that a file holds; 0 when it holds none.
+pid_t PidIn(std::string_view text) {
+  text = Trim(text);
+  pid_t pid = 0;
+  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), pid);
+  return error == std::errc() && end == text.data() + text.size() && pid > 0 ? pid : 0;
+}
+
+// Whether a process runs a program, by the name that the kernel knows it by. A pid file may be left from a process
+// that ended long ago and whose pid is another's now.
+bool Runs(pid_t pid, const char* szProgram) {
+  char szPath[64];
+  std::snprintf(szPath, sizeof szPath, "/proc/%d/exe", pid);
+  char target[4096];
+  const ssize_t size = ::readlink(szPath, target, sizeof target);
+  if (size < 0) return false;
+  std::string_view name(target, static_cast<size_t>(size));
+  name.remove_prefix(name.rfind('/') + 1);
+  return name == szProgram;
+}
+
+// Whether the process ended within the time.
+bool EndsWithin(int process, int milliseconds) {
+  pollfd ended{process, POLLIN, 0};
+  return ::poll(&ended, 1, milliseconds) > 0;
+}
+
+Status End(pid_t pid, const char* szProgram) {
+  // Held before the name is looked at, so that the pid cannot become another's in between.
+  const Descriptor process(::pidfd_open(pid, 0));
+  if (!process.valid()) return errno == ESRCH ? Status::Ok() : Status::Failed(errno);
+  if (!Runs(pid, szProgram)) return Status::Ok();
+
+  for (const int signal : {SIGTERM, SIGKILL}) {
+    if (::pidfd_send_signal(process.get(), signal, nullptr, 0) < 0) {
+      return errno == ESRCH ? Status::Ok() : Status::Failed(errno);
+    }
+    if (EndsWithin(process.get(), kPatience)) return Status::Ok();
+  }
+  return Status::Failed(ETIMEDOUT);
+}
+
+}  // namespace
+
+Status EndDaemon(const char* szPidPath, const char* szProgram) {
+  Result<Bytes> file = ReadFile(szPidPath);
+  if (file.error() == ENOENT) return Status::Ok();
+  if (!file.ok()) return file.status();
+  if (const pid_t pid = PidIn(file->view()); pid != 0) {
+    if (Status status = End(pid, szProgram); !status.ok()) return status;
+  }
+  // The daemon may have removed it itself.
+  return ::unlink(szPidPath) < 0 && errno != ENOENT ? Status::Failed(errno) : Status::Ok();
+}

@@ -1,0 +1,76 @@
+// Ending the current connection.
+#include <unistd.h>
+
+#include <cstdio>
+
+#include "common/connection_files.h"
+#include "platform/core/daemon.h"
+#include "platform/core/error.h"
+#include "platform/core/interface.h"
+#include "platform/core/radio.h"
+
+namespace {
+
+Status EndSupplicant(const char* /*szIfName*/) {
+  return EndDaemon(kSupplicantPidPath, "wpa_supplicant");
+}
+
+Status EndDhcpClient(const char* szIfName) {
+  char szPidPath[sizeof kDhcpClientPidFormat + IFNAMSIZ];
+  std::snprintf(szPidPath, sizeof szPidPath, kDhcpClientPidFormat, szIfName);
+  return EndDaemon(szPidPath, "busybox");
+}
+
+// An ad-hoc cell has nobody to tell: the interface stops being part of it by being a station again, which the driver
+// only takes while the interface is down.
+Status LeaveCell(const char* szIfName, const Radio& radio) {
+  if (Status status = SetInterfaceUp(szIfName, false); !status.ok()) return status;
+  if (Status status = radio.SetMode(WIRELESS_OPMODE_MANAGED); !status.ok()) return status;
+  return SetInterfaceUp(szIfName, true);
+}
+
+Status LeaveNetwork(const char* szIfName) {
+  Result<Radio> radio = Radio::Open(szIfName);
+  if (!radio.ok()) return radio.status();
+  Result<WIRELESS_OPMODE> mode = radio->Mode();
+  if (!mode.ok()) return mode.status();
+  if (*mode == WIRELESS_OPMODE_ADHOC) return LeaveCell(szIfName, *radio);
+  if (*mode != WIRELESS_OPMODE_MANAGED) return Status::Ok();
+
+  Result<std::optional<Bssid>> accessPoint = radio->AccessPoint();
+  if (!accessPoint.ok()) return accessPoint.status();
+  return *accessPoint ? radio->Leave() : Status::Ok();
+}
+
+Status ForgetRecord(const char* /*szIfName*/) {
+  return ::unlink(kConnectionRecordPath) < 0 && errno != ENOENT ? Status::Failed(errno) : Status::Ok();
+}
+
+struct Step {
+  const char* szName;
+  Status (*run)(const char* szIfName);
+  bool needsAdapter;
+};
+
+// Daemons first: they would join and address the interface again.
+constexpr Step kSteps[] = {
+    {"end the supplicant of", EndSupplicant, false},   {"end the DHCP client of", EndDhcpClient, false},
+    {"leave the network of", LeaveNetwork, true},      {"remove the addresses of", RemoveAddresses, true},
+    {"forget the connection of", ForgetRecord, false},
+};
+
+}  // namespace
+
+int MEROWirelessNetworkDisconnect(void) {
+  const bool adapter = MEROWirelessAdapterNum() > 0;
+  const char* szIfName = MEROWirelessInterfaceGet();
+  int result = 0;
+  for (const Step& step : kSteps) {
+    if (step.needsAdapter && !adapter) continue;
+    if (Status status = step.run(szIfName); !status.ok()) {
+      FAIL(status.error(), step.szName, szIfName);
+      result = -1;
+    }
+  }
+  return result;
+}

@@ -1,0 +1,46 @@
+// Changing a file: what it held is replaced as a whole, and nobody else changes it meanwhile.
+#ifndef MERO_PLATFORM_FILE_EDIT_H
+#define MERO_PLATFORM_FILE_EDIT_H
+
+#include <sys/types.h>
+
+#include <climits>
+#include <string_view>
+
+#include "platform/core/bytes.h"
+#include "platform/core/descriptor.h"
+#include "platform/core/result.h"
+
+class FileEdit {
+ public:
+  FileEdit() = default;
+
+  // Locks a file, following symbolic links, and reads it. One that is missing is created with mode `mode`, or is
+  // ENOENT when `mode` is 0. Blocks while another process edits the file.
+  static Result<FileEdit> Open(const char* szPath, mode_t mode);
+
+  // What the file holds.
+  std::string_view text() const {
+    return text_.view();
+  }
+
+  // Replaces the content. The file holds the old content or the new one, whole, whenever this is interrupted.
+  Status Commit(std::string_view content);
+
+ private:
+  Descriptor lock_;  // the file itself, locked; closing it gives the lock up, after the new file is in place
+  Bytes text_;
+  char szPath_[PATH_MAX] = {};  // where the file really is
+};
+
+// Changes a file in one go: `compose(text, content)` gives its new content, or the reason why not.
+template <class Compose>
+Status EditFile(const char* szPath, mode_t mode, Compose compose) {
+  Result<FileEdit> edit = FileEdit::Open(szPath, mode);
+  if (!edit.ok()) return edit.status();
+  Bytes content;
+  if (Status status = compose(edit->text(), content); !status.ok()) return status;
+  return edit->Commit(content.view());
+}
+
+#endif  // MERO_PLATFORM_FILE_EDIT_H

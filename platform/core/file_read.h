@@ -1,0 +1,14 @@
+// Reading whole files.
+#ifndef MERO_PLATFORM_FILE_READ_H
+#define MERO_PLATFORM_FILE_READ_H
+
+#include "platform/core/bytes.h"
+#include "platform/core/result.h"
+
+// The content of an open regular file; EFBIG when it is larger than any file of settings has reason to be.
+Result<Bytes> ReadWhole(int fd);
+
+// The content of a file; ENOENT when there is none.
+Result<Bytes> ReadFile(const char* szPath);
+
+#endif  // MERO_PLATFORM_FILE_READ_H

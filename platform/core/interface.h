@@ -1,0 +1,31 @@
+// Network interfaces, asked and told through ioctls.
+#ifndef MERO_PLATFORM_INTERFACE_H
+#define MERO_PLATFORM_INTERFACE_H
+
+#include <net/if.h>
+
+#include "common/text.h"
+#include "platform/core/descriptor.h"
+#include "platform/core/result.h"
+
+// A socket to pass ioctls through, or the reason why there is none.
+Result<Descriptor> OpenControl();
+
+// Brings an interface up, or takes it down.
+Status SetInterfaceUp(const char* szIfName, bool up);
+
+// Removes every IPv4 address of an interface.
+Status RemoveAddresses(const char* szIfName);
+
+// A request of the kernel's (`struct ifreq`, `struct iwreq`) that names its interface. ENODEV when the name is longer
+// than any interface's, so that a name that was cut never reaches another interface.
+template <class Request>
+Result<Request> RequestFor(const char* szIfName) {
+  Request request{};
+  auto& name = reinterpret_cast<char(&)[IFNAMSIZ]>(request);
+  if (std::strlen(szIfName) >= sizeof name) return Status::Failed(ENODEV);
+  CopyText(name, szIfName);
+  return request;
+}
+
+#endif  // MERO_PLATFORM_INTERFACE_H

@@ -1,0 +1,178 @@
+// Reading one known network from its file.
+//
+// Callers that list all networks ask for one after another, from the first to the last. Reading the file anew for each
+// would take quadratic time, so its text is kept during such a walk, for as long as the file is provably the same. The
+// walk takes one reading, and nothing of the file, least of all its secrets, stays in memory behind it.
+#include <sys/stat.h>
+
+#include <charconv>
+#include <cstdlib>
+#include <ctime>
+#include <new>
+
+#include "common/clock.h"
+#include "common/known_networks_file.h"
+#include "common/text.h"
+#include "platform/core/error.h"
+#include "platform/core/file_read.h"
+#include "platform/core/literals.h"
+#include "platform/core/section_index.h"
+
+namespace {
+
+// What tells a file that was replaced or written to from the one that was read.
+struct FileStamp {
+  dev_t device;
+  ino_t inode;
+  off_t size;
+  timespec modified;
+  timespec changed;
+};
+
+bool Equal(const timespec& a, const timespec& b) {
+  return a.tv_sec == b.tv_sec && a.tv_nsec == b.tv_nsec;
+}
+
+bool Equal(const FileStamp& a, const FileStamp& b) {
+  return a.device == b.device && a.inode == b.inode && a.size == b.size && Equal(a.modified, b.modified) &&
+         Equal(a.changed, b.changed);
+}
+
+Result<FileStamp> StampOf(const char* szPath) {
+  struct stat info;
+  if (::stat(szPath, &info) < 0) return Status::Failed(errno);
+  return FileStamp{info.st_dev, info.st_ino, info.st_size, info.st_mtim, info.st_ctim};
+}
+
+// Whether a change from now on is bound to show in the stamp: file times advance in ticks, and a second change within
+// one tick does not.
+bool HasSettled(const FileStamp& stamp) {
+  constexpr int64_t kNanoseconds = 1'000'000'000;
+  constexpr int64_t kSeveralTicks = 50'000'000;
+  timespec now;
+  ::clock_gettime(CLOCK_REALTIME, &now);
+  const int64_t age = (int64_t{now.tv_sec} - stamp.changed.tv_sec) * kNanoseconds + now.tv_nsec - stamp.changed.tv_nsec;
+  return age > kSeveralTicks;
+}
+
+struct KeptFile {
+  Bytes text;
+  FileStamp stamp;
+  SectionIndex index;
+};
+
+bool g_walking = false;  // the first section was asked for, and not yet the last
+KeptFile* g_kept = nullptr;
+
+void Drop() {
+  if (g_kept == nullptr) return;
+  g_kept->~KeptFile();
+  std::free(g_kept);
+  g_kept = nullptr;
+}
+
+void EndWalk() {
+  g_walking = false;
+  Drop();
+}
+
+// Keeps a text, if there is memory for it; not to keep it only costs time.
+void Keep(Bytes&& text, const FileStamp& stamp) {
+  SectionIndex index;
+  if (!index.Build(text.view())) return;
+  void* room = std::malloc(sizeof(KeptFile));
+  if (room != nullptr) g_kept = new (room) KeptFile{std::move(text), stamp, std::move(index)};
+}
+
+int32_t ParseTime(std::string_view text) {
+  int64_t seconds = 0;
+  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), seconds);
+  if (error == std::errc::result_out_of_range) return SaturatedTime(text.front() == '-' ? INT64_MIN : INT64_MAX);
+  return end == text.data() + text.size() ? SaturatedTime(seconds) : 0;
+}
+
+void TakeBssid(std::string_view text, WIRELESS_NETWORK& network) {
+  const std::optional<Bssid> bssid = ParseBssid(text);
+  if (bssid) std::memcpy(network.bssid, bssid->octets, sizeof network.bssid);
+}
+
+// Takes one pair of the section into the record; a pair of another program's is passed over.
+void Take(const Pair& pair, WIRELESS_NETWORK_CONFIG& config) {
+  const auto [key, value] = pair;
+  char szWord[32];  // longer than any word of an enumeration
+  CopyText(szWord, value);
+
+  if (key == kKeySecret) CopyText(config.szKey, value);
+  if (key == kKeyAddress) CopyText(config.szIp, value);
+  if (key == kKeyMask) CopyText(config.szMask, value);
+  if (key == kKeyGateway) CopyText(config.szGateway, value);
+  if (key == kKeyEssid) CopyText(config.network.szEssid, value);
+  if (key == kKeyBssid) TakeBssid(value, config.network);
+  if (key == kKeyMode) config.network.opmode = ParseOpmode(szWord);
+  if (key == kKeyAccessTime) config.atime = ParseTime(value);
+  if (key == kKeyAuth) config.network.auth = MEROWirelessAuthParse(szWord);
+  if (key == kKeyEncrypt) config.network.encrypt = MEROWirelessEncryptParse(szWord);
+}
+
+WIRELESS_NETWORK_CONFIG ConfigOf(std::string_view section) {
+  WIRELESS_NETWORK_CONFIG config{};
+  for (Lines lines(section); lines.Next();) {
+    const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
+    if (pair) Take(*pair, config);
+  }
+  return config;
+}
+
+bool IsFirst(std::string_view text, const SectionPlace& place) {
+  Lines lines(Slice(text, 0, place.header));
+  while (lines.Next()) {
+    if (SectionOfLine(lines.text())) return false;
+  }
+  return true;
+}
+
+WIRELESS_NETWORK_CONFIG ConfigAt(std::string_view text, const SectionPlace& place) {
+  return ConfigOf(Slice(text, place.body, place.end));
+}
+
+Result<WIRELESS_NETWORK_CONFIG> ReadKept(const char* szSection) {
+  const std::string_view text = g_kept->text.view();
+  const std::optional<SectionPlace> place = g_kept->index.Find(text, szSection);
+  if (!place) return Status::Failed(ENOENT);
+  const WIRELESS_NETWORK_CONFIG config = ConfigAt(text, *place);
+  if (place->end == text.size()) EndWalk();
+  return config;
+}
+
+Result<WIRELESS_NETWORK_CONFIG> ReadAnew(const char* szSection, const FileStamp& stamp) {
+  Result<Bytes> file = ReadFile(kKnownNetworksPath);
+  if (!file.ok()) return file.status();
+  const std::string_view text = file->view();
+  const std::optional<SectionPlace> place = FindSection(text, szSection);
+  if (!place) return Status::Failed(ENOENT);
+  const WIRELESS_NETWORK_CONFIG config = ConfigAt(text, *place);
+
+  if (IsFirst(text, *place)) g_walking = true;
+  if (place->end == text.size()) EndWalk();
+  if (g_walking && HasSettled(stamp)) Keep(std::move(*file), stamp);
+  return config;
+}
+
+// ENOENT when there is no such section, or no file.
+Result<WIRELESS_NETWORK_CONFIG> Read(const char* szSection) {
+  Result<FileStamp> stamp = StampOf(kKnownNetworksPath);
+  if (!stamp.ok()) return EndWalk(), stamp.status();
+  if (g_kept != nullptr && !Equal(g_kept->stamp, *stamp)) Drop();
+  return g_kept != nullptr ? ReadKept(szSection) : ReadAnew(szSection, *stamp);
+}
+
+}  // namespace
+
+int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg) {
+  if (szSection == nullptr || pNetCfg == nullptr) return REFUSE_NULL(), -1;
+  Result<WIRELESS_NETWORK_CONFIG> config = Read(szSection);
+  if (config.error() == ENOENT) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
+  if (!config.ok()) return FAIL(config.error(), "read", kKnownNetworksPath), -1;
+  *pNetCfg = *config;
+  return 0;
+}

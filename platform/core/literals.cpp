@@ -1,0 +1,92 @@
+// The texts of the radio's enumerations, and back.
+#include "platform/core/literals.h"
+
+#include <charconv>
+#include <cstdio>
+#include <iterator>
+
+#include "common/literals.h"
+#include "common/protocol_texts.h"
+#include "platform/core/error.h"
+
+namespace {
+
+constexpr WIRELESS_LITERAL_MAPPING kAuthTexts[] = {
+    {"UNKNOWN", {WIRELESS_AUTH_UNKNOWN}}, {"OPEN", {WIRELESS_AUTH_OPEN}},     {"SHARED", {WIRELESS_AUTH_SHARED}},
+    {"WEPAUTO", {WIRELESS_AUTH_WEPAUTO}}, {"WPAPSK", {WIRELESS_AUTH_WPAPSK}}, {"WPA2PSK", {WIRELESS_AUTH_WPA2PSK}},
+    {"WPANONE", {WIRELESS_AUTH_WPANONE}}, {"WPAEAP", {WIRELESS_AUTH_WPAEAP}}, {"WPA2EAP", {WIRELESS_AUTH_WPA2EAP}},
+};
+static_assert(std::size(kAuthTexts) == WIRELESS_AUTH_WPA2EAP + 1, "name every authentication");
+
+constexpr WIRELESS_LITERAL_MAPPING kEncryptTexts[] = {
+    {"UNKNOWN", {WIRELESS_ENCRYPT_UNKNOWN}}, {"NONE", {WIRELESS_ENCRYPT_NONE}},
+    {"WEP", {WIRELESS_ENCRYPT_WEP}},         {"TKIP", {WIRELESS_ENCRYPT_TKIP}},
+    {"AES", {WIRELESS_ENCRYPT_AES}},         {"TKIPAES", {WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES}},
+};
+
+// What the supplicant calls the ciphers of WPA; the first row stands for whatever is none.
+constexpr WIRELESS_LITERAL_MAPPING kSupplicantCiphers[] = {
+    {"", {WIRELESS_ENCRYPT_UNKNOWN}},
+    {"TKIP", {WIRELESS_ENCRYPT_TKIP}},
+    {"CCMP", {WIRELESS_ENCRYPT_AES}},
+    {"TKIP CCMP", {WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES}},
+};
+
+constexpr WIRELESS_LITERAL_MAPPING kOpmodeTexts[] = {
+    {"UNKNOWN", {WIRELESS_OPMODE_UNKNOWN}},      {"AUTO", {WIRELESS_OPMODE_AUTO}},
+    {"ADHOC", {WIRELESS_OPMODE_ADHOC}},          {"MANAGED", {WIRELESS_OPMODE_MANAGED}},
+    {"MASTER", {WIRELESS_OPMODE_MASTER}},        {"REPEATER", {WIRELESS_OPMODE_REPEATER}},
+    {"SECONDARY", {WIRELESS_OPMODE_SECONDEARY}}, {"MONITOR", {WIRELESS_OPMODE_MONITOR}},
+};
+static_assert(std::size(kOpmodeTexts) == WIRELESS_OPMODE_MAX, "name every operating mode");
+
+}  // namespace
+
+WIRELESS_OPMODE ParseOpmode(const char* szOpmode) {
+  return static_cast<WIRELESS_OPMODE>(ValueOf(kOpmodeTexts, szOpmode));
+}
+
+std::optional<Bssid> ParseBssid(std::string_view text) {
+  constexpr size_t kDigits = 2;
+  Bssid bssid;
+  if (text.size() != std::size(bssid.octets) * (kDigits + 1) - 1) return std::nullopt;
+  const char* octet = text.data();
+  for (unsigned char& value : bssid.octets) {
+    const char* end = octet + kDigits;
+    if (std::from_chars(octet, end, value, 16).ptr != end) return std::nullopt;
+    if (end != text.data() + text.size() && *end != ':') return std::nullopt;
+    octet = end + 1;
+  }
+  return bssid;
+}
+
+const char* MEROWirelessAuthStringGet(WIRELESS_AUTH auth) {
+  return TextOf(kAuthTexts, auth);
+}
+
+const char* MEROWirelessEncryptStringGet(WIRELESS_ENCRYPT encrypt, int form) {
+  return TextOf(form == 1 ? Literals(kSupplicantCiphers) : Literals(kEncryptTexts), encrypt);
+}
+
+const char* MEROWirelessOpmodeStringGet(WIRELESS_OPMODE opmode) {
+  return TextOf(kOpmodeTexts, opmode);
+}
+
+char* MEROWirelessBssidStringGet(const unsigned char* rgbBssid, char* szBssid, size_t cbBssid) {
+  if (rgbBssid == nullptr || szBssid == nullptr) return REFUSE_NULL(), nullptr;
+  std::snprintf(szBssid, cbBssid, "%02X:%02X:%02X:%02X:%02X:%02X", rgbBssid[0], rgbBssid[1], rgbBssid[2], rgbBssid[3],
+                rgbBssid[4], rgbBssid[5]);
+  return szBssid;
+}
+
+WIRELESS_AUTH MEROWirelessAuthParse(const char* szAuth) {
+  return static_cast<WIRELESS_AUTH>(ValueOf(kAuthTexts, szAuth));
+}
+
+WIRELESS_ENCRYPT MEROWirelessEncryptParse(const char* szEncrypt) {
+  return static_cast<WIRELESS_ENCRYPT>(ValueOf(kEncryptTexts, szEncrypt));
+}
+
+WIRELESS_PROTOCOL MEROWirelessProtocolParse(const char* szProtocol) {
+  return static_cast<WIRELESS_PROTOCOL>(ValueOf(kProtocolTexts, szProtocol));
+}

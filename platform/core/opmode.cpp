@@ -1,0 +1,14 @@
+// What the client interface is operated as.
+#include "platform/core/error.h"
+#include "platform/core/radio.h"
+
+int MEROWirelessOpmodeSet(WIRELESS_OPMODE opmode) {
+  const char* szIfName = MEROWirelessInterfaceGet();
+  if (opmode < WIRELESS_OPMODE_AUTO || opmode >= WIRELESS_OPMODE_UNKNOWN) {
+    return FAIL(EINVAL, "set the mode of", szIfName), -1;
+  }
+  Result<Radio> radio = Radio::Open(szIfName);
+  const Status status = radio.ok() ? radio->SetMode(opmode) : radio.status();
+  if (!status.ok()) return FAIL(status.error(), "set the mode of", szIfName), -1;
+  return 0;
+}

@@ -1,0 +1,36 @@
+// One interface's radio, asked and told through the kernel's wireless extensions.
+#ifndef MERO_PLATFORM_RADIO_H
+#define MERO_PLATFORM_RADIO_H
+
+#include <net/if.h>
+
+#include "platform.h"
+#include "platform/core/descriptor.h"
+#include "platform/core/literals.h"
+#include "platform/core/result.h"
+
+class Radio {
+ public:
+  Radio() = default;
+
+  static Result<Radio> Open(const char* szIfName);
+
+  Result<bool> IsUp() const;
+  Result<WIRELESS_OPMODE> Mode() const;
+  Status SetMode(WIRELESS_OPMODE mode) const;
+
+  // The name of the current network; empty when there is none.
+  Status Essid(char (&szEssid)[33]) const;
+
+  // The address of the current access point, or of the ad-hoc cell; none when there is no connection.
+  Result<std::optional<Bssid>> AccessPoint() const;
+
+  // Leaves the current network or cell.
+  Status Leave() const;
+
+ private:
+  Descriptor control_;
+  char szIfName_[IFNAMSIZ] = {};
+};
+
+#endif  // MERO_PLATFORM_RADIO_H

@@ -1,0 +1,176 @@
+// Section files.
+#include "common/text.h"
+#include "platform/core/error.h"
+#include "platform/core/file_edit.h"
+#include "platform/core/file_read.h"
+#include "platform/core/section_text.h"
+#include "platform/core/text_hash.h"
+#include "platform/core/text_list.h"
+
+namespace {
+
+constexpr mode_t kMode = 0600;  // what stands in sections are settings with their secrets
+
+// The pairs that a section is to hold, and the form of their lines.
+struct NewPairs {
+  const PLIBSZHASH* hash;
+  const char* szFormat;
+};
+
+bool IsPair(const Lines& lines) {
+  return PairOfLine(lines.text(), ValueForm::kPlain).has_value();
+}
+
+// Where in a section's body its pairs begin, and where they end; both at the start when there are none.
+LinePlace PlaceOfPairs(std::string_view body) {
+  std::optional<LinePlace> place;
+  for (Lines lines(body); lines.Next();) {
+    if (IsPair(lines)) place = LinePlace{place ? place->begin : lines.begin(), lines.end()};
+  }
+  return place.value_or(LinePlace{0, 0});
+}
+
+Status AppendPairs(Bytes& content, const NewPairs& pairs) {
+  for (const HashEntry* entry = pairs.hash->first; entry != nullptr; entry = entry->next) {
+    const Pair pair{entry->szKey, entry->szValue};
+    if (Status status = AppendPair(content, pairs.szFormat, pair, ValueForm::kPlain); !status.ok()) return status;
+  }
+  return Status::Ok();
+}
+
+Status AppendAllButPairs(Bytes& content, std::string_view text) {
+  for (Lines lines(text); lines.Next();) {
+    if (IsPair(lines)) continue;
+    if (Status status = AppendText(content, lines.whole()); !status.ok()) return status;
+  }
+  return Status::Ok();
+}
+
+// The text and, behind it, the header of a new section.
+Status ComposeNewHeader(std::string_view text, const char* szSection, Bytes& content) {
+  if (Status status = AppendText(content, text); !status.ok()) return status;
+  if (Status status = EndLine(content); !status.ok()) return status;
+  return AppendHeader(content, szSection);
+}
+
+Status ComposeAdded(std::string_view text, const char* szSection, const NewPairs& pairs, Bytes& content) {
+  if (Status status = ComposeNewHeader(text, szSection, content); !status.ok()) return status;
+  return AppendPairs(content, pairs);
+}
+
+// The text with the pairs of one section replaced, and its header when it gets a new name.
+Status ComposeReplaced(std::string_view text, const SectionPlace& place, const char* szNewName, const NewPairs& pairs,
+                       Bytes& content) {
+  const std::string_view body = Slice(text, place.body, place.end);
+  const LinePlace old = PlaceOfPairs(body);
+
+  if (Status status = AppendText(content, Slice(text, 0, place.header)); !status.ok()) return status;
+  const Status header = szNewName != nullptr ? AppendHeader(content, szNewName)
+                                             : AppendText(content, Slice(text, place.header, place.body));
+  if (!header.ok()) return header;
+  if (Status status = AppendText(content, Slice(body, 0, old.begin)); !status.ok()) return status;
+  if (Status status = EndLine(content); !status.ok()) return status;
+  if (Status status = AppendPairs(content, pairs); !status.ok()) return status;
+  if (Status status = AppendAllButPairs(content, Slice(body, old.begin)); !status.ok()) return status;
+  return AppendText(content, Slice(text, place.end));
+}
+
+Status ComposeSection(std::string_view text, const char* szSection, const char* szNewName, const NewPairs& pairs,
+                      Bytes& content) {
+  const std::optional<SectionPlace> place = FindSection(text, szSection);
+  if (place) return ComposeReplaced(text, *place, szNewName, pairs, content);
+  return ComposeAdded(text, szNewName != nullptr ? szNewName : szSection, pairs, content);
+}
+
+// Where the line of a key is to stand in a text: in place of the old one, or behind the section's last pair.
+LinePlace PlaceOfKey(std::string_view text, const SectionPlace& section, std::string_view key) {
+  const std::string_view body = Slice(text, section.body, section.end);
+  const size_t behindPairs = PlaceOfPairs(body).end;
+  const LinePlace place = FindKey(body, key, ValueForm::kPlain).value_or(LinePlace{behindPairs, behindPairs});
+  return {section.body + place.begin, section.body + place.end};
+}
+
+Status ComposeValue(std::string_view text, const char* szSection, const Pair& pair, const char* szFormat,
+                    Bytes& content) {
+  const std::optional<SectionPlace> section = FindSection(text, szSection);
+  if (!section) {
+    if (Status status = ComposeNewHeader(text, szSection, content); !status.ok()) return status;
+    return AppendPair(content, szFormat, pair, ValueForm::kPlain);
+  }
+
+  const LinePlace place = PlaceOfKey(text, *section, pair.key);
+  if (Status status = AppendText(content, Slice(text, 0, place.begin)); !status.ok()) return status;
+  if (Status status = EndLine(content); !status.ok()) return status;
+  if (Status status = AppendPair(content, szFormat, pair, ValueForm::kPlain); !status.ok()) return status;
+  return AppendText(content, Slice(text, place.end));
+}
+
+int WriteSection(const char* szPath, const char* szSection, const char* szNewName, const NewPairs& pairs) {
+  const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
+    return ComposeSection(text, szSection, szNewName, pairs, content);
+  });
+  if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  return 1;
+}
+
+}  // namespace
+
+int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList) {
+  if (szPath == nullptr || ppslList == nullptr || *ppslList == nullptr) return REFUSE_NULL(), -1;
+
+  Result<Bytes> file = ReadFile(szPath);
+  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
+  if (!file.ok()) return FAIL(file.error(), "read", szPath), -1;
+
+  PLIBSZLIST& list = **ppslList;
+  const int before = list.nItem;
+  for (Lines lines(file->view()); lines.Next();) {
+    const std::optional<std::string_view> section = SectionOfLine(lines.text());
+    if (section && !AppendToList(list, *section)) {
+      TruncateList(list, before);
+      return FAIL(ENOMEM, "read", szPath), -1;
+    }
+  }
+  return list.nItem - before;
+}
+
+int PLIBCFileGetSection(const char* szPath, const char* szSection, PPLIBSZHASH* ppshHash) {
+  if (szPath == nullptr || szSection == nullptr || ppshHash == nullptr || *ppshHash == nullptr) {
+    return REFUSE_NULL(), -1;
+  }
+
+  Result<Bytes> file = ReadFile(szPath);
+  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
+  if (!file.ok()) return FAIL(file.error(), "read", szPath), -1;
+
+  const std::optional<SectionPlace> place = FindSection(file->view(), szSection);
+  if (!place) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
+  for (Lines lines(Slice(file->view(), place->body, place->end)); lines.Next();) {
+    const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
+    if (pair && !SetInHash(**ppshHash, pair->key, pair->value)) return FAIL(ENOMEM, "read", szPath), -1;
+  }
+  return 1;
+}
+
+int PLIBCFileAddSection(const char* szPath, const char* szSection, const PLIBSZHASH* pshHash, const char* szFormat) {
+  if (szPath == nullptr || szSection == nullptr || pshHash == nullptr || szFormat == nullptr) return REFUSE_NULL(), -1;
+  return WriteSection(szPath, szSection, nullptr, {pshHash, szFormat});
+}
+
+int PLIBCFileSetSection(const char* szPath, const char* szSection, const char* szNewName, const PLIBSZHASH* pshHash,
+                        const char* szFormat) {
+  if (szPath == nullptr || szSection == nullptr || pshHash == nullptr || szFormat == nullptr) return REFUSE_NULL(), -1;
+  return WriteSection(szPath, szSection, szNewName, {pshHash, szFormat});
+}
+
+int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const char* szKey, const char* szValue,
+                             const char* szFormat) {
+  if (szPath == nullptr || szSection == nullptr || szKey == nullptr || szValue == nullptr || szFormat == nullptr) {
+    return REFUSE_NULL(), -1;
+  }
+  const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
+    return ComposeValue(text, szSection, {szKey, szValue}, szFormat, content);
+  });
+  if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  return 0;
+}

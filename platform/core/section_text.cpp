@@ -1,0 +1,123 @@
+// The text of settings files.
+#include "platform/core/section_text.h"
+
+#include "common/text.h"
+
+bool Lines::Next() {
+  begin_ = end_;
+  if (begin_ == text_.size()) return false;
+  const size_t feed = text_.find('\n', begin_);
+  end_ = feed == std::string_view::npos ? text_.size() : feed + 1;
+  return true;
+}
+
+std::string_view Lines::text() const {
+  std::string_view line = whole();
+  if (!line.ends_with('\n')) return line;
+  line.remove_suffix(1);
+  if (line.ends_with('\r')) line.remove_suffix(1);
+  return line;
+}
+
+namespace {
+
+std::string_view Unquoted(std::string_view value) {
+  const bool quoted =
+      value.size() >= 2 && value.front() == value.back() && (value.front() == '"' || value.front() == '\'');
+  if (!quoted) return value;
+  value.remove_prefix(1);
+  value.remove_suffix(1);
+  return value;
+}
+
+// Whether the text that begins at `begin` is one whole line.
+bool IsOneLine(std::string_view text) {
+  return text.ends_with('\n') && text.find('\n') == text.size() - 1;
+}
+
+// Expands the two "%s" of a line format; EINVAL when it has another number of them, or any other conversion.
+Status Expand(Bytes& to, std::string_view format, Pair pair) {
+  const std::string_view values[] = {pair.key, pair.value};
+  size_t used = 0;
+  while (!format.empty()) {
+    const size_t percent = std::min(format.find('%'), format.size());
+    if (!to.Append(Slice(format, 0, percent))) return Status::Failed(ENOMEM);
+    format.remove_prefix(percent);
+    if (format.empty()) break;
+    if (!format.starts_with("%s") || used == std::size(values)) return Status::Failed(EINVAL);
+    if (!to.Append(values[used++])) return Status::Failed(ENOMEM);
+    format.remove_prefix(2);
+  }
+  return used == std::size(values) ? Status::Ok() : Status::Failed(EINVAL);
+}
+
+}  // namespace
+
+std::optional<Pair> PairOfLine(std::string_view line, ValueForm form) {
+  const size_t equals = line.find('=');
+  if (equals == std::string_view::npos || SectionOfLine(line)) return std::nullopt;
+  const std::string_view key = Trim(Slice(line, 0, equals));
+  if (key.empty() || key.front() == '#' || key.front() == ';') return std::nullopt;
+  const std::string_view value = Slice(line, equals + 1);
+  return Pair{key, form == ValueForm::kShell ? Unquoted(Trim(value)) : value};
+}
+
+std::optional<std::string_view> SectionOfLine(std::string_view line) {
+  line = Trim(line);
+  if (line.size() < 2 || line.front() != '[' || line.back() != ']') return std::nullopt;
+  return Trim(Slice(line, 1, line.size() - 1));
+}
+
+std::optional<SectionPlace> FindSection(std::string_view text, std::string_view name) {
+  std::optional<SectionPlace> place;
+  for (Lines lines(text); lines.Next();) {
+    const std::optional<std::string_view> section = SectionOfLine(lines.text());
+    if (!section) continue;
+    if (place) {
+      place->end = lines.begin();
+      return place;
+    }
+    if (EqualIgnoringCase(*section, name)) place = SectionPlace{lines.begin(), lines.end(), text.size()};
+  }
+  return place;
+}
+
+std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, ValueForm form) {
+  std::optional<LinePlace> place;
+  for (Lines lines(text); lines.Next();) {
+    const std::optional<Pair> pair = PairOfLine(lines.text(), form);
+    if (pair && pair->key == key) place = LinePlace{lines.begin(), lines.end()};
+  }
+  return place;
+}
+
+Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form) {
+  const size_t begin = to.view().size();
+  if (Status status = Expand(to, szFormat, pair); !status.ok()) return status;
+
+  const std::string_view written = Slice(to.view(), begin);
+  Lines line(written);
+  const bool one = IsOneLine(written) && line.Next();
+  const std::optional<Pair> read = one ? PairOfLine(line.text(), form) : std::nullopt;
+  const bool same = read && read->key == pair.key && read->value == pair.value;
+  return same ? Status::Ok() : Status::Failed(EINVAL);
+}
+
+Status AppendHeader(Bytes& to, std::string_view name) {
+  const size_t begin = to.view().size();
+  if (!to.Append("[") || !to.Append(name) || !to.Append("]\n")) return Status::Failed(ENOMEM);
+
+  const std::string_view written = Slice(to.view(), begin);
+  Lines line(written);
+  const bool one = IsOneLine(written) && line.Next();
+  return one && SectionOfLine(line.text()) == name ? Status::Ok() : Status::Failed(EINVAL);
+}
+
+Status AppendText(Bytes& to, std::string_view text) {
+  return to.Append(text) ? Status::Ok() : Status::Failed(ENOMEM);
+}
+
+Status EndLine(Bytes& to) {
+  const std::string_view text = to.view();
+  return text.empty() || text.ends_with('\n') ? Status::Ok() : AppendText(to, "\n");
+}

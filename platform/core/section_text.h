@@ -1,0 +1,84 @@
+// The text of settings files: lines, KEY=value pairs, and sections. Nothing here copies; all is views of the text.
+#ifndef MERO_PLATFORM_SECTION_TEXT_H
+#define MERO_PLATFORM_SECTION_TEXT_H
+
+#include <optional>
+#include <string_view>
+
+#include "common/text.h"
+#include "platform/core/bytes.h"
+#include "platform/core/result.h"
+
+// Walks a text line by line.
+class Lines {
+ public:
+  explicit Lines(std::string_view text) : text_(text) {}
+
+  // Moves on to the next line; false at the end.
+  bool Next();
+
+  std::string_view whole() const {
+    return Slice(text_, begin_, end_);
+  }                               // with its line end
+  std::string_view text() const;  // without
+  size_t begin() const {
+    return begin_;
+  }
+  size_t end() const {
+    return end_;
+  }
+
+ private:
+  std::string_view text_;
+  size_t begin_ = 0;
+  size_t end_ = 0;
+};
+
+struct Pair {
+  std::string_view key;
+  std::string_view value;
+};
+
+// How a file's values stand behind the "=".
+enum class ValueForm {
+  kPlain,  // every byte counts
+  kShell,  // white space around them does not, nor do quotes
+};
+
+// The pair on a line, given without its end; none on a comment, a section's header, or any other line.
+std::optional<Pair> PairOfLine(std::string_view line, ValueForm form);
+
+// The name on a section's header; none on any other line.
+std::optional<std::string_view> SectionOfLine(std::string_view line);
+
+// Where a section stands in its file, as offsets.
+struct SectionPlace {
+  size_t header;
+  size_t body;
+  size_t end;
+};
+
+// The first section of that name; none when absent. Names compare without regard to ASCII case.
+std::optional<SectionPlace> FindSection(std::string_view text, std::string_view name);
+
+// Where a key's line stands in a text, as offsets: its last, which is the one that counts. None when absent.
+struct LinePlace {
+  size_t begin;
+  size_t end;
+};
+std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, ValueForm form);
+
+// Appends the line of a pair in the format of the caller ("%s" twice). EINVAL when the format is another, or when the
+// line would not read back as that pair in that form.
+Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form);
+
+// Appends a section's header; EINVAL when it would not read back as that name.
+Status AppendHeader(Bytes& to, std::string_view name);
+
+// Appends bytes as they are.
+Status AppendText(Bytes& to, std::string_view text);
+
+// Ends the last line, if it has no end yet, so that a line can follow.
+Status EndLine(Bytes& to);
+
+#endif  // MERO_PLATFORM_SECTION_TEXT_H
