@@ -1,0 +1,28 @@
+// Commands for the shell.
+#include "shell_words.h"
+
+#include <algorithm>
+
+#include "common/text.h"
+
+namespace {
+
+bool IsOrdinary(char c) {
+  constexpr std::string_view kMarks = "_.:/@%+=,-";
+  return (c >= '0' && c <= '9') || (ToLower(c) >= 'a' && ToLower(c) <= 'z') || kMarks.find(c) != std::string_view::npos;
+}
+
+}  // namespace
+
+ShellWord::ShellWord(std::string_view value) {
+  constexpr std::string_view kQuoteInside = "'\\''";  // out of the quotes, a quote by itself, and in again
+  char* to = szWord_;
+  const auto put = [&](std::string_view text) { to = std::copy(text.begin(), text.end(), to); };
+
+  value = Slice(value, 0, (sizeof szWord_ - 3) / kQuoteInside.size());
+  const bool ordinary = !value.empty() && std::all_of(value.begin(), value.end(), IsOrdinary);
+  if (!ordinary) put("'");
+  for (const char c : value) put(c == '\'' ? kQuoteInside : std::string_view(&c, 1));
+  if (!ordinary) put("'");
+  *to = '\0';
+}

@@ -1,0 +1,62 @@
+// Commands for the shell. What is put into them may come from strangers: anyone in range chooses the name of a network.
+#ifndef MERO_LIB_SHELL_WORDS_H
+#define MERO_LIB_SHELL_WORDS_H
+
+#include <cerrno>
+#include <cstddef>
+#include <cstdio>
+#include <cstdlib>
+#include <string_view>
+
+// A value as one word of a command: as it is when all its characters are ordinary, else quoted, so that the shell
+// passes it on unchanged.
+class ShellWord {
+ public:
+  explicit ShellWord(std::string_view value);
+
+  // The word; longer than any command when the value was, so that no command is run with a part of it.
+  const char* c_str() const {
+    return szWord_;
+  }
+
+ private:
+  // The longest command is 1024 bytes; a value that would fill it quoted needs four times as much.
+  char szWord_[4 * 1024 + 3];
+};
+
+// A command of at most kSize - 1 bytes. One that is longer is cut in its text, for messages, and never run.
+template <size_t kSize>
+class Command {
+ public:
+  template <class... Values>
+  explicit Command(const char* szFormat, Values... values) {
+    const int size = std::snprintf(szText_, kSize, szFormat, values...);
+    fits_ = size >= 0 && static_cast<size_t>(size) < kSize;
+  }
+
+  const char* c_str() const {
+    return szText_;
+  }
+
+  // Runs it and waits; negative when it could not be started. The exit status is for callers that look at it.
+  [[nodiscard]] int Run() const {
+    return fits_ ? std::system(szText_) : Refuse(-1);
+  }
+
+  // Starts it, to read its output; null when it could not be started.
+  [[nodiscard]] FILE* OpenPipe() const {
+    return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr);
+  }
+
+ private:
+  template <class Failure>
+  static Failure Refuse(Failure failure) {
+    errno = E2BIG;
+    return failure;
+  }
+
+  char szText_[kSize] = {};
+  bool fits_ = false;
+};
+
+#endif  // MERO_LIB_SHELL_WORDS_H

@@ -1,0 +1,8 @@
+// The text of a radio standard.
+#include "common/literals.h"
+#include "common/protocol_texts.h"
+#include "wireless.h"
+
+const char* MEROWirelessProtocolStringGet(const WIRELESS_PROTOCOL proto) {
+  return TextOf(kProtocolTexts, proto);
+}
