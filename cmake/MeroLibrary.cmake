@@ -1,3 +1,22 @@
+# How the parts of the shared libraries are compiled.
+function(mero_compile_part name)
+  target_include_directories(${name} PUBLIC ${CMAKE_SOURCE_DIR}/include PRIVATE ${CMAKE_SOURCE_DIR})
+  target_compile_options(${name} PRIVATE -fno-exceptions -fno-rtti -fvisibility=hidden -fvisibility-inlines-hidden
+                                         -ffunction-sections)
+  set_target_properties(${name} PROPERTIES POSITION_INDEPENDENT_CODE ON)
+  if(CMAKE_SIZEOF_VOID_P EQUAL 4)
+    # Files beyond 2 GiB and times beyond 2038. Machines with 64-bit longs have them anyway.
+    target_compile_definitions(${name} PRIVATE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
+  endif()
+endfunction()
+
+# mero_internal(NAME SOURCES ...): code that several shared libraries contain.
+function(mero_internal name)
+  cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES")
+  add_library(${name} STATIC ${arg_SOURCES})
+  mero_compile_part(${name})
+endfunction()
+
 # mero_library(NAME EXPORTS FILE SOURCES ... [LIBRARIES ...])
 #
 # A shared library with C++ inside and C at its boundary: it exports the names in its version script and nothing else,
@@ -6,11 +25,7 @@ function(mero_library name)
   cmake_parse_arguments(PARSE_ARGV 1 arg "" "EXPORTS" "SOURCES;LIBRARIES")
 
   add_library(${name} SHARED ${arg_SOURCES})
-  target_include_directories(${name} PUBLIC ${CMAKE_SOURCE_DIR}/include PRIVATE ${CMAKE_SOURCE_DIR})
-  target_compile_options(${name} PRIVATE -fno-exceptions -fno-rtti -fvisibility=hidden -fvisibility-inlines-hidden
-                                         -ffunction-sections)
-  # Files beyond 2 GiB and times beyond 2038, also where longs have 32 bits.
-  target_compile_definitions(${name} PRIVATE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
+  mero_compile_part(${name})
   target_link_options(${name} PRIVATE -Wl,-z,defs -Wl,-z,now -Wl,--gc-sections -Wl,--as-needed
                                       -Wl,--version-script=${arg_EXPORTS})
   target_link_libraries(${name} PRIVATE ${arg_LIBRARIES})

@@ -6,6 +6,5 @@
 inline constexpr char kConnectionRecordPath[] = "/var/tmp/.wireless_current_connection";
 
 inline constexpr char kSupplicantPidPath[] = "/var/run/wpa_supplicant.pid";
-inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";  // with the interface
 
 #endif  // MERO_COMMON_CONNECTION_FILES_H

@@ -3,6 +3,7 @@
 #define MERO_LIB_HOLDERS_H
 
 #include <fcntl.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <cstdlib>
@@ -77,13 +78,17 @@ RecordHolder<Record> NewRecord() {
   return RecordHolder<Record>(static_cast<Record*>(std::calloc(1, sizeof(Record))));
 }
 
+// Keeps a stream from the commands that are run while it is open. One without a descriptor has nothing to keep.
+inline void CloseOnExec(FILE* pfStream) {
+  if (pfStream != nullptr && ::fileno(pfStream) >= 0) (void)::fcntl(::fileno(pfStream), F_SETFD, FD_CLOEXEC);
+}
+
 // The output of a command, to be read.
 class Pipe {
  public:
   template <size_t kSize>
   explicit Pipe(const Command<kSize>& command) : pfPipe_(command.OpenPipe()) {
-    // Commands that run while this one is read inherit nothing of it. It has no descriptor when it is no real pipe.
-    if (pfPipe_ != nullptr && ::fileno(pfPipe_) >= 0) (void)::fcntl(::fileno(pfPipe_), F_SETFD, FD_CLOEXEC);
+    CloseOnExec(pfPipe_);
   }
   Pipe(const Pipe&) = delete;
   Pipe& operator=(const Pipe&) = delete;
@@ -100,6 +105,43 @@ class Pipe {
 
  private:
   FILE* pfPipe_;
+};
+
+// A file that is written from its beginning.
+class NewFile {
+ public:
+  // Who may read a file that is created; one that exists keeps its mode.
+  enum Readers : mode_t { kSecret = 0600, kForAll = 0644 };
+
+  NewFile(const char* szPath, Readers readers) {
+    // Created apart from being opened, since fopen() would create it for all to read.
+    const int fd = ::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC, static_cast<mode_t>(readers));
+    if (fd < 0) return;
+    ::close(fd);
+    pfFile_ = std::fopen(szPath, "w");
+    CloseOnExec(pfFile_);
+  }
+  NewFile(const NewFile&) = delete;
+  NewFile& operator=(const NewFile&) = delete;
+  ~NewFile() {
+    if (pfFile_ != nullptr) (void)std::fclose(pfFile_);  // given up half written, after a failure
+  }
+
+  explicit operator bool() const {
+    return pfFile_ != nullptr;
+  }
+  FILE* get() const {
+    return pfFile_;
+  }
+
+  // Whether all that was written has reached the file. Nothing may be written afterwards.
+  [[nodiscard]] bool Close() {
+    const bool written = std::ferror(pfFile_) == 0;
+    return std::fclose(std::exchange(pfFile_, nullptr)) == 0 && written;
+  }
+
+ private:
+  FILE* pfFile_ = nullptr;
 };
 
 #endif  // MERO_LIB_HOLDERS_H

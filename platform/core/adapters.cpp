@@ -7,7 +7,7 @@
 #include <memory>
 
 #include "common/text.h"
-#include "platform/core/error.h"
+#include "platform/base/error.h"
 
 namespace {
 

@@ -7,7 +7,7 @@
 
 #include "common/connection_files.h"
 #include "common/text.h"
-#include "platform/core/file_read.h"
+#include "platform/base/file_read.h"
 
 namespace {
 

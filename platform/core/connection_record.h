@@ -3,8 +3,8 @@
 #define MERO_PLATFORM_CONNECTION_RECORD_H
 
 #include "platform.h"
+#include "platform/base/result.h"
 #include "platform/core/literals.h"
-#include "platform/core/result.h"
 
 struct ConnectionRecord {
   WIRELESS_PROTOCOL protocol = WIRELESS_PROTO_UNKNOWN;

@@ -1,6 +1,6 @@
 // What is known about the current connection.
+#include "platform/base/error.h"
 #include "platform/core/connection_record.h"
-#include "platform/core/error.h"
 #include "platform/core/radio.h"
 
 namespace {

@@ -1,24 +1,17 @@
 // Ending the current connection.
 #include <unistd.h>
 
-#include <cstdio>
-
 #include "common/connection_files.h"
-#include "platform/core/daemon.h"
-#include "platform/core/error.h"
-#include "platform/core/interface.h"
+#include "platform/base/daemon.h"
+#include "platform/base/dhcp_client.h"
+#include "platform/base/error.h"
+#include "platform/base/interface.h"
 #include "platform/core/radio.h"
 
 namespace {
 
 Status EndSupplicant(const char* /*szIfName*/) {
   return EndDaemon(kSupplicantPidPath, "wpa_supplicant");
-}
-
-Status EndDhcpClient(const char* szIfName) {
-  char szPidPath[sizeof kDhcpClientPidFormat + IFNAMSIZ];
-  std::snprintf(szPidPath, sizeof szPidPath, kDhcpClientPidFormat, szIfName);
-  return EndDaemon(szPidPath, "busybox");
 }
 
 // An ad-hoc cell has nobody to tell: the interface stops being part of it by being a station again, which the driver

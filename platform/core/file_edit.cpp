@@ -9,7 +9,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "platform/core/file_read.h"
+#include "platform/base/file_read.h"
 
 namespace {
 

@@ -7,9 +7,9 @@
 #include <climits>
 #include <string_view>
 
-#include "platform/core/bytes.h"
-#include "platform/core/descriptor.h"
-#include "platform/core/result.h"
+#include "platform/base/bytes.h"
+#include "platform/base/descriptor.h"
+#include "platform/base/result.h"
 
 class FileEdit {
  public:

@@ -4,8 +4,8 @@
 
 #include <cstdio>
 
-#include "platform/core/descriptor.h"
-#include "platform/core/error.h"
+#include "platform/base/descriptor.h"
+#include "platform/base/error.h"
 
 int PLIBCFileExist(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), 0;

@@ -13,8 +13,8 @@
 #include "common/clock.h"
 #include "common/known_networks_file.h"
 #include "common/text.h"
-#include "platform/core/error.h"
-#include "platform/core/file_read.h"
+#include "platform/base/error.h"
+#include "platform/base/file_read.h"
 #include "platform/core/literals.h"
 #include "platform/core/section_index.h"
 

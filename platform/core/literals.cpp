@@ -7,7 +7,7 @@
 
 #include "common/literals.h"
 #include "common/protocol_texts.h"
-#include "platform/core/error.h"
+#include "platform/base/error.h"
 
 namespace {
 

@@ -4,7 +4,7 @@
 #include <linux/wireless.h>
 #include <sys/ioctl.h>
 
-#include "platform/core/interface.h"
+#include "platform/base/interface.h"
 
 // The kernel numbers the modes as this interface does.
 static_assert(WIRELESS_OPMODE_AUTO == IW_MODE_AUTO && WIRELESS_OPMODE_ADHOC == IW_MODE_ADHOC);

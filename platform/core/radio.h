@@ -5,9 +5,9 @@
 #include <net/if.h>
 
 #include "platform.h"
-#include "platform/core/descriptor.h"
+#include "platform/base/descriptor.h"
+#include "platform/base/result.h"
 #include "platform/core/literals.h"
-#include "platform/core/result.h"
 
 class Radio {
  public:

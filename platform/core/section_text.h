@@ -6,8 +6,8 @@
 #include <string_view>
 
 #include "common/text.h"
-#include "platform/core/bytes.h"
-#include "platform/core/result.h"
+#include "platform/base/bytes.h"
+#include "platform/base/result.h"
 
 // Walks a text line by line.
 class Lines {

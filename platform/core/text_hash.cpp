@@ -6,7 +6,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "platform/core/error.h"
+#include "platform/base/error.h"
 
 namespace {
 

@@ -1,38 +1,36 @@
 // IPv4 addresses as text.
+#include "platform/sdk/addresses.h"
+
 #include <arpa/inet.h>
 
 #include <bit>
-#include <cstdint>
 
 #include "platform.h"
 
-namespace {
-
-// An address or a mask in host order; false when the text is none. Dotted with four numbers, no shorthand.
-bool Parse(const char* szText, uint32_t& value) {
+std::optional<Ipv4> ParseAddress(const char* szAddress) {
   in_addr address;
-  if (szText == nullptr || ::inet_pton(AF_INET, szText, &address) != 1) return false;
-  value = ntohl(address.s_addr);
-  return true;
+  if (szAddress == nullptr || ::inet_pton(AF_INET, szAddress, &address) != 1) return std::nullopt;
+  return ntohl(address.s_addr);
 }
 
-// Ones, then zeros.
-bool IsMask(uint32_t mask) {
-  return std::countl_one(mask) + std::countr_zero(mask) == 32;
+std::optional<Ipv4> ParseMask(const char* szMask) {
+  const std::optional<Ipv4> mask = ParseAddress(szMask);
+  const bool contiguous = mask && std::countl_one(*mask) + std::countr_zero(*mask) == 32;
+  return contiguous ? mask : std::nullopt;
 }
 
-}  // namespace
+bool IsHost(Ipv4 address, Ipv4 mask) {
+  if (~mask <= 1) return true;  // in a subnet of one or two addresses all are hosts'
+  const Ipv4 host = address & ~mask;
+  return host != 0 && host != ~mask;
+}
 
 int MERONetIsSameSubnet(const char* szAddress, const char* szReference, const char* szMask) {
-  uint32_t address;
-  uint32_t reference;
-  uint32_t mask;
-  if (!Parse(szAddress, address) || !Parse(szReference, reference) || !Parse(szMask, mask) || !IsMask(mask)) return 0;
-  if ((address & mask) != (reference & mask)) return 0;
-
-  const uint32_t host = address & ~mask;
-  const bool hasNetworkAddress = ~mask > 1;  // two addresses alone are both hosts, and so is one
-  return !hasNetworkAddress || (host != 0 && host != ~mask) ? 1 : 0;
+  const std::optional<Ipv4> address = ParseAddress(szAddress);
+  const std::optional<Ipv4> reference = ParseAddress(szReference);
+  const std::optional<Ipv4> mask = ParseMask(szMask);
+  if (!address || !reference || !mask) return 0;
+  return (*address & *mask) == (*reference & *mask) && IsHost(*address, *mask) ? 1 : 0;
 }
 
 const char* MERONetNtoa(struct in_addr address) {

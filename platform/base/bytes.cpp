@@ -1,5 +1,5 @@
 // A growing run of bytes.
-#include "platform/core/bytes.h"
+#include "platform/base/bytes.h"
 
 #include <algorithm>
 #include <cstdlib>

@@ -1,11 +1,11 @@
 // Reading whole files.
-#include "platform/core/file_read.h"
+#include "platform/base/file_read.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "platform/core/descriptor.h"
+#include "platform/base/descriptor.h"
 
 namespace {
 

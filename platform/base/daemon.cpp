@@ -1,5 +1,5 @@
 // Daemons that keep their pid in a file.
-#include "platform/core/daemon.h"
+#include "platform/base/daemon.h"
 
 #include <poll.h>
 #include <unistd.h>
@@ -13,8 +13,8 @@ extern "C" {
 #include <cstdio>
 
 #include "common/text.h"
-#include "platform/core/descriptor.h"
-#include "platform/core/file_read.h"
+#include "platform/base/descriptor.h"
+#include "platform/base/file_read.h"
 
 namespace {
 

@@ -2,8 +2,8 @@
 #ifndef MERO_PLATFORM_FILE_READ_H
 #define MERO_PLATFORM_FILE_READ_H
 
-#include "platform/core/bytes.h"
-#include "platform/core/result.h"
+#include "platform/base/bytes.h"
+#include "platform/base/result.h"
 
 // The content of an open regular file; EFBIG when it is larger than any file of settings has reason to be.
 Result<Bytes> ReadWhole(int fd);

@@ -6,7 +6,7 @@
 
 #include <utility>
 
-#include "platform/core/result.h"
+#include "platform/base/result.h"
 
 class Descriptor {
  public:

@@ -5,8 +5,8 @@
 #include <net/if.h>
 
 #include "common/text.h"
-#include "platform/core/descriptor.h"
-#include "platform/core/result.h"
+#include "platform/base/descriptor.h"
+#include "platform/base/result.h"
 
 // A socket to pass ioctls through, or the reason why there is none.
 Result<Descriptor> OpenControl();

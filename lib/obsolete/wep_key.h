@@ -1,0 +1,26 @@
+// The forms in which a WEP key is given, told apart by its length alone.
+#ifndef MERO_LIB_WEP_KEY_H
+#define MERO_LIB_WEP_KEY_H
+
+#include <cstring>
+
+enum class WepKeyForm {
+  kText,    // 40 or 104 bits as 5 or 13 characters
+  kDigits,  // the same as 10 or 26 hexadecimal digits
+  kWrong,
+};
+
+inline WepKeyForm FormOfWepKey(const char* szKey) {
+  switch (std::strlen(szKey)) {
+    case 5:
+    case 13:
+      return WepKeyForm::kText;
+    case 10:
+    case 26:
+      return WepKeyForm::kDigits;
+    default:
+      return WepKeyForm::kWrong;
+  }
+}
+
+#endif  // MERO_LIB_WEP_KEY_H

@@ -1,0 +1,6 @@
+// Names the interface that serves as access point.
+#include "wireless.h"
+
+const char* MEROWirelessAPInterfaceGet(void) {
+  return "wlan0";
+}

@@ -1,0 +1,237 @@
+// Joins a network: an ad-hoc cell directly, any other through the supplicant.
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+
+#include "common/connection_files.h"
+#include "common/log.h"
+#include "holders.h"
+#include "platform.h"
+#include "shell_words.h"
+#include "wep_key.h"
+#include "wireless.h"
+
+namespace {
+
+constexpr char kMarkerPath[] = "/var/tmp/.wireless_connecting";
+constexpr char kSupplicantPath[] = "/usr/sbin/wpa_supplicant";
+constexpr char kSupplicantConfigPath[] = "/usr/mero/etc/wpa_supplicant.conf";
+constexpr char kSystemSettingsPath[] = "/etc/meroinfo.conf";
+constexpr char kResolverPath[] = "/etc/resolv.conf";
+
+constexpr int kMediaServiceRestart = 2;
+
+using LongCommand = Command<1024>;
+
+// ---- The supplicant's configuration ----
+
+BOOL CheckBssid(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
+  if (pNetCfg == nullptr) return LOG("Bad parameters"), FALSE;
+  const auto& bssid = pNetCfg->network.bssid;
+  const bool known = std::any_of(std::begin(bssid), std::end(bssid), [](unsigned char octet) { return octet != 0; });
+  return known && pNetCfg->noneBssid == 0 ? TRUE : FALSE;
+}
+
+void WriteWepKey(FILE* pfConf, const char* szKey) {
+  switch (FormOfWepKey(szKey)) {
+    case WepKeyForm::kText:
+      std::fprintf(pfConf, "\twep_key0=\"%s\"\n", szKey);
+      break;
+    case WepKeyForm::kDigits:
+      std::fprintf(pfConf, "\twep_key0=%s\n", szKey);
+      break;
+    case WepKeyForm::kWrong:
+      LOG("Wrong WEP Format.");  // and the attempt goes on, without the key
+      break;
+  }
+}
+
+void WriteWithoutWpa(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+  std::fprintf(pfConf, "\tkey_mgmt=NONE\n");
+  if (config.network.encrypt == WIRELESS_ENCRYPT_WEP) {
+    WriteWepKey(pfConf, config.szKey);
+    std::fprintf(pfConf, "\twep_tx_keyidx=0\n");
+    std::fprintf(pfConf, "\tauth_alg=SHARED\n");
+  }
+  std::fprintf(pfConf, "}\n");
+}
+
+void WritePairwise(FILE* pfConf, WIRELESS_ENCRYPT encrypt) {
+  if ((encrypt & (WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES)) == 0) return;
+  std::fprintf(pfConf, "\tpairwise=%s\n", MEROWirelessEncryptStringGet(encrypt, 1));
+}
+
+void WriteWpaPsk(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+  std::fprintf(pfConf, "\tkey_mgmt=WPA-PSK\n");
+  WritePairwise(pfConf, config.network.encrypt);
+  std::fprintf(pfConf, "\tpsk=\"%s\"\n}\n", config.szKey);
+}
+
+void WriteWpaEap(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+  std::fprintf(pfConf, "\tkey_mgmt=WPA-EAP\n");
+  std::fprintf(pfConf, "\teap=TTLS PEAP\n");
+  WritePairwise(pfConf, config.network.encrypt);
+  std::fprintf(pfConf, "\tidentity=\"%s\"\n", config.szUser);
+  std::fprintf(pfConf, "\tpassword=\"%s\"\n", config.szKey);
+  std::fprintf(pfConf, "}\n");
+}
+
+// Writes what the authentication asks for, and closes the block; false when there is no such authentication.
+bool WriteSecurity(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+  switch (config.network.auth) {
+    case WIRELESS_AUTH_OPEN:
+    case WIRELESS_AUTH_SHARED:
+    case WIRELESS_AUTH_WEPAUTO:
+      return WriteWithoutWpa(pfConf, config), true;
+    case WIRELESS_AUTH_WPAPSK:
+    case WIRELESS_AUTH_WPA2PSK:
+      return WriteWpaPsk(pfConf, config), true;
+    case WIRELESS_AUTH_WPAEAP:
+    case WIRELESS_AUTH_WPA2EAP:
+      return WriteWpaEap(pfConf, config), true;
+    case WIRELESS_AUTH_UNKNOWN:
+    case WIRELESS_AUTH_WPANONE:
+      break;
+  }
+  return LOG("Failed to detect authentication/encryption type"), false;
+}
+
+bool WriteNetwork(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+  char szBssid[1024] = {};
+  std::fprintf(pfConf, "ctrl_interface=/var/run/wpa_supplicant\n");
+  std::fprintf(pfConf, "network={\n");
+  std::fprintf(pfConf, "\tssid=\"%s\"\n", config.network.szEssid);
+  if (CheckBssid(&config) == TRUE) {
+    std::fprintf(pfConf, "\tbssid=%s\n", MEROWirelessBssidStringGet(config.network.bssid, szBssid, sizeof szBssid));
+  }
+  std::fprintf(pfConf, "\tscan_ssid=1\n");
+  return WriteSecurity(pfConf, config);
+}
+
+// Whether a value would end its line in the configuration and begin one of its own. Values come from strangers.
+bool HoldsLineFeed(const WIRELESS_NETWORK_CONFIG& config) {
+  for (const char* szValue : {config.network.szEssid, config.szKey, config.szUser}) {
+    if (std::strchr(szValue, '\n') != nullptr) return true;
+  }
+  return false;
+}
+
+BOOL SetWpaSupplicantConfig(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
+  if (pNetCfg == nullptr) return LOG("Bad parameters"), FALSE;
+  if (HoldsLineFeed(*pNetCfg)) return LOG("A name or secret with a line feed cannot be configured."), FALSE;
+
+  if (PLIBCFileExist(kSupplicantConfigPath) != 0) (void)PLIBCSysUnlink(kSupplicantConfigPath);  // written anew anyway
+  NewFile conf(kSupplicantConfigPath, NewFile::kSecret);
+  if (!conf) return LOG("Failed to open file[%s].", kSupplicantConfigPath), FALSE;
+  const bool complete = WriteNetwork(conf.get(), *pNetCfg);
+  return conf.Close() && complete ? TRUE : FALSE;
+}
+
+// ---- The supplicant itself ----
+
+bool Run(const LongCommand& command) {
+  if (command.Run() >= 0) return true;
+  return LOG("Failed to execute '%s'", command.c_str()), false;
+}
+
+bool TerminateSupplicant() {
+  return Run(LongCommand("/usr/sbin/wpa_cli terminate > /dev/null 2>&1"));
+}
+
+bool StartSupplicant(const char* szIfName) {
+  return Run(LongCommand("%s -Dwext -i%s -c%s -B -P%s &> /dev/null", kSupplicantPath, ShellWord(szIfName).c_str(),
+                         kSupplicantConfigPath, kSupplicantPidPath));
+}
+
+// Asks for the supplicant's state once a second until the connection is complete.
+BOOL CheckConnComplete() {
+  constexpr int kPolls = 15;
+  char szState[1024] = {};
+  for (int poll = 0; poll < kPolls; ++poll) {
+    ::sleep(1);
+    const Pipe status(LongCommand("/usr/sbin/wpa_cli status | grep wpa_state"));
+    if (!status) continue;
+    if (std::fscanf(status.get(), " wpa_state=%1023s", szState) == 1 && std::strcmp(szState, "COMPLETED") == 0) {
+      return TRUE;
+    }
+  }
+  return FALSE;
+}
+
+BOOL RecordConnection(const WIRELESS_NETWORK* pNetwork) {
+  if (pNetwork == nullptr) return FALSE;
+  (void)PLIBCSysUnlink(kConnectionRecordPath);  // what was recorded holds no longer, whatever comes of this
+  NewFile record(kConnectionRecordPath, NewFile::kForAll);
+  if (!record) return FALSE;
+
+  char szBssid[1024] = {};
+  std::fprintf(record.get(), "%s\n%d\n%d\n%d\n%s\n", pNetwork->szEssid, pNetwork->protocol, pNetwork->auth,
+               pNetwork->encrypt, MEROWirelessBssidStringGet(pNetwork->bssid, szBssid, sizeof szBssid));
+  return record.Close() ? TRUE : FALSE;
+}
+
+// ---- The connection ----
+
+int NetworkConnect(const char* szIfName, const WIRELESS_NETWORK_CONFIG* pNetCfg) {
+  if (szIfName == nullptr || pNetCfg == nullptr) return LOG("Bad parameters"), -1;
+  if (pNetCfg->network.opmode == WIRELESS_OPMODE_ADHOC) return MEROWirelessAdhocCreate(pNetCfg);
+
+  if (SetWpaSupplicantConfig(pNetCfg) == FALSE) return LOG("Failed to set [%s]", kSupplicantConfigPath), -1;
+  if (PLIBCFileExist(kSupplicantPidPath) != 0 && !TerminateSupplicant()) return -1;
+  if (!StartSupplicant(szIfName)) return -1;
+  if (CheckConnComplete() == FALSE) {
+    LOG("Time out to connect AP, kill wpa_supplicant.");
+    (void)TerminateSupplicant();  // has reported; there is nothing else to be done
+    return -1;
+  }
+  if (RecordConnection(&pNetCfg->network) == FALSE) return LOG("Failed to record this connection."), -1;
+  return 0;
+}
+
+bool MediaServiceUses(const char* szIfName) {
+  return PLIBCFileCheckKeyValue(kSystemSettingsPath, "runmediaservice", "yes", 0) != 0 &&
+         PLIBCFileCheckKeyValue(kSystemSettingsPath, "network_mediaservice", szIfName, 0) != 0;
+}
+
+void PostProcessing() {
+  if (MediaServiceUses(MEROWirelessInterfaceGet())) (void)MEROMediaService(kMediaServiceRestart);  // has reported
+  if (PLIBCFileExist(kResolverPath) != 0) {
+    (void)Run(LongCommand("/bin/cp /etc/resolv.conf /etc/resolv.conf.wireless.bak"));  // has reported
+  }
+}
+
+// The marker of an attempt; gone at the end of every attempt, also of one that was refused because it was there.
+class Marker {
+ public:
+  Marker() = default;
+  Marker(const Marker&) = delete;
+  Marker& operator=(const Marker&) = delete;
+  ~Marker() {
+    (void)PLIBCSysUnlink(kMarkerPath);
+  }
+
+  bool exists() const {
+    return PLIBCFileExist(kMarkerPath) != 0;
+  }
+  void Create() const {
+    (void)PLIBCFileTouch(kMarkerPath);
+  }  // a guard that cannot be put up is no reason not to join
+};
+
+}  // namespace
+
+int MEROWirelessNetworkConnect(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
+  const Marker marker;
+  if (MEROWirelessAdapterNum() <= 0) return LOG("There is no wireless USB adapter plugged"), -1;
+  if (MEROWirelessCheckBlock() != 1) return 0;  // a radio that is switched off is nobody's failure
+  if (marker.exists()) return LOG("Another connection construction is going"), -1;
+
+  marker.Create();
+  if (NetworkConnect(MEROWirelessInterfaceGet(), pNetCfg) < 0) return LOG("Failed to connect network."), -1;
+  PostProcessing();
+  return 0;
+}

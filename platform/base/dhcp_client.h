@@ -1,0 +1,29 @@
+// The DHCP client of an interface: busybox's, which stays behind to renew the lease.
+#ifndef MERO_PLATFORM_DHCP_CLIENT_H
+#define MERO_PLATFORM_DHCP_CLIENT_H
+
+#include <net/if.h>
+
+#include "platform/base/result.h"
+
+inline constexpr char kDhcpClientPath[] = "/bin/busybox";
+
+// A file of an interface's client, by a format that takes the interface's name.
+class DhcpClientFile {
+ public:
+  DhcpClientFile(const char* szFormat, const char* szIfName);
+
+  const char* c_str() const {
+    return szPath_;
+  }
+
+ private:
+  char szPath_[64];
+};
+
+inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
+
+// Ends the client of an interface, if it has one.
+Status EndDhcpClient(const char* szIfName);
+
+#endif  // MERO_PLATFORM_DHCP_CLIENT_H

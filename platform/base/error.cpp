@@ -1,0 +1,29 @@
+// The error codes of errnos.
+#include "platform/base/error.h"
+
+namespace {
+
+struct CodeOfErrno {
+  int error;
+  MERO_ERROR code;
+};
+
+constexpr CodeOfErrno kCodes[] = {
+    {ENOMEM, ERR_OUT_OF_MEMORY},   {EINVAL, ERR_BAD_PARAMETERS},
+    {EACCES, ERR_PERMISSION},      {EPERM, ERR_PERMISSION},
+    {EROFS, ERR_PERMISSION},       {ENOSPC, ERR_NO_SPACE},
+    {EDQUOT, ERR_NO_SPACE},        {EIO, ERR_IO},
+    {ENOENT, ERR_FILE_NOT_FOUND},  {ENOTDIR, ERR_FILE_NOT_FOUND},
+    {EFBIG, ERR_TOO_LARGE},        {ERANGE, ERR_TOO_LARGE},
+    {ENAMETOOLONG, ERR_TOO_LARGE}, {ENODEV, ERR_NO_DEVICE},
+    {ENXIO, ERR_NO_DEVICE},        {ENOEXEC, ERR_COMMAND_FAILED},
+};
+
+}  // namespace
+
+int CodeOfError(int error) {
+  for (const CodeOfErrno& row : kCodes) {
+    if (row.error == error) return row.code;
+  }
+  return ERR_UNKNOWN;
+}

@@ -1,0 +1,134 @@
+// Addressing an interface: now, and at every boot.
+#include <arpa/inet.h>
+#include <sys/ioctl.h>
+#include <sys/stat.h>
+
+#include <cstdio>
+#include <optional>
+
+#include "platform/base/dhcp_client.h"
+#include "platform/base/error.h"
+#include "platform/base/interface.h"
+#include "platform/sdk/addresses.h"
+
+namespace {
+
+constexpr const char* kScriptDirectories[] = {"/etc/sysconfig", "/etc/sysconfig/network-scripts"};
+constexpr char kScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
+constexpr char kLineFormat[] = "%s=%s\n";
+
+struct Subnet {
+  Ipv4 address;
+  Ipv4 mask;
+};
+
+// The record's address and mask; none after a report that names the one that is none.
+std::optional<Subnet> SubnetOf(const NETINFO& netInfo) {
+  const std::optional<Ipv4> mask = ParseMask(netInfo.szMask);
+  if (!mask || *mask == 0) return LOG("'%s' is no netmask for %s", netInfo.szMask, netInfo.szInterface), std::nullopt;
+  const std::optional<Ipv4> address = ParseAddress(netInfo.szIp);
+  if (!address || *address == INADDR_ANY || !IsHost(*address, *mask)) {
+    return LOG("'%s' is no address for %s", netInfo.szIp, netInfo.szInterface), std::nullopt;
+  }
+  return Subnet{*address, *mask};
+}
+
+Status Set(const Descriptor& control, const char* szIfName, unsigned long what, Ipv4 value) {
+  Result<ifreq> request = RequestFor<ifreq>(szIfName);
+  if (!request.ok()) return request.status();
+  auto& address = reinterpret_cast<sockaddr_in&>(request->ifr_addr);
+  address.sin_family = AF_INET;
+  address.sin_addr.s_addr = htonl(value);
+  return Status::Of(::ioctl(control.get(), what, &*request));
+}
+
+Status Apply(const char* szIfName, const Subnet& subnet) {
+  Result<Descriptor> control = OpenControl();
+  if (!control.ok()) return control.status();
+  if (Status status = Set(*control, szIfName, SIOCSIFADDR, subnet.address); !status.ok()) return status;
+  if (Status status = Set(*control, szIfName, SIOCSIFNETMASK, subnet.mask); !status.ok()) return status;
+  const Ipv4 broadcast = subnet.address | ~subnet.mask;
+  if (Status status = Set(*control, szIfName, SIOCSIFBRDADDR, broadcast); !status.ok()) return status;
+  return SetInterfaceUp(szIfName, true);
+}
+
+Status MakeScriptDirectory() {
+  for (const char* szDirectory : kScriptDirectories) {
+    if (::mkdir(szDirectory, 0755) < 0 && errno != EEXIST) return Status::Failed(errno);
+  }
+  return Status::Ok();
+}
+
+// The network-script file of an interface, changed key by key until one fails, which the platform reports.
+class Script {
+ public:
+  explicit Script(const char* szIfName) {
+    std::snprintf(szPath_, sizeof szPath_, kScriptFormat, szIfName);
+    if (Status status = MakeScriptDirectory(); !status.ok()) {
+      FAIL(status.error(), "make the directory of", szPath_);
+      written_ = false;
+    }
+  }
+
+  void Set(const char* szKey, const char* szValue) {
+    written_ = written_ && PLIBCFileSetKeyValue(szPath_, szKey, szValue, kLineFormat) > 0;
+  }
+
+  void Remove(const char* szKey) {
+    written_ = written_ && PLIBCFileRemoveKey(szPath_, szKey) >= 0;
+  }
+
+  bool written() const {
+    return written_;
+  }
+
+ private:
+  char szPath_[sizeof kScriptFormat + IFNAMSIZ];
+  bool written_ = true;
+};
+
+bool WriteStatic(const NETINFO& netInfo) {
+  Script script(netInfo.szInterface);
+  script.Set("DEVICE", netInfo.szInterface);
+  script.Set("BOOTPROTO", "static");
+  script.Set("IPADDR", netInfo.szIp);
+  script.Set("NETMASK", netInfo.szMask);
+  return script.written();
+}
+
+bool WriteDhcp(const NETINFO& netInfo) {
+  Script script(netInfo.szInterface);
+  script.Set("DEVICE", netInfo.szInterface);
+  script.Set("BOOTPROTO", "dhcp");
+  script.Remove("IPADDR");
+  script.Remove("NETMASK");
+  return script.written();
+}
+
+int SetStatic(const NETINFO& netInfo) {
+  const std::optional<Subnet> subnet = SubnetOf(netInfo);
+  if (!subnet) return PLIBCErrSet(ERR_BAD_PARAMETERS), -1;
+  // A DHCP client that stayed would put its own address back.
+  if (Status status = EndDhcpClient(netInfo.szInterface); !status.ok()) {
+    return FAIL(status.error(), "end the DHCP client of", netInfo.szInterface), -1;
+  }
+  if (Status status = Apply(netInfo.szInterface, *subnet); !status.ok()) {
+    return FAIL(status.error(), "address", netInfo.szInterface), -1;
+  }
+  return WriteStatic(netInfo) ? 0 : -1;
+}
+
+// The DHCP client has set the address, or will.
+int SetDhcp(const NETINFO& netInfo) {
+  if (Status status = SetInterfaceUp(netInfo.szInterface, true); !status.ok()) {
+    return FAIL(status.error(), "bring up", netInfo.szInterface), -1;
+  }
+  return WriteDhcp(netInfo) ? 0 : -1;
+}
+
+}  // namespace
+
+int MERONetSetCard1(const NETINFO* pNetInfo, int /*flags*/) {
+  if (pNetInfo == nullptr) return REFUSE_NULL(), -1;
+  return pNetInfo->blManual != FALSE ? SetStatic(*pNetInfo) : SetDhcp(*pNetInfo);
+}
