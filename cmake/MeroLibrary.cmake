@@ -26,8 +26,11 @@ function(mero_library name)
 
   add_library(${name} SHARED ${arg_SOURCES})
   mero_compile_part(${name})
-  target_link_options(${name} PRIVATE -Wl,-z,defs -Wl,-z,now -Wl,--gc-sections -Wl,--as-needed
+  target_link_options(${name} PRIVATE -Wl,-z,now -Wl,--gc-sections -Wl,--as-needed
                                       -Wl,--version-script=${arg_EXPORTS})
+  if(NOT (MERO_SANITIZE AND CMAKE_CXX_COMPILER_ID STREQUAL Clang))  # whose sanitizers are in the program alone
+    target_link_options(${name} PRIVATE -Wl,-z,defs)
+  endif()
   target_link_libraries(${name} PRIVATE ${arg_LIBRARIES})
   set_target_properties(${name} PROPERTIES
     LINKER_LANGUAGE C

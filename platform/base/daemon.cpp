@@ -38,6 +38,9 @@ bool Runs(pid_t pid, const char* szProgram) {
   if (size < 0) return false;
   std::string_view name(target, static_cast<size_t>(size));
   name.remove_prefix(name.rfind('/') + 1);
+  // The program's file may have been replaced since, by an upgrade say.
+  constexpr std::string_view kReplaced = " (deleted)";
+  if (name.ends_with(kReplaced)) name.remove_suffix(kReplaced.size());
   return name == szProgram;
 }
 

@@ -72,7 +72,7 @@ int MEROWirelessCurInfoGet(WIRELESS_REQUEST request, PWIRELESS_INFO pInfo) {
     return 0;
   }
   const char* szIfName = MEROWirelessInterfaceGet();
-  Result<Radio> radio = Radio::Open(szIfName);
+  Result<Radio> radio = Radio::OfAdapter(szIfName);
   const Status status = radio.ok() ? Ask(*radio, request, *pInfo) : radio.status();
   if (!status.ok()) return FAIL(status.error(), "ask the adapter", szIfName), -1;
   return 0;

@@ -23,7 +23,7 @@ Status LeaveCell(const char* szIfName, const Radio& radio) {
 }
 
 Status LeaveNetwork(const char* szIfName) {
-  Result<Radio> radio = Radio::Open(szIfName);
+  Result<Radio> radio = Radio::OfAdapter(szIfName);
   if (!radio.ok()) return radio.status();
   Result<WIRELESS_OPMODE> mode = radio->Mode();
   if (!mode.ok()) return mode.status();

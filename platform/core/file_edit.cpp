@@ -81,10 +81,15 @@ Status FlushDirectory(const char* szPath) {
 }  // namespace
 
 Result<FileEdit> FileEdit::Open(const char* szPath, mode_t mode) {
-  const int create = mode != 0 ? O_CREAT : 0;
+  constexpr int kFlags = O_RDONLY | O_CLOEXEC | O_NONBLOCK;
   FileEdit edit;
   while (true) {
-    edit.lock_ = Descriptor(::open(szPath, O_RDONLY | O_CLOEXEC | O_NONBLOCK | create, mode));
+    edit.created_ = false;
+    edit.lock_ = Descriptor(::open(szPath, kFlags));
+    if (!edit.lock_.valid() && errno == ENOENT && mode != 0) {
+      edit.created_ = true;
+      edit.lock_ = Descriptor(::open(szPath, kFlags | O_CREAT, mode));
+    }
     if (!edit.lock_.valid()) return Status::Failed(errno);
     if (Status status = Lock(edit.lock_.get()); !status.ok()) return status;
     if (::realpath(szPath, edit.szPath_) == nullptr) {
@@ -92,14 +97,19 @@ Result<FileEdit> FileEdit::Open(const char* szPath, mode_t mode) {
       return Status::Failed(errno);
     }
     Result<bool> current = Names(edit.szPath_, edit.lock_.get());
-    if (!current.ok()) return Status::Failed(current.error());
+    if (!current.ok()) return current.status();
     if (*current) break;
   }
 
   Result<Bytes> text = ReadWhole(edit.lock_.get());
-  if (!text.ok()) return Status::Failed(text.error());
+  if (!text.ok()) return text.status();
   edit.text_ = std::move(*text);
   return edit;
+}
+
+void FileEdit::Abandon() {
+  // Under the lock, so that nobody is writing it; who waits for the lock will notice.
+  if (created_ && text_.view().empty()) (void)::unlink(szPath_);  // it is as good as never made
 }
 
 Status FileEdit::Commit(std::string_view content) {

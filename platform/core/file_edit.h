@@ -24,12 +24,16 @@ class FileEdit {
     return text_.view();
   }
 
+  // Gives up, and removes the file again if it was made for this edit.
+  void Abandon();
+
   // Replaces the content. The file holds the old content or the new one, whole, whenever this is interrupted.
   Status Commit(std::string_view content);
 
  private:
   Descriptor lock_;  // the file itself, locked; closing it gives the lock up, after the new file is in place
   Bytes text_;
+  bool created_ = false;
   char szPath_[PATH_MAX] = {};  // where the file really is
 };
 
@@ -39,8 +43,10 @@ Status EditFile(const char* szPath, mode_t mode, Compose compose) {
   Result<FileEdit> edit = FileEdit::Open(szPath, mode);
   if (!edit.ok()) return edit.status();
   Bytes content;
-  if (Status status = compose(edit->text(), content); !status.ok()) return status;
-  return edit->Commit(content.view());
+  Status status = compose(edit->text(), content);
+  if (status.ok()) status = edit->Commit(content.view());
+  if (!status.ok()) edit->Abandon();
+  return status;
 }
 
 #endif  // MERO_PLATFORM_FILE_EDIT_H

@@ -14,6 +14,7 @@ int PLIBCFileExist(const char* szPath) {
 
 int PLIBCFileTouch(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
+  if (PLIBCFileExist(szPath) != 0) return 0;
   Descriptor file(::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0600));
   if (!file.valid()) return FAIL(errno, "create", szPath), -1;
   if (Status status = file.Close(); !status.ok()) return FAIL(status.error(), "create", szPath), -1;

@@ -20,6 +20,8 @@
 
 namespace {
 
+constexpr int kNoSection = ENODATA;
+
 // What tells a file that was replaced or written to from the one that was read.
 struct FileStamp {
   dev_t device;
@@ -61,7 +63,7 @@ struct KeptFile {
   SectionIndex index;
 };
 
-bool g_walking = false;  // the first section was asked for, and not yet the last
+size_t g_asked = 0;  // how many sections were asked for since the first; 0 when no walk is under way
 KeptFile* g_kept = nullptr;
 
 void Drop() {
@@ -72,8 +74,16 @@ void Drop() {
 }
 
 void EndWalk() {
-  g_walking = false;
+  g_asked = 0;
   Drop();
+}
+
+// Counts a section that was asked for, of `total` in the file. A walk begins with the first, and goes on until as many
+// were asked for as there are: by number, since a section may stand in the file twice.
+void Advance(bool first, size_t total) {
+  if (g_asked > 0) ++g_asked;
+  if (first && g_asked < total) g_asked = 1;
+  if (g_asked >= total) EndWalk();
 }
 
 // Keeps a text, if there is memory for it; not to keep it only costs time.
@@ -87,13 +97,14 @@ void Keep(Bytes&& text, const FileStamp& stamp) {
 int32_t ParseTime(std::string_view text) {
   int64_t seconds = 0;
   const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), seconds);
+  if (end != text.data() + text.size()) return 0;
   if (error == std::errc::result_out_of_range) return SaturatedTime(text.front() == '-' ? INT64_MIN : INT64_MAX);
-  return end == text.data() + text.size() ? SaturatedTime(seconds) : 0;
+  return SaturatedTime(seconds);
 }
 
 void TakeBssid(std::string_view text, WIRELESS_NETWORK& network) {
-  const std::optional<Bssid> bssid = ParseBssid(text);
-  if (bssid) std::memcpy(network.bssid, bssid->octets, sizeof network.bssid);
+  const Bssid bssid = ParseBssid(text).value_or(Bssid{});
+  std::memcpy(network.bssid, bssid.octets, sizeof network.bssid);
 }
 
 // Takes one pair of the section into the record; a pair of another program's is passed over.
@@ -116,6 +127,7 @@ void Take(const Pair& pair, WIRELESS_NETWORK_CONFIG& config) {
 
 WIRELESS_NETWORK_CONFIG ConfigOf(std::string_view section) {
   WIRELESS_NETWORK_CONFIG config{};
+  config.network.opmode = WIRELESS_OPMODE_UNKNOWN;
   for (Lines lines(section); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
     if (pair) Take(*pair, config);
@@ -138,9 +150,9 @@ WIRELESS_NETWORK_CONFIG ConfigAt(std::string_view text, const SectionPlace& plac
 Result<WIRELESS_NETWORK_CONFIG> ReadKept(const char* szSection) {
   const std::string_view text = g_kept->text.view();
   const std::optional<SectionPlace> place = g_kept->index.Find(text, szSection);
-  if (!place) return Status::Failed(ENOENT);
+  if (!place) return Status::Failed(kNoSection);
   const WIRELESS_NETWORK_CONFIG config = ConfigAt(text, *place);
-  if (place->end == text.size()) EndWalk();
+  Advance(IsFirst(text, *place), g_kept->index.headers());
   return config;
 }
 
@@ -149,16 +161,15 @@ Result<WIRELESS_NETWORK_CONFIG> ReadAnew(const char* szSection, const FileStamp&
   if (!file.ok()) return file.status();
   const std::string_view text = file->view();
   const std::optional<SectionPlace> place = FindSection(text, szSection);
-  if (!place) return Status::Failed(ENOENT);
+  if (!place) return Status::Failed(kNoSection);
   const WIRELESS_NETWORK_CONFIG config = ConfigAt(text, *place);
 
-  if (IsFirst(text, *place)) g_walking = true;
-  if (place->end == text.size()) EndWalk();
-  if (g_walking && HasSettled(stamp)) Keep(std::move(*file), stamp);
+  Advance(IsFirst(text, *place), CountSections(text));
+  if (g_asked > 0 && HasSettled(stamp)) Keep(std::move(*file), stamp);
   return config;
 }
 
-// ENOENT when there is no such section, or no file.
+// kNoSection when there is no such section, ENOENT when there is no file.
 Result<WIRELESS_NETWORK_CONFIG> Read(const char* szSection) {
   Result<FileStamp> stamp = StampOf(kKnownNetworksPath);
   if (!stamp.ok()) return EndWalk(), stamp.status();
@@ -171,7 +182,8 @@ Result<WIRELESS_NETWORK_CONFIG> Read(const char* szSection) {
 int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg) {
   if (szSection == nullptr || pNetCfg == nullptr) return REFUSE_NULL(), -1;
   Result<WIRELESS_NETWORK_CONFIG> config = Read(szSection);
-  if (config.error() == ENOENT) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
+  if (config.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), -1;
+  if (config.error() == kNoSection) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
   if (!config.ok()) return FAIL(config.error(), "read", kKnownNetworksPath), -1;
   *pNetCfg = *config;
   return 0;

@@ -7,7 +7,7 @@ int MEROWirelessOpmodeSet(WIRELESS_OPMODE opmode) {
   if (opmode < WIRELESS_OPMODE_AUTO || opmode >= WIRELESS_OPMODE_UNKNOWN) {
     return FAIL(EINVAL, "set the mode of", szIfName), -1;
   }
-  Result<Radio> radio = Radio::Open(szIfName);
+  Result<Radio> radio = Radio::OfAdapter(szIfName);
   const Status status = radio.ok() ? radio->SetMode(opmode) : radio.status();
   if (!status.ok()) return FAIL(status.error(), "set the mode of", szIfName), -1;
   return 0;

@@ -32,7 +32,9 @@ constexpr uint16_t kReasonLeaving = 3;  // "the station is leaving", as a frame 
 
 }  // namespace
 
-Result<Radio> Radio::Open(const char* szIfName) {
+Result<Radio> Radio::OfAdapter(const char* szIfName) {
+  // Asked first, since a kernel without wireless extensions gives another reason.
+  if (MEROWirelessAdapterNum() <= 0) return Status::Failed(ENODEV);
   Result<Descriptor> control = OpenControl();
   if (!control.ok()) return control.status();
   if (std::strlen(szIfName) >= IFNAMSIZ) return Status::Failed(ENODEV);

@@ -13,7 +13,8 @@ class Radio {
  public:
   Radio() = default;
 
-  static Result<Radio> Open(const char* szIfName);
+  // ENODEV when no adapter is there.
+  static Result<Radio> OfAdapter(const char* szIfName);
 
   Result<bool> IsUp() const;
   Result<WIRELESS_OPMODE> Mode() const;

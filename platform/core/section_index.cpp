@@ -22,12 +22,6 @@ std::string_view NameAt(std::string_view text, const SectionPlace& place) {
   return *SectionOfLine(Slice(text, place.header, place.body));
 }
 
-size_t CountSections(std::string_view text) {
-  size_t count = 0;
-  for (Lines lines(text); lines.Next();) count += SectionOfLine(lines.text()).has_value() ? 1 : 0;
-  return count;
-}
-
 }  // namespace
 
 SectionIndex::~SectionIndex() {
@@ -51,7 +45,8 @@ void SectionIndex::Add(std::string_view text, const SectionPlace& place) {
 
 bool SectionIndex::Build(std::string_view text) {
   *this = SectionIndex();
-  nPlaces_ = std::bit_ceil(2 * CountSections(text) + 1);
+  nHeaders_ = CountSections(text);
+  nPlaces_ = std::bit_ceil(2 * nHeaders_ + 1);
   places_ = static_cast<SectionPlace*>(std::calloc(nPlaces_, sizeof(SectionPlace)));
   if (places_ == nullptr) return false;
 

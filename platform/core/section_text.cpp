@@ -44,7 +44,7 @@ Status Expand(Bytes& to, std::string_view format, Pair pair) {
     if (!to.Append(Slice(format, 0, percent))) return Status::Failed(ENOMEM);
     format.remove_prefix(percent);
     if (format.empty()) break;
-    if (!format.starts_with("%s") || used == std::size(values)) return Status::Failed(EINVAL);
+    if (Slice(format, 0, 2) != "%s" || used == std::size(values)) return Status::Failed(EINVAL);
     if (!to.Append(values[used++])) return Status::Failed(ENOMEM);
     format.remove_prefix(2);
   }
@@ -80,6 +80,12 @@ std::optional<SectionPlace> FindSection(std::string_view text, std::string_view 
     if (EqualIgnoringCase(*section, name)) place = SectionPlace{lines.begin(), lines.end(), text.size()};
   }
   return place;
+}
+
+size_t CountSections(std::string_view text) {
+  size_t count = 0;
+  for (Lines lines(text); lines.Next();) count += SectionOfLine(lines.text()).has_value() ? 1 : 0;
+  return count;
 }
 
 std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, ValueForm form) {

@@ -61,6 +61,9 @@ struct SectionPlace {
 // The first section of that name; none when absent. Names compare without regard to ASCII case.
 std::optional<SectionPlace> FindSection(std::string_view text, std::string_view name);
 
+// How many sections there are, those included that stand twice.
+size_t CountSections(std::string_view text);
+
 // Where a key's line stands in a text, as offsets: its last, which is the one that counts. None when absent.
 struct LinePlace {
   size_t begin;

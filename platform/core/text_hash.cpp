@@ -119,7 +119,7 @@ void PLIBCSzHashFree(PPLIBSZHASH pshHash) {
 }
 
 const char* PLIBCSzHashGetValue(const PLIBSZHASH* pshHash, const char* szKey) {
-  if (pshHash == nullptr || szKey == nullptr) return nullptr;
+  if (pshHash == nullptr || szKey == nullptr) return REFUSE_NULL(), nullptr;
   const HashEntry* entry = Find(*pshHash, szKey);
   return entry != nullptr ? entry->szValue : nullptr;
 }

@@ -56,7 +56,8 @@ void PLIBCSzListFree(PPLIBSZLIST pslList) {
 }
 
 const char* PLIBCSzListGet(const PLIBSZLIST* pslList, int index) {
-  return pslList != nullptr && Has(*pslList, index) ? pslList->ppszItem[index] : nullptr;
+  if (pslList == nullptr) return REFUSE_NULL(), nullptr;
+  return Has(*pslList, index) ? pslList->ppszItem[index] : nullptr;
 }
 
 int PLIBCSzListFind(const PLIBSZLIST* pslList, const char* szText) {

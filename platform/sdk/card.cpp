@@ -1,21 +1,16 @@
 // Addressing an interface: now, and at every boot.
 #include <arpa/inet.h>
 #include <sys/ioctl.h>
-#include <sys/stat.h>
 
-#include <cstdio>
 #include <optional>
 
 #include "platform/base/dhcp_client.h"
 #include "platform/base/error.h"
 #include "platform/base/interface.h"
 #include "platform/sdk/addresses.h"
+#include "platform/sdk/network_script.h"
 
 namespace {
-
-constexpr const char* kScriptDirectories[] = {"/etc/sysconfig", "/etc/sysconfig/network-scripts"};
-constexpr char kScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
-constexpr char kLineFormat[] = "%s=%s\n";
 
 struct Subnet {
   Ipv4 address;
@@ -52,43 +47,8 @@ Status Apply(const char* szIfName, const Subnet& subnet) {
   return SetInterfaceUp(szIfName, true);
 }
 
-Status MakeScriptDirectory() {
-  for (const char* szDirectory : kScriptDirectories) {
-    if (::mkdir(szDirectory, 0755) < 0 && errno != EEXIST) return Status::Failed(errno);
-  }
-  return Status::Ok();
-}
-
-// The network-script file of an interface, changed key by key until one fails, which the platform reports.
-class Script {
- public:
-  explicit Script(const char* szIfName) {
-    std::snprintf(szPath_, sizeof szPath_, kScriptFormat, szIfName);
-    if (Status status = MakeScriptDirectory(); !status.ok()) {
-      FAIL(status.error(), "make the directory of", szPath_);
-      written_ = false;
-    }
-  }
-
-  void Set(const char* szKey, const char* szValue) {
-    written_ = written_ && PLIBCFileSetKeyValue(szPath_, szKey, szValue, kLineFormat) > 0;
-  }
-
-  void Remove(const char* szKey) {
-    written_ = written_ && PLIBCFileRemoveKey(szPath_, szKey) >= 0;
-  }
-
-  bool written() const {
-    return written_;
-  }
-
- private:
-  char szPath_[sizeof kScriptFormat + IFNAMSIZ];
-  bool written_ = true;
-};
-
 bool WriteStatic(const NETINFO& netInfo) {
-  Script script(netInfo.szInterface);
+  NetworkScript script(netInfo.szInterface);
   script.Set("DEVICE", netInfo.szInterface);
   script.Set("BOOTPROTO", "static");
   script.Set("IPADDR", netInfo.szIp);
@@ -97,7 +57,7 @@ bool WriteStatic(const NETINFO& netInfo) {
 }
 
 bool WriteDhcp(const NETINFO& netInfo) {
-  Script script(netInfo.szInterface);
+  NetworkScript script(netInfo.szInterface);
   script.Set("DEVICE", netInfo.szInterface);
   script.Set("BOOTPROTO", "dhcp");
   script.Remove("IPADDR");
