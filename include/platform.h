@@ -135,7 +135,8 @@ int PLIBCSzListRemove(PPLIBSZLIST pslList, int index);
 
 /* ---- Files ---------------------------------------------------------------------------------------------------- */
 
-/** @return 1 when the path names something that exists (a dangling link does not), else 0. */
+/** @return 1 when the path names something that exists (a dangling link does not), or that cannot be looked at; else
+ *          0. */
 int PLIBCFileExist(const char* szPath);
 
 /**

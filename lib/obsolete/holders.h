@@ -26,15 +26,9 @@ class Hash {
     if (pshHash_ != nullptr) PLIBCSzHashFree(pshHash_);
   }
 
-  explicit operator bool() const {
-    return pshHash_ != nullptr;
-  }
-  PPLIBSZHASH get() const {
-    return pshHash_;
-  }
-  PPLIBSZHASH* address() {
-    return &pshHash_;
-  }
+  explicit operator bool() const { return pshHash_ != nullptr; }
+  PPLIBSZHASH get() const { return pshHash_; }
+  PPLIBSZHASH* address() { return &pshHash_; }
 
  private:
   PPLIBSZHASH pshHash_;
@@ -50,15 +44,9 @@ class List {
     if (pslList_ != nullptr) PLIBCSzListFree(pslList_);
   }
 
-  explicit operator bool() const {
-    return pslList_ != nullptr;
-  }
-  PPLIBSZLIST get() const {
-    return pslList_;
-  }
-  PPLIBSZLIST* address() {
-    return &pslList_;
-  }
+  explicit operator bool() const { return pslList_ != nullptr; }
+  PPLIBSZLIST get() const { return pslList_; }
+  PPLIBSZLIST* address() { return &pslList_; }
 
  private:
   PPLIBSZLIST pslList_;
@@ -66,9 +54,7 @@ class List {
 
 // A zero-filled record that a list is to take.
 struct FreeRecord {
-  void operator()(void* record) const {
-    std::free(record);
-  }
+  void operator()(void* record) const { std::free(record); }
 };
 template <class Record>
 using RecordHolder = std::unique_ptr<Record, FreeRecord>;
@@ -96,12 +82,8 @@ class Pipe {
     if (pfPipe_ != nullptr) ::pclose(pfPipe_);
   }
 
-  explicit operator bool() const {
-    return pfPipe_ != nullptr;
-  }
-  FILE* get() const {
-    return pfPipe_;
-  }
+  explicit operator bool() const { return pfPipe_ != nullptr; }
+  FILE* get() const { return pfPipe_; }
 
  private:
   FILE* pfPipe_;
@@ -127,12 +109,8 @@ class NewFile {
     if (pfFile_ != nullptr) (void)std::fclose(pfFile_);  // given up half written, after a failure
   }
 
-  explicit operator bool() const {
-    return pfFile_ != nullptr;
-  }
-  FILE* get() const {
-    return pfFile_;
-  }
+  explicit operator bool() const { return pfFile_ != nullptr; }
+  FILE* get() const { return pfFile_; }
 
   // Whether all that was written has reached the file. Nothing may be written afterwards.
   [[nodiscard]] bool Close() {
@@ -142,6 +120,22 @@ class NewFile {
 
  private:
   FILE* pfFile_ = nullptr;
+};
+
+// The marker file of work that is under way. Gone at the end of every attempt, also of one that is refused because it
+// was there.
+class Marker {
+ public:
+  explicit Marker(const char* szPath) : szPath_(szPath) {}
+  Marker(const Marker&) = delete;
+  Marker& operator=(const Marker&) = delete;
+  ~Marker() { (void)PLIBCSysUnlink(szPath_); }
+
+  bool exists() const { return PLIBCFileExist(szPath_) != 0; }
+  void Create() const { (void)PLIBCFileTouch(szPath_); }  // a guard that cannot be put up does not keep from the work
+
+ private:
+  const char* szPath_;
 };
 
 #endif  // MERO_LIB_HOLDERS_H

@@ -46,18 +46,12 @@ void ClearRing(WIRELESS_LIST& head) {
 template <class Record>
 class OwnRing {
  public:
-  OwnRing() {
-    ResetRing(head_);
-  }
+  OwnRing() { ResetRing(head_); }
   OwnRing(const OwnRing&) = delete;
   OwnRing& operator=(const OwnRing&) = delete;
-  ~OwnRing() {
-    ClearRing<Record>(head_);
-  }
+  ~OwnRing() { ClearRing<Record>(head_); }
 
-  WIRELESS_LIST& head() {
-    return head_;
-  }
+  WIRELESS_LIST& head() { return head_; }
 
  private:
   WIRELESS_LIST head_;

@@ -15,9 +15,7 @@ class ShellWord {
   explicit ShellWord(std::string_view value);
 
   // The word; longer than any command when the value was, so that no command is run with a part of it.
-  const char* c_str() const {
-    return szWord_;
-  }
+  const char* c_str() const { return szWord_; }
 
  private:
   // The longest command is 1024 bytes; a value that would fill it quoted needs four times as much.
@@ -30,23 +28,22 @@ class Command {
  public:
   template <class... Values>
   explicit Command(const char* szFormat, Values... values) {
-    const int size = std::snprintf(szText_, kSize, szFormat, values...);
+    int size = 0;
+    if constexpr (sizeof...(values) > 0) {
+      size = std::snprintf(szText_, kSize, szFormat, values...);
+    } else {
+      size = std::snprintf(szText_, kSize, "%s", szFormat);
+    }
     fits_ = size >= 0 && static_cast<size_t>(size) < kSize;
   }
 
-  const char* c_str() const {
-    return szText_;
-  }
+  const char* c_str() const { return szText_; }
 
   // Runs it and waits; negative when it could not be started. The exit status is for callers that look at it.
-  [[nodiscard]] int Run() const {
-    return fits_ ? std::system(szText_) : Refuse(-1);
-  }
+  [[nodiscard]] int Run() const { return fits_ ? std::system(szText_) : Refuse(-1); }
 
   // Starts it, to read its output; null when it could not be started.
-  [[nodiscard]] FILE* OpenPipe() const {
-    return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr);
-  }
+  [[nodiscard]] FILE* OpenPipe() const { return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr); }
 
  private:
   template <class Failure>

@@ -204,28 +204,10 @@ void PostProcessing() {
   }
 }
 
-// The marker of an attempt; gone at the end of every attempt, also of one that was refused because it was there.
-class Marker {
- public:
-  Marker() = default;
-  Marker(const Marker&) = delete;
-  Marker& operator=(const Marker&) = delete;
-  ~Marker() {
-    (void)PLIBCSysUnlink(kMarkerPath);
-  }
-
-  bool exists() const {
-    return PLIBCFileExist(kMarkerPath) != 0;
-  }
-  void Create() const {
-    (void)PLIBCFileTouch(kMarkerPath);
-  }  // a guard that cannot be put up is no reason not to join
-};
-
 }  // namespace
 
 int MEROWirelessNetworkConnect(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
-  const Marker marker;
+  const Marker marker(kMarkerPath);
   if (MEROWirelessAdapterNum() <= 0) return LOG("There is no wireless USB adapter plugged"), -1;
   if (MEROWirelessCheckBlock() != 1) return 0;  // a radio that is switched off is nobody's failure
   if (marker.exists()) return LOG("Another connection construction is going"), -1;

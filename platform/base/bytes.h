@@ -21,24 +21,16 @@ class Bytes {
   }
   ~Bytes();
 
-  std::string_view view() const {
-    return {data_, size_};
-  }
-  size_t capacity() const {
-    return capacity_;
-  }
-  char* data() {
-    return data_;
-  }
+  std::string_view view() const { return {data_, size_}; }
+  size_t capacity() const { return capacity_; }
+  char* data() { return data_; }
 
   // False when memory ran out; what was there stays.
   [[nodiscard]] bool Reserve(size_t capacity);
   [[nodiscard]] bool Append(std::string_view text);
 
   // Takes in `size` bytes that were written behind the end, within the capacity.
-  void Grow(size_t size) {
-    size_ += size;
-  }
+  void Grow(size_t size) { size_ += size; }
 
  private:
   char* data_ = nullptr;

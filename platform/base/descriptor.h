@@ -20,17 +20,11 @@ class Descriptor {
     if (fd_ >= 0) ::close(fd_);
   }
 
-  bool valid() const {
-    return fd_ >= 0;
-  }
-  int get() const {
-    return fd_;
-  }
+  bool valid() const { return fd_ >= 0; }
+  int get() const { return fd_; }
 
   // For a file that was written, where a failed close is a failed write.
-  Status Close() {
-    return Status::Of(::close(std::exchange(fd_, -1)));
-  }
+  Status Close() { return Status::Of(::close(std::exchange(fd_, -1))); }
 
  private:
   int fd_;

@@ -13,9 +13,7 @@ class DhcpClientFile {
  public:
   DhcpClientFile(const char* szFormat, const char* szIfName);
 
-  const char* c_str() const {
-    return szPath_;
-  }
+  const char* c_str() const { return szPath_; }
 
  private:
   char szPath_[64];

@@ -17,9 +17,7 @@ class Attributes {
   Attributes() : error_(::posix_spawnattr_init(&attributes_)) {}
   Attributes(const Attributes&) = delete;
   Attributes& operator=(const Attributes&) = delete;
-  ~Attributes() {
-    ::posix_spawnattr_destroy(&attributes_);
-  }
+  ~Attributes() { ::posix_spawnattr_destroy(&attributes_); }
 
   // The program starts as if nobody had touched signals, whatever this process does with them.
   int ResetSignals() {
@@ -33,9 +31,7 @@ class Attributes {
     return error_;
   }
 
-  const posix_spawnattr_t* get() const {
-    return &attributes_;
-  }
+  const posix_spawnattr_t* get() const { return &attributes_; }
 
  private:
   posix_spawnattr_t attributes_;
@@ -47,9 +43,7 @@ class FileActions {
   FileActions() : error_(::posix_spawn_file_actions_init(&actions_)) {}
   FileActions(const FileActions&) = delete;
   FileActions& operator=(const FileActions&) = delete;
-  ~FileActions() {
-    ::posix_spawn_file_actions_destroy(&actions_);
-  }
+  ~FileActions() { ::posix_spawn_file_actions_destroy(&actions_); }
 
   int Set(Standard standard) {
     for (const int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
@@ -60,9 +54,7 @@ class FileActions {
     return error_;
   }
 
-  const posix_spawn_file_actions_t* get() const {
-    return &actions_;
-  }
+  const posix_spawn_file_actions_t* get() const { return &actions_; }
 
  private:
   posix_spawn_file_actions_t actions_;

@@ -15,9 +15,7 @@ constexpr char kInterfaces[] = "/sys/class/net";
 constexpr char kInterfaceWithoutAdapter[] = "wlan0";
 
 struct CloseDirectory {
-  void operator()(DIR* directory) const {
-    ::closedir(directory);
-  }
+  void operator()(DIR* directory) const { ::closedir(directory); }
 };
 using Directory = std::unique_ptr<DIR, CloseDirectory>;
 

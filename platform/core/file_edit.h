@@ -20,9 +20,7 @@ class FileEdit {
   static Result<FileEdit> Open(const char* szPath, mode_t mode);
 
   // What the file holds.
-  std::string_view text() const {
-    return text_.view();
-  }
+  std::string_view text() const { return text_.view(); }
 
   // Gives up, and removes the file again if it was made for this edit.
   void Abandon();

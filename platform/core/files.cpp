@@ -9,7 +9,9 @@
 
 int PLIBCFileExist(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), 0;
-  return ::access(szPath, F_OK) == 0 ? 1 : 0;
+  if (::access(szPath, F_OK) == 0) return 1;
+  // What cannot be looked at may well be there: who takes it for missing would write over it.
+  return errno == ENOENT || errno == ENOTDIR || errno == ELOOP || errno == ENAMETOOLONG ? 0 : 1;
 }
 
 int PLIBCFileTouch(const char* szPath) {

@@ -78,11 +78,11 @@ void EndWalk() {
   Drop();
 }
 
-// Counts a section that was asked for, of `total` in the file. A walk begins with the first, and goes on until as many
-// were asked for as there are: by number, since a section may stand in the file twice.
+// Counts a question for a section, of `total` in the file. A walk begins with the first section, and goes on for as
+// many questions as there are sections: by number, since one may stand in the file twice, or have a name that no
+// question can give.
 void Advance(bool first, size_t total) {
-  if (g_asked > 0) ++g_asked;
-  if (first && g_asked < total) g_asked = 1;
+  if (g_asked > 0 || first) ++g_asked;
   if (g_asked >= total) EndWalk();
 }
 
@@ -143,16 +143,16 @@ bool IsFirst(std::string_view text, const SectionPlace& place) {
   return true;
 }
 
-WIRELESS_NETWORK_CONFIG ConfigAt(std::string_view text, const SectionPlace& place) {
-  return ConfigOf(Slice(text, place.body, place.end));
+// The network of a section in a text; kNoSection when there is none.
+Result<WIRELESS_NETWORK_CONFIG> ConfigAt(std::string_view text, const std::optional<SectionPlace>& place) {
+  if (!place) return Status::Failed(kNoSection);
+  return ConfigOf(Slice(text, place->body, place->end));
 }
 
 Result<WIRELESS_NETWORK_CONFIG> ReadKept(const char* szSection) {
   const std::string_view text = g_kept->text.view();
-  const std::optional<SectionPlace> place = g_kept->index.Find(text, szSection);
-  if (!place) return Status::Failed(kNoSection);
-  const WIRELESS_NETWORK_CONFIG config = ConfigAt(text, *place);
-  Advance(IsFirst(text, *place), g_kept->index.headers());
+  Result<WIRELESS_NETWORK_CONFIG> config = ConfigAt(text, g_kept->index.Find(text, szSection));
+  Advance(false, g_kept->index.headers());
   return config;
 }
 
@@ -161,10 +161,9 @@ Result<WIRELESS_NETWORK_CONFIG> ReadAnew(const char* szSection, const FileStamp&
   if (!file.ok()) return file.status();
   const std::string_view text = file->view();
   const std::optional<SectionPlace> place = FindSection(text, szSection);
-  if (!place) return Status::Failed(kNoSection);
-  const WIRELESS_NETWORK_CONFIG config = ConfigAt(text, *place);
+  Result<WIRELESS_NETWORK_CONFIG> config = ConfigAt(text, place);
 
-  Advance(IsFirst(text, *place), CountSections(text));
+  Advance(place && IsFirst(text, *place), CountSections(text));
   if (g_asked > 0 && HasSettled(stamp)) Keep(std::move(*file), stamp);
   return config;
 }

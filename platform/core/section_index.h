@@ -29,9 +29,7 @@ class SectionIndex {
   [[nodiscard]] bool Build(std::string_view text);
 
   // How many sections there are, those included that stand twice.
-  size_t headers() const {
-    return nHeaders_;
-  }
+  size_t headers() const { return nHeaders_; }
 
   // As FindSection() on the text that the index was built from, in constant time.
   std::optional<SectionPlace> Find(std::string_view text, std::string_view name) const;

@@ -17,16 +17,10 @@ class Lines {
   // Moves on to the next line; false at the end.
   bool Next();
 
-  std::string_view whole() const {
-    return Slice(text_, begin_, end_);
-  }                               // with its line end
-  std::string_view text() const;  // without
-  size_t begin() const {
-    return begin_;
-  }
-  size_t end() const {
-    return end_;
-  }
+  std::string_view whole() const { return Slice(text_, begin_, end_); }  // with its line end
+  std::string_view text() const;                                         // without
+  size_t begin() const { return begin_; }
+  size_t end() const { return end_; }
 
  private:
   std::string_view text_;

@@ -23,9 +23,7 @@ class NetworkScript {
   void Remove(const char* szKey);
 
   // Whether all changes were made.
-  bool written() const {
-    return written_;
-  }
+  bool written() const { return written_; }
 
  private:
   void Get(const char* szKey, char* szValue, size_t cbValue) const;
