@@ -1,0 +1,267 @@
+#include "appliance/sbin/elements.h"
+
+#include <algorithm>
+#include <iterator>
+#include <optional>
+
+namespace iwlist {
+namespace {
+
+enum ElementId : std::uint8_t {
+  kSsid = 0,
+  kSupportedRates = 1,
+  kHtCapabilities = 45,
+  kRsn = 48,
+  kExtendedRates = 50,
+  kVendorSpecific = 221,
+};
+
+constexpr std::size_t kElementHeaderSize = 2;
+constexpr std::size_t kMaxNameSize = 32;
+constexpr std::size_t kHtCapabilitiesSize = 26;
+constexpr unsigned kCapabilityPrivacy = 0x0010;
+
+// Shows each element to `visit`; false when the bytes do not end where an element does.
+template <class Visitor>
+bool ForEachElement(Bytes bytes, Visitor visit) {
+  while (bytes.size() >= kElementHeaderSize) {
+    const std::size_t size = bytes[1];
+    if (size > bytes.size() - kElementHeaderSize) return false;
+    visit(bytes[0], bytes.subspan(kElementHeaderSize, size));
+    bytes = bytes.subspan(kElementHeaderSize + size);
+  }
+  return bytes.empty();
+}
+
+// ---- Name
+
+std::string NameOf(Bytes body) {
+  const bool hidden = std::ranges::all_of(body, [](std::uint8_t byte) { return byte == 0; });
+  if (hidden || body.size() > kMaxNameSize) return {};
+  return {body.begin(), body.end()};
+}
+
+// ---- Radio standard
+
+enum Standard : unsigned { kA = 1, kB = 2, kG = 4, kN = 8 };
+
+struct Protocol {
+  unsigned standards;
+  WIRELESS_PROTOCOL protocol;
+};
+
+// Everything that one network can offer: no network is on two bands.
+constexpr Protocol kProtocols[] = {
+    {kB, WIRELESS_PROTO_LEGACY_11B}, {kG, WIRELESS_PROTO_LEGACY_11G}, {kB | kG, WIRELESS_PROTO_LEGACY_11BG},
+    {kB | kN, WIRELESS_PROTO_11BN},  {kG | kN, WIRELESS_PROTO_11GN},  {kB | kG | kN, WIRELESS_PROTO_11BGN},
+    {kA, WIRELESS_PROTO_LEGACY_11A}, {kA | kN, WIRELESS_PROTO_11AN},  {kN, WIRELESS_PROTO_11N},
+};
+
+WIRELESS_PROTOCOL ProtocolOf(unsigned standards) {
+  const auto* found = std::ranges::find(kProtocols, standards, &Protocol::standards);
+  return found == std::end(kProtocols) ? WIRELESS_PROTO_UNKNOWN : found->protocol;
+}
+
+// What the rates are called depends on the band.
+struct Band {
+  unsigned dsss;
+  unsigned ofdm;
+  unsigned ht;
+};
+
+Band BandOf(unsigned megahertz) {
+  if (megahertz >= 2400 && megahertz < 2500) return {.dsss = kB, .ofdm = kG, .ht = kN};
+  if (megahertz >= 4900 && megahertz < 5925) return {.dsss = 0, .ofdm = kA, .ht = kN};
+  return {};
+}
+
+// The standards of a rates element: one rate a byte, in units of 500 kb/s. Other values are no rates but conditions
+// for joining.
+unsigned StandardsOf(Bytes rates, const Band& band) {
+  constexpr std::uint8_t kMandatory = 0x80;
+  constexpr std::uint8_t kDsssRates[] = {2, 4, 11, 22};
+  constexpr std::uint8_t kOfdmRates[] = {12, 18, 24, 36, 48, 72, 96, 108};
+
+  unsigned standards = 0;
+  for (const std::uint8_t byte : rates) {
+    const int rate = byte & ~kMandatory;
+    if (std::ranges::find(kDsssRates, rate) != std::end(kDsssRates)) standards |= band.dsss;
+    if (std::ranges::find(kOfdmRates, rate) != std::end(kOfdmRates)) standards |= band.ofdm;
+  }
+  return standards;
+}
+
+// ---- Security
+
+constexpr std::size_t kOuiSize = 3;
+constexpr std::size_t kSuiteSize = kOuiSize + 1;
+
+enum CipherType : std::uint8_t { kCipherOfGroup = 0, kCipherTkip = 2, kCipherCcmp = 4 };
+enum KeyType : std::uint8_t { kKeyNone = 0, kKeyEap = 1, kKeyPsk = 2 };
+
+// WPA and its successor say the same things in the same form, each in suites of its own. Key types that the client
+// would not be configured for (SAE, fast transition, ...) are unknown.
+struct Generation {
+  std::uint8_t oui[kOuiSize];
+  WIRELESS_ENCRYPT defaultCipher;
+  WIRELESS_AUTH none, eap, psk;
+};
+
+constexpr Generation kWpa = {
+    {0x00, 0x50, 0xF2}, WIRELESS_ENCRYPT_TKIP, WIRELESS_AUTH_WPANONE, WIRELESS_AUTH_WPAEAP, WIRELESS_AUTH_WPAPSK};
+constexpr Generation kWpa2 = {
+    {0x00, 0x0F, 0xAC}, WIRELESS_ENCRYPT_AES, WIRELESS_AUTH_UNKNOWN, WIRELESS_AUTH_WPA2EAP, WIRELESS_AUTH_WPA2PSK};
+
+// What a maker's own element begins with when it is WPA's.
+constexpr std::uint8_t kWpaPrefix[] = {0x00, 0x50, 0xF2, 0x01};
+
+bool IsWpa(Bytes body) {
+  return body.size() >= std::size(kWpaPrefix) && std::ranges::equal(body.first(std::size(kWpaPrefix)), kWpaPrefix);
+}
+
+WIRELESS_ENCRYPT operator|(WIRELESS_ENCRYPT left, WIRELESS_ENCRYPT right) {
+  return static_cast<WIRELESS_ENCRYPT>(static_cast<int>(left) | static_cast<int>(right));
+}
+
+// Takes the fields of a WPA or RSN element from front to back. A sender may leave fields off the end, which come out
+// empty; a field that is cut short makes the whole element worthless.
+class SuiteReader {
+ public:
+  explicit SuiteReader(Bytes bytes) : rest_(bytes) {}
+
+  unsigned Number() {
+    const Bytes bytes = Take(2);
+    return bytes.empty() ? 0U : bytes[0] | static_cast<unsigned>(bytes[1]) << 8;
+  }
+  Bytes Suite() { return rest_.empty() ? Bytes() : Take(kSuiteSize); }
+  Bytes SuiteList() { return rest_.empty() ? Bytes() : Take(Number() * kSuiteSize); }
+  [[nodiscard]] bool Whole() const { return whole_; }
+
+ private:
+  Bytes Take(std::size_t size) {
+    whole_ = whole_ && size <= rest_.size();
+    if (!whole_) return {};
+    const Bytes taken = rest_.first(size);
+    rest_ = rest_.subspan(size);
+    return taken;
+  }
+
+  Bytes rest_;
+  bool whole_ = true;
+};
+
+bool Lists(Bytes suites, const Generation& generation, std::uint8_t type) {
+  for (; suites.size() >= kSuiteSize; suites = suites.subspan(kSuiteSize)) {
+    if (std::ranges::equal(suites.first(kOuiSize), generation.oui) && suites[kOuiSize] == type) return true;
+  }
+  return false;
+}
+
+WIRELESS_ENCRYPT CiphersOf(Bytes pairwise, Bytes group, const Generation& generation) {
+  if (pairwise.empty()) return generation.defaultCipher;
+  const bool asGroup = Lists(pairwise, generation, kCipherOfGroup);
+  const auto offers = [&](CipherType type) {
+    return Lists(pairwise, generation, type) || (asGroup && Lists(group, generation, type));
+  };
+  const WIRELESS_ENCRYPT tkip = offers(kCipherTkip) ? WIRELESS_ENCRYPT_TKIP : WIRELESS_ENCRYPT_UNKNOWN;
+  const WIRELESS_ENCRYPT aes = offers(kCipherCcmp) ? WIRELESS_ENCRYPT_AES : WIRELESS_ENCRYPT_UNKNOWN;
+  return tkip | aes;
+}
+
+// Of several, the one that asks least of the user.
+WIRELESS_AUTH AuthOf(Bytes keys, const Generation& generation) {
+  if (Lists(keys, generation, kKeyPsk)) return generation.psk;
+  if (keys.empty() || Lists(keys, generation, kKeyEap)) return generation.eap;
+  if (Lists(keys, generation, kKeyNone)) return generation.none;
+  return WIRELESS_AUTH_UNKNOWN;
+}
+
+// The security that a WPA or RSN element announces, from its version on.
+Security SecurityOfSuites(Bytes body, const Generation& generation) {
+  SuiteReader reader(body);
+  const unsigned version = reader.Number();
+  const Bytes group = reader.Suite();
+  const Bytes pairwise = reader.SuiteList();
+  const Bytes keys = reader.SuiteList();
+  if (!reader.Whole() || version != 1) return {};
+  return {AuthOf(keys, generation), CiphersOf(pairwise, group, generation)};
+}
+
+// A network that offers both generations is joined by the newer one with the ciphers of either.
+Security Combine(const Security& wpa, const Security& wpa2) {
+  if (wpa.auth == WIRELESS_AUTH_UNKNOWN) return wpa2;
+  if (wpa2.auth == WIRELESS_AUTH_UNKNOWN) return wpa;
+  return {wpa2.auth, wpa.encrypt | wpa2.encrypt};
+}
+
+// What the elements of one network said of its security.
+struct SecurityElements {
+  std::optional<Security> wpa;
+  std::optional<Security> wpa2;
+  bool allRead = false;
+};
+
+Security SecurityOf(const SecurityElements& elements, unsigned capability) {
+  if (elements.wpa && elements.wpa2) return Combine(*elements.wpa, *elements.wpa2);
+  if (elements.wpa2) return *elements.wpa2;
+  if (elements.wpa) return *elements.wpa;
+  if ((capability & kCapabilityPrivacy) == 0) return {WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE};
+  // The element that says WPA may be among those that could not be read.
+  if (!elements.allRead) return {};
+  return {WIRELESS_AUTH_SHARED, WIRELESS_ENCRYPT_WEP};
+}
+
+}  // namespace
+
+Description Describe(Bytes elements, unsigned capability, unsigned megahertz) {
+  const Band band = BandOf(megahertz);
+  std::optional<std::string> name;
+  unsigned standards = 0;
+  SecurityElements security;
+
+  security.allRead = ForEachElement(elements, [&](std::uint8_t id, Bytes body) {
+    switch (id) {
+      case kSsid:
+        if (!name) name = NameOf(body);
+        break;
+      case kSupportedRates:
+      case kExtendedRates:
+        standards |= StandardsOf(body, band);
+        break;
+      case kHtCapabilities:
+        if (body.size() >= kHtCapabilitiesSize) standards |= band.ht;
+        break;
+      case kRsn:
+        if (!security.wpa2) security.wpa2 = SecurityOfSuites(body, kWpa2);
+        break;
+      case kVendorSpecific:
+        if (IsWpa(body) && !security.wpa) security.wpa = SecurityOfSuites(body.subspan(std::size(kWpaPrefix)), kWpa);
+        break;
+    }
+  });
+  return {name.value_or(""), ProtocolOf(standards), SecurityOf(security, capability)};
+}
+
+int ChannelOf(unsigned megahertz) {
+  struct Range {
+    unsigned first, last, zero, step;
+  };
+  // `zero` is where channel 0 would be.
+  constexpr Range kRanges[] = {
+      {2412, 2472, 2407, 5},        // 2.4 GHz
+      {2484, 2484, 2470, 1},        // its channel 14, which stands apart
+      {4910, 4980, 4000, 5},        // 4.9 GHz
+      {5005, 5920, 5000, 5},        // 5 GHz
+      {5935, 5935, 5925, 5},        // channel 2 of 6 GHz, which stands apart
+      {5955, 7115, 5950, 5},        // 6 GHz
+      {58320, 70200, 56160, 2160},  // 60 GHz
+  };
+  for (const Range& range : kRanges) {
+    if (megahertz >= range.first && megahertz <= range.last) {
+      return static_cast<int>((megahertz - range.zero) / range.step);
+    }
+  }
+  return 0;
+}
+
+}  // namespace iwlist

@@ -1,0 +1,18 @@
+// Reads what access points and ad-hoc cells say of themselves in their beacons. Every byte of it is a stranger's.
+#ifndef MERO_APPLIANCE_ELEMENTS_H
+#define MERO_APPLIANCE_ELEMENTS_H
+
+#include "appliance/sbin/network.h"
+
+namespace iwlist {
+
+// The network of a beacon or probe response, from its information elements, its capability field and its frequency.
+// What stands in front of a malformed element is used. WPA that cannot be read is unknown, never none or WEP.
+Description Describe(Bytes elements, unsigned capability, unsigned megahertz);
+
+// The number of the channel at a centre frequency; 0 when there is none.
+int ChannelOf(unsigned megahertz);
+
+}  // namespace iwlist
+
+#endif  // MERO_APPLIANCE_ELEMENTS_H

@@ -1,0 +1,52 @@
+// iwlist with one form more: `iwlist INTERFACE scanning mero` (or `scan mero`) lists the scan results that the radio's
+// driver holds, in the fixed columns of listing.h, and does not scan for them. Every other form is the ordinary
+// tool's, which the package system has moved aside.
+//
+// Exit status: 0 listed, also when nothing is in range; 1 not listed, with the reason in one line on standard error
+// and nothing on standard output; 127 the ordinary tool is not there, 126 it cannot be run; else the ordinary tool's.
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <exception>
+#include <string_view>
+
+#include "appliance/sbin/listing.h"
+#include "appliance/sbin/radio.h"
+
+namespace {
+
+constexpr char kOrdinaryTool[] = "/sbin/iwlist.distrib";
+
+bool AsksForListing(int argc, char* argv[]) {
+  if (argc != 4) return false;
+  const std::string_view verb = argv[2];
+  return (verb == "scanning" || verb == "scan") && std::string_view(argv[3]) == "mero";
+}
+
+int List(const char* interface) {
+  try {
+    const auto reader = isatty(STDOUT_FILENO) != 0 ? iwlist::Reader::kTerminal : iwlist::Reader::kProgram;
+    iwlist::Write(STDOUT_FILENO, iwlist::Listing(iwlist::ReadScanResults(interface), reader));
+    return EXIT_SUCCESS;
+  } catch (const std::exception& failure) {
+    std::fprintf(stderr, "iwlist: %s\n", failure.what());
+    return EXIT_FAILURE;
+  }
+}
+
+// Returns only when it could not.
+int HandOver(char* argv[]) {
+  execv(kOrdinaryTool, argv);
+  const int status = errno == ENOENT ? 127 : 126;
+  std::fprintf(stderr, "iwlist: cannot run the ordinary tool %s: %s\n", kOrdinaryTool, std::strerror(errno));
+  return status;
+}
+
+}  // namespace
+
+int main(int argc, char* argv[]) {
+  return AsksForListing(argc, argv) ? List(argv[1]) : HandOver(argv);
+}
