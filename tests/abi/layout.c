@@ -1,0 +1,2 @@
+/* The headers in C. */
+#include "layout.h"

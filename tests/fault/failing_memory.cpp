@@ -1,0 +1,92 @@
+// Memory that runs out.
+//
+// What the functions below stand in front of has names of its own, so that nothing is looked up, which takes memory.
+#include "tests/fault/failing_memory.h"
+
+#include <cerrno>
+#include <cstddef>
+#include <cstring>
+
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define BEHIND_SANITIZER
+#endif
+#elif defined(__SANITIZE_ADDRESS__)
+#define BEHIND_SANITIZER
+#endif
+
+#ifdef BEHIND_SANITIZER
+#define REAL(name) __interceptor_##name
+#else
+#define REAL(name) __libc_##name
+#endif
+
+extern "C" {
+void* REAL(malloc)(size_t size);
+void* REAL(calloc)(size_t count, size_t size);
+void* REAL(realloc)(void* block, size_t size);
+void REAL(free)(void* block);
+}
+
+namespace {
+
+int g_untilFailure = 0;  // allocations until the one that fails; 0 when none is to
+bool g_failed = false;
+int g_blocks = 0;
+
+bool Fails() {
+  if (g_untilFailure == 0 || --g_untilFailure > 0) return false;
+  g_failed = true;
+  errno = ENOMEM;
+  return true;
+}
+
+void* Counted(void* block) {
+  if (block != nullptr) ++g_blocks;
+  return block;
+}
+
+}  // namespace
+
+// In place of libc's, or of those that the sanitizer has put in place of libc's.
+extern "C" {
+
+void* malloc(size_t size) {
+  return Fails() ? nullptr : Counted(REAL(malloc)(size));
+}
+
+void* calloc(size_t count, size_t size) {
+  return Fails() ? nullptr : Counted(REAL(calloc)(count, size));
+}
+
+void* realloc(void* block, size_t size) {
+  if (Fails()) return nullptr;
+  void* moved = REAL(realloc)(block, size);
+  return block == nullptr ? Counted(moved) : moved;
+}
+
+void free(void* block) {
+  if (block != nullptr) --g_blocks;
+  REAL(free)(block);
+}
+
+// The sanitizer's does not come to malloc() by its name.
+char* strndup(const char* szText, size_t limit) {
+  const size_t size = ::strnlen(szText, limit);
+  char* szCopy = static_cast<char*>(malloc(size + 1));
+  if (szCopy == nullptr) return nullptr;
+  std::memcpy(szCopy, szText, size);
+  szCopy[size] = '\0';
+  return szCopy;
+}
+
+}  // extern "C"
+
+MemoryOutcome RunWithoutMemory(int n, const std::function<int()>& operation) {
+  g_failed = false;
+  const int before = g_blocks;
+  g_untilFailure = n;
+  const int result = operation();
+  g_untilFailure = 0;
+  return {g_failed, result, g_blocks - before};
+}

@@ -1,0 +1,16 @@
+// Memory that runs out: this program's malloc() and its kin may be told to fail.
+#ifndef MERO_TESTS_FAULT_FAILING_MEMORY_H
+#define MERO_TESTS_FAULT_FAILING_MEMORY_H
+
+#include <functional>
+
+struct MemoryOutcome {
+  bool failed = false;  // an allocation has failed
+  int result = 0;
+  int blocksLeft = 0;  // how many blocks more are in use behind the operation than before it
+};
+
+// Runs an operation whose nth allocation fails, from 1 on, and no other.
+MemoryOutcome RunWithoutMemory(int n, const std::function<int()>& operation);
+
+#endif  // MERO_TESTS_FAULT_FAILING_MEMORY_H

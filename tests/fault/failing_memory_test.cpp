@@ -1,0 +1,257 @@
+// Operations for which memory runs out, at each allocation that they make.
+#include "tests/fault/failing_memory.h"
+
+#include <search.h>
+
+#include <cstddef>
+#include <cstdlib>
+#include <filesystem>
+
+#include "tests/fault/saving.h"
+#include "tests/platform/containers.h"
+#include "tests/platform/platform_test.h"
+
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+constexpr char kSettings[] = "/tmp/platform/settings";
+constexpr char kFormat[] = "\t%s=%s\n";
+
+void FreeList(WIRELESS_LIST& head) {
+  while (head.q_forw != &head) {
+    WIRELESS_LIST* node = head.q_forw;
+    ::remque(node);
+    std::free(reinterpret_cast<char*>(node) - offsetof(WIRELESS_NETWORK_CONFIG, list));
+  }
+}
+
+std::string Sections(int count) {
+  std::string text;
+  for (int i = 0; i < count; ++i) text += "[" + std::to_string(i) + "]\n\tKEY=" + std::string(100, 'v') + "\n";
+  return text;
+}
+
+class WithoutMemory : public PlatformTest {
+ protected:
+  void SetUp() override {
+    PlatformTest::SetUp();
+    Prepare(Savings().front());
+    WriteFile(kSettings, Sections(100));
+  }
+
+  // Runs an operation with each of its allocations failing. It must fail with `failure` and its one report, leave no
+  // memory in use and the settings as they were. Ends when it makes no more allocations.
+  template <class Operation>
+  static void ExpectFailure(int failure, Operation operation) {
+    const std::string before = ReadFile(kSettings);
+    int n = 1;
+    for (;; ++n) {
+      const MemoryOutcome outcome = RunWithoutMemory(n, operation);
+      EXPECT_EQ(outcome.blocksLeft, 0) << "allocation " << n;
+      if (!outcome.failed) break;
+      EXPECT_EQ(outcome.result, failure) << "allocation " << n;
+      EXPECT_EQ(PLIBCErrGet(), ERR_OUT_OF_MEMORY) << "allocation " << n;
+      EXPECT_THAT(TakeLog(), ElementsAre(testing::Field(&LogLine::text, testing::EndsWith("Cannot allocate memory"))));
+      EXPECT_EQ(ReadFile(kSettings), before) << "allocation " << n;
+      EXPECT_THAT(NamesIn(kDirectory), ElementsAre("settings")) << "allocation " << n;
+      PLIBCErrSet(ERR_NONE);
+    }
+    EXPECT_GT(n, 1) << "it makes no allocation";
+  }
+};
+
+TEST_F(WithoutMemory, NoHashAndNoListIsMade) {
+  ExpectFailure(-1, [] {
+    PPLIBSZHASH hash = PLIBCSzHashAlloc(1024);
+    PLIBCSzHashFree(hash);
+    return hash != nullptr ? 0 : -1;
+  });
+  ExpectFailure(-1, [] {
+    PPLIBSZLIST list = PLIBCSzListAlloc(1024);
+    PLIBCSzListFree(list);
+    return list != nullptr ? 0 : -1;
+  });
+}
+
+TEST_F(WithoutMemory, AHashStaysAsItWas) {
+  TextHash hash{{"OLD", "value"}};
+  for (int n = 1; n <= 3; ++n) {  // the entry, its key, its value
+    const MemoryOutcome outcome = RunWithoutMemory(n, [&] { return PLIBCSzHashSetValue(hash.address(), "NEW", "x"); });
+    EXPECT_EQ(outcome.result, -1);
+    EXPECT_EQ(outcome.blocksLeft, 0);
+    ::ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to set NEW: Cannot allocate memory");
+  }
+  EXPECT_EQ(RunWithoutMemory(1, [&] { return PLIBCSzHashSetValue(hash.address(), "OLD", "x"); }).result, -1);
+  ::ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to set OLD: Cannot allocate memory");
+  EXPECT_EQ(hash["OLD"], "value");
+  EXPECT_EQ(hash["NEW"], "(none)");
+}
+
+TEST_F(WithoutMemory, AHashThatCannotGrowHoldsItsKeysAllTheSame) {
+  PPLIBSZHASH hash = PLIBCSzHashAlloc(0);
+  int unset = 0;
+  for (int i = 0; i < 1000; ++i) {
+    // The fourth allocation of a setting is that of growing, which is no part of what was asked for.
+    const auto set = [&] { return PLIBCSzHashSetValue(&hash, std::to_string(i).c_str(), "value"); };
+    unset += RunWithoutMemory(4, set).result == 1 ? 0 : 1;
+  }
+  EXPECT_EQ(unset, 0);
+  for (int i = 0; i < 1000; ++i) EXPECT_STREQ(PLIBCSzHashGetValue(hash, std::to_string(i).c_str()), "value") << i;
+  PLIBCSzHashFree(hash);
+}
+
+TEST_F(WithoutMemory, SettingsAreNotReadAndOutputsStay) {
+  char szValue[8] = "as was";
+  ExpectFailure(-1, [&] { return PLIBCFileGetKeyValue(kSettings, "NONE", szValue, sizeof szValue, 0); });
+  EXPECT_STREQ(szValue, "as was");
+  ExpectFailure(0, [] { return PLIBCFileCheckKeyValue(kSettings, "NONE", "", 0); });
+  ExpectFailure(-1, [] {
+    PPLIBSZHASH of = PLIBCSzHashAlloc(1024);
+    const int result = of != nullptr ? PLIBCFileGetSection(kSettings, "7", &of) : -1;
+    PLIBCSzHashFree(of);
+    return result;
+  });
+}
+
+TEST_F(WithoutMemory, AListOfSectionsIsAsItWas) {
+  WriteFile(kFile, "[first]\n");
+  TextList list;
+  ASSERT_EQ(PLIBCFileEnumSection(kFile, list.address()), 1);
+  ASSERT_EQ(PLIBCSysUnlink(kFile), 0);
+  for (int n = 1; n <= 10; ++n) {
+    const MemoryOutcome outcome = RunWithoutMemory(n, [&] { return PLIBCFileEnumSection(kSettings, list.address()); });
+    EXPECT_EQ(outcome.result, -1) << n;
+    EXPECT_EQ(outcome.blocksLeft, 0) << n;
+    EXPECT_THAT(list.items(), ElementsAre("first")) << n;
+    ::ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to read /tmp/platform/settings: Cannot allocate memory");
+  }
+  ExpectFailure(-1, [] {
+    PPLIBSZLIST of = PLIBCSzListAlloc(1024);
+    const int result = of != nullptr ? PLIBCFileEnumSection(kSettings, &of) : -1;
+    PLIBCSzListFree(of);
+    return result;
+  });
+}
+
+TEST_F(WithoutMemory, SettingsStayAsTheyWere) {
+  const std::string before = ReadFile(kSettings);
+  const TextHash hash{{"A", "1"}, {"B", "2"}};
+  // Each succeeds in the end, so that it is undone for the next.
+  ExpectFailure(-1, [] { return PLIBCFileSetKeyValue(kSettings, "KEY", "value", kFormat); });
+  WriteFile(kSettings, before);
+  ExpectFailure(-1, [] { return PLIBCFileRemoveKey(kSettings, "KEY"); });
+  WriteFile(kSettings, before);
+  ExpectFailure(-1, [&] { return PLIBCFileAddSection(kSettings, "new", hash.get(), kFormat); });
+  WriteFile(kSettings, before);
+  ExpectFailure(-1, [&] { return PLIBCFileSetSection(kSettings, "7", "new", hash.get(), kFormat); });
+  WriteFile(kSettings, before);
+  ExpectFailure(-1, [] { return PLIBCFileSetSectionValue(kSettings, "7", "NEW", "value", kFormat); });
+}
+
+TEST_F(WithoutMemory, AKnownNetworkIsNotRead) {
+  WIRELESS_NETWORK_CONFIG config;
+  const std::string section = SectionOf(2);
+  ExpectFailure(-1, [&] { return MEROWirelessConfGet(section.c_str(), &config); });
+}
+
+// The text of the file is kept between one network and the next, while there is memory for it.
+TEST_F(WithoutMemory, AWalkOverTheKnownNetworksGoesOnAndKeepsNothing) {
+  const std::string sections[] = {SectionOf(1), SectionOf(2), SectionOf(3)};
+  const auto walk = [&] {
+    int read = 0;
+    WIRELESS_NETWORK_CONFIG config;
+    for (const std::string& section : sections) read += MEROWirelessConfGet(section.c_str(), &config) == 0 ? 1 : 0;
+    return read;
+  };
+  LetTheStoreSettle();
+  int n = 1;
+  for (;; ++n) {
+    const MemoryOutcome outcome = RunWithoutMemory(n, walk);
+    const size_t reports = TakeLog().size();
+    EXPECT_EQ(static_cast<size_t>(outcome.result), std::size(sections) - reports) << "allocation " << n;
+    EXPECT_EQ(RunWithoutMemory(0, walk).result, 3) << "allocation " << n;
+    if (!outcome.failed) break;
+  }
+  EXPECT_GT(n, 3);
+  EXPECT_EQ(RunWithoutMemory(0, walk).blocksLeft, 0);
+}
+
+TEST_F(WithoutMemory, NoProgramIsRun) {
+  const auto outcome = RunWithoutMemory(1, [] { return PLIBCExec("/bin/true", nullptr, nullptr, nullptr, nullptr); });
+  EXPECT_TRUE(outcome.failed);
+  EXPECT_EQ(outcome.result, -1);
+  EXPECT_EQ(outcome.blocksLeft, 0);
+  ::ExpectFailure(ERR_COMMAND_FAILED, "Failed to run /bin/true: Cannot allocate memory");
+}
+
+TEST_F(WithoutMemory, NoAdapterIsSeen) {
+  ExpectFailure(0, [] { return MEROWirelessAdapterNum(); });
+}
+
+TEST_F(WithoutMemory, AKnownNetworkIsNotSavedAndTheStoreStays) {
+  for (const Saving& saving : Savings()) {
+    SCOPED_TRACE(saving.szName);
+    Prepare(saving);
+    const std::string before = StoredText();
+    int n = 1;
+    for (;; ++n) {
+      const MemoryOutcome outcome = RunWithoutMemory(n, [&] { return MEROWirelessConfSet(&saving.network); });
+      EXPECT_EQ(outcome.blocksLeft, 0) << "allocation " << n;
+      if (!outcome.failed) break;
+      EXPECT_EQ(outcome.result, -1) << "allocation " << n;
+      EXPECT_EQ(PLIBCErrGet(), ERR_OUT_OF_MEMORY) << "allocation " << n;
+      EXPECT_THAT(TakeLog(), ElementsAre(testing::Field(&LogLine::text, testing::EndsWith("Cannot allocate memory")),
+                                         testing::Field(&LogLine::unit, "wireless_conf_set")))
+          << "allocation " << n;
+      EXPECT_THAT(StoredText(), IsStillThe(before)) << "allocation " << n;
+      for (const std::string& name : NamesIn(kStoreDirectory)) EXPECT_EQ(name, "wireless.conf");
+    }
+    EXPECT_GT(n, 10);
+    EXPECT_EQ(MEROWirelessConfSet(&saving.network), 0);
+  }
+}
+
+TEST_F(WithoutMemory, WhatWasListedBeforeIsTheCallersAndTheRestIsReported) {
+  struct Listing {
+    const char* szUnit;
+    int (*run)(WIRELESS_LIST*);
+  };
+  for (const Listing& listing : {Listing{"wireless_conf_enum", MEROWirelessConfEnum},
+                                 Listing{"wireless_conf_enum_by_atime", MEROWirelessConfEnumByAtime}}) {
+    SCOPED_TRACE(listing.szUnit);
+    int failures = 0;
+    for (int n = 1;; ++n) {
+      WIRELESS_LIST head;
+      int listed = 0;
+      const MemoryOutcome outcome = RunWithoutMemory(n, [&] {
+        const int result = listing.run(&head);
+        for (const WIRELESS_LIST* node = head.q_forw; node != &head; node = node->q_forw) ++listed;
+        FreeList(head);
+        return result;
+      });
+      EXPECT_EQ(outcome.blocksLeft, 0) << "allocation " << n;
+      const std::vector<LogLine> log = TakeLog();
+      if (outcome.result == 0) {
+        if (!outcome.failed) break;
+        continue;
+      }
+      ++failures;
+      EXPECT_EQ(outcome.result, -1) << "allocation " << n;
+      EXPECT_LT(listed, 3) << "allocation " << n;
+      ASSERT_FALSE(log.empty()) << "allocation " << n;
+      EXPECT_EQ(log.back().unit, listing.szUnit) << "allocation " << n;
+    }
+    EXPECT_GE(failures, 6);
+  }
+}
+
+TEST_F(WithoutMemory, DisconnectingGoesOnAndSaysSo) {
+  const auto outcome = RunWithoutMemory(1, [] { return MEROWirelessNetworkDisconnect(); });
+  EXPECT_TRUE(outcome.failed);
+  EXPECT_EQ(outcome.blocksLeft, 0);
+  EXPECT_THAT(TakeLog(), testing::Not(IsEmpty()));
+}
+
+}  // namespace

@@ -1,0 +1,170 @@
+// A save whose system calls fail, one at a time.
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <set>
+
+#include "tests/fault/saving.h"
+#include "tests/fault/supervised.h"
+#include "tests/platform/platform_test.h"
+
+namespace {
+
+using testing::AnyOf;
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+bool Lists(const std::vector<SystemCall>& calls, const std::string& name) {
+  return std::ranges::find(calls, name, &SystemCall::name) != calls.end();
+}
+
+class ASaveWithAFailure : public PlatformTest {
+ protected:
+  // Lets each system call of each save that works on files fail, and calls `look(saving, before, after, outcome)`.
+  template <class Look>
+  static void FailEverywhere(int error, Look look) {
+    std::set<std::string> failed;
+    for (const Saving& saving : Savings()) {
+      SCOPED_TRACE(saving.szName);
+      const auto save = [&] { return MEROWirelessConfSet(&saving.network); };
+      Prepare(saving);
+      const std::string before = StoredText();
+      ASSERT_EQ(save(), 0);
+      const std::string after = StoredText();
+
+      for (int call = 1;; ++call) {
+        Prepare(saving);
+        const Outcome outcome = RunSupervised({Interference::kFail, call, error, ""}, save);
+        if (!outcome.reached) break;
+        if (outcome.call.name.starts_with("system call")) continue;  // memory and the like
+        SCOPED_TRACE("call " + std::to_string(call) + ", " + outcome.call.name + ": " + std::strerror(error));
+        failed.insert(outcome.call.name);
+        look(before, after, outcome);
+        for (const std::string& name : NamesIn(kStoreDirectory)) EXPECT_EQ(name, "wireless.conf");
+        EXPECT_EQ(save(), 0) << "the next save";
+        EXPECT_EQ(StoredText(), after) << "of the next save";
+      }
+    }
+    EXPECT_THAT(failed,
+                testing::IsSupersetOf({"open", "read", "write", "fsync", "close", "rename", "flock", "fchmod"}));
+  }
+
+  static void ExpectFailed(const Outcome& outcome, int code, const std::string& before, const std::string& after) {
+    EXPECT_EQ(outcome.result, -1);
+    EXPECT_EQ(outcome.code, code);
+    char szErrno[32];
+    std::snprintf(szErrno, sizeof szErrno, "errno=0x%X", static_cast<unsigned>(code));
+    EXPECT_THAT(outcome.reports, ElementsAre(HasSubstr(kStore), HasSubstr("wireless_conf_set:")));
+    EXPECT_THAT(outcome.reports, Contains(AnyOf(HasSubstr(szErrno), HasSubstr("Failed to touch"))));
+    // What has taken its place cannot be taken back; it is whole, but may not outlast a power cut.
+    const bool inPlace = Lists(outcome.before, "rename");
+    EXPECT_THAT(StoredText(), inPlace ? testing::Matcher<std::string>(after) : IsStillThe(before));
+  }
+};
+
+TEST_F(ASaveWithAFailure, ReportsItAndLeavesTheStoreAndNothingElse) {
+  const struct {
+    int error;
+    int code;
+  } rows[] = {{EIO, ERR_IO}, {ENOSPC, ERR_NO_SPACE}, {EDQUOT, ERR_NO_SPACE}, {EACCES, ERR_PERMISSION}};
+  for (const auto& row : rows) {
+    FailEverywhere(row.error, [&](const std::string& before, const std::string& after, const Outcome& outcome) {
+      // Not to know that there is a store, or to close what was only read, does not keep a network from being saved.
+      const bool harmless = (outcome.call.name == "access" || outcome.call.name == "close") && outcome.result == 0;
+      // A close that fails is not tried again, since the descriptor may be another's by then.
+      EXPECT_EQ(outcome.descriptorsLeft, outcome.call.name == "close" ? 1 : 0);
+      if (!harmless) return ExpectFailed(outcome, row.code, before, after);
+      EXPECT_THAT(outcome.reports, IsEmpty());
+      EXPECT_EQ(StoredText(), after);
+    });
+  }
+}
+
+TEST_F(ASaveWithAFailure, FailsWhenTheFileThatItWroteCannotBeClosed) {
+  const Saving saving = Savings().front();
+  for (int call = 1;; ++call) {
+    Prepare(saving);
+    const std::string before = StoredText();
+    const Outcome outcome =
+        RunSupervised({Interference::kFail, call, EIO, "close"}, [&] { return MEROWirelessConfSet(&saving.network); });
+    ASSERT_TRUE(outcome.reached);
+    if (!Lists(outcome.before, "fsync")) continue;
+    return ExpectFailed(outcome, ERR_IO, before, "");
+  }
+}
+
+TEST_F(ASaveWithAFailure, GoesOnWhereTheFailureDoesNotMatter) {
+  const struct {
+    const char* szCall;
+    int error;
+    const char* szBehind;  // only a call behind one of this name
+  } rows[] = {
+      {"flock", EINTR, ""},
+      {"read", EINTR, ""},
+      {"write", EINTR, ""},
+      {"fsync", EINVAL, "rename"},
+  };
+  const Saving saving = Savings().front();
+  for (const auto& row : rows) {
+    int met = 0;
+    for (int call = 1;; ++call) {
+      Prepare(saving);
+      const Outcome outcome = RunSupervised({Interference::kFail, call, row.error, row.szCall},
+                                            [&] { return MEROWirelessConfSet(&saving.network); });
+      if (!outcome.reached) break;
+      if (*row.szBehind != '\0' && !Lists(outcome.before, row.szBehind)) continue;
+      ++met;
+      EXPECT_EQ(outcome.result, 0) << row.szCall;
+      EXPECT_THAT(outcome.reports, IsEmpty()) << row.szCall;
+      EXPECT_THAT(StoredText(), HasSubstr("new secret")) << row.szCall;
+    }
+    EXPECT_GT(met, 0) << row.szCall;
+  }
+}
+
+TEST_F(ASaveWithAFailure, GoesOnBehindAWriteThatTookAPart) {
+  for (const Saving& saving : Savings()) {
+    const auto save = [&] { return MEROWirelessConfSet(&saving.network); };
+    Prepare(saving);
+    ASSERT_EQ(save(), 0);
+    const std::string after = StoredText();
+    int writes = 0;
+    while (true) {
+      Prepare(saving);
+      if (!RunSupervised({Interference::kShorten, writes + 1, 0, "write"}, save).reached) break;
+      ++writes;
+      EXPECT_EQ(StoredText(), after) << saving.szName;
+    }
+    EXPECT_GT(writes, 0);
+  }
+}
+
+class AFailure : public PlatformTest {};
+
+TEST_F(AFailure, HasACodeThatTellsItsReason) {
+  const struct {
+    int error;
+    int code;
+  } rows[] = {
+      {ENOMEM, ERR_OUT_OF_MEMORY},   {EINVAL, ERR_BAD_PARAMETERS},
+      {EACCES, ERR_PERMISSION},      {EPERM, ERR_PERMISSION},
+      {EROFS, ERR_PERMISSION},       {ENOSPC, ERR_NO_SPACE},
+      {EDQUOT, ERR_NO_SPACE},        {EIO, ERR_IO},
+      {ENOTDIR, ERR_FILE_NOT_FOUND}, {EFBIG, ERR_TOO_LARGE},
+      {ENAMETOOLONG, ERR_TOO_LARGE}, {ENODEV, ERR_NO_DEVICE},
+      {ENXIO, ERR_NO_DEVICE},        {EBUSY, ERR_UNKNOWN},
+      {EMFILE, ERR_UNKNOWN},         {ELOOP, ERR_UNKNOWN},
+  };
+  for (const auto& row : rows) {
+    const Outcome outcome =
+        RunSupervised({Interference::kFail, 1, row.error, "unlink"}, [] { return PLIBCSysUnlink("/tmp/file"); });
+    EXPECT_EQ(outcome.call.name, "unlink");
+    EXPECT_EQ(outcome.result, -1);
+    EXPECT_EQ(outcome.code, row.code) << std::strerror(row.error);
+    EXPECT_THAT(outcome.reports, ElementsAre(HasSubstr(std::string("/tmp/file: ") + std::strerror(row.error))));
+  }
+}
+
+}  // namespace

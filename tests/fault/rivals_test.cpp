@@ -1,0 +1,47 @@
+// What a rival may do between two system calls of an operation: the first call meets the state before, the next the
+// state after.
+#include <cerrno>
+#include <filesystem>
+
+#include "tests/fault/supervised.h"
+#include "tests/platform/platform_test.h"
+
+namespace {
+
+class ARival : public PlatformTest {
+ protected:
+  // Runs an operation whose first call of that name finds no file, although there is one.
+  static Outcome RunBeforeRival(const char* szCall, const std::function<int()>& operation) {
+    return RunSupervised({Interference::kFail, 1, ENOENT, szCall}, operation);
+  }
+};
+
+TEST_F(ARival, ThatMakesAFileDoesNotHaveItEmptiedByTouchingIt) {
+  WriteFile(kFile, "content");
+  const Outcome outcome = RunBeforeRival("access", [] { return PLIBCFileTouch(kFile); });
+  EXPECT_TRUE(outcome.reached);
+  EXPECT_EQ(outcome.result, 0);
+  EXPECT_EQ(ReadFile(kFile), "content");
+}
+
+// Whoever may write to the directory could lead the new content, secrets included, to a file of theirs.
+TEST_F(ARival, ThatPutsALinkInTheWayOfAChangeHasNothingWrittenThroughIt) {
+  WriteFile(kFile, "KEY=old\n");
+  WriteFile("/tmp/platform/victim", "as was");
+  std::filesystem::create_symlink("victim", "/tmp/platform/.file.new");
+  const Outcome outcome = RunBeforeRival("unlink", [] { return PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"); });
+  EXPECT_TRUE(outcome.reached);
+  EXPECT_EQ(outcome.result, -1);
+  EXPECT_EQ(ReadFile("/tmp/platform/victim"), "as was");
+  EXPECT_EQ(ReadFile(kFile), "KEY=old\n");
+}
+
+TEST_F(ARival, ThatMakesAFileHasItsKeysKept) {
+  WriteFile(kFile, "RIVAL=kept\n");
+  const Outcome outcome = RunBeforeRival("open", [] { return PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"); });
+  EXPECT_TRUE(outcome.reached);
+  EXPECT_EQ(outcome.result, 1);
+  EXPECT_EQ(ReadFile(kFile), "RIVAL=kept\nKEY=new\n");
+}
+
+}  // namespace

@@ -1,0 +1,276 @@
+// An operation in a child process whose system calls this process watches.
+//
+// The child has the kernel ask this process about each of its calls (seccomp user notification), which works the same
+// way on every architecture. Only its calls to Mark() and what it reports afterwards go through unasked.
+#include "tests/fault/supervised.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <linux/filter.h>
+#include <linux/seccomp.h>
+#include <poll.h>
+#include <sys/ioctl.h>
+#include <sys/prctl.h>
+#include <sys/syscall.h>
+#include <sys/uio.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
+#include <cstddef>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <iterator>
+
+#include "platform.h"
+#include "tests/platform/system_log.h"
+
+namespace {
+
+// No operation makes this call; the child does to say that the operation begins and that it has ended.
+constexpr int kMark = SYS_getppid;
+
+const SystemCall kNames[] = {
+#ifdef SYS_open
+    {SYS_open, "open"},
+#endif
+#ifdef SYS_access
+    {SYS_access, "access"},
+#endif
+#ifdef SYS_readlink
+    {SYS_readlink, "readlink"},
+#endif
+#ifdef SYS_unlink
+    {SYS_unlink, "unlink"},
+#endif
+#ifdef SYS_rename
+    {SYS_rename, "rename"},
+#endif
+#ifdef SYS_stat
+    {SYS_stat, "stat"},
+#endif
+#ifdef SYS_fstat
+    {SYS_fstat, "stat"},
+#endif
+#ifdef SYS_newfstatat
+    {SYS_newfstatat, "stat"},
+#endif
+#ifdef SYS_fstatat64
+    {SYS_fstatat64, "stat"},
+#endif
+#ifdef SYS_renameat
+    {SYS_renameat, "rename"},
+#endif
+#ifdef SYS_fchown32
+    {SYS_fchown32, "fchown"},
+#endif
+    {SYS_statx, "stat"},        {SYS_openat, "open"},      {SYS_faccessat, "access"}, {SYS_readlinkat, "readlink"},
+    {SYS_unlinkat, "unlink"},   {SYS_renameat2, "rename"}, {SYS_read, "read"},        {SYS_write, "write"},
+    {SYS_fsync, "fsync"},       {SYS_close, "close"},      {SYS_flock, "flock"},      {SYS_fchmod, "fchmod"},
+    {SYS_fchown, "fchown"},
+};
+
+SystemCall CallOf(int number) {
+  for (const SystemCall& call : kNames) {
+    if (call.number == number) return call;
+  }
+  return {number, "system call " + std::to_string(number)};
+}
+
+void Require(bool done, const char* szWhat) {
+  if (done) return;
+  std::perror(szWhat);
+  std::abort();
+}
+
+void WriteAll(int fd, const void* data, size_t size) {
+  Require(::write(fd, data, size) == static_cast<ssize_t>(size), "write to the supervisor");
+}
+
+// Has the kernel ask about every call, except those that end the process and writes to `report`. Gives the descriptor
+// that it asks through.
+int HaveCallsAsked(int report) {
+  sock_filter filter[] = {
+      BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, nr)),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_exit_group, 3, 0),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_write, 0, 3),
+      BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, args[0])),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, static_cast<__u32>(report), 0, 1),
+      BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW),
+      BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_USER_NOTIF),
+  };
+  const sock_fprog program = {std::size(filter), filter};
+  Require(::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0, "no new privileges");
+  const long asked = ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, SECCOMP_FILTER_FLAG_NEW_LISTENER, &program);
+  Require(asked >= 0, "have system calls asked about");
+  return static_cast<int>(asked);
+}
+
+[[noreturn]] void BeChild(int report, const std::function<int()>& operation) {
+  PLIBCErrSet(ERR_NONE);
+  TakeLog();
+  const int asked = HaveCallsAsked(report);
+  WriteAll(report, &asked, sizeof asked);
+  ::syscall(kMark);
+  const int result = operation();
+  ::syscall(kMark);
+
+  const int numbers[] = {result, PLIBCErrGet()};
+  WriteAll(report, numbers, sizeof numbers);
+  for (const LogLine& line : TakeLog()) {
+    const std::string text = line.unit + ":" + std::to_string(line.line) + " " + line.text + "\n";
+    WriteAll(report, text.data(), text.size());
+  }
+  ::_exit(EXIT_SUCCESS);
+}
+
+class Supervisor {
+ public:
+  Supervisor(pid_t child, int report, const Plan& plan) : child_(child), report_(report), plan_(plan) {
+    int there = -1;
+    Require(::read(report_, &there, sizeof there) == sizeof there, "read where the child is asked");
+    const int process = static_cast<int>(::syscall(SYS_pidfd_open, child_, 0));
+    asked_ = static_cast<int>(::syscall(SYS_pidfd_getfd, process, there, 0));
+    Require(asked_ >= 0, "get what the child is asked through");
+    ::close(process);
+  }
+  ~Supervisor() { ::close(asked_); }
+
+  Outcome Supervise() {
+    while (NextCall()) Answer();
+    int state = 0;
+    Require(::waitpid(child_, &state, 0) == child_, "wait for the child");
+    outcome_.killed = WIFSIGNALED(state);
+    if (!outcome_.killed) ReadReport();
+    return std::move(outcome_);
+  }
+
+ private:
+  // Waits for the child's next call; false when it has ended.
+  bool NextCall() {
+    pollfd ready = {asked_, POLLIN, 0};
+    while (::poll(&ready, 1, -1) < 0) Require(errno == EINTR, "wait for a system call");
+    if ((ready.revents & POLLIN) == 0) return false;
+    call_ = {};
+    // ENOENT: the child was killed in between.
+    if (::ioctl(asked_, SECCOMP_IOCTL_NOTIF_RECV, &call_) == 0) return true;
+    Require(errno == ENOENT, "receive a system call");
+    return NextCall();
+  }
+
+  void Answer() {
+    if (call_.data.nr == kMark) return PassMark();
+    if (!inOperation_) return LetThrough();
+    const SystemCall call = CallOf(call_.data.nr);
+    if (IsPlanned(call)) {
+      outcome_.reached = true;
+      outcome_.call = call;
+      return Interfere();
+    }
+    if (!outcome_.reached) outcome_.before.push_back(call);
+    LetThrough();
+  }
+
+  bool IsPlanned(const SystemCall& call) {
+    const bool counts = plan_.name.empty() || plan_.name == call.name;
+    return counts && ++calls_ == plan_.call;
+  }
+
+  // The operation begins, or has ended.
+  void PassMark() {
+    inOperation_ = !inOperation_;
+    if (inOperation_) {
+      descriptorsBefore_ = CountDescriptors();
+    } else {
+      outcome_.descriptorsLeft = CountDescriptors() - descriptorsBefore_;
+    }
+    LetThrough();
+  }
+
+  void Interfere() {
+    const bool writes = outcome_.call.name == "write";
+    switch (plan_.interference) {
+      case Interference::kNone:
+        return LetThrough();
+      case Interference::kTearWrite:
+        if (writes) (void)WriteHalf();
+        [[fallthrough]];
+      case Interference::kKill:
+        Require(::kill(child_, SIGKILL) == 0, "kill the child");
+        return;
+      case Interference::kFail:
+        return Reply(0, -plan_.error, 0);
+      case Interference::kShorten:
+        return writes ? Reply(WriteHalf(), 0, 0) : LetThrough();
+    }
+  }
+
+  // Does half of the child's write in its place.
+  ssize_t WriteHalf() const {
+    std::string half(static_cast<size_t>(call_.data.args[2] + 1) / 2, '\0');
+    const iovec here = {half.data(), half.size()};
+    const iovec there = {reinterpret_cast<void*>(static_cast<uintptr_t>(call_.data.args[1])), half.size()};
+    Require(::process_vm_readv(child_, &here, 1, &there, 1, 0) == static_cast<ssize_t>(half.size()),
+            "read what it writes");
+    const int process = static_cast<int>(::syscall(SYS_pidfd_open, child_, 0));
+    const int file = static_cast<int>(::syscall(SYS_pidfd_getfd, process, static_cast<int>(call_.data.args[0]), 0));
+    Require(::write(file, half.data(), half.size()) == static_cast<ssize_t>(half.size()), "write a half");
+    ::close(file);
+    ::close(process);
+    return static_cast<ssize_t>(half.size());
+  }
+
+  void LetThrough() { Reply(0, 0, SECCOMP_USER_NOTIF_FLAG_CONTINUE); }
+
+  void Reply(long long value, int error, __u32 flags) {
+    seccomp_notif_resp reply = {call_.id, value, error, flags};
+    Require(::ioctl(asked_, SECCOMP_IOCTL_NOTIF_SEND, &reply) == 0 || errno == ENOENT, "answer a system call");
+  }
+
+  int CountDescriptors() const {
+    const std::filesystem::directory_iterator all("/proc/" + std::to_string(child_) + "/fd");
+    return static_cast<int>(std::distance(begin(all), end(all)));
+  }
+
+  void ReadReport() {
+    int numbers[2] = {};
+    Require(::read(report_, numbers, sizeof numbers) == sizeof numbers, "read the child's result");
+    outcome_.result = numbers[0];
+    outcome_.code = numbers[1];
+    std::string line;
+    for (char c; ::read(report_, &c, 1) == 1;) {
+      if (c != '\n') {
+        line += c;
+      } else {
+        outcome_.reports.push_back(std::exchange(line, {}));
+      }
+    }
+  }
+
+  pid_t child_;
+  int report_;
+  Plan plan_;
+  int asked_ = -1;
+  seccomp_notif call_ = {};
+  bool inOperation_ = false;
+  int calls_ = 0;
+  int descriptorsBefore_ = 0;
+  Outcome outcome_;
+};
+
+}  // namespace
+
+Outcome RunSupervised(const Plan& plan, const std::function<int()>& operation) {
+  int report[2];
+  Require(::pipe2(report, O_CLOEXEC) == 0, "pipe");
+  const pid_t child = ::fork();
+  Require(child >= 0, "fork");
+  if (child == 0) BeChild(report[1], operation);
+  ::close(report[1]);
+  Outcome outcome = Supervisor(child, report[0], plan).Supervise();
+  ::close(report[0]);
+  return outcome;
+}

@@ -1,0 +1,47 @@
+// An operation in a child process whose system calls this process watches, and one of which it interferes with.
+#ifndef MERO_TESTS_FAULT_SUPERVISED_H
+#define MERO_TESTS_FAULT_SUPERVISED_H
+
+#include <sys/types.h>
+
+#include <functional>
+#include <string>
+#include <vector>
+
+struct SystemCall {
+  int number = -1;
+  std::string name;  // by which the C library knows it; a number when no test is about it
+};
+
+// What happens in place of a system call.
+enum class Interference {
+  kNone,
+  kKill,       // the process is killed
+  kTearWrite,  // half of what a write was to write is written, then the process is killed; other calls are as with
+               // kKill
+  kFail,       // the call fails, without effect
+  kShorten,    // half of what a write was to write is written; other calls are let through
+};
+
+struct Plan {
+  Interference interference = Interference::kNone;
+  int call = 0;  // which of the operation's calls, from 1 on
+  int error = 0;
+  std::string name;  // counts only calls of that name; empty for all
+};
+
+struct Outcome {
+  bool reached = false;            // the operation made as many calls as the plan says
+  SystemCall call;                 // the one interfered with
+  std::vector<SystemCall> before;  // those that were let through until then
+  bool killed = false;
+  int result = -1;  // what follows is of an operation that was not killed
+  int code = 0;
+  std::vector<std::string> reports;
+  int descriptorsLeft = 0;  // how many more are open behind the operation than before it
+};
+
+// Runs an operation in a child of this process.
+Outcome RunSupervised(const Plan& plan, const std::function<int()>& operation);
+
+#endif  // MERO_TESTS_FAULT_SUPERVISED_H

@@ -1,0 +1,199 @@
+// Reading the known networks one after another, from the first to the last, while others may write to the file.
+#include <fcntl.h>
+#include <sys/inotify.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <chrono>
+#include <ctime>
+#include <filesystem>
+#include <thread>
+
+#include "common/known_networks_file.h"
+#include "tests/platform/containers.h"
+#include "tests/platform/platform_test.h"
+
+namespace {
+
+using std::chrono_literals::operator""ms;
+
+std::string NameOf(int i) {
+  return "network " + std::to_string(i);
+}
+
+std::string TextOf(int i, const std::string& essid) {
+  return "[" + NameOf(i) + "]\n\tESSID=" + essid + "\n\tACCESS_TIME=" + std::to_string(i) + "\n";
+}
+
+std::string Networks(int count, const std::string& essid = "old") {
+  std::string text;
+  for (int i = 0; i < count; ++i) text += TextOf(i, essid);
+  return text;
+}
+
+// Waits until the clock has left the file's last change far enough behind that a change from now on is bound to show.
+void LetTheFileSettle() {
+  const auto age = [] {
+    return std::filesystem::file_time_type::clock::now() - std::filesystem::last_write_time(kKnownNetworksPath);
+  };
+  while (age() < 100ms) std::this_thread::sleep_for(5ms);
+}
+
+// Counts how often a file is opened.
+class OpenCounter {
+ public:
+  explicit OpenCounter(const char* szPath) {
+    // With what lies between, since equal events in a row become one.
+    EXPECT_GE(::inotify_add_watch(watch_, szPath, IN_OPEN | IN_CLOSE), 0) << szPath;
+  }
+  ~OpenCounter() { ::close(watch_); }
+
+  int Take() {
+    int count = 0;
+    inotify_event event;  // without a name, as of a file that is watched itself
+    while (::read(watch_, &event, sizeof event) == sizeof event) count += (event.mask & IN_OPEN) != 0 ? 1 : 0;
+    return count;
+  }
+
+ private:
+  int watch_ = ::inotify_init1(IN_NONBLOCK | IN_CLOEXEC);
+};
+
+class Walk : public PlatformTest {
+ protected:
+  static std::string EssidOf(int i) {
+    WIRELESS_NETWORK_CONFIG config = {};
+    return MEROWirelessConfGet(NameOf(i).c_str(), &config) == 0 ? config.network.szEssid : "(none)";
+  }
+
+  static void WalkOver(int count) {
+    for (int i = 0; i < count; ++i) ASSERT_EQ(EssidOf(i), "old") << i;
+  }
+
+  // As another process.
+  template <class Action>
+  static void Elsewhere(Action action) {
+    const pid_t pid = ::fork();
+    if (pid == 0) ::_exit(action() ? 0 : 1);
+    int state = -1;
+    ASSERT_EQ(::waitpid(pid, &state, 0), pid);
+    ASSERT_EQ(state, 0);
+  }
+
+  static bool Overwrite(off_t offset, std::string_view text) {
+    const int fd = ::open(kKnownNetworksPath, O_WRONLY | O_CLOEXEC);
+    return ::pwrite(fd, text.data(), text.size(), offset) == static_cast<ssize_t>(text.size());
+  }
+};
+
+TEST_F(Walk, SeesEveryNetworkOnce) {
+  WriteFile(kKnownNetworksPath, Networks(100));
+  LetTheFileSettle();
+  for (int round = 0; round < 3; ++round) WalkOver(100);
+}
+
+TEST_F(Walk, ReadsTheFileOnceAndKeepsNothingOfItBehindTheLastNetwork) {
+  for (const int count : {1, 2, 100}) {
+    WriteFile(kKnownNetworksPath, Networks(count));
+    LetTheFileSettle();
+    for (int round = 0; round < 3; ++round) {
+      OpenCounter opens(kKnownNetworksPath);
+      WalkOver(count);
+      EXPECT_EQ(opens.Take(), 1) << count << " networks, round " << round;
+    }
+  }
+}
+
+TEST_F(Walk, KeepsNothingBehindTheLastNetworkOfAnyFile) {
+  const std::string_view contents[] = {
+      "[a]\n[b]\n[a]\n",          "[a]\n[a]\n[a]\n", "[a]\n[b]\n[B]\n", "junk\nKEY=value\n[a]\n[]\n[ b ]\n",
+      {"[a]\n[b\0c]\n[d]\n", 14},
+  };
+  for (const std::string_view content : contents) {
+    WriteFile(kKnownNetworksPath, content);
+    LetTheFileSettle();
+    for (int round = 0; round < 3; ++round) {
+      TextList names;
+      ASSERT_EQ(PLIBCFileEnumSection(kKnownNetworksPath, names.address()), names.get()->nItem);
+      OpenCounter opens(kKnownNetworksPath);
+      for (int i = 0; i < names.get()->nItem; ++i) {
+        WIRELESS_NETWORK_CONFIG config;
+        (void)MEROWirelessConfGet(PLIBCSzListGet(names.get(), i), &config);
+        if (i > 0) continue;
+        EXPECT_EQ(opens.Take(), 1) << "nothing was there to take the first from: " << content << ", round " << round;
+      }
+    }
+  }
+}
+
+TEST_F(Walk, SeesAFileThatAnotherProcessPutInPlace) {
+  WriteFile(kKnownNetworksPath, Networks(4));
+  LetTheFileSettle();
+  WalkOver(2);
+  Elsewhere(
+      [] { return PLIBCFileSetSectionValue(kKnownNetworksPath, NameOf(2).c_str(), "ESSID", "new", "\t%s=%s\n") == 0; });
+  EXPECT_EQ(EssidOf(2), "new");
+  EXPECT_EQ(EssidOf(3), "old");
+}
+
+TEST_F(Walk, SeesAnEditOfTheFileByAnotherProcess) {
+  WriteFile(kKnownNetworksPath, Networks(4));
+  LetTheFileSettle();
+  WalkOver(2);
+  const auto essid = static_cast<off_t>(Networks(2).size() + TextOf(2, "").find("ESSID=") + 6);
+  Elsewhere([&] { return Overwrite(essid, "new"); });
+  EXPECT_EQ(EssidOf(2), "new");
+  EXPECT_EQ(EssidOf(3), "old");
+}
+
+// File times advance in ticks, so that of two edits within one the second may not show in them.
+TEST_F(Walk, SeesAnEditThatComesRightBehindAnother) {
+  const auto essid = static_cast<off_t>(Networks(1).size() + TextOf(1, "").find("ESSID=") + 6);
+  for (int round = 0; round < 200; ++round) {
+    WriteFile(kKnownNetworksPath, Networks(4));
+    ASSERT_EQ(EssidOf(0), "old");
+    ASSERT_TRUE(Overwrite(essid, "new"));
+    ASSERT_EQ(EssidOf(1), "new") << round;
+  }
+}
+
+TEST_F(Walk, SeesThatTheFileWasRemovedOrEmptied) {
+  WriteFile(kKnownNetworksPath, Networks(4));
+  LetTheFileSettle();
+  WalkOver(2);
+  std::filesystem::rename(kKnownNetworksPath, "/usr/mero/etc/aside");
+  EXPECT_EQ(EssidOf(2), "(none)");
+  std::filesystem::rename("/usr/mero/etc/aside", kKnownNetworksPath);
+  WalkOver(2);
+  WriteFile(kKnownNetworksPath, "");
+  EXPECT_EQ(EssidOf(2), "(none)");
+}
+
+TEST_F(Walk, FindsNetworksInAnyOrderAndNoneThatIsNotThere) {
+  WriteFile(kKnownNetworksPath, Networks(10));
+  LetTheFileSettle();
+  for (const int i : {0, 5, 3, 3, 0, 11, 9, 2, 10, 1, 9, 9, 0, 4})
+    EXPECT_EQ(EssidOf(i), i < 10 ? "old" : "(none)") << i;
+}
+
+TEST_F(Walk, TakesTimeInProportionToTheNumberOfNetworks) {
+  const auto seconds = [](int count) {
+    WriteFile(kKnownNetworksPath, Networks(count));
+    LetTheFileSettle();
+    double least = 1e9;
+    for (int round = 0; round < 3; ++round) {
+      timespec begin;
+      timespec end;
+      ::clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &begin);
+      WalkOver(count);
+      ::clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &end);
+      least = std::min(least, static_cast<double>(end.tv_sec - begin.tv_sec) +
+                                  static_cast<double>(end.tv_nsec - begin.tv_nsec) / 1e9);
+    }
+    return least;
+  };
+  EXPECT_LT(seconds(10'000), 40 * seconds(1'000));  // a hundred times as long, were each a reading of its own
+}
+
+}  // namespace

@@ -1,0 +1,40 @@
+// Network interfaces that a test makes.
+#include "tests/platform/network_interfaces.h"
+
+#include <net/if.h>
+#include <sys/ioctl.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <utility>
+
+std::string Shell(const std::string& command) {
+  std::string output;
+  FILE* pipe = ::popen(("PATH=/usr/sbin:/usr/bin:/sbin:/bin; " + command).c_str(), "re");
+  for (int c; pipe != nullptr && (c = std::fgetc(pipe)) != EOF;) output += static_cast<char>(c);
+  EXPECT_TRUE(pipe != nullptr && ::pclose(pipe) == 0) << command << "\n" << output;
+  return output;
+}
+
+// One end of a virtual cable; every kernel has those, unlike dummy interfaces.
+NetworkInterface::NetworkInterface(std::string name) : name_(std::move(name)) {
+  Shell("ip link add " + name_ + " type veth");
+}
+
+NetworkInterface::~NetworkInterface() {
+  Shell("ip link delete " + name_);
+}
+
+unsigned NetworkInterface::flags() const {
+  const int control = ::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0);
+  ifreq request = {};
+  name_.copy(request.ifr_name, sizeof request.ifr_name - 1);
+  EXPECT_EQ(::ioctl(control, SIOCGIFFLAGS, &request), 0) << name_;
+  ::close(control);
+  return static_cast<unsigned short>(request.ifr_flags);
+}
+
+std::string NetworkInterface::addresses() const {
+  return Shell("ip -4 -o address show dev " + name_ + " | while read -r _ _ _ a _; do printf '%s ' \"$a\"; done");
+}

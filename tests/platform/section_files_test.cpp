@@ -1,0 +1,180 @@
+// Section files: what is read from them.
+#include "tests/platform/containers.h"
+#include "tests/platform/platform_test.h"
+
+namespace {
+
+using testing::ElementsAre;
+
+class SectionFile : public PlatformTest {
+ protected:
+  static std::vector<std::string> SectionsOf(std::string_view content) {
+    WriteFile(kFile, content);
+    TextList list;
+    const int count = PLIBCFileEnumSection(kFile, list.address());
+    EXPECT_EQ(count, list.get()->nItem) << content;
+    return list.items();
+  }
+};
+
+TEST_F(SectionFile, ListsItsSectionsInOrder) {
+  const struct {
+    std::string_view content;
+    std::vector<std::string> names;
+  } rows[] = {
+      {"", {}},
+      {"junk\nKEY=value\n", {}},
+      {"[a]", {"a"}},
+      {"[b]\n[a]\n[c]\n", {"b", "a", "c"}},
+      {"KEY=before\n[a]\n\tKEY=1\n\n# comment\n[b]\n", {"a", "b"}},
+      {"[a]\r\nKEY=1\r\n[b]\r\n", {"a", "b"}},
+      {"  [ two words ] \t\n", {"two words"}},
+      {"[00:11:22:AA:BB:CC]\n", {"00:11:22:AA:BB:CC"}},
+      {"[a]b\nx[c]\n[d\ne]\n[\n]\n[e]\n", {"e"}},
+      {"[a]]\n[[b]\n", {"a]", "[b"}},
+      {"[]\n", {""}},
+      {"#[a]\n;[b]\nKEY=[c]\n", {}},
+      {"[a]\n[A]\n[a]\n", {"a", "A", "a"}},
+      {"[\xFF\xFE]\n", {"\xFF\xFE"}},
+  };
+  for (const auto& row : rows) EXPECT_EQ(SectionsOf(row.content), row.names) << row.content;
+}
+
+TEST_F(SectionFile, HasNoSectionsWhileItIsMissing) {
+  TextList list;
+  for (const char* szPath : {kMissing, kInMissingDirectory}) {
+    EXPECT_EQ(PLIBCFileEnumSection(szPath, list.address()), 0);
+    ExpectNothingFound(ERR_FILE_NOT_FOUND);
+  }
+  EXPECT_EQ(list.get()->nItem, 0);
+}
+
+TEST_F(SectionFile, AppendsItsSectionsToAList) {
+  WriteFile(kFile, "[b]\n[c]\n");
+  TextList list;
+  EXPECT_EQ(PLIBCFileEnumSection(kFile, list.address()), 2);
+  EXPECT_EQ(PLIBCFileEnumSection(kFile, list.address()), 2);
+  EXPECT_THAT(list.items(), ElementsAre("b", "c", "b", "c"));
+}
+
+TEST_F(SectionFile, GivesEachValueAsExactlyTheBytesBehindTheEqualsSign) {
+  const struct {
+    std::string_view line;
+    const char* szKey;
+    std::string value;
+  } rows[] = {
+      {"KEY=value\n", "KEY", "value"},
+      {"\tKEY=value\n", "KEY", "value"},
+      {" KEY \t=value\n", "KEY", "value"},
+      {"KEY=value", "KEY", "value"},
+      {"KEY=value\r\n", "KEY", "value"},
+      {"KEY= value \t\n", "KEY", " value \t"},
+      {"KEY=\"value\"\n", "KEY", "\"value\""},
+      {"KEY=a=b\n", "KEY", "a=b"},
+      {"KEY=\n", "KEY", ""},
+      {"KEY=", "KEY", ""},
+      {"KEY=[b]\n", "KEY", "[b]"},
+      {"KEY=# no comment\n", "KEY", "# no comment"},
+      {"KEY=\xFF\xFE\n", "KEY", "\xFF\xFE"},
+      {"KEY=1\nKEY=2\n", "KEY", "2"},
+      {"junk\n\n# comment\n; comment\n=x\nKEY=value\n", "KEY", "value"},
+      {"two words=value\n", "two words", "value"},
+      {"#KEY=value\n", "KEY", "(none)"},
+      {" ;KEY=value\n", "KEY", "(none)"},
+      {"key=value\n", "KEY", "(none)"},
+      {"KEYS=value\n", "KEY", "(none)"},
+      {"KEY\n", "KEY", "(none)"},
+      {"KEY=value\n[b]\nKEY=other\n", "KEY", "value"},
+  };
+  for (const auto& row : rows) {
+    WriteFile(kFile, "KEY=before\n[a]\n" + std::string(row.line));
+    TextHash hash;
+    EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1) << row.line;
+    EXPECT_EQ(hash[row.szKey], row.value) << row.line;
+  }
+}
+
+TEST_F(SectionFile, FindsASectionWhateverItsCaseAndTheWhiteSpaceAroundIt) {
+  for (const char* szHeader : {"[Model X]", "[MODEL x]", " [ model X\t] ", "[model x]\r"}) {
+    WriteFile(kFile, "[other]\nKEY=other\n" + std::string(szHeader) + "\nKEY=value\n");
+    TextHash hash;
+    EXPECT_EQ(PLIBCFileGetSection(kFile, "Model X", hash.address()), 1) << szHeader;
+    EXPECT_EQ(hash["KEY"], "value") << szHeader;
+  }
+}
+
+TEST_F(SectionFile, GivesTheFirstOfSeveralSectionsOfOneName) {
+  WriteFile(kFile, "[a]\nFIRST=1\n[b]\n[A]\nSECOND=2\n");
+  TextHash hash;
+  EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
+  EXPECT_EQ(hash["FIRST"], "1");
+  EXPECT_EQ(hash["SECOND"], "(none)");
+}
+
+TEST_F(SectionFile, LeavesInAHashWhatTheSectionDoesNotHold) {
+  WriteFile(kFile, "[a]\nKEY=new\n");
+  TextHash hash{{"KEY", "old"}, {"OTHER", "kept"}};
+  EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
+  EXPECT_EQ(hash["KEY"], "new");
+  EXPECT_EQ(hash["OTHER"], "kept");
+}
+
+TEST_F(SectionFile, GivesAnEmptySection) {
+  WriteFile(kFile, "[a]\n[b]\nKEY=other\n");
+  TextHash hash;
+  EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
+  EXPECT_EQ(hash["KEY"], "(none)");
+}
+
+TEST_F(SectionFile, HasNoSectionButThoseWithAHeader) {
+  TextHash hash;
+  for (const char* szContent : {"", "a\n", "[ab]\n", "[b]\nKEY=[a]\n", "#[a]\n", "[a\n", "x[a]\n"}) {
+    WriteFile(kFile, szContent);
+    EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 0) << szContent;
+    ExpectNothingFound(ERR_SECTION_NOT_FOUND);
+  }
+  EXPECT_EQ(PLIBCFileGetSection(kMissing, "a", hash.address()), 0);
+  ExpectNothingFound(ERR_FILE_NOT_FOUND);
+}
+
+TEST_F(SectionFile, ReadsLinesAndNamesOfAnyLength) {
+  const std::string name(100'000, 'n');
+  const std::string value(1'000'000, 'v');
+  EXPECT_THAT(SectionsOf("[" + name + "]\nKEY=" + value + "\n"), ElementsAre(name));
+  TextHash hash;
+  EXPECT_EQ(PLIBCFileGetSection(kFile, name.c_str(), hash.address()), 1);
+  EXPECT_EQ(hash["KEY"], value);
+}
+
+TEST_F(SectionFile, ThatCannotBeReadIsReported) {
+  TextList list;
+  EXPECT_EQ(PLIBCFileEnumSection(kDirectory, list.address()), -1);
+  ExpectFailure(ERR_BAD_PARAMETERS, "Failed to read /tmp/platform: Invalid argument");
+  TextHash hash;
+  EXPECT_EQ(PLIBCFileGetSection(kDirectory, "a", hash.address()), -1);
+  ExpectFailure(ERR_BAD_PARAMETERS, "Failed to read /tmp/platform: Invalid argument");
+}
+
+TEST_F(SectionFile, RefusesNullArguments) {
+  TextList list;
+  PPLIBSZLIST noList = nullptr;
+  EXPECT_EQ(PLIBCFileEnumSection(nullptr, list.address()), -1);
+  ExpectNullRefused();
+  EXPECT_EQ(PLIBCFileEnumSection(kFile, nullptr), -1);
+  ExpectNullRefused();
+  EXPECT_EQ(PLIBCFileEnumSection(kFile, &noList), -1);
+  ExpectNullRefused();
+
+  TextHash hash;
+  PPLIBSZHASH noHash = nullptr;
+  EXPECT_EQ(PLIBCFileGetSection(nullptr, "a", hash.address()), -1);
+  ExpectNullRefused();
+  EXPECT_EQ(PLIBCFileGetSection(kFile, nullptr, hash.address()), -1);
+  ExpectNullRefused();
+  EXPECT_EQ(PLIBCFileGetSection(kFile, "a", nullptr), -1);
+  ExpectNullRefused();
+  EXPECT_EQ(PLIBCFileGetSection(kFile, "a", &noHash), -1);
+  ExpectNullRefused();
+}
+
+}  // namespace

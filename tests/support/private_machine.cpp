@@ -1,0 +1,71 @@
+// A machine of the test's own.
+#include "private_machine.h"
+
+#include <fcntl.h>
+#include <sched.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+namespace {
+
+// Every machine has this directory, and keeps it for mounts that come and go.
+const std::string kUpper = "/mnt";
+
+void Require(bool done, const std::string& what) {
+  if (done) return;
+  std::fprintf(stderr, "cannot set up a private machine: %s: %s\n", what.c_str(), std::strerror(errno));
+  std::exit(EXIT_FAILURE);
+}
+
+void WriteTo(const std::string& path, const std::string& text) {
+  const int fd = ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
+  Require(fd >= 0, path);
+  Require(::write(fd, text.data(), text.size()) == static_cast<ssize_t>(text.size()), path);
+  ::close(fd);
+}
+
+void Mount(const char* szType, const std::string& target, const std::string& options) {
+  Require(::mount(szType, target.c_str(), szType, 0, options.c_str()) == 0, "mount " + target);
+}
+
+void MakeDirectory(const std::string& path) {
+  Require(::mkdir(path.c_str(), 0755) == 0 || errno == EEXIST, "make " + path);
+}
+
+// Whoever is not root becomes the root of a user namespace.
+void EnterNamespaces() {
+  const uid_t uid = ::getuid();
+  const gid_t gid = ::getgid();
+  const int user = uid == 0 ? 0 : CLONE_NEWUSER;
+  Require(::unshare(CLONE_NEWNS | CLONE_NEWNET | user) == 0, "namespaces");
+  if (user == 0) return;
+  WriteTo("/proc/self/setgroups", "deny");
+  WriteTo("/proc/self/uid_map", "0 " + std::to_string(uid) + " 1");
+  WriteTo("/proc/self/gid_map", "0 " + std::to_string(gid) + " 1");
+}
+
+void MakeWritable(const std::string& name) {
+  const std::string upper = kUpper + "/" + name;
+  const std::string work = upper + ".work";
+  MakeDirectory(upper);
+  MakeDirectory(work);
+  Mount("overlay", "/" + name, "lowerdir=/" + name + ",upperdir=" + upper + ",workdir=" + work);
+}
+
+}  // namespace
+
+void EnterPrivateMachine() {
+  EnterNamespaces();
+  Require(::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) == 0, "private mounts");
+  Mount("tmpfs", kUpper, "");
+  for (const char* name : {"etc", "run", "tmp", "usr", "var"}) MakeWritable(name);
+  Mount("sysfs", "/sys", "");
+  for (const char* path : {"/usr/mero", "/usr/mero/etc", "/var/tmp"}) MakeDirectory(path);
+}

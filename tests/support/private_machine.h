@@ -1,0 +1,11 @@
+// A machine of the test's own: its files and network interfaces are the real ones to whoever runs in it, and nothing of
+// the machine outside is touched.
+#ifndef MERO_TESTS_PRIVATE_MACHINE_H
+#define MERO_TESTS_PRIVATE_MACHINE_H
+
+// Moves this process into namespaces in which /etc, /run, /tmp, /usr and /var may be written to, on top of what the
+// machine has, and in which there are no network interfaces but a loopback. /usr/mero/etc and /var/tmp exist.
+// Ends the process with a message when that cannot be done.
+void EnterPrivateMachine();
+
+#endif  // MERO_TESTS_PRIVATE_MACHINE_H

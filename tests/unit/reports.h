@@ -1,0 +1,17 @@
+// Reports that are known by their unit and their text, whichever line of the source they come from.
+#ifndef MERO_TESTS_UNIT_REPORTS_H
+#define MERO_TESTS_UNIT_REPORTS_H
+
+#include <regex>
+#include <string>
+#include <vector>
+
+// Effects or messages with "#" for the line of each report: "syslog(3, wireless_ifcfg_set:# Bad parameters)".
+inline std::vector<std::string> WithoutLines(std::vector<std::string> texts) {
+  using namespace std::regex_constants;
+  static const std::regex kLine("((?:syslog\\(3, )?[a-z_]+):[1-9][0-9]* ");
+  for (std::string& text : texts) text = std::regex_replace(text, kLine, "$1:# ", match_continuous | format_first_only);
+  return texts;
+}
+
+#endif  // MERO_TESTS_UNIT_REPORTS_H

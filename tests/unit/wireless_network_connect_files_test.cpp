@@ -1,0 +1,188 @@
+// What a connection leaves: its record, a media service that knows of it, and a copy of the resolver's settings.
+#include <sys/stat.h>
+
+#include "hostile_texts.h"
+#include "joining.h"
+
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+// ---- The record ----
+
+class ConnectionRecord : public JoiningTest {};
+
+TEST_F(ConnectionRecord, HoldsNameProtocolAuthenticationEncryptionAndAddressOnALineEach) {
+  WriteText(kRecord, std::string(1000, 'x'));
+  EXPECT_EQ(Join(), 0);
+  EXPECT_EQ(ReadText(kRecord), "Home Net\n7\n5\n8\n00:11:22:AA:BB:CC\n");
+}
+
+TEST_F(ConnectionRecord, HoldsNumbersAndAddressesAsTheyAre) {
+  config_.network.protocol = static_cast<WIRELESS_PROTOCOL>(12);
+  config_.network.auth = WIRELESS_AUTH_WPA2EAP;
+  config_.network.encrypt = static_cast<WIRELESS_ENCRYPT>(12);
+  config_.noneBssid = 0;
+  std::memset(config_.network.bssid, 0, 6);
+  EXPECT_EQ(Join(), 0);
+  EXPECT_EQ(ReadText(kRecord), "Home Net\n12\n8\n12\n00:00:00:00:00:00\n");
+
+  config_.network.protocol = WIRELESS_PROTO_UNKNOWN;
+  config_.network.auth = WIRELESS_AUTH_OPEN;
+  config_.network.encrypt = WIRELESS_ENCRYPT_UNKNOWN;
+  config_.network.szEssid[0] = '\0';
+  std::memset(config_.network.bssid, 0xff, 6);
+  EXPECT_EQ(Join(), 0);
+  EXPECT_EQ(ReadText(kRecord), "\n0\n1\n0\nFF:FF:FF:FF:FF:FF\n");
+}
+
+TEST_F(ConnectionRecord, HoldsTheAccessPointAlsoWhenTheNameAloneCounts) {
+  config_.noneBssid = 1;
+  EXPECT_EQ(Join(), 0);
+  EXPECT_THAT(ReadText(kRecord), testing::EndsWith("\n00:11:22:AA:BB:CC\n"));
+}
+
+TEST_F(ConnectionRecord, HoldsNamesAsTheyAre) {
+  for (const std::string& name : kHostileTexts) {
+    if (name.find('\n') != std::string::npos) continue;
+    std::strcpy(config_.network.szEssid, name.c_str());
+    EXPECT_EQ(Join(), 0);
+    EXPECT_EQ(ReadText(kRecord), name + "\n7\n5\n8\n00:11:22:AA:BB:CC\n");
+  }
+}
+
+TEST_F(ConnectionRecord, CanBeReadByOtherPrograms) {
+  const mode_t before = umask(022);
+  EXPECT_EQ(Join(), 0);
+  umask(before);
+  struct stat status {};
+  ASSERT_EQ(stat(kRecord.c_str(), &status), 0);
+  EXPECT_EQ(status.st_mode & 07777, 0644u);
+}
+
+// Has the record's name in use again as soon as the old record is gone.
+template <class Occupy>
+void OccupyWhenRemoved(Occupy occupy) {
+  fake::PLIBCSysUnlink.Does([occupy](const char* szPath) {
+    const int result = fake::PLIBCSysUnlink.Real(szPath);
+    if (szPath == kRecord) occupy();
+    return result;
+  });
+}
+
+const std::vector<std::string> kCannotRecord = {"wireless_network_connect:# Failed to record this connection.",
+                                                "wireless_network_connect:# Failed to connect network."};
+
+TEST_F(ConnectionRecord, IsGoneWhenTheNewOneCannotBeWrittenAndTheSupplicantStays) {
+  WriteText(kRecord, "old");
+  WriteText(kResolver, "");
+  OccupyWhenRemoved([] {
+    EXPECT_FALSE(Exists(kRecord));
+    std::filesystem::create_directory(kRecord);
+  });
+  EXPECT_EQ(Join(), -1);
+  EXPECT_THAT(WithoutLines(fake::Messages()), testing::ElementsAreArray(kCannotRecord));
+  EXPECT_THAT(fake::EffectsOf({"system"}), ElementsAre(RunOf(kStartsSupplicant)));
+  EXPECT_EQ(fake::PLIBCFileCheckKeyValue.calls(), 0);
+  EXPECT_FALSE(Exists(kMarker));
+}
+
+TEST_F(ConnectionRecord, ThatDoesNotReachTheDiskIsAFailure) {
+  OccupyWhenRemoved([] { std::filesystem::create_symlink("/dev/full", kRecord); });
+  EXPECT_EQ(Join(), -1);
+  EXPECT_THAT(WithoutLines(fake::Messages()), testing::ElementsAreArray(kCannotRecord));
+}
+
+TEST_F(ConnectionRecord, StaysWhenTheNetworkIsNotJoined) {
+  WriteText(kRecord, "old");
+  fake::PipesGive({""});
+  EXPECT_EQ(Join(), -1);
+  fake::system.Returns(-1);
+  EXPECT_EQ(Join(), -1);
+  config_.network.auth = WIRELESS_AUTH_UNKNOWN;
+  EXPECT_EQ(Join(), -1);
+  EXPECT_EQ(ReadText(kRecord), "old");
+}
+
+// ---- The media service and the resolver ----
+
+class AfterJoining : public JoiningTest {};
+
+TEST_F(AfterJoining, TheMediaServiceIsToldWhenItRunsOnTheInterface) {
+  const struct {
+    const char* szIfName;
+    const char* szSettings;
+    bool told;
+  } kCases[] = {
+      {"wlan0", "runmediaservice=yes\nnetwork_mediaservice=wlan0\n", true},
+      {"wlan0", "network_mediaservice=\"wlan0\"\nother=x\nrunmediaservice=\"yes\"\n", true},
+      {"usb7", "runmediaservice=yes\nnetwork_mediaservice=usb7\n", true},
+      {"usb7", "runmediaservice=yes\nnetwork_mediaservice=wlan0\n", false},
+      {"wlan0", "runmediaservice=no\nnetwork_mediaservice=wlan0\n", false},
+      {"wlan0", "runmediaservice=Yes\nnetwork_mediaservice=wlan0\n", false},
+      {"wlan0", "runmediaservice=\nnetwork_mediaservice=wlan0\n", false},
+      {"wlan0", "runmediaservice=yes\nnetwork_mediaservice=wlan01\n", false},
+      {"wlan0", "runmediaservice=yes\nnetwork_mediaservice=WLAN0\n", false},
+      {"wlan0", "runmediaservice=yes\nnetwork_mediaservice=\n", false},
+      {"wlan0", "runmediaservice=yes\n", false},
+      {"wlan0", "network_mediaservice=wlan0\n", false},
+      {"wlan0", "", false},
+  };
+  for (const auto& row : kCases) {
+    Begin();
+    fake::MEROWirelessInterfaceGet.Returns(row.szIfName);
+    WriteText(kSystemSettings, row.szSettings);
+    EXPECT_EQ(Join(), 0);
+    const Effects expected = row.told ? Effects{"MEROMediaService(2)"} : Effects{};
+    EXPECT_EQ(fake::EffectsOf({"MEROMediaService"}), expected) << row.szSettings;
+  }
+}
+
+TEST_F(AfterJoining, TheMediaServiceIsAskedAboutInTheSystemsSettings) {
+  fake::PLIBCFileCheckKeyValue.Returns(-1);  // not zero: it is so
+  EXPECT_EQ(Join(), 0);
+  EXPECT_THAT(
+      fake::EffectsOf({"PLIBCFileCheckKeyValue", "MEROMediaService"}),
+      ElementsAre("PLIBCFileCheckKeyValue(/etc/meroinfo.conf, runmediaservice, yes, 0)",
+                  "PLIBCFileCheckKeyValue(/etc/meroinfo.conf, network_mediaservice, wlan0, 0)", "MEROMediaService(2)"));
+}
+
+TEST_F(AfterJoining, AMediaServiceThatFailsIsNoFailureOfTheConnection) {
+  WriteText(kSystemSettings, "runmediaservice=yes\nnetwork_mediaservice=wlan0\n");
+  WriteText(kResolver, "");
+  fake::MEROMediaService.Returns(-1);
+  EXPECT_EQ(Join(), 0);
+  EXPECT_THAT(fake::Messages(), IsEmpty());
+  EXPECT_THAT(fake::EffectsOf({"MEROMediaService", "system"}),
+              ElementsAre(RunOf(kStartsSupplicant), "MEROMediaService(2)", RunOf(kSavesResolver)));
+}
+
+TEST_F(AfterJoining, TheResolverIsSavedWhenThereIsOne) {
+  EXPECT_EQ(Join(), 0);
+  EXPECT_THAT(fake::EffectsOf({"system"}), ElementsAre(RunOf(kStartsSupplicant)));
+  WriteText(kResolver, "nameserver 10.0.0.1\n");
+  EXPECT_EQ(Join(), 0);
+  EXPECT_EQ(fake::EffectsOf({"system"}).back(), RunOf(kSavesResolver));
+}
+
+TEST_F(AfterJoining, AResolverThatCannotBeSavedIsReportedAndNoFailureOfTheConnection) {
+  WriteText(kResolver, "");
+  fake::system.Returns(0, -1);
+  EXPECT_EQ(Join(), 0);
+  EXPECT_THAT(WithoutLines(fake::Messages()),
+              ElementsAre("wireless_network_connect:# Failed to execute '" + kSavesResolver + "'"));
+  EXPECT_TRUE(Exists(kRecord));
+  EXPECT_FALSE(Exists(kMarker));
+}
+
+TEST_F(AfterJoining, NothingIsDoneForANetworkThatWasNotJoined) {
+  WriteText(kSystemSettings, "runmediaservice=yes\nnetwork_mediaservice=wlan0\n");
+  WriteText(kResolver, "");
+  fake::PipesGive({""});
+  EXPECT_EQ(Join(), -1);
+  EXPECT_EQ(fake::MEROMediaService.calls(), 0);
+  EXPECT_EQ(fake::EffectsOf({"system"}).back(), RunOf(kEndsSupplicant));
+}
+
+}  // namespace

@@ -1,0 +1,300 @@
+// A scan's course: the adapter, the interface, the readings. What a reading makes of its rows is tested by itself.
+#include <fcntl.h>
+
+#include <climits>
+
+#include "listing.h"
+#include "unit_test.h"
+
+namespace {
+
+using testing::ElementsAre;
+using testing::ElementsAreArray;
+using testing::IsEmpty;
+
+constexpr char kListsLast[] = "popen(/sbin/iwlist wlan0 scanning mero, r)";
+constexpr char kScansAfresh[] = "system(/sbin/iwlist wlan0 scanning > /dev/null 2>&1)";
+constexpr char kClosesPipe[] = "pclose(&)";
+
+std::string ReportOf(const std::string& message) {
+  return fake::Report("wireless_network_scan:" + message);
+}
+
+class Scan : public UnitTest {
+ protected:
+  Scan() {
+    BeginWithAdapter();
+    fake::system.Returns(0);
+    fake::PipesGive({ListingOf(1)});
+  }
+
+  int Run(WIRELESS_SCAN scan = WIRELESS_SCAN_LAST) {
+    return memory::Run(0, [&] { return MEROWirelessNetworkScan(scan, ring_.head()); });
+  }
+
+  // What was done, but for the texts that rows were taken apart into.
+  static std::vector<std::string> Steps() {
+    return fake::EffectsOf({"MEROWirelessAdapterNum", "MEROWirelessInterfaceGet", "PLIBNetIfUp", "sleep", "system",
+                            "popen", "pclose", "syslog"});
+  }
+
+  // The steps of a scan, from the first question about the adapter to the interface that is up.
+  static std::vector<std::string> After(std::vector<std::string> steps) {
+    const char* const before[] = {"MEROWirelessAdapterNum()", "MEROWirelessInterfaceGet()", "PLIBNetIfUp(wlan0)",
+                                  "sleep(1)"};
+    steps.insert(steps.begin(), std::begin(before), std::end(before));
+    return steps;
+  }
+
+  Ring<WIRELESS_NETWORK> ring_;
+};
+
+TEST_F(Scan, ReadsTheLastResultsUntilTwoReadingsAgree) {
+  EXPECT_EQ(Run(), 0);
+  EXPECT_THAT(Steps(), ElementsAreArray(After({kListsLast, kClosesPipe, ReportOf("169 Scan 0: result is un-stable."),
+                                               kListsLast, kClosesPipe, ReportOf("164 Scan 1: success.")})));
+  EXPECT_EQ(ring_.Records().size(), 1u);
+}
+
+TEST_F(Scan, IsMadeAfreshFirstWhenThatIsAskedFor) {
+  EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), 0);
+  EXPECT_THAT(Steps(), ElementsAreArray(
+                           After({kScansAfresh, kListsLast, kClosesPipe, ReportOf("169 Scan 0: result is un-stable."),
+                                  kListsLast, kClosesPipe, ReportOf("164 Scan 1: success.")})));
+}
+
+TEST_F(Scan, IsNotMadeAfreshForAnyOtherValue) {
+  for (const int scan : {0, 2, -1, 257, INT_MAX}) {
+    EXPECT_EQ(Run(static_cast<WIRELESS_SCAN>(scan)), 0) << scan;
+    ring_.Clear();
+  }
+  EXPECT_EQ(fake::system.calls(), 0);
+}
+
+// The steps of waiting so many times for an adapter, up to the question that follows.
+std::vector<std::string> Waits(int count) {
+  std::vector<std::string> steps;
+  for (int i = 0; i < count; ++i) {
+    steps.insert(steps.end(),
+                 {"MEROWirelessAdapterNum()", ReportOf("233 Wait for wlan0 ready, " + std::to_string(i)), "sleep(1)"});
+  }
+  steps.push_back("MEROWirelessAdapterNum()");
+  return steps;
+}
+
+TEST_F(Scan, WaitsForAnAdapterUpToFiveTimesASecond) {
+  for (int absent = 0; absent <= 5; ++absent) {
+    BeginWithAdapter();
+    fake::MEROWirelessAdapterNum.Does([left = absent]() mutable { return left-- > 0 ? -(left % 2) : 2; });
+    fake::MEROWirelessInterfaceGet.Returns("usb7");
+    fake::PLIBNetIfUp.Returns(0);
+    EXPECT_EQ(Run(), -1);
+    std::vector<std::string> expected = Waits(absent);
+    expected.insert(expected.end(), {"MEROWirelessInterfaceGet()", "PLIBNetIfUp(usb7)",
+                                     ReportOf("191 Failed to activate network interface usb7")});
+    EXPECT_THAT(fake::Effects(), ElementsAreArray(expected)) << absent;
+  }
+}
+
+TEST_F(Scan, FailsWithoutAnAdapterAndLeavesTheHeadAsItWas) {
+  for (const int none : {0, -1}) {
+    BeginWithAdapter();
+    fake::MEROWirelessAdapterNum.Returns(none);
+    EXPECT_EQ(Run(), -1);
+    std::vector<std::string> expected = Waits(5);
+    expected.push_back(ReportOf("229 There is no wireless USB adapter plugged"));
+    EXPECT_THAT(fake::Effects(), ElementsAreArray(expected)) << none;
+    EXPECT_FALSE(ring_.IsSet());
+  }
+}
+
+TEST_F(Scan, RejectsANullHeadOnceThereIsAnAdapter) {
+  EXPECT_EQ(MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, nullptr), -1);
+  EXPECT_THAT(fake::Effects(),
+              ElementsAre("MEROWirelessAdapterNum()", "MEROWirelessInterfaceGet()", ReportOf("188 Bad parameters")));
+  BeginWithAdapter();
+  fake::MEROWirelessAdapterNum.Returns(0);
+  EXPECT_EQ(MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, nullptr), -1);
+  EXPECT_EQ(fake::Effects().back(), ReportOf("229 There is no wireless USB adapter plugged"));
+}
+
+TEST_F(Scan, RejectsAnInterfaceWithoutAName) {
+  fake::MEROWirelessInterfaceGet.Returns(static_cast<const char*>(nullptr));
+  EXPECT_EQ(Run(), -1);
+  EXPECT_THAT(fake::Effects(),
+              ElementsAre("MEROWirelessAdapterNum()", "MEROWirelessInterfaceGet()", ReportOf("188 Bad parameters")));
+}
+
+TEST_F(Scan, FailsWhenTheInterfaceStaysDown) {
+  fake::PLIBNetIfUp.Returns(0);
+  EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), -1);
+  EXPECT_THAT(fake::Effects(),
+              ElementsAre("MEROWirelessAdapterNum()", "MEROWirelessInterfaceGet()", "PLIBNetIfUp(wlan0)",
+                          ReportOf("191 Failed to activate network interface wlan0")));
+}
+
+TEST_F(Scan, TakesAnyAnswerButZeroForAnInterfaceThatIsUp) {
+  fake::PLIBNetIfUp.Returns(-1);
+  EXPECT_EQ(Run(), 0);
+}
+
+TEST_F(Scan, FailsWhenTheFreshScanCannotBeStarted) {
+  fake::system.Returns(-1);
+  EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), -1);
+  EXPECT_THAT(Steps(),
+              ElementsAreArray(After(
+                  {kScansAfresh, ReportOf("200 Failed to execute '/sbin/iwlist wlan0 scanning > /dev/null 2>&1'")})));
+}
+
+TEST_F(Scan, DoesNotMindHowTheFreshScanEnds) {
+  for (const int status : {1, 256, 65280, INT_MAX}) {
+    fake::system.Returns(status);
+    EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), 0) << status;
+    ring_.Clear();
+  }
+}
+
+// The course of a scan by the number of networks in each reading; a negative number is a reading that fails.
+struct Course {
+  std::vector<int> readings;
+  std::vector<std::string> messages;
+  int result;
+  size_t nListed;
+};
+
+const std::string kFailed = "162 Scan #: failed.";
+const std::string kSuccess = "164 Scan #: success.";
+const std::string kNothing = "167 Scan #: no scan result.";
+const std::string kUnstable = "169 Scan #: result is un-stable.";
+const std::string kFailedAtLast = "204 Failed to get network scanning result";
+
+const Course kCourses[] = {
+    {{3, 3}, {kUnstable, kSuccess}, 0, 3},
+    {{1, 2, 2}, {kUnstable, kUnstable, kSuccess}, 0, 2},
+    {{0, 3, 3}, {kNothing, kUnstable, kSuccess}, 0, 3},
+    {{3, 0, 3, 3}, {kUnstable, kNothing, kUnstable, kSuccess}, 0, 3},
+    {{1, 2, 3, 4, 4}, {kUnstable, kUnstable, kUnstable, kUnstable, kSuccess}, 0, 4},
+    {{2, 3, 4, 5, 6}, {kUnstable, kUnstable, kUnstable, kUnstable, kUnstable}, 0, 6},
+    {{3, 2, 3, 2, 3}, {kUnstable, kUnstable, kUnstable, kUnstable, kUnstable}, 0, 3},
+    {{0, 0, 0, 0, 0}, {kNothing, kNothing, kNothing, kNothing, kNothing}, 0, 0},
+    {{1, 2, 3, 4, 0}, {kUnstable, kUnstable, kUnstable, kUnstable, kNothing}, 0, 0},
+    {{-1, 3, 3}, {kFailed, kUnstable, kSuccess}, 0, 3},
+    {{3, -1, 3, 3}, {kUnstable, kFailed, kUnstable, kSuccess}, 0, 3},
+    {{-1, -1, -1, -1, 2}, {kFailed, kFailed, kFailed, kFailed, kUnstable}, 0, 2},
+    {{-1, -1, -1, -1, 0}, {kFailed, kFailed, kFailed, kFailed, kNothing}, 0, 0},
+    {{-1, -1, -1, -1, -1}, {kFailed, kFailed, kFailed, kFailed, kFailed, kFailedAtLast}, -1, 0},
+    {{1, 2, 3, 4, -1}, {kUnstable, kUnstable, kUnstable, kUnstable, kFailed, kFailedAtLast}, -1, 0},
+};
+
+constexpr char kNoPipe[] = "83 Failed to popen '/sbin/iwlist wlan0 scanning mero', errno=Too many open files";
+
+TEST_F(Scan, TakesUpToFiveReadingsAndKeepsTheLast) {
+  for (const Course& course : kCourses) {
+    BeginWithAdapter();
+    std::vector<fake::Output> outputs;
+    std::vector<std::string> expected;
+    for (size_t i = 0; i < course.messages.size(); ++i) {
+      const bool opens = i >= course.readings.size() || course.readings[i] >= 0;
+      if (i < course.readings.size()) {
+        outputs.push_back(opens ? fake::Output(ListingOf(course.readings[i])) : fake::kNoPipe);
+        expected.push_back(kListsLast);
+        expected.push_back(opens ? kClosesPipe : ReportOf(kNoPipe));
+      }
+      std::string message = course.messages[i];
+      const size_t at = message.find('#');
+      if (at != std::string::npos) message[at] = static_cast<char>('0' + i);
+      expected.push_back(ReportOf(message));
+    }
+    fake::PipesGive(outputs);
+
+    EXPECT_EQ(Run(), course.result) << testing::PrintToString(course.readings);
+    EXPECT_THAT(Steps(), ElementsAreArray(After(expected))) << testing::PrintToString(course.readings);
+    EXPECT_EQ(ring_.Records().size(), course.nListed) << testing::PrintToString(course.readings);
+    EXPECT_EQ(memory::Held(), course.nListed) << "records of earlier readings are left";
+    ring_.Clear();
+  }
+}
+
+TEST_F(Scan, EndsEveryPipeAndInheritsNoneToOtherCommands) {
+  fake::popen.Does([](const char*, const char* szMode) { return fake::popen.Real("echo; echo", szMode); });
+  fake::pclose.Does([](FILE* pipe) {
+    EXPECT_NE(fcntl(fileno(pipe), F_GETFD) & FD_CLOEXEC, 0);
+    return fake::pclose.Real(pipe);
+  });
+  EXPECT_EQ(Run(), 0);
+  EXPECT_EQ(fake::popen.calls(), 5);
+  EXPECT_EQ(fake::pclose.calls(), 5);
+}
+
+constexpr char kTool[] = "/usr/sbin/iwlist";
+
+// The tool notes the words that it was called with, and lists one network when they are the right ones.
+void InstallTool() {
+  WriteScript(kTool,
+              "for word; do printf '<%s>' \"$word\"; done >> /tmp/words; echo >> /tmp/words\n"
+              "[ \"$3\" = mero ] || exit 1\n"
+              "printf 'heading\\nheading\\n%s\\n' '" +
+                  RowOf("6", "net") + "'\n");
+  WriteText("/tmp/words", "");
+}
+
+TEST_F(Scan, RunsTheListingTool) {
+  InstallTool();
+  BeginWithAdapter();
+  EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), 0);
+  EXPECT_EQ(ring_.Records().size(), 1u);
+  EXPECT_EQ(ReadText("/tmp/words"), "<wlan0><scanning>\n<wlan0><scanning><mero>\n<wlan0><scanning><mero>\n");
+}
+
+TEST_F(Scan, PassesAnyInterfaceNameOnAsOneInertWord) {
+  InstallTool();
+  for (const char* szName : {"a b",
+                             "$(touch /tmp/x)",
+                             "`touch /tmp/x`",
+                             "a;touch /tmp/x",
+                             "a|b",
+                             "a&b",
+                             "'",
+                             "'';'''",
+                             "\"",
+                             "\\",
+                             "*",
+                             "~",
+                             "#",
+                             "a>/tmp/x",
+                             "!",
+                             "{a,b}",
+                             "\t\n",
+                             "\x80\xff",
+                             "$IFS",
+                             "''''''''''''''' "}) {
+    BeginWithAdapter();
+    fake::MEROWirelessInterfaceGet.Returns(szName);
+    WriteText("/tmp/words", "");
+    EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), 0) << szName;
+    const std::string word = "<" + std::string(szName) + ">";
+    EXPECT_EQ(ReadText("/tmp/words"),
+              word + "<scanning>\n" + word + "<scanning><mero>\n" + word + "<scanning><mero>\n");
+    EXPECT_EQ(ring_.Records().size(), 1u) << szName;
+    EXPECT_EQ(ReadText("/tmp/x"), "");
+    ring_.Clear();
+  }
+}
+
+TEST_F(Scan, NeverRunsACommandThatWouldBeCut) {
+  const std::string name(200, 'i');
+  fake::MEROWirelessInterfaceGet.Returns(name.c_str());
+  EXPECT_EQ(Run(WIRELESS_SCAN_RENEW), -1);
+  EXPECT_EQ(fake::system.calls(), 0);
+  EXPECT_EQ(fake::Messages().back(),
+            "wireless_network_scan:200 Failed to execute '" + ("/sbin/iwlist " + name).substr(0, 127) + "'");
+
+  EXPECT_EQ(Run(WIRELESS_SCAN_LAST), -1);
+  EXPECT_EQ(fake::popen.calls(), 0);
+  EXPECT_THAT(fake::Messages(),
+              testing::Contains("wireless_network_scan:83 Failed to popen '" + ("/sbin/iwlist " + name).substr(0, 127) +
+                                "', errno=Argument list too long")
+                  .Times(5));
+}
+
+}  // namespace
