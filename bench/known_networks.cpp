@@ -1,0 +1,163 @@
+// What known networks cost: listing them by their last save, and saving one.
+//
+// The store lies on the file system of the directory that the program is run in.
+#include <benchmark/benchmark.h>
+#include <fcntl.h>
+#include <search.h>
+#include <sys/mount.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstddef>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <thread>
+
+#include "common/known_networks_file.h"
+#include "common/text.h"
+#include "platform.h"
+#include "private_machine.h"
+#ifdef WITH_GLIB
+#include "key_file.h"
+#endif
+
+namespace {
+
+namespace fs = std::filesystem;
+
+void Require(bool done, const char* szWhat) {
+  if (done) return;
+  std::perror(szWhat);
+  std::exit(EXIT_FAILURE);
+}
+
+WIRELESS_NETWORK_CONFIG NetworkOf(int number) {
+  WIRELESS_NETWORK_CONFIG config = {};
+  CopyText(config.szKey, "correct horse battery " + std::to_string(number));
+  CopyText(config.szIp, "192.168.1.2");
+  CopyText(config.szMask, "255.255.255.0");
+  CopyText(config.szGateway, "192.168.1.1");
+  CopyText(config.network.szEssid, "Network " + std::to_string(number));
+  for (int i = 3; i < 6; ++i) config.network.bssid[i] = static_cast<unsigned char>(number >> (8 * (5 - i)));
+  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  config.network.auth = WIRELESS_AUTH_WPA2PSK;
+  config.network.encrypt = WIRELESS_ENCRYPT_AES;
+  return config;
+}
+
+// The store's section of one network, saved at some time or other.
+std::string SectionOf(int number) {
+  const WIRELESS_NETWORK_CONFIG config = NetworkOf(number);
+  char szBssid[18];
+  MEROWirelessBssidStringGet(config.network.bssid, szBssid, sizeof szBssid);
+  const int64_t time = 1'600'000'000 + int64_t{number} * 7919 % 100'000'000;
+  char szSection[1024];
+  const int size = std::snprintf(szSection, sizeof szSection,
+                                 "[%s]\n\tKEY=%s\n\tIPADDR=%s\n\tNETMASK=%s\n\tGATEWAY=%s\n\tESSID=%s\n\tBSSID=%s\n"
+                                 "\tMODE=MANAGED\n\tACCESS_TIME=%lld\n\tAUTH=WPA2PSK\n\tENCRYPT=AES\n",
+                                 szBssid, config.szKey, config.szIp, config.szMask, config.szGateway,
+                                 config.network.szEssid, szBssid, static_cast<long long>(time));
+  return {szSection, static_cast<size_t>(size)};
+}
+
+// Makes a store of so many networks, and lets its times settle as those of any store have that was not just written.
+void MakeStore(int64_t networks) {
+  std::ofstream store(kKnownNetworksPath, std::ios::trunc);
+  for (int i = 0; i < networks; ++i) store << SectionOf(i);
+  store.close();
+  Require(store.good(), "make a store");
+  const auto age = [] { return fs::file_time_type::clock::now() - fs::last_write_time(kKnownNetworksPath); };
+  while (age() < std::chrono::milliseconds(100)) std::this_thread::sleep_for(std::chrono::milliseconds(5));
+}
+
+int64_t CountAndFree(WIRELESS_LIST& head) {
+  int64_t count = 0;
+  for (; head.q_forw != &head; ++count) {
+    WIRELESS_LIST* node = head.q_forw;
+    ::remque(node);
+    std::free(reinterpret_cast<char*>(node) - offsetof(WIRELESS_NETWORK_CONFIG, list));
+  }
+  return count;
+}
+
+void ReportPerNetwork(benchmark::State& state) {
+  using Counter = benchmark::Counter;
+  state.counters["per_network"] =
+      Counter(static_cast<double>(state.range(0)), Counter::kIsIterationInvariantRate | Counter::kInvert);
+  state.SetComplexityN(state.range(0));
+}
+
+void EnumerateByLastSave(benchmark::State& state) {
+  MakeStore(state.range(0));
+  for (auto _ : state) {
+    WIRELESS_LIST head;
+    Require(MEROWirelessConfEnumByAtime(&head) == 0 && CountAndFree(head) == state.range(0), "enumerate");
+  }
+  ReportPerNetwork(state);
+}
+BENCHMARK(EnumerateByLastSave)->RangeMultiplier(10)->Range(10, 10'000)->Complexity(benchmark::oN);
+
+#ifdef WITH_GLIB
+void LoadAndSortAsKeyFile(benchmark::State& state) {
+  MakeStore(state.range(0));
+  for (auto _ : state) {
+    Require(SortedGroupsOfKeyFile(kKnownNetworksPath) == static_cast<size_t>(state.range(0)), "load a key file");
+  }
+  ReportPerNetwork(state);
+}
+BENCHMARK(LoadAndSortAsKeyFile)->RangeMultiplier(10)->Range(10, 10'000)->Complexity(benchmark::oN);
+#endif
+
+constexpr int kStored = 1000;
+
+void SaveOneOf1000(benchmark::State& state) {
+  MakeStore(kStored);
+  int number = 0;
+  for (auto _ : state) {
+    const WIRELESS_NETWORK_CONFIG config = NetworkOf(number++ % kStored);
+    Require(MEROWirelessConfSet(&config) == 0, "save");
+  }
+}
+BENCHMARK(SaveOneOf1000)->UseRealTime();
+
+// Puts a file of the store's size in the store's place, as little as can be done for one of the two to be there whole
+// after a crash.
+void WriteFsyncRename(benchmark::State& state, bool flushDirectory) {
+  MakeStore(kStored);
+  std::ifstream store(kKnownNetworksPath, std::ios::binary);
+  const std::string content(std::istreambuf_iterator<char>(store), {});
+  const fs::path directory = fs::path(kKnownNetworksPath).parent_path();
+  const std::string beside = directory / "beside";
+  for (auto _ : state) {
+    const int file = ::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
+    Require(::write(file, content.data(), content.size()) == static_cast<ssize_t>(content.size()), "write");
+    Require(::fsync(file) == 0 && ::close(file) == 0, "flush");
+    Require(::rename(beside.c_str(), kKnownNetworksPath) == 0, "rename");
+    if (!flushDirectory) continue;
+    const int in = ::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    Require(::fsync(in) == 0 && ::close(in) == 0, "flush the directory");
+  }
+}
+BENCHMARK_CAPTURE(WriteFsyncRename, one_or_the_other, false)->UseRealTime();
+BENCHMARK_CAPTURE(WriteFsyncRename, the_new_one, true)->UseRealTime();
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  benchmark::Initialize(&argc, argv);
+  if (benchmark::ReportUnrecognizedArguments(argc, argv)) return EXIT_FAILURE;
+
+  // A relative path, which leads there also where the private machine has its own /tmp or /var.
+  char szStore[] = "store-XXXXXX";
+  Require(::mkdtemp(szStore) != nullptr, "make a directory for the store");
+  EnterPrivateMachine();
+  Require(::mount(szStore, "/usr/mero/etc", nullptr, MS_BIND, nullptr) == 0, "mount the store");
+  benchmark::RunSpecifiedBenchmarks();
+  Require(::umount("/usr/mero/etc") == 0, "unmount the store");
+  fs::remove_all(szStore);
+  return EXIT_SUCCESS;
+}
