@@ -22,7 +22,8 @@ bool Lists(const std::vector<SystemCall>& calls, const std::string& name) {
 
 class ASaveWithAFailure : public PlatformTest {
  protected:
-  // Lets each system call of each save that works on files fail, and calls `look(saving, before, after, outcome)`.
+  // Lets each system call on files of each save fail, and calls `look(before, after, outcome)` with the store before
+  // the save and the one that the save is to make of it.
   template <class Look>
   static void FailEverywhere(int error, Look look) {
     std::set<std::string> failed;

@@ -17,10 +17,9 @@ struct SystemCall {
 enum class Interference {
   kNone,
   kKill,       // the process is killed
-  kTearWrite,  // half of what a write was to write is written, then the process is killed; other calls are as with
-               // kKill
+  kTearWrite,  // as kKill, but of a write one half is done first
   kFail,       // the call fails, without effect
-  kShorten,    // half of what a write was to write is written; other calls are let through
+  kShorten,    // of a write only one half is done; other calls are let through
 };
 
 struct Plan {
