@@ -18,7 +18,7 @@ enum class Interference {
   kNone,
   kKill,       // the process is killed
   kTearWrite,  // as kKill, but of a write one half is done first
-  kFail,       // the call fails, without effect
+  kFail,       // the call fails, without effect; calls for memory and the like are let through
   kShorten,    // of a write only one half is done; other calls are let through
 };
 
