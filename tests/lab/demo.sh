@@ -144,4 +144,14 @@ show_file nas "$CONFIGURATION"
 doing 'listing them by last save: MEROWirelessConfEnumByAtime' on nas mero-call enum-by-time
 show_known_networks
 
+heading 'Switched on next to a network that it knows'
+doing "'Café du coin' gives out addresses" serve cafe 192.168.20
+doing 'joining the last saved network in range: MEROWirelessAutoConnect' on nas mero-call autoconnect
+remark "its address: $(ipv4_of nas)"
+doing 'adding the default route: MEROWirelessDefaultGatewaySet' on nas mero-call gateway 192.168.20.1
+remark "$(ip -n nas route show default)"
+doing 'asking the gateway for an answer: ping' expect_reachable nas 192.168.20.1
+on nas mero-call status
+remark "MEROWirelessConnStatusGet: ${OUTPUT##*status=}"
+
 printf '\nThat took %d seconds.\n' "$(seconds_passed)"
