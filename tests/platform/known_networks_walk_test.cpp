@@ -1,6 +1,7 @@
 // Reading the known networks one after another, from the first to the last, while others may write to the file.
 #include <fcntl.h>
 #include <sys/inotify.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -9,6 +10,7 @@
 #include <ctime>
 #include <filesystem>
 #include <thread>
+#include <utility>
 
 #include "common/known_networks_file.h"
 #include "tests/platform/containers.h"
@@ -62,6 +64,11 @@ class OpenCounter {
 
 class Walk : public PlatformTest {
  protected:
+  void SetUp() override {
+    PlatformTest::SetUp();
+    std::filesystem::remove_all(kKnownNetworksPath);
+  }
+
   static std::string EssidOf(int i) {
     WIRELESS_NETWORK_CONFIG config = {};
     return MEROWirelessConfGet(NameOf(i).c_str(), &config) == 0 ? config.network.szEssid : "(none)";
@@ -147,6 +154,29 @@ TEST_F(Walk, SeesAnEditOfTheFileByAnotherProcess) {
   EXPECT_EQ(EssidOf(3), "old");
 }
 
+// Two files may well have been written in one tick, and be equal in everything but what they hold.
+TEST_F(Walk, SeesThatALinkWasTurnedToAnotherFile) {
+  const auto changed = [](const char* szPath) {
+    struct stat info = {};
+    EXPECT_EQ(::stat(szPath, &info), 0);
+    return std::pair(info.st_ctim.tv_sec, info.st_ctim.tv_nsec);
+  };
+  constexpr char kOld[] = "/tmp/platform/old";
+  constexpr char kNew[] = "/tmp/platform/new";
+  do {
+    std::filesystem::remove(kOld);
+    std::filesystem::remove(kNew);
+    WriteFile(kOld, Networks(4, "old"));
+    WriteFile(kNew, Networks(4, "new"));
+  } while (changed(kOld) != changed(kNew));
+  std::filesystem::create_symlink(kOld, kKnownNetworksPath);
+  LetTheFileSettle();
+  WalkOver(2);
+  std::filesystem::remove(kKnownNetworksPath);
+  std::filesystem::create_symlink(kNew, kKnownNetworksPath);
+  EXPECT_EQ(EssidOf(2), "new");
+}
+
 // File times advance in ticks, so that of two edits within one the second may not show in them.
 TEST_F(Walk, SeesAnEditThatComesRightBehindAnother) {
   const auto essid = static_cast<off_t>(Networks(1).size() + TextOf(1, "").find("ESSID=") + 6);
@@ -168,6 +198,13 @@ TEST_F(Walk, SeesThatTheFileWasRemovedOrEmptied) {
   WalkOver(2);
   WriteFile(kKnownNetworksPath, "");
   EXPECT_EQ(EssidOf(2), "(none)");
+}
+
+TEST_F(Walk, FindsASectionWhateverItsCaseAndTheFirstOfItsName) {
+  WriteFile(kKnownNetworksPath,
+            TextOf(0, "old") + "[NETWORK 1]\n\tESSID=old\n" + TextOf(1, "second") + TextOf(2, "old"));
+  LetTheFileSettle();
+  WalkOver(3);
 }
 
 TEST_F(Walk, FindsNetworksInAnyOrderAndNoneThatIsNotThere) {

@@ -32,7 +32,8 @@
 #include "memory.h"
 #include "platform.h"
 
-// Every faked function, where it is from, and the number of its parameters. Only syslog() and time() are apart.
+// Every faked function, where it is from, and the number of its parameters. Two are apart: time() has NowIs() below,
+// and what goes to syslog() is recorded and goes no further.
 #define MERO_FAKES(FAKE)                              \
   FAKE(kill, kLibc, 2)                                \
   FAKE(pclose, kLibc, 1)                              \

@@ -14,4 +14,9 @@ inline std::vector<std::string> WithoutLines(std::vector<std::string> texts) {
   return texts;
 }
 
+// The last of the texts; an empty one when there is none.
+inline std::string Last(const std::vector<std::string>& texts) {
+  return texts.empty() ? "" : texts.back();
+}
+
 #endif  // MERO_TESTS_UNIT_REPORTS_H

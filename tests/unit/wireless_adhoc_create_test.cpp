@@ -210,8 +210,8 @@ TEST_F(AdhocCell, FailsWhenTheKeyCannotBeSet) {
     fake::system.Returns(0, -1);
     SetKey(szKey);
     EXPECT_EQ(Create(), -1);
-    EXPECT_EQ(Steps().back(), ReportOf("Failed to execute '/sbin/iwconfig wlan0 key open " +
-                                       std::string(*szKey == 'a' ? "s:" : "") + szKey + " > /dev/null 2>&1'"));
+    EXPECT_EQ(Last(Steps()), ReportOf("Failed to execute '/sbin/iwconfig wlan0 key open " +
+                                      std::string(*szKey == 'a' ? "s:" : "") + szKey + " > /dev/null 2>&1'"));
     EXPECT_EQ(fake::PLIBNetIfUp.calls(), 0);
   }
 }
@@ -316,7 +316,7 @@ TEST_F(AdhocCell, IsNotCreatedWithAPartOfItsKey) {
   EXPECT_EQ(fake::system.calls(), 1);  // for the name
   std::string command = "/sbin/iwconfig wlan0 key open '";
   while (command.size() < 127) command += "'\\''";
-  EXPECT_EQ(Steps().back(), ReportOf("Failed to execute '" + command.substr(0, 127) + "'"));
+  EXPECT_EQ(Last(Steps()), ReportOf("Failed to execute '" + command.substr(0, 127) + "'"));
 }
 
 // A command has up to 127 bytes.

@@ -36,7 +36,7 @@ TEST_F(AutoConnectOrder, FindsANetworkByItsAddressAndNotByItsName) {
   EXPECT_EQ(Connect(), -1);
   Find(InRange("Home", 2) + InRange("Renamed", 1));
   EXPECT_EQ(Connect(), 0);
-  EXPECT_EQ(fake::EffectsOf({"join"}).back(), JoinOf("Renamed"));
+  EXPECT_EQ(Last(fake::EffectsOf({"join"})), JoinOf("Renamed"));
 }
 
 TEST_F(AutoConnectOrder, JoinsANetworkInRangeAsItIsNowAndNotAsItWasSaved) {

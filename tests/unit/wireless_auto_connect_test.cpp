@@ -169,12 +169,12 @@ TEST_F(AutoConnect, EndsConnectedAndAddressedOrDisconnectedWheneverMemoryRunsOut
       [] { return MEROWirelessAutoConnect(); },
       [&](int n, int result) {
         EXPECT_EQ(memory::Held(), 0u) << n;
-        EXPECT_EQ(fake::Effects().back(), result == 0 ? kAddresses : kDisconnects) << n;
+        EXPECT_EQ(Last(fake::Effects()), result == 0 ? kAddresses : kDisconnects) << n;
         if (result == 0) {
           EXPECT_EQ(addressed_, "10.0.0.2/255.0.0.2") << n;
         } else {
           EXPECT_EQ(result, -1) << n;
-          EXPECT_EQ(WithoutLines(fake::Messages()).back(), "wireless_auto_connect:# Failed to connect any access point")
+          EXPECT_EQ(Last(WithoutLines(fake::Messages())), "wireless_auto_connect:# Failed to connect any access point")
               << n;
         }
         failures += result == 0 ? 0 : 1;

@@ -48,7 +48,7 @@ TEST_F(DefaultGateway, IsRejectedWhenNullOrEmptyOnceTheInterfaceIsAskedFor) {
 TEST_F(DefaultGateway, IsNotCheckedForBeingAnAddress) {
   for (const char* szGateway : {"x", "999.0.0.1", "gateway.example", "fe80::1", "0"}) {
     EXPECT_EQ(MEROWirelessDefaultGatewaySet(szGateway), 0);
-    EXPECT_EQ(fake::Effects().back(), "system(" + CommandFor(szGateway, "wlan0") + ")");
+    EXPECT_EQ(Last(fake::Effects()), "system(" + CommandFor(szGateway, "wlan0") + ")");
   }
 }
 
@@ -103,7 +103,7 @@ TEST_F(DefaultGateway, IsSetWholeOrNotAtAll) {
   const size_t room = 1023 - CommandFor("", "wlan0").size();
   const std::string longest(room, '1');
   EXPECT_EQ(MEROWirelessDefaultGatewaySet(longest.c_str()), 0);
-  EXPECT_EQ(fake::Effects().back(), "system(" + CommandFor(longest, "wlan0") + ")");
+  EXPECT_EQ(Last(fake::Effects()), "system(" + CommandFor(longest, "wlan0") + ")");
 
   for (const std::string& text : {longest + "1", std::string(5000, '1'), std::string(room / 4, '\'')}) {
     fake::Begin();

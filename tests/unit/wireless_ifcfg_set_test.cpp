@@ -120,7 +120,7 @@ TEST_F(Addressing, FailsWhenTheInterfaceCannotBeSet) {
       fake::MERONetSetCard1.Returns(result);
       std::strcpy(config_.szIp, szIp);
       EXPECT_EQ(MEROWirelessIfconfigSet("wlan0", config_), -1);
-      EXPECT_EQ(Steps().back(), ReportOf("Failed to set network interface"));
+      EXPECT_EQ(Last(Steps()), ReportOf("Failed to set network interface"));
       EXPECT_EQ(fake::Messages().size(), 1u);
     }
   }

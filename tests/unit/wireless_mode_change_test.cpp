@@ -69,7 +69,7 @@ TEST_F(ModeChange, DependsOnWhatTheScriptSaysWhenItHasFinished) {
 TEST_F(ModeChange, FailsWithoutTheScript) {
   std::filesystem::remove(kScript);
   EXPECT_EQ(MEROWirelessModeChange(WIRELESS_CLIENT_MODE), FALSE);
-  EXPECT_EQ(WithoutLines(fake::Messages()).back(), "wireless_mode_change:# Failed to change to wireless client mode.");
+  EXPECT_EQ(Last(WithoutLines(fake::Messages())), "wireless_mode_change:# Failed to change to wireless client mode.");
 }
 
 }  // namespace

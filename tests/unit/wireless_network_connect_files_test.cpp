@@ -163,7 +163,7 @@ TEST_F(AfterJoining, TheResolverIsSavedWhenThereIsOne) {
   EXPECT_THAT(fake::EffectsOf({"system"}), ElementsAre(RunOf(kStartsSupplicant)));
   WriteText(kResolver, "nameserver 10.0.0.1\n");
   EXPECT_EQ(Join(), 0);
-  EXPECT_EQ(fake::EffectsOf({"system"}).back(), RunOf(kSavesResolver));
+  EXPECT_EQ(Last(fake::EffectsOf({"system"})), RunOf(kSavesResolver));
 }
 
 TEST_F(AfterJoining, AResolverThatCannotBeSavedIsReportedAndNoFailureOfTheConnection) {
@@ -182,7 +182,7 @@ TEST_F(AfterJoining, NothingIsDoneForANetworkThatWasNotJoined) {
   fake::PipesGive({""});
   EXPECT_EQ(Join(), -1);
   EXPECT_EQ(fake::MEROMediaService.calls(), 0);
-  EXPECT_EQ(fake::EffectsOf({"system"}).back(), RunOf(kEndsSupplicant));
+  EXPECT_EQ(Last(fake::EffectsOf({"system"})), RunOf(kEndsSupplicant));
 }
 
 }  // namespace

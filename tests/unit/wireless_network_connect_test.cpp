@@ -161,7 +161,7 @@ TEST_F(Joining, IsSilentlyLeftOutWhileTheRadioIsBlocked) {
       EXPECT_THAT(fake::EffectsOf({"syslog", "system", "popen", "sleep", "PLIBCFileTouch", "PLIBNetIfDown",
                                    "MEROWirelessOpmodeSet", "PLIBCFileCheckKeyValue"}),
                   IsEmpty());
-      EXPECT_EQ(Steps().back(), kEnds.front());
+      EXPECT_EQ(Last(Steps()), kEnds.front());
       EXPECT_FALSE(Exists(kMarker));
       EXPECT_FALSE(Exists(kSupplicantConfig));
       EXPECT_FALSE(Exists(kRecord));
@@ -292,7 +292,7 @@ TEST_F(Joining, EndsAsItIsSaidToWheneverMemoryRunsOut) {
   memory::FailEach(join, [&](int n, int result) {
     EXPECT_EQ(memory::Held(), 0u) << n;
     EXPECT_FALSE(Exists(kMarker)) << n;
-    EXPECT_EQ(Steps().back(), kEnds.front()) << n;
+    EXPECT_EQ(Last(Steps()), kEnds.front()) << n;
     if (result == 0) {
       EXPECT_THAT(ReadText(kSupplicantConfig), testing::EndsWith("\tpsk=\"correct horse\"\n}\n")) << n;
       EXPECT_EQ(ReadText(kRecord), "Home Net\n7\n5\n8\n00:11:22:AA:BB:CC\n") << n;

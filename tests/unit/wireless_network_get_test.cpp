@@ -27,7 +27,7 @@ class NetworkInRange : public UnitTest {
     fake::PipesGive({kListing});
   }
 
-  // Looks one up; a negative channel is left where none was found.
+  // Looks one up into a record whose every byte is set.
   int Find(const char* szValue, WIRELESS_FILTER filter) {
     std::memset(&network_, 0xff, sizeof network_);
     const int result = memory::Run(0, [&] { return MEROWirelessNetworkGet(szValue, filter, &network_); });

@@ -194,7 +194,7 @@ TEST_F(ListingRow, IsReportedAndLeftOutWithoutAllInformation) {
 }
 
 TEST_F(ListingRow, HasNoInformationWhenItEndsBeforeTheInformationsColumn) {
-  for (const size_t size : {32u, 33u, 35u, 36u, 37u}) {
+  for (const size_t size : {32u, 33u, 35u, 36u, 37u, 38u}) {
     const std::string row = ("6    00:11:22:33:44:55 1 a WEP " + std::string(37, 'x')).substr(0, size - 1) + "\n";
     Read(row + RowOf("after"));
     EXPECT_THAT(Complaints(), ElementsAre(InfoComplaint(row))) << size;

@@ -154,63 +154,62 @@ TEST_F(Scan, DoesNotMindHowTheFreshScanEnds) {
   }
 }
 
-// The course of a scan by the number of networks in each reading; a negative number is a reading that fails.
+// What is said of a reading.
+struct Outcome {
+  const char* szLine;
+  const char* szText;
+};
+constexpr Outcome kFailed = {"162", "failed."};
+constexpr Outcome kSuccess = {"164", "success."};
+constexpr Outcome kNothing = {"167", "no scan result."};
+constexpr Outcome kUnstable = {"169", "result is un-stable."};
+
+// How many networks each reading of a scan has, negative for one that cannot be taken, and what is said of it.
 struct Course {
   std::vector<int> readings;
-  std::vector<std::string> messages;
-  int result;
-  size_t nListed;
+  std::vector<Outcome> outcomes;
 };
-
-const std::string kFailed = "162 Scan #: failed.";
-const std::string kSuccess = "164 Scan #: success.";
-const std::string kNothing = "167 Scan #: no scan result.";
-const std::string kUnstable = "169 Scan #: result is un-stable.";
-const std::string kFailedAtLast = "204 Failed to get network scanning result";
 
 const Course kCourses[] = {
-    {{3, 3}, {kUnstable, kSuccess}, 0, 3},
-    {{1, 2, 2}, {kUnstable, kUnstable, kSuccess}, 0, 2},
-    {{0, 3, 3}, {kNothing, kUnstable, kSuccess}, 0, 3},
-    {{3, 0, 3, 3}, {kUnstable, kNothing, kUnstable, kSuccess}, 0, 3},
-    {{1, 2, 3, 4, 4}, {kUnstable, kUnstable, kUnstable, kUnstable, kSuccess}, 0, 4},
-    {{2, 3, 4, 5, 6}, {kUnstable, kUnstable, kUnstable, kUnstable, kUnstable}, 0, 6},
-    {{3, 2, 3, 2, 3}, {kUnstable, kUnstable, kUnstable, kUnstable, kUnstable}, 0, 3},
-    {{0, 0, 0, 0, 0}, {kNothing, kNothing, kNothing, kNothing, kNothing}, 0, 0},
-    {{1, 2, 3, 4, 0}, {kUnstable, kUnstable, kUnstable, kUnstable, kNothing}, 0, 0},
-    {{-1, 3, 3}, {kFailed, kUnstable, kSuccess}, 0, 3},
-    {{3, -1, 3, 3}, {kUnstable, kFailed, kUnstable, kSuccess}, 0, 3},
-    {{-1, -1, -1, -1, 2}, {kFailed, kFailed, kFailed, kFailed, kUnstable}, 0, 2},
-    {{-1, -1, -1, -1, 0}, {kFailed, kFailed, kFailed, kFailed, kNothing}, 0, 0},
-    {{-1, -1, -1, -1, -1}, {kFailed, kFailed, kFailed, kFailed, kFailed, kFailedAtLast}, -1, 0},
-    {{1, 2, 3, 4, -1}, {kUnstable, kUnstable, kUnstable, kUnstable, kFailed, kFailedAtLast}, -1, 0},
+    {{3, 3}, {kUnstable, kSuccess}},
+    {{1, 2, 2}, {kUnstable, kUnstable, kSuccess}},
+    {{0, 3, 3}, {kNothing, kUnstable, kSuccess}},
+    {{3, 0, 3, 3}, {kUnstable, kNothing, kUnstable, kSuccess}},
+    {{1, 2, 3, 4, 4}, {kUnstable, kUnstable, kUnstable, kUnstable, kSuccess}},
+    {{2, 3, 4, 5, 6}, {kUnstable, kUnstable, kUnstable, kUnstable, kUnstable}},
+    {{3, 2, 3, 2, 3}, {kUnstable, kUnstable, kUnstable, kUnstable, kUnstable}},
+    {{0, 0, 0, 0, 0}, {kNothing, kNothing, kNothing, kNothing, kNothing}},
+    {{1, 2, 3, 4, 0}, {kUnstable, kUnstable, kUnstable, kUnstable, kNothing}},
+    {{-1, 3, 3}, {kFailed, kUnstable, kSuccess}},
+    {{3, -1, 3, 3}, {kUnstable, kFailed, kUnstable, kSuccess}},
+    {{-1, -1, -1, -1, 2}, {kFailed, kFailed, kFailed, kFailed, kUnstable}},
+    {{-1, -1, -1, -1, 0}, {kFailed, kFailed, kFailed, kFailed, kNothing}},
+    {{-1, -1, -1, -1, -1}, {kFailed, kFailed, kFailed, kFailed, kFailed}},
+    {{1, 2, 3, 4, -1}, {kUnstable, kUnstable, kUnstable, kUnstable, kFailed}},
 };
 
-constexpr char kNoPipe[] = "83 Failed to popen '/sbin/iwlist wlan0 scanning mero', errno=Too many open files";
-
 TEST_F(Scan, TakesUpToFiveReadingsAndKeepsTheLast) {
-  for (const Course& course : kCourses) {
-    BeginWithAdapter();
+  const std::string notOpened = "83 Failed to popen '/sbin/iwlist wlan0 scanning mero', errno=Too many open files";
+  for (const auto& [readings, outcomes] : kCourses) {
     std::vector<fake::Output> outputs;
     std::vector<std::string> expected;
-    for (size_t i = 0; i < course.messages.size(); ++i) {
-      const bool opens = i >= course.readings.size() || course.readings[i] >= 0;
-      if (i < course.readings.size()) {
-        outputs.push_back(opens ? fake::Output(ListingOf(course.readings[i])) : fake::kNoPipe);
-        expected.push_back(kListsLast);
-        expected.push_back(opens ? kClosesPipe : ReportOf(kNoPipe));
-      }
-      std::string message = course.messages[i];
-      const size_t at = message.find('#');
-      if (at != std::string::npos) message[at] = static_cast<char>('0' + i);
-      expected.push_back(ReportOf(message));
+    for (size_t i = 0; i < readings.size(); ++i) {
+      const bool opens = readings[i] >= 0;
+      outputs.push_back(opens ? fake::Output(ListingOf(readings[i])) : fake::kNoPipe);
+      expected.push_back(kListsLast);
+      expected.push_back(opens ? kClosesPipe : ReportOf(notOpened));
+      expected.push_back(ReportOf(outcomes[i].szLine + (" Scan " + std::to_string(i)) + ": " + outcomes[i].szText));
     }
-    fake::PipesGive(outputs);
+    const bool fails = readings.back() < 0;
+    if (fails) expected.push_back(ReportOf("204 Failed to get network scanning result"));
+    const size_t listed = fails ? 0 : static_cast<size_t>(readings.back());
 
-    EXPECT_EQ(Run(), course.result) << testing::PrintToString(course.readings);
-    EXPECT_THAT(Steps(), ElementsAreArray(After(expected))) << testing::PrintToString(course.readings);
-    EXPECT_EQ(ring_.Records().size(), course.nListed) << testing::PrintToString(course.readings);
-    EXPECT_EQ(memory::Held(), course.nListed) << "records of earlier readings are left";
+    BeginWithAdapter();
+    fake::PipesGive(outputs);
+    EXPECT_EQ(Run(), fails ? -1 : 0) << testing::PrintToString(readings);
+    EXPECT_THAT(Steps(), ElementsAreArray(After(expected))) << testing::PrintToString(readings);
+    EXPECT_EQ(ring_.Records().size(), listed) << testing::PrintToString(readings);
+    EXPECT_EQ(memory::Held(), listed) << "records of earlier readings are left";
     ring_.Clear();
   }
 }
