@@ -44,7 +44,7 @@ class WithoutMemory : public PlatformTest {
   // Runs an operation with each of its allocations failing. It must fail with `failure` and its one report, leave no
   // memory in use and the settings as they were. Ends when it makes no more allocations.
   template <class Operation>
-  static void ExpectFailure(int failure, Operation operation) {
+  static void ExpectEachToFail(int failure, Operation operation) {
     const std::string before = ReadFile(kSettings);
     int n = 1;
     for (;; ++n) {
@@ -63,12 +63,12 @@ class WithoutMemory : public PlatformTest {
 };
 
 TEST_F(WithoutMemory, NoHashAndNoListIsMade) {
-  ExpectFailure(-1, [] {
+  ExpectEachToFail(-1, [] {
     PPLIBSZHASH hash = PLIBCSzHashAlloc(1024);
     PLIBCSzHashFree(hash);
     return hash != nullptr ? 0 : -1;
   });
-  ExpectFailure(-1, [] {
+  ExpectEachToFail(-1, [] {
     PPLIBSZLIST list = PLIBCSzListAlloc(1024);
     PLIBCSzListFree(list);
     return list != nullptr ? 0 : -1;
@@ -81,10 +81,10 @@ TEST_F(WithoutMemory, AHashStaysAsItWas) {
     const MemoryOutcome outcome = RunWithoutMemory(n, [&] { return PLIBCSzHashSetValue(hash.address(), "NEW", "x"); });
     EXPECT_EQ(outcome.result, -1);
     EXPECT_EQ(outcome.blocksLeft, 0);
-    ::ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to set NEW: Cannot allocate memory");
+    ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to set NEW: Cannot allocate memory");
   }
   EXPECT_EQ(RunWithoutMemory(1, [&] { return PLIBCSzHashSetValue(hash.address(), "OLD", "x"); }).result, -1);
-  ::ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to set OLD: Cannot allocate memory");
+  ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to set OLD: Cannot allocate memory");
   EXPECT_EQ(hash["OLD"], "value");
   EXPECT_EQ(hash["NEW"], "(none)");
 }
@@ -104,10 +104,10 @@ TEST_F(WithoutMemory, AHashThatCannotGrowHoldsItsKeysAllTheSame) {
 
 TEST_F(WithoutMemory, SettingsAreNotReadAndOutputsStay) {
   char szValue[8] = "as was";
-  ExpectFailure(-1, [&] { return PLIBCFileGetKeyValue(kSettings, "NONE", szValue, sizeof szValue, 0); });
+  ExpectEachToFail(-1, [&] { return PLIBCFileGetKeyValue(kSettings, "NONE", szValue, sizeof szValue, 0); });
   EXPECT_STREQ(szValue, "as was");
-  ExpectFailure(0, [] { return PLIBCFileCheckKeyValue(kSettings, "NONE", "", 0); });
-  ExpectFailure(-1, [] {
+  ExpectEachToFail(0, [] { return PLIBCFileCheckKeyValue(kSettings, "NONE", "", 0); });
+  ExpectEachToFail(-1, [] {
     PPLIBSZHASH of = PLIBCSzHashAlloc(1024);
     const int result = of != nullptr ? PLIBCFileGetSection(kSettings, "7", &of) : -1;
     PLIBCSzHashFree(of);
@@ -125,9 +125,9 @@ TEST_F(WithoutMemory, AListOfSectionsIsAsItWas) {
     EXPECT_EQ(outcome.result, -1) << n;
     EXPECT_EQ(outcome.blocksLeft, 0) << n;
     EXPECT_THAT(list.items(), ElementsAre("first")) << n;
-    ::ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to read /tmp/platform/settings: Cannot allocate memory");
+    ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to read /tmp/platform/settings: Cannot allocate memory");
   }
-  ExpectFailure(-1, [] {
+  ExpectEachToFail(-1, [] {
     PPLIBSZLIST of = PLIBCSzListAlloc(1024);
     const int result = of != nullptr ? PLIBCFileEnumSection(kSettings, &of) : -1;
     PLIBCSzListFree(of);
@@ -139,21 +139,21 @@ TEST_F(WithoutMemory, SettingsStayAsTheyWere) {
   const std::string before = ReadFile(kSettings);
   const TextHash hash{{"A", "1"}, {"B", "2"}};
   // Each succeeds in the end, so that it is undone for the next.
-  ExpectFailure(-1, [] { return PLIBCFileSetKeyValue(kSettings, "KEY", "value", kFormat); });
+  ExpectEachToFail(-1, [] { return PLIBCFileSetKeyValue(kSettings, "KEY", "value", kFormat); });
   WriteFile(kSettings, before);
-  ExpectFailure(-1, [] { return PLIBCFileRemoveKey(kSettings, "KEY"); });
+  ExpectEachToFail(-1, [] { return PLIBCFileRemoveKey(kSettings, "KEY"); });
   WriteFile(kSettings, before);
-  ExpectFailure(-1, [&] { return PLIBCFileAddSection(kSettings, "new", hash.get(), kFormat); });
+  ExpectEachToFail(-1, [&] { return PLIBCFileAddSection(kSettings, "new", hash.get(), kFormat); });
   WriteFile(kSettings, before);
-  ExpectFailure(-1, [&] { return PLIBCFileSetSection(kSettings, "7", "new", hash.get(), kFormat); });
+  ExpectEachToFail(-1, [&] { return PLIBCFileSetSection(kSettings, "7", "new", hash.get(), kFormat); });
   WriteFile(kSettings, before);
-  ExpectFailure(-1, [] { return PLIBCFileSetSectionValue(kSettings, "7", "NEW", "value", kFormat); });
+  ExpectEachToFail(-1, [] { return PLIBCFileSetSectionValue(kSettings, "7", "NEW", "value", kFormat); });
 }
 
 TEST_F(WithoutMemory, AKnownNetworkIsNotRead) {
   WIRELESS_NETWORK_CONFIG config;
   const std::string section = SectionOf(2);
-  ExpectFailure(-1, [&] { return MEROWirelessConfGet(section.c_str(), &config); });
+  ExpectEachToFail(-1, [&] { return MEROWirelessConfGet(section.c_str(), &config); });
 }
 
 // The text of the file is kept between one network and the next, while there is memory for it.
@@ -183,11 +183,11 @@ TEST_F(WithoutMemory, NoProgramIsRun) {
   EXPECT_TRUE(outcome.failed);
   EXPECT_EQ(outcome.result, -1);
   EXPECT_EQ(outcome.blocksLeft, 0);
-  ::ExpectFailure(ERR_COMMAND_FAILED, "Failed to run /bin/true: Cannot allocate memory");
+  ExpectFailure(ERR_COMMAND_FAILED, "Failed to run /bin/true: Cannot allocate memory");
 }
 
 TEST_F(WithoutMemory, NoAdapterIsSeen) {
-  ExpectFailure(0, [] { return MEROWirelessAdapterNum(); });
+  ExpectEachToFail(0, [] { return MEROWirelessAdapterNum(); });
 }
 
 TEST_F(WithoutMemory, AKnownNetworkIsNotSavedAndTheStoreStays) {

@@ -90,7 +90,8 @@ class Walk : public PlatformTest {
 
   static bool Overwrite(off_t offset, std::string_view text) {
     const int fd = ::open(kKnownNetworksPath, O_WRONLY | O_CLOEXEC);
-    return ::pwrite(fd, text.data(), text.size(), offset) == static_cast<ssize_t>(text.size());
+    const ssize_t put = ::pwrite(fd, text.data(), text.size(), offset);
+    return ::close(fd) == 0 && put == static_cast<ssize_t>(text.size());
   }
 };
 
