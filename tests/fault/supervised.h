@@ -10,7 +10,7 @@
 
 struct SystemCall {
   int number = -1;
-  std::string name;  // by which the C library knows it; a number when no test is about it
+  std::string name;  // by which the C library knows it
 };
 
 // What happens in place of a system call.
@@ -18,13 +18,13 @@ enum class Interference {
   kNone,
   kKill,       // the process is killed
   kTearWrite,  // as kKill, but of a write one half is done first
-  kFail,       // the call fails, without effect; calls for memory and the like are let through
+  kFail,       // the call fails, without effect
   kShorten,    // of a write only one half is done; other calls are let through
 };
 
 struct Plan {
   Interference interference = Interference::kNone;
-  int call = 0;  // which of the operation's calls, from 1 on
+  int call = 0;  // which of the operation's calls on files, from 1 on
   int error = 0;
   std::string name;  // counts only calls of that name; empty for all
 };
