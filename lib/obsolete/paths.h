@@ -2,6 +2,8 @@
 #ifndef MERO_LIB_PATHS_H
 #define MERO_LIB_PATHS_H
 
+#include <cstdio>
+
 // The access-point settings, one section an adapter model.
 inline constexpr char kApSettingsPath[] = "/usr/mero/etc/wireless_ap.conf";
 
@@ -11,5 +13,31 @@ inline constexpr char kProductKey[] = "PRODUCT";
 
 // Exists while an access point is being set up.
 inline constexpr char kApMarkerPath[] = "/var/tmp/.wireless_ap_connecting";
+
+// The appliance's network start script: "start" or "restart", the wireless interface, the bridge.
+inline constexpr char kNetworkScriptPath[] = "/etc/rc.network";
+
+// What the access-point daemon of an interface, and that of its guest network, is configured by; and whether either is
+// switched on.
+inline constexpr char kHostapdHostFormat[] = "/etc/hostapd/hostapd-%s-host.conf";
+inline constexpr char kHostapdGuestFormat[] = "/etc/hostapd/hostapd-%s-guest.conf";
+inline constexpr char kHostapdGuestInfoFormat[] = "/etc/hostapd/hostapd-%s-guest.info";
+inline constexpr char kHostapdInfoFormat[] = "/etc/hostapd/hostapd-%s.info";
+
+// What the network start script knows of an interface or a bridge.
+inline constexpr char kInterfaceScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
+
+// The path that one of the formats above gives for an interface or a bridge.
+class InterfacePath {
+ public:
+  InterfacePath(const char* szFormat, const char* szIfName) {
+    std::snprintf(szPath_, sizeof szPath_, szFormat, szIfName);
+  }
+
+  const char* c_str() const { return szPath_; }
+
+ private:
+  char szPath_[4096];
+};
 
 #endif  // MERO_LIB_PATHS_H

@@ -26,3 +26,13 @@ ShellWord::ShellWord(std::string_view value) {
   if (!ordinary) put("'");
   *to = '\0';
 }
+
+ShellQuoted::ShellQuoted(std::string_view value) {
+  constexpr std::string_view kSpecial = "\"\\$`";
+  char* to = szText_;
+  for (const char c : Slice(value, 0, (sizeof szText_ - 1) / 2)) {
+    if (kSpecial.find(c) != std::string_view::npos) *to++ = '\\';
+    *to++ = c;
+  }
+  *to = '\0';
+}

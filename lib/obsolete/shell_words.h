@@ -22,6 +22,17 @@ class ShellWord {
   char szWord_[4 * 1024 + 3];
 };
 
+// A value inside a word that the command has in double quotes, escaped where the shell would not pass it on unchanged.
+class ShellQuoted {
+ public:
+  explicit ShellQuoted(std::string_view value);
+
+  const char* c_str() const { return szText_; }
+
+ private:
+  char szText_[2 * 1024 + 1];  // longer than any command when the value was
+};
+
 // A command of at most kSize - 1 bytes. One that is longer is cut in its text, for messages, and never run.
 template <size_t kSize>
 class Command {

@@ -1,0 +1,107 @@
+// Reads the access-point settings of one adapter model.
+#include <cstdlib>
+#include <cstring>
+
+#include "ap_settings.h"
+#include "common/log.h"
+#include "common/text.h"
+#include "holders.h"
+#include "paths.h"
+#include "platform.h"
+#include "wireless.h"
+
+namespace {
+
+int GetIntegerValue(const PPLIBSZHASH pHash, const char* key, int defValue) {
+  const char* szValue = PLIBCSzHashGetValue(pHash, key);
+  return szValue != nullptr ? std::atoi(szValue) : defValue;
+}
+
+const char* GetStringValue(const PPLIBSZHASH pHash, const char* key, const char* defValue) {
+  const char* szValue = PLIBCSzHashGetValue(pHash, key);
+  return szValue != nullptr ? szValue : defValue;
+}
+
+int GetSwitchValue(const PPLIBSZHASH pHash, const char* key, int defValue) {
+  const char* szValue = PLIBCSzHashGetValue(pHash, key);
+  if (szValue == nullptr) return defValue;
+  return std::strcmp(szValue, "yes") == 0 ? TRUE : FALSE;
+}
+
+// What holds when there is no section. A section that lacks keys has other defaults, those of the table: above all for
+// the guest network, which is bare here.
+void SetDefaultAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
+  *pConf = MERO_AP_CONF{};
+  pConf->txpower = 10;
+  pConf->blWifiUnblock = TRUE;
+  CopyText(pConf->szSecName, szSecName);
+  CopyText(pConf->wifiSchedConf.szWifiSched, kAlwaysOn);
+
+  MERO_HOSTAP_CONF& hostapConf = pConf->hostapConf;
+  CopyText(hostapConf.szSSID, "Corvanta");
+  CopyText(hostapConf.szBridge, "lbr0");
+  hostapConf.hwMode = AP_MODE_80211G;
+  hostapConf.ieee80211n = 1;
+  hostapConf.wirelessWidth = AP_FREQ_ALL;
+  hostapConf.maxStation = 256;
+  hostapConf.wmm = 1;
+}
+
+// Takes one setting of a key from the section into its field of a record.
+void Take(PPLIBSZHASH pshHash, const char* szKey, const Setting& setting, void* record) {
+  char* field = static_cast<char*>(record) + setting.offset;
+  const auto put = [field](int value) { std::memcpy(field, &value, sizeof value); };
+  switch (setting.kind) {
+    case SettingKind::kSwitch:
+      return put(GetSwitchValue(pshHash, szKey, setting.missing));
+    case SettingKind::kInteger:
+      return put(GetIntegerValue(pshHash, szKey, setting.missing));
+    case SettingKind::kText:
+      return CopyText(field, setting.size, GetStringValue(pshHash, szKey, setting.szMissing));
+    case SettingKind::kTextOnlyWritten:
+    case SettingKind::kMainSecrets:
+    case SettingKind::kGuestSecrets:
+      return;
+  }
+}
+
+// Reads what an encryption needs. One that is unknown needs nothing.
+BOOL getEncryptionConf(PPLIBSZHASH pshHash, MERO_AP_ENCRYPT encryption, PMERO_HOSTAP_ENCRYPT_INFO pEncryptInfo,
+                       BOOL blGuestNet) {
+  if (blGuestNet != FALSE && encryption == AP_ENCRYPT_WPA_EAP) {
+    return LOG("Guest Network does not have EAP encryption"), FALSE;
+  }
+  ForEachSecret(encryption, blGuestNet, [&](const char* szKey, const Setting& setting) {
+    Take(pshHash, szKey, setting, pEncryptInfo);
+    return true;
+  });
+  return TRUE;
+}
+
+void TakeAll(PPLIBSZHASH pshHash, PMERO_AP_CONF pConf) {
+  MERO_HOSTAP_CONF& main = pConf->hostapConf;
+  MERO_HOSTAP_GUEST_NET& guest = main.guestNet;
+  for (const Setting& setting : kApSettings) {
+    if (setting.kind == SettingKind::kMainSecrets) {
+      (void)getEncryptionConf(pshHash, main.encryption, &main.encryptInfo, FALSE);
+    } else if (setting.kind == SettingKind::kGuestSecrets) {
+      (void)getEncryptionConf(pshHash, guest.encryption, &guest.encryptInfo, TRUE);  // has reported; the rest is good
+    } else {
+      Take(pshHash, setting.szKey, setting, pConf);
+    }
+  }
+}
+
+}  // namespace
+
+int MEROWirelessGetAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
+  if (szSecName == nullptr || pConf == nullptr) return LOG("Bad parameters"), -1;
+  SetDefaultAPConfig(szSecName, pConf);
+  if (PLIBCFileExist(kApSettingsPath) == 0) return 0;
+
+  Hash section;
+  if (!section) return -1;
+  const int result = PLIBCFileGetSection(kApSettingsPath, szSecName, section.address());
+  if (result > 0) TakeAll(section.get(), pConf);
+  return result;
+}

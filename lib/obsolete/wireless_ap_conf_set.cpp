@@ -1,0 +1,138 @@
+// Saves the access-point settings.
+#include <cstdio>
+#include <cstring>
+#include <optional>
+
+#include "ap_settings.h"
+#include "common/log.h"
+#include "holders.h"
+#include "paths.h"
+#include "platform.h"
+#include "shell_words.h"
+#include "wireless.h"
+
+namespace {
+
+constexpr char kLineFormat[] = "\t%s=%s\n";
+constexpr char kEnableKey[] = "enable";
+
+char* ConvertIntegerToString(const int value, char* szValue, const size_t cbSize) {
+  std::snprintf(szValue, cbSize, "%d", value);
+  return szValue;
+}
+
+// Whether the file holds the section's header, by a search that knows no case, takes the name as a part of a regular
+// expression, and finds it anywhere in a line. 1 or 0; -1 after a report.
+int IsSectionExist(const char* szSecName) {
+  if (szSecName == nullptr) return LOG("Wrong Parameter."), -1;
+  const Command<1024> command("grep -i \"\\[%s\\]\" %s", ShellQuoted(szSecName).c_str(), kApSettingsPath);
+  const Pipe found(command);
+  if (!found) return LOG("Failed to execute command"), -1;
+  char szLine[1024] = {};
+  (void)std::fgets(szLine, sizeof szLine, found.get());  // nothing found leaves the line empty
+  return szLine[0] != '\0' ? 1 : 0;
+}
+
+const char* TextOfSwitch(int value) {
+  return value != FALSE ? "yes" : "no";
+}
+
+// Puts the setting of a key, from its field of a record, into the hash; false when memory ran out.
+bool Put(PPLIBSZHASH* ppshHash, const char* szKey, const Setting& setting, const void* record) {
+  const char* field = static_cast<const char*>(record) + setting.offset;
+  int value = 0;
+  char szInteger[1024];
+  const char* szValue = field;
+  switch (setting.kind) {
+    case SettingKind::kSwitch:
+      std::memcpy(&value, field, sizeof value);
+      szValue = TextOfSwitch(value);
+      break;
+    case SettingKind::kInteger:
+      std::memcpy(&value, field, sizeof value);
+      szValue = ConvertIntegerToString(value, szInteger, sizeof szInteger);
+      break;
+    case SettingKind::kText:
+    case SettingKind::kTextOnlyWritten:
+      break;
+    case SettingKind::kMainSecrets:
+    case SettingKind::kGuestSecrets:
+      return true;
+  }
+  if (PLIBCSzHashSetValue(ppshHash, szKey, szValue) >= 0) return true;
+  return LOG("Failed to alloc memory"), false;
+}
+
+BOOL setEncryptionConf(PPLIBSZHASH* ppshHash, const MERO_AP_ENCRYPT encryption,
+                       const PMERO_HOSTAP_ENCRYPT_INFO pEncryptInfo, BOOL blGuestNet) {
+  if (encryption < AP_ENCRYPT_OPEN || encryption >= AP_ENCRYPT_MAX) return LOG("Wrong encryption"), FALSE;
+  if (blGuestNet != FALSE && encryption == AP_ENCRYPT_WPA_EAP) {
+    return LOG("Guest Network does not have EAP encryption"), FALSE;
+  }
+  const bool put = ForEachSecret(encryption, blGuestNet, [&](const char* szKey, const Setting& setting) {
+    return Put(ppshHash, szKey, setting, pEncryptInfo);
+  });
+  return put ? TRUE : FALSE;
+}
+
+bool PutAll(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
+  MERO_HOSTAP_CONF& main = pConf->hostapConf;
+  MERO_HOSTAP_GUEST_NET& guest = main.guestNet;
+  for (const Setting& setting : kApSettings) {
+    bool done = false;
+    if (setting.kind == SettingKind::kMainSecrets) {
+      done = setEncryptionConf(ppshHash, main.encryption, &main.encryptInfo, FALSE) != FALSE;
+    } else if (setting.kind == SettingKind::kGuestSecrets) {
+      done = setEncryptionConf(ppshHash, guest.encryption, &guest.encryptInfo, TRUE) != FALSE;
+    } else {
+      done = Put(ppshHash, setting.szKey, setting, pConf);
+    }
+    if (!done) return false;
+  }
+  return true;
+}
+
+// Whether the section is there to be replaced; the file is made for it if need be. None after a failure.
+std::optional<bool> FindSection(const char* szSecName) {
+  if (PLIBCFileExist(kApSettingsPath) != 0) {
+    const int exists = IsSectionExist(szSecName);
+    return exists >= 0 ? std::optional<bool>(exists > 0) : std::nullopt;
+  }
+  if (PLIBCFileTouch(kApSettingsPath) < 0) return LOG("Failed to touch %s", kApSettingsPath), std::nullopt;
+  return false;
+}
+
+// All other settings stay, so that nothing is lost when the access point is switched off.
+BOOL SaveDisabled(const char* szSecName) {
+  if (PLIBCFileSetSectionValue(kApSettingsPath, szSecName, kEnableKey, TextOfSwitch(FALSE), kLineFormat) >= 0) {
+    return TRUE;
+  }
+  return LOG("Failed to set key[%s] of sec[%s] in file[%s].", kEnableKey, szSecName, kApSettingsPath), FALSE;
+}
+
+BOOL SaveSection(const char* szSecName, PPLIBSZHASH pshHash, bool exists) {
+  if (exists) {
+    if (PLIBCFileSetSection(kApSettingsPath, szSecName, nullptr, pshHash, kLineFormat) > 0) return TRUE;
+    return LOG("Failed to set section: %s from %s, errno=0x%X", szSecName, kApSettingsPath,
+               static_cast<unsigned>(PLIBCErrGet())),
+           FALSE;
+  }
+  if (PLIBCFileAddSection(kApSettingsPath, szSecName, pshHash, kLineFormat) > 0) return TRUE;
+  return LOG("Failed to add section: %s from %s, errno=0x%X", szSecName, kApSettingsPath,
+             static_cast<unsigned>(PLIBCErrGet())),
+         FALSE;
+}
+
+}  // namespace
+
+BOOL MEROWirelessSetAPConfig(const PMERO_AP_CONF pConf) {
+  if (pConf == nullptr) return LOG("Bad parameters"), FALSE;
+  Hash hash;
+  if (!hash) return LOG("Failed to alloc memory"), FALSE;
+
+  const std::optional<bool> exists = FindSection(pConf->szSecName);
+  if (!exists) return FALSE;
+  if (pConf->blEnable == FALSE) return SaveDisabled(pConf->szSecName);
+  if (!PutAll(hash.address(), pConf)) return FALSE;
+  return SaveSection(pConf->szSecName, hash.get(), *exists);
+}
