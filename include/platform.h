@@ -374,22 +374,29 @@ typedef struct BRIDGE_INFO {
 /**
  * Lists the interfaces that the kernel has in a bridge at this moment.
  *
- * @param ppslList  the address of the caller's list pointer; names are appended.
- * @return how many were appended; -1 when there is no such bridge.
+ * @param ppslList  the address of the caller's list pointer; names are appended, in order.
+ * @return how many were appended; -1 when there is no such bridge (ERR_NO_DEVICE) or memory ran out, with the list as
+ *         it was.
  */
 int PLIBNetBridgeSlaveEnum(const char* szBridge, PPLIBSZLIST* ppslList);
 
 /**
- * Reads a bridge's configuration from its network-script file.
+ * Reads a bridge's configuration from its network-script file, /etc/sysconfig/network-scripts/ifcfg-BRIDGE. A bridge is
+ * configured when the file says TYPE=Bridge.
  *
- * @return 0; -1 when the bridge is not configured.
+ * @return 0; -1, without a report, when the bridge is not configured (ERR_NO_DEVICE).
  */
 int MERONetGetBridgeConfig(const char* szBridge, PNETINFO pNetInfo, PBRIDGE_INFO pBridgeInfo);
 
 /**
- * Creates or rewrites a bridge's network-script file. The network start script makes the bridge itself.
+ * Creates or rewrites a bridge's network-script file; keys that it does not know stay. The network start script makes
+ * the bridge itself. What is written reads back the same, field by field.
  *
- * @return 0; -1 on failure.
+ * @param pNetInfo     names the bridge in szInterface. Empty addresses and a hardware address of zeros are none.
+ * @param pBridgeInfo  a bridge of either type, and its first member, which may be empty. Its szIfName is the same as
+ *                     szInterface; one of them may be empty.
+ * @return 0; -1 on failure. A record that is no bridge's, that names none, two, or itself as its first member, or with
+ *         a text that is not one plain word, is refused with ERR_BAD_PARAMETERS before anything is written.
  */
 int MERONetSetBridgeConfig(const NETINFO* pNetInfo, const BRIDGE_INFO* pBridgeInfo);
 
@@ -397,9 +404,9 @@ int MERONetSetBridgeConfig(const NETINFO* pNetInfo, const BRIDGE_INFO* pBridgeIn
 
 /** What a DHCP server gives out on one interface. */
 typedef struct MERO_DHCPD_CONF {
-  BOOL blEnable;
+  BOOL blEnable; /**< the server serves; on writing, the switch beside the record says so */
   int autoTime;
-  int leaseTime;         /**< seconds */
+  int leaseTime;         /**< seconds; 0 leaves it to the server */
   char szRangeStart[20]; /**< the first address given out */
   char szRangeEnd[20];   /**< the last */
   char szInterface[16];
@@ -413,17 +420,25 @@ typedef struct MERO_DHCPD_CONF {
 } MERO_DHCPD_CONF, *PMERO_DHCPD_CONF;
 
 /**
- * Reads the configuration that is kept for an interface and a tag.
+ * Reads the configuration that is kept for an interface and a tag: /etc/dhcpd/dhcpd-INTERFACE-TAG.conf, and beside it
+ * the .info file with the switch.
  *
- * @return 1 read; 0 when there is none or it cannot be read.
+ * @return 1 read; 0 when there is none (also for names that can have none), or when it cannot be read.
  */
 int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCPD_CONF pConf);
 
 /**
- * Writes the server's files. The network start script starts the server.
+ * Writes the server's files: the .conf, which dnsmasq reads, then the .info file. Their directory is made when it is
+ * missing. The network start script starts the server.
  *
+ * @param pConf   reads back the same, field by field; only blEnable is what the switch was. Neither szInterface nor
+ *                szTag is empty or holds a '/'.
  * @param enable  1: the server serves; 0: it does not, and all else is kept.
- * @return 1; 0 on failure.
+ * @return 1; 0 on failure. A text with a control character, '"', '\\' or '#', and any but the domain and the lease file
+ *         with a ',', is refused with ERR_BAD_PARAMETERS before anything is written.
+ *
+ * dnsmasq takes a range that has both its ends, and a mask before a lease time; no second name server without a first;
+ * and lines of up to 1,024 bytes.
  */
 int MERONetSetDhcpServerConfigFiles(const MERO_DHCPD_CONF* pConf, int enable);
 

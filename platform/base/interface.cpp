@@ -5,9 +5,15 @@
 #include <sys/ioctl.h>
 #include <sys/socket.h>
 
+#include <algorithm>
 #include <optional>
 
 #include "platform/base/bytes.h"
+
+bool IsInterfaceName(std::string_view name) {
+  if (name.empty() || name.size() >= IFNAMSIZ || name == "." || name == "..") return false;
+  return std::none_of(name.begin(), name.end(), [](char c) { return c == '/' || c == ':' || IsSpace(c); });
+}
 
 Result<Descriptor> OpenControl() {
   Descriptor control(::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0));

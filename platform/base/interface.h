@@ -4,9 +4,15 @@
 
 #include <net/if.h>
 
+#include <string_view>
+
 #include "common/text.h"
 #include "platform/base/descriptor.h"
 #include "platform/base/result.h"
+
+// Whether the kernel would take a text for an interface's name. One that it would not take stands for no interface, and
+// must not become part of a path.
+bool IsInterfaceName(std::string_view name);
 
 // A socket to pass ioctls through, or the reason why there is none.
 Result<Descriptor> OpenControl();

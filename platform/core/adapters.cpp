@@ -1,23 +1,17 @@
 // The wireless adapters that the kernel has.
-#include <dirent.h>
 #include <net/if.h>
 #include <unistd.h>
 
 #include <cstdio>
-#include <memory>
 
 #include "common/text.h"
+#include "platform/base/directory.h"
 #include "platform/base/error.h"
 
 namespace {
 
 constexpr char kInterfaces[] = "/sys/class/net";
 constexpr char kInterfaceWithoutAdapter[] = "wlan0";
-
-struct CloseDirectory {
-  void operator()(DIR* directory) const { ::closedir(directory); }
-};
-using Directory = std::unique_ptr<DIR, CloseDirectory>;
 
 bool HasEntry(const char* szIfName, const char* szEntry) {
   char szPath[sizeof kInterfaces + NAME_MAX + 16];

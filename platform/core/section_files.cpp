@@ -1,8 +1,8 @@
 // Section files.
 #include "common/text.h"
 #include "platform/base/error.h"
+#include "platform/base/file_edit.h"
 #include "platform/base/file_read.h"
-#include "platform/core/file_edit.h"
 #include "platform/core/section_text.h"
 #include "platform/core/text_hash.h"
 #include "platform/core/text_list.h"

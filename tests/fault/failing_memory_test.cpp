@@ -3,10 +3,12 @@
 
 #include <search.h>
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdlib>
 #include <filesystem>
 
+#include "common/text.h"
 #include "tests/fault/saving.h"
 #include "tests/platform/containers.h"
 #include "tests/platform/platform_test.h"
@@ -188,6 +190,38 @@ TEST_F(WithoutMemory, NoProgramIsRun) {
 
 TEST_F(WithoutMemory, NoAdapterIsSeen) {
   ExpectEachToFail(0, [] { return MEROWirelessAdapterNum(); });
+}
+
+TEST_F(WithoutMemory, AListOfABridgesMembersIsAsItWas) {
+  const auto shell = [](const char* szCommand) {
+    ASSERT_EQ(PLIBCExec("/bin/sh", "-c", szCommand, nullptr, nullptr), 0) << szCommand;
+  };
+  shell(
+      "export PATH=/usr/sbin:/usr/bin:/sbin:/bin; ip link add br7 type bridge && ip link add net1 type veth &&"
+      " ip link set master br7 net1");
+  ExpectEachToFail(-1, [] {
+    PPLIBSZLIST list = PLIBCSzListAlloc(0);
+    const int result = list != nullptr ? PLIBNetBridgeSlaveEnum("br7", &list) : -1;
+    EXPECT_TRUE(list == nullptr || list->nItem == std::max(result, 0));
+    PLIBCSzListFree(list);
+    return result;
+  });
+  shell("export PATH=/usr/sbin:/usr/bin:/sbin:/bin; ip link delete net1 && ip link delete br7");
+}
+
+TEST_F(WithoutMemory, TheFilesOfADhcpServerAreNeitherWrittenNorRead) {
+  MERO_DHCPD_CONF conf{};
+  CopyText(conf.szInterface, "lbr0");
+  CopyText(conf.szTag, "lbr0");
+  CopyText(conf.szRouter, "10.1.14.1");
+  ExpectEachToFail(0, [&] { return MERONetSetDhcpServerConfigFiles(&conf, 1); });
+  MERO_DHCPD_CONF read{};
+  ExpectEachToFail(0, [&] {
+    const int result = MERONetGetDhcpServerConf("lbr0", "lbr0", &read);
+    EXPECT_EQ(read.szRouter[0] != '\0', result != 0);
+    return result;
+  });
+  EXPECT_STREQ(read.szRouter, "10.1.14.1");
 }
 
 TEST_F(WithoutMemory, AKnownNetworkIsNotSavedAndTheStoreStays) {

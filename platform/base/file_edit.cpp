@@ -1,5 +1,5 @@
 // Changing a file.
-#include "platform/core/file_edit.h"
+#include "platform/base/file_edit.h"
 
 #include <fcntl.h>
 #include <sys/file.h>

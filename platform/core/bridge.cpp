@@ -1,0 +1,59 @@
+// The bridges that the kernel has.
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+
+#include "platform/base/directory.h"
+#include "platform/base/error.h"
+#include "platform/base/interface.h"
+#include "platform/core/text_list.h"
+
+namespace {
+
+constexpr char kMembersFormat[] = "/sys/class/net/%s/brif";
+
+// The directory with an entry for each member. ENODEV when the kernel has no bridge of that name.
+Result<Directory> OpenMembers(const char* szBridge) {
+  if (!IsInterfaceName(szBridge)) return Status::Failed(ENODEV);
+  char szPath[sizeof kMembersFormat + IFNAMSIZ];
+  std::snprintf(szPath, sizeof szPath, kMembersFormat, szBridge);
+  Directory directory(::opendir(szPath));
+  if (!directory) return Status::Failed(errno == ENOENT ? ENODEV : errno);
+  return directory;
+}
+
+Status AppendNames(DIR* directory, PLIBSZLIST& list) {
+  while (true) {
+    errno = 0;
+    const dirent* entry = ::readdir(directory);
+    if (entry == nullptr) return errno == 0 ? Status::Ok() : Status::Failed(errno);
+    if (entry->d_name[0] == '.') continue;
+    if (!AppendToList(list, entry->d_name)) return Status::Failed(ENOMEM);
+  }
+}
+
+Status AppendMembers(const char* szBridge, PLIBSZLIST& list) {
+  Result<Directory> directory = OpenMembers(szBridge);
+  if (!directory.ok()) return directory.status();
+
+  const int before = list.nItem;
+  if (Status status = AppendNames(directory->get(), list); !status.ok()) {
+    TruncateList(list, before);
+    return status;
+  }
+  std::sort(list.ppszItem + before, list.ppszItem + list.nItem,
+            [](const char* szA, const char* szB) { return ::strverscmp(szA, szB) < 0; });
+  return Status::Ok();
+}
+
+}  // namespace
+
+int PLIBNetBridgeSlaveEnum(const char* szBridge, PPLIBSZLIST* ppslList) {
+  if (szBridge == nullptr || ppslList == nullptr || *ppslList == nullptr) return REFUSE_NULL(), -1;
+  PLIBSZLIST& list = **ppslList;
+  const int before = list.nItem;
+  if (Status status = AppendMembers(szBridge, list); !status.ok()) {
+    return FAIL(status.error(), "list the members of", szBridge), -1;
+  }
+  return list.nItem - before;
+}
