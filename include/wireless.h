@@ -522,9 +522,10 @@ BOOL MEROWirelessApConfigSecNameGet(char* szSecName, size_t cbSize);
 /**
  * Saves the access-point settings. With `blEnable` FALSE only the switch itself is saved, and all else stays.
  *
- * @param pConf  the settings; `szSecName` names the section.
- * @return TRUE; FALSE when pConf is null, an encryption is none of MERO_AP_ENCRYPT or none for a guest network, memory
- *         ran out, or the file could not be written.
+ * @param pConf  the settings; `szSecName` names the section. No text may hold a line feed or end with a carriage
+ *               return, nor may the name begin or end with white space: the file could not carry it.
+ * @return TRUE; FALSE when pConf is null, a text cannot be saved, an encryption is none of MERO_AP_ENCRYPT or none for a
+ *         guest network, memory ran out, or the file could not be written.
  *
  * Reads and replaces /usr/mero/etc/wireless_ap.conf (created with mode 0600), all or nothing. Does not block on the
  * network.
@@ -545,8 +546,8 @@ int MEROWirelessCheckBlock(void);
  * taken down; nothing here starts either again.
  *
  * @param szIfName  the wireless interface.
- * @param pConf     the settings; must not be null.
- * @return TRUE; FALSE when szIfName is null or a file could not be written.
+ * @param pConf     the settings; must not be null. No name or secret that is written may hold a line feed.
+ * @return TRUE; FALSE when szIfName is null, a text cannot be written, or a file could not be.
  *
  * Writes /etc/hostapd/hostapd-IF-host.conf and, on a model with a built-in card, hostapd-IF-guest.conf and
  * hostapd-IF-guest.info. Does not block on the network.

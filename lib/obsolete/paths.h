@@ -24,6 +24,9 @@ inline constexpr char kHostapdGuestFormat[] = "/etc/hostapd/hostapd-%s-guest.con
 inline constexpr char kHostapdGuestInfoFormat[] = "/etc/hostapd/hostapd-%s-guest.info";
 inline constexpr char kHostapdInfoFormat[] = "/etc/hostapd/hostapd-%s.info";
 
+// Whether the DHCP server of a bridge is switched on.
+inline constexpr char kDhcpInfoFormat[] = "/etc/dhcpd/dhcpd-%1$s-%1$s.info";
+
 // What the network start script knows of an interface or a bridge.
 inline constexpr char kInterfaceScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
 

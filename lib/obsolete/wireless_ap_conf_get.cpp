@@ -31,13 +31,13 @@ int GetSwitchValue(const PPLIBSZHASH pHash, const char* key, int defValue) {
 // What holds when there is no section. A section that lacks keys has other defaults, those of the table: above all for
 // the guest network, which is bare here.
 void SetDefaultAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
-  *pConf = MERO_AP_CONF{};
-  pConf->txpower = 10;
-  pConf->blWifiUnblock = TRUE;
-  CopyText(pConf->szSecName, szSecName);
-  CopyText(pConf->wifiSchedConf.szWifiSched, kAlwaysOn);
+  MERO_AP_CONF conf{};
+  conf.txpower = 10;
+  conf.blWifiUnblock = TRUE;
+  CopyText(conf.szSecName, szSecName);
+  CopyText(conf.wifiSchedConf.szWifiSched, kAlwaysOn);
 
-  MERO_HOSTAP_CONF& hostapConf = pConf->hostapConf;
+  MERO_HOSTAP_CONF& hostapConf = conf.hostapConf;
   CopyText(hostapConf.szSSID, "Corvanta");
   CopyText(hostapConf.szBridge, "lbr0");
   hostapConf.hwMode = AP_MODE_80211G;
@@ -45,6 +45,7 @@ void SetDefaultAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
   hostapConf.wirelessWidth = AP_FREQ_ALL;
   hostapConf.maxStation = 256;
   hostapConf.wmm = 1;
+  *pConf = conf;  // all at once, since the name may be the record's own
 }
 
 // Takes one setting of a key from the section into its field of a record.

@@ -246,10 +246,10 @@ BOOL SetGuestNetAPConf(const char* szIfName, PMERO_HOSTAP_GUEST_NET pConf) {
 
 // ---- The steps ----
 
-// Ends the first daemon that is listed, without waiting for its end.
+// Ends the first daemon that is listed, without waiting for its end. To kill(), zero and less are many processes.
 void StopDaemon(const Pipe& processes) {
   int pid = 0;
-  if (!processes || std::fscanf(processes.get(), " %d", &pid) != 1) return;
+  if (!processes || std::fscanf(processes.get(), " %d", &pid) != 1 || pid <= 0) return;
   if (::kill(pid, SIGTERM) < 0) LOG("Failed to kill hostapd");
 }
 

@@ -3,6 +3,7 @@
 
 #include <random>
 
+#include "hostile_texts.h"
 #include "unit_test.h"
 
 namespace {
@@ -68,6 +69,65 @@ TEST_F(ShellWords, AreCutOnlyWhenNoCommandCouldHoldThem) {
     }
   }
 }
+
+// ---- Inside double quotes of the command's own ----
+
+std::string InQuotes(const std::string& value) {
+  return "\"<" + std::string(ShellQuoted(value).c_str()) + ">\"";
+}
+
+TEST_F(ShellWords, InQuotesAreEscapedOnlyWhereTheQuotesEndOrTheShellExpands) {
+  const struct {
+    const char* szValue;
+    const char* szQuoted;
+  } rows[] = {
+      {"", ""},
+      {"802.11n WLAN Stick", "802.11n WLAN Stick"},
+      {"it's; <a> & |b| #c (d) [e] {f} *~!?", "it's; <a> & |b| #c (d) [e] {f} *~!?"},
+      {"$(x) `y` \"z\"", "\\$(x) \\`y\\` \\\"z\\\""},
+      {"a\\", "a\\\\"},
+      {"\\$", "\\\\\\$"},
+      {"\t\n\xff", "\t\n\xff"},
+  };
+  for (const auto& row : rows) EXPECT_STREQ(ShellQuoted(row.szValue).c_str(), row.szQuoted);
+  for (int byte = 1; byte < 256; ++byte) {
+    const std::string value(1, static_cast<char>(byte));
+    const bool asItIs = ShellQuoted(value).c_str() == value;
+    EXPECT_EQ(asItIs, std::string("\"$`\\").find(value) == std::string::npos) << byte;
+  }
+}
+
+TEST_F(ShellWords, InQuotesArePassedOnUnchangedByTheShell) {
+  for (const std::string& value : kHostileTexts) {
+    EXPECT_EQ(PassedOn(InQuotes(value)), "<<" + value + ">><.>");
+  }
+  const std::string every = BytesFromTo(1, 255);
+  EXPECT_EQ(PassedOn(InQuotes(every)), "<<" + every + ">><.>");
+  EXPECT_FALSE(HasIntruder());
+}
+
+TEST_F(ShellWords, InQuotesArePassedOnUnchangedWhateverTheBytes) {
+  constexpr std::string_view kTelling = "\"\\$`'(){}!x\n ";
+  std::mt19937 random(7);
+  std::uniform_int_distribution<size_t> size(0, 40);
+  for (int i = 0; i < 200; ++i) {
+    std::string value(size(random), ' ');
+    for (char& c : value) c = kTelling[std::uniform_int_distribution<size_t>(0, kTelling.size() - 1)(random)];
+    EXPECT_EQ(PassedOn(InQuotes(value)), "<<" + value + ">><.>");
+  }
+}
+
+TEST_F(ShellWords, InQuotesAreCutOnlyWhenNoCommandCouldHoldThem) {
+  for (const char byte : {'x', ' ', '"', '$'}) {
+    const std::string value(1023, byte);
+    EXPECT_EQ(PassedOn(InQuotes(value)), "<<" + value + ">><.>");
+    for (const size_t size : {1024u, 1025u, 5000u}) {
+      EXPECT_GE(std::string_view(ShellQuoted(std::string(size, byte)).c_str()).size(), 1024u) << size;
+    }
+  }
+}
+
+// ---- The commands that they make ----
 
 TEST_F(ShellWords, AreNotNeededForACommandThatStandsAsItIs) {
   EXPECT_STREQ(Command<32>("ps | awk '{print $1}' %s %%").c_str(), "ps | awk '{print $1}' %s %%");
