@@ -524,8 +524,8 @@ BOOL MEROWirelessApConfigSecNameGet(char* szSecName, size_t cbSize);
  *
  * @param pConf  the settings; `szSecName` names the section. No text may hold a line feed or end with a carriage
  *               return, nor may the name begin or end with white space: the file could not carry it.
- * @return TRUE; FALSE when pConf is null, a text cannot be saved, an encryption is none of MERO_AP_ENCRYPT or none for a
- *         guest network, memory ran out, or the file could not be written.
+ * @return TRUE; FALSE when pConf is null, a text cannot be saved, an encryption is none of MERO_AP_ENCRYPT or none for
+ * a guest network, memory ran out, or the file could not be written.
  *
  * Reads and replaces /usr/mero/etc/wireless_ap.conf (created with mode 0600), all or nothing. Does not block on the
  * network.

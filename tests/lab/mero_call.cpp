@@ -200,6 +200,102 @@ constexpr Field<Config> kConfigFields[] = {
      [](Config& of, std::string_view text) { of.atime = Number(text); }},
 };
 
+// Settings of an access point: numbers and switches as the settings file has them, texts as they are.
+using Settings = MERO_AP_CONF;
+
+// A member of the settings, as a field.
+#define NUMBER(key, member)                                                                                     \
+  {                                                                                                             \
+    key, [](const Settings& of) { return std::to_string(+(of.member)); },                                       \
+        [](Settings& of, std::string_view text) { of.member = static_cast<decltype(of.member)>(Number(text)); } \
+  }
+#define TEXT(key, member)                                                     \
+  {                                                                           \
+    key, [](const Settings& of) -> std::string { return of.member; },         \
+        [](Settings& of, std::string_view text) { SetText(of.member, text); } \
+  }
+
+constexpr Field<Settings> kSettingsFields[] = {
+    NUMBER("enable", blEnable),
+    NUMBER("unblock", blWifiUnblock),
+    TEXT("ssid", hostapConf.szSSID),
+    TEXT("bridge", hostapConf.szBridge),
+    NUMBER("hidden", hostapConf.hideSSID),
+    NUMBER("hw_mode", hostapConf.hwMode),
+    NUMBER("channel", hostapConf.channel),
+    NUMBER("ieee80211n", hostapConf.ieee80211n),
+    NUMBER("width", hostapConf.wirelessWidth),
+    NUMBER("stations", hostapConf.maxStation),
+    NUMBER("wmm", hostapConf.wmm),
+    NUMBER("guest", hostapConf.guestNet.blEnable),
+    TEXT("guest_ssid", hostapConf.guestNet.szSSID),
+    TEXT("guest_bssid", hostapConf.guestNet.szBSSID),
+    NUMBER("guest_hidden", hostapConf.guestNet.hideSSID),
+    NUMBER("guest_stations", hostapConf.guestNet.maxStation),
+    NUMBER("guest_isolate", hostapConf.guestNet.blAPIsolate),
+    NUMBER("guest_lan_block", guestNetAccessRule.blLanBlock),
+    NUMBER("guest_access_ds", guestNetAccessRule.blAccessDS),
+    NUMBER("guest_internet_block", guestNetAccessRule.blInternetBlock),
+    NUMBER("guest_allow_http", guestNetAccessRule.blAllowHttp),
+    TEXT("sched", wifiSchedConf.szWifiSched),
+    NUMBER("sched_enabled", wifiSchedConf.wifiSchedEnabled),
+    TEXT("guest_sched", guestNetSchedConf.szWifiSched),
+    NUMBER("guest_sched_enabled", guestNetSchedConf.wifiSchedEnabled),
+    // What another encryption needed says nothing to a new one.
+    {"encryption", [](const Settings& of) { return std::to_string(of.hostapConf.encryption); },
+     [](Settings& of, std::string_view text) {
+       of.hostapConf.encryption = static_cast<MERO_AP_ENCRYPT>(Number(text));
+       of.hostapConf.encryptInfo = {};
+     }},
+    {"guest_encryption", [](const Settings& of) { return std::to_string(of.hostapConf.guestNet.encryption); },
+     [](Settings& of, std::string_view text) {
+       of.hostapConf.guestNet.encryption = static_cast<MERO_AP_ENCRYPT>(Number(text));
+       of.hostapConf.guestNet.encryptInfo = {};
+     }},
+};
+
+// What an encryption needs; for those who set it, behind the encryption itself.
+constexpr Field<Settings> kWepFields[] = {
+    TEXT("wep_key", hostapConf.encryptInfo.szWepPwd),
+};
+constexpr Field<Settings> kPskFields[] = {
+    TEXT("passphrase", hostapConf.encryptInfo.wpaPskInfo.szPassPhrase),
+    NUMBER("wpa", hostapConf.encryptInfo.wpaPskInfo.wpaType),
+    NUMBER("cipher", hostapConf.encryptInfo.wpaPskInfo.encryptType),
+};
+constexpr Field<Settings> kEapFields[] = {
+    NUMBER("wpa", hostapConf.encryptInfo.wpaEapInfo.wpaType),
+    NUMBER("cipher", hostapConf.encryptInfo.wpaEapInfo.encryptType),
+    TEXT("radius", hostapConf.encryptInfo.wpaEapInfo.szAuthIP),
+    NUMBER("radius_port", hostapConf.encryptInfo.wpaEapInfo.authPort),
+    TEXT("radius_secret", hostapConf.encryptInfo.wpaEapInfo.szAuthSharedSecret),
+};
+constexpr Field<Settings> kGuestPskFields[] = {
+    TEXT("guest_passphrase", hostapConf.guestNet.encryptInfo.wpaPskInfo.szPassPhrase),
+    NUMBER("guest_wpa", hostapConf.guestNet.encryptInfo.wpaPskInfo.wpaType),
+    NUMBER("guest_cipher", hostapConf.guestNet.encryptInfo.wpaPskInfo.encryptType),
+};
+#undef NUMBER
+#undef TEXT
+
+std::span<const Field<Settings>> SecretFieldsOf(const Settings& settings) {
+  switch (settings.hostapConf.encryption) {
+    case AP_ENCRYPT_WEP:
+      return kWepFields;
+    case AP_ENCRYPT_WPA_PSK:
+      return kPskFields;
+    case AP_ENCRYPT_WPA_EAP:
+      return kEapFields;
+    default:
+      return {};
+  }
+}
+
+std::span<const Field<Settings>> GuestSecretFieldsOf(const Settings& settings) {
+  if (settings.hostapConf.guestNet.encryption != AP_ENCRYPT_WPA_PSK) return {};
+  return kGuestPskFields;
+}
+
 template <class Record>
 std::string Pairs(const Record& record, std::span<const Field<Record>> fields) {
   std::string pairs;
@@ -224,22 +320,35 @@ void Print(const Network& network) {
   std::puts(Pairs<Network>(network, kNetworkFields).c_str());
 }
 
+void Print(const Settings& settings) {
+  std::string pairs = Pairs<Settings>(settings, kSettingsFields);
+  for (const auto fields : {SecretFieldsOf(settings), GuestSecretFieldsOf(settings)}) {
+    if (!fields.empty()) pairs.append(" ").append(Pairs<Settings>(settings, fields));
+  }
+  std::puts(pairs.c_str());
+}
+
 void Print(const Config& config) {
   std::printf("%s %s\n", Pairs<Network>(config.network, kNetworkFields).c_str(),
               Pairs<Config>(config, kConfigFields).c_str());
 }
 
-Config ConfigOf(Arguments arguments) {
-  Config config{};
+// Gives each KEY=VALUE to `set`, which tells whether it knows the key.
+template <class Setter>
+void SetAll(Arguments arguments, Setter set) {
   for (const std::string_view argument : arguments) {
     const std::size_t equals = argument.find('=');
     const std::string_view key = argument.substr(0, equals);
     if (equals == argument.npos) throw WrongCall("no KEY=VALUE: " + std::string(argument));
-    const std::string_view value = argument.substr(equals + 1);
-    if (!Set<Network>(config.network, kNetworkFields, key, value) && !Set<Config>(config, kConfigFields, key, value)) {
-      throw WrongCall("no such key: " + std::string(key));
-    }
+    if (!set(key, argument.substr(equals + 1))) throw WrongCall("no such key: " + std::string(key));
   }
+}
+
+Config ConfigOf(Arguments arguments) {
+  Config config{};
+  SetAll(arguments, [&](std::string_view key, std::string_view value) {
+    return Set<Network>(config.network, kNetworkFields, key, value) || Set<Config>(config, kConfigFields, key, value);
+  });
   return config;
 }
 
@@ -361,6 +470,47 @@ int Disconnect(Arguments) {
   return Told(MEROWirelessNetworkDisconnect());
 }
 
+// The settings of the adapter that is plugged in, whose section they name; -1 when there is none.
+int ReadSettings(Settings& settings) {
+  char szSection[sizeof settings.szSecName] = {};
+  if (MEROWirelessApConfigSecNameGet(szSection, sizeof szSection) == FALSE) return -1;
+  return MEROWirelessGetAPConfig(szSection, &settings);
+}
+
+int ApShow(Arguments) {
+  Settings settings{};
+  const int result = Told(ReadSettings(settings));
+  Print(settings);
+  return result;
+}
+
+// What is not said stays as it was; an access point whose settings are saved is switched on, unless they say otherwise.
+int ApSave(Arguments arguments) {
+  Settings settings{};
+  (void)ReadSettings(settings);
+  settings.blEnable = TRUE;
+  SetAll(arguments, [&](std::string_view key, std::string_view value) {
+    return Set<Settings>(settings, kSettingsFields, key, value) ||
+           Set<Settings>(settings, SecretFieldsOf(settings), key, value) ||
+           Set<Settings>(settings, GuestSecretFieldsOf(settings), key, value);
+  });
+  return Told(MEROWirelessSetAPConfig(&settings));
+}
+
+int ApEnable(Arguments) {
+  return Told(MEROWirelessAPEnable());
+}
+
+int ApDisable(Arguments) {
+  return Told(MEROWirelessAPDisable());
+}
+
+int Mode(Arguments arguments) {
+  const std::string_view mode = arguments[0];
+  if (mode != "ap" && mode != "client") throw WrongCall("neither ap nor client: " + std::string(mode));
+  return Told(MEROWirelessModeChange(mode == "ap" ? WIRELESS_AP_MODE : WIRELESS_CLIENT_MODE));
+}
+
 using Succeeded = bool (*)(int result);
 constexpr Succeeded kZero = [](int result) { return result == 0; };
 constexpr Succeeded kPositive = [](int result) { return result > 0; };
@@ -388,6 +538,11 @@ constexpr Call kCalls[] = {
     {"ifconfig", "INTERFACE [KEY=VALUE...]", 1, kAny, Ifconfig, kZero},
     {"gateway", "ADDRESS", 1, 1, Gateway, kZero},
     {"status", "", 0, 0, Status, kPositive},
+    {"ap-show", "", 0, 0, ApShow, kPositive},
+    {"ap-save", "[KEY=VALUE...]", 0, kAny, ApSave, kPositive},
+    {"ap-enable", "", 0, 0, ApEnable, kPositive},
+    {"ap-disable", "", 0, 0, ApDisable, kPositive},
+    {"mode", "ap|client", 1, 1, Mode, kPositive},
     // Not the library's but the platform's: the library joins networks, and has no function that leaves one.
     {"disconnect", "", 0, 0, Disconnect, kZero},
 };

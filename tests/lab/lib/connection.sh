@@ -26,20 +26,32 @@ leaves() {
   expect_nothing_left "$1"
 }
 
-# station ACCESS-POINT NAME: the appliance is a station of that access point, which lets its traffic pass.
+# station ACCESS-POINT NAME: the appliance is a station of that access point, on any of its networks, and its traffic
+# passes.
 station() {
-  ip netns exec "$1" iw dev wlan0 station dump | awk -v address="$(address_of "$2")" '
+  networks_of "$1" | awk -v address="$(address_of "$2")" '
     $1 == "Station" { this = $2 == address }
     this && $1 == "authorized:" && $2 == "yes" { found = 1 }
     END { exit !found }'
+}
+
+networks_of() {  # ACCESS-POINT
+  local interface
+  for interface in $(ip netns exec "$1" iw dev | awk '$1 == "Interface" { print $2 }'); do
+    ip netns exec "$1" iw dev "$interface" station dump
+  done
 }
 
 expect_station() {  # ACCESS-POINT NAME
   within 2 station "$1" "$2" || fail "$2 is no station of $1"
 }
 
+no_station() {  # ACCESS-POINT NAME
+  ! station "$@"
+}
+
 expect_no_station() {  # ACCESS-POINT NAME
-  ! station "$1" "$2" || fail "$2 is a station of $1"
+  no_station "$1" "$2" || fail "$2 is a station of $1"
 }
 
 # processes_of NAME: the processes of an appliance but for its own, the first one and the system log; each as its pid
@@ -62,13 +74,14 @@ expect_processes() {
 }
 
 # What runs is a daemon: it holds nothing of the process that started it, no file, no terminal, no end of a pipe to it.
+# Logs and leases are its own.
 expect_nothing_inherited() {  # NAME
   local process _ held
   while read -r process _; do
     held=$(descriptors_of "$1" "$process")
     [[ $(head -n 3 <<<"$held" | sort -u) == /dev/null ]] || fail "a daemon of $1 keeps standard descriptors:
 $held"
-    ! grep -qvE '^(/dev/null|(socket|pipe|anon_inode):.*)$' <<<"$held" || fail "a daemon of $1 keeps files open:
+    ! grep -qvE '^(/dev/null|/run/rc\.network/.*|(socket|pipe|anon_inode):.*)$' <<<"$held" || fail "a daemon of $1 keeps files open:
 $held"
   done < <(processes_of "$1")
 }
