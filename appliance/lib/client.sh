@@ -1,0 +1,17 @@
+# The other use of a wireless interface: a station of somebody else's access point.
+# shellcheck shell=sh
+
+# end_client INTERFACE: ends what joins networks and leases addresses there.
+end_client() {
+	end_daemon wpa_supplicant /var/run/wpa_supplicant.pid
+	end_lease "$1"
+	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
+}
+
+# free_for_client INTERFACE: as it is when it has just been plugged in.
+free_for_client() {
+	is_there "$1" || return 0
+	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
+	attempt "take $1 down" ip link set dev "$1" down
+	attempt "make $1 a client's" iw dev "$1" set type managed
+}

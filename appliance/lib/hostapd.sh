@@ -1,0 +1,112 @@
+# The access-point daemon.
+# shellcheck shell=sh
+# shellcheck disable=SC2154  # what the other parts set
+
+control=/var/run/hostapd
+
+start_hostapd() { # INTERFACE
+	end_hostapd "$1"
+	expect_interface "$1"
+	configuration=$state/hostapd-$1.conf log=$state/hostapd-$1.log
+	write_configuration "$1" "$configuration"
+	make_named_files "$configuration"
+
+	: >"$log"
+	said=$(hostapd -B -t -f "$log" -P "$(hostapd_pid "$1")" "$configuration" 2>&1) ||
+		fail "cannot start the access point on $1: $(reason_in "$log" "$said")"
+	await_access_point "$1" "$log"
+}
+
+end_hostapd() { # INTERFACE
+	end_daemon hostapd "$(hostapd_pid "$1")"
+}
+
+# end_access_point INTERFACE: ends the daemon for good; what it was told holds secrets.
+end_access_point() {
+	end_hostapd "$1"
+	rm -f "$state/hostapd-$1.conf" "$state/hostapd-$1.log"
+}
+
+hostapd_pid() { # INTERFACE
+	printf '%s/hostapd-%s.pid' "$state" "$1"
+}
+
+# What the daemon reads: the main network's file and, while it is on, the guest network's; without what the card cannot
+# do, since a daemon that is told to use that does not start.
+write_configuration() { # INTERFACE FILE
+	[ -s "/etc/hostapd/hostapd-$1-host.conf" ] || fail "/etc/hostapd/hostapd-$1-host.conf is missing or empty"
+	put "$2" <"/etc/hostapd/hostapd-$1-host.conf"
+	unable=$(what_is_unable "$1" "$(band_of "$2")") || exit 1
+	sed "$unable" "$2" | put "$2"
+	if guest_is_on "$1"; then guest_configuration "$1" >>"$2"; fi
+}
+
+band_of() { # CONFIGURATION
+	if grep -qx 'hw_mode=a' "$1"; then echo 2; else echo 1; fi
+}
+
+# what_is_unable INTERFACE BAND: what takes the card's lacks out of a configuration, for sed.
+what_is_unable() {
+	bits=$(ht_capabilities "$1" "$2") || exit 1
+	if [ -z "$bits" ]; then
+		echo '/^ieee80211n=/d; /^ht_capab=/d; /^require_ht=/d'
+		return
+	fi
+	lacks "$bits" 0x0020 '\[SHORT-GI-20\]'
+	lacks "$bits" 0x0040 '\[SHORT-GI-40\]'
+	lacks "$bits" 0x0400 '\[DELAYED-BA\]'
+	lacks "$bits" 0x0800 '\[MAX-AMSDU-7935\]'
+	lacks "$bits" 0x0002 '\[HT40[+-]\]'
+}
+
+lacks() { # BITS BIT PATTERN
+	[ $(($1 & $2)) -ne 0 ] || echo "/^ht_capab=/s/$3//"
+}
+
+# What the card can do under 802.11n in a band, as its bits; empty for a card without.
+ht_capabilities() { # INTERFACE BAND
+	phy=$(cat "/sys/class/net/$1/phy80211/name") || fail "$1 is no wireless interface"
+	iw phy "$phy" info | awk -v band="Band $2:" '
+		$1 == "Band" { inside = ($0 ~ band) }
+		inside && $1 == "Capabilities:" { print $2; exit }'
+}
+
+# The daemon does not start when a file that it is told to read is missing.
+make_named_files() { # CONFIGURATION
+	sed -n 's/^wpa_psk_file=//p' "$1" | while IFS= read -r file; do
+		[ -e "$file" ] || put "$file" </dev/null
+	done || exit 1
+}
+
+# The daemon is in the background before it has chosen a channel.
+await_access_point() { # INTERFACE LOG
+	tries=300
+	while [ $tries -gt 0 ]; do
+		case $(hostapd_cli -p "$control" -i "$1" status 2>/dev/null | sed -n 's/^state=//p') in
+		ENABLED) return ;;
+		DFS) return ;; # listens for radar, for a minute or more, and comes up by itself
+		DISABLED) break ;;
+		esac
+		daemon_of hostapd "$(hostapd_pid "$1")" >/dev/null || break
+		sleep 0.1
+		tries=$((tries - 1))
+	done
+	end_hostapd "$1"
+	fail "the access point on $1 does not come up: $(reason_in "$2")"
+}
+
+# reason_in LOG [TEXT]: the line in which a daemon says what went wrong, without its time.
+reason_in() {
+	{
+		cat "$1"
+		printf '%s\n' "${2-}"
+	} | awk '
+		{ sub(/^[0-9]+\.[0-9]+: /, "") }
+		tolower($0) ~ /line [0-9]+:|fail|error|invalid|unable|could not|does not|not (allowed|configured|found|supported)|in use/ {
+			print
+			found = 1
+			exit
+		}
+		NF { last = $0 }
+		END { if (!found) print last }'
+}

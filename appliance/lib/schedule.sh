@@ -1,0 +1,25 @@
+# Networks that are on the air at some hours of the week only.
+# shellcheck shell=sh
+# shellcheck disable=SC2154  # what the other parts set
+
+# is_off_now SWITCH-KEY SCHEDULE-KEY: whether a schedule is followed, and has its network off the air. It has a digit for
+# each hour of a week, from Sunday's first on: 0 for off.
+is_off_now() {
+	is_on "$1" 0 || return 1
+	hour=$(date +%H)
+	digit=$(($(date +%w) * 24 + ${hour#0} + 1))
+	[ "$(setting "$2" '' | cut -c "$digit")" = 0 ]
+}
+
+# An interface that is down is off the air; the daemon puts its network back when it comes up.
+apply_main_schedule() { # INTERFACE
+	turn=up
+	if is_off_now wifi_sched_enabled wifi_sched; then turn=down; fi
+	attempt "switch $1 $turn" ip link set dev "$1" "$turn"
+}
+
+# guest_is_late INTERFACE: whether the guest network is on the air and should not be, or the other way round. The daemon
+# can neither take up nor give up a network while it runs.
+guest_is_late() {
+	if guest_is_on "$1"; then ! is_there "$guest_interface"; else is_there "$guest_interface"; fi
+}

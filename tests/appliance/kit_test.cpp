@@ -1,0 +1,305 @@
+// The appliance kit's scripts, by their parts and as they are called, where no radio is needed.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <vector>
+
+namespace fs = std::filesystem;
+
+namespace {
+
+using testing::HasSubstr;
+using testing::StartsWith;
+
+struct Ran {
+  int status;
+  std::string output;  // of both kinds
+};
+
+Ran RunInShell(const std::string& command) {
+  FILE* pipe = ::popen(("{ " + command + "\n} 2>&1").c_str(), "r");
+  Ran ran = {-1, ""};
+  for (int c; (c = std::fgetc(pipe)) != EOF;) ran.output += static_cast<char>(c);
+  const int status = ::pclose(pipe);
+  ran.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  return ran;
+}
+
+void Write(const std::string& path, const std::string& text) {
+  fs::create_directories(fs::path(path).parent_path());
+  std::ofstream(path) << text;
+}
+
+// A program that stands before the machine's own of that name.
+void Install(const std::string& name, const std::string& script) {
+  const std::string path = "/tmp/bin/" + name;
+  Write(path, "#!/bin/sh\n" + script);
+  ::chmod(path.c_str(), 0755);
+}
+
+// Has the parts do something, as the scripts would.
+Ran RunInParts(const std::string& command) {
+  std::string script = "set -u; PATH=/tmp/bin:$PATH; ";
+  for (const char* part : {"report", "files", "daemon", "bridge", "hostapd", "guest", "dhcp", "firewall", "schedule",
+                           "client", "adapter"}) {
+    script += ". /usr/mero/lib/network/" + std::string(part) + ".sh; ";
+  }
+  return RunInShell(script + command);
+}
+
+std::string Tells(const std::string& command) {
+  const Ran ran = RunInParts(command);
+  EXPECT_EQ(ran.status, 0) << command << "\n" << ran.output;
+  return ran.output;
+}
+
+class Kit : public testing::Test {
+ protected:
+  Kit() {
+    const fs::path kit = APPLIANCE_KIT;
+    fs::create_directories("/usr/mero/lib");
+    fs::copy(kit / "lib", "/usr/mero/lib/network", fs::copy_options::recursive);
+    fs::copy(kit / "hotplug", "/usr/mero/hotplug", fs::copy_options::recursive);
+    fs::copy(kit / "etc/rc.network", "/etc/rc.network");
+    Write("/tmp/wireless.info", "INTERFACE=\"wlan0\"\nPRODUCT=\"RT [5370\"\n");
+  }
+};
+
+TEST_F(Kit, ReadsAValueWithoutItsQuotes) {
+  const struct {
+    const char* szText;
+    const char* szValue;
+  } rows[] = {
+      {"KEY=value\n", "value"},
+      {"KEY=\"value\"\n", "value"},
+      {"KEY='a b'\n", "a b"},
+      {"  KEY = value \n", "value"},
+      {"KEY=value\r\n", "value"},
+      {"KEY=value", "value"},
+      {"KEY=first\nKEY=last\n", "last"},
+      {"OTHERKEY=x\n#KEY=x\n", ""},
+      {"KEY=\n", ""},
+      {"KEY=$(touch /tmp/run)`touch /tmp/run`\n", "$(touch /tmp/run)`touch /tmp/run`"},
+  };
+  for (const auto& row : rows) {
+    Write("/tmp/file", row.szText);
+    EXPECT_EQ(Tells("printf '%s' \"$(value_of KEY /tmp/file)\""), row.szValue) << row.szText;
+  }
+  EXPECT_EQ(Tells("value_of KEY /tmp/missing"), "");
+  EXPECT_FALSE(fs::exists("/tmp/run"));
+}
+
+TEST_F(Kit, ReadsASettingFromTheSectionOfTheAdapter) {
+  Write("/usr/mero/etc/wireless_ap.conf",
+        "[other]\n\tssid=wrong\n\tkey=wrong\n"
+        "[rt [5370]\n\tssid=a = b\n\tssid=\"last\" \n\tempty=\n# key=wrong\n"
+        "[RT [5370]\n\tkey=wrong\n");
+  EXPECT_EQ(Tells("setting ssid x"), "\"last\" ");
+  EXPECT_EQ(Tells("setting empty x"), "");
+  EXPECT_EQ(Tells("setting key 'as usual'"), "as usual");
+  fs::remove("/usr/mero/etc/wireless_ap.conf");
+  EXPECT_EQ(Tells("setting ssid 'as usual'"), "as usual");
+}
+
+TEST_F(Kit, TakesNamesOfInterfacesOnly) {
+  for (const char* szGood : {"wlan0", "br-lan", "eth0.7", "a_b", "123456789012345"}) {
+    EXPECT_EQ(RunInParts("expect_name '" + std::string(szGood) + "'").status, 0) << szGood;
+  }
+  for (const char* szBad : {"../x", "a b", "a/b", ".", "..", "-x", "1234567890123456", "a;b", "a\nb"}) {
+    const Ran ran = RunInParts("expect_name '" + std::string(szBad) + "'");
+    EXPECT_EQ(ran.status, 1) << szBad;
+    EXPECT_THAT(ran.output, HasSubstr("is no name of an interface"));
+  }
+}
+
+TEST_F(Kit, LeavesOutWhatTheCardCannotDo) {
+  const std::string all = "[SHORT-GI-20][DELAYED-BA][SHORT-GI-40][MAX-AMSDU-7935][HT40-]";
+  const struct {
+    const char* szBits;
+    std::string left;
+  } rows[] = {
+      {"0x0c62", "ieee80211n=1\nht_capab=" + all + "\nrequire_ht=1\n"},
+      {"0x107e", "ieee80211n=1\nht_capab=[SHORT-GI-20][SHORT-GI-40][HT40-]\nrequire_ht=1\n"},
+      {"0x0020", "ieee80211n=1\nht_capab=[SHORT-GI-20]\nrequire_ht=1\n"},
+      {"0x0000", "ieee80211n=1\nht_capab=\nrequire_ht=1\n"},
+      {"", ""},  // no 802.11n at all
+  };
+  for (const auto& row : rows) {
+    Write("/tmp/conf", "ieee80211n=1\nht_capab=" + all + "\nrequire_ht=1\n");
+    const std::string card = "ht_capabilities() { echo " + std::string(row.szBits) + "; }; ";
+    EXPECT_EQ(Tells(card + "sed \"$(what_is_unable wlan0 1)\" /tmp/conf"), row.left) << row.szBits;
+  }
+}
+
+TEST_F(Kit, ReadsTheCapabilitiesOfTheBand) {
+  Install("iw",
+          "cat <<END\nWiphy phy0\n\tBand 1:\n\t\tCapabilities: 0x11\n\t\tCapabilities: 0x99\n"
+          "\tBand 2:\n\t\tCapabilities: 0x22\n\tBand 3:\n\t\tFrequencies:\nEND\n");
+  Install("cat", "if [ $# -eq 0 ]; then exec /bin/cat; else echo phy0; fi\n");
+  EXPECT_EQ(Tells("ht_capabilities wlan0 1"), "0x11\n");
+  EXPECT_EQ(Tells("ht_capabilities wlan0 2"), "0x22\n");
+  EXPECT_EQ(Tells("ht_capabilities wlan0 3"), "");
+}
+
+TEST_F(Kit, FindsTheLineInWhichADaemonSaysWhy) {
+  const struct {
+    const char* szLog;
+    const char* szReason;
+  } rows[] = {
+      {"1795.2: rfkill: Cannot open RFKILL control device\n1795.3: Line 22: invalid WPA passphrase\n1795.4: 1 errors\n",
+       "Line 22: invalid WPA passphrase\n"},
+      {"1795.2: wlan0: interface state UNINITIALIZED->DISABLED\nDriver does not support configured HT\n",
+       "Driver does not support configured HT\n"},
+      {"only this\n\n", "only this\n"},
+  };
+  for (const auto& row : rows) {
+    Write("/tmp/log", row.szLog);
+    EXPECT_EQ(Tells("reason_in /tmp/log"), row.szReason);
+  }
+  Write("/tmp/log", "");
+  EXPECT_EQ(Tells("reason_in /tmp/log 'hostapd: unable to do it'"), "hostapd: unable to do it\n");
+}
+
+TEST_F(Kit, FollowsAScheduleByTheHourOfTheWeek) {
+  const auto is_off = [](const std::string& hours, const char* szSwitch, const char* szDay, const char* szHour) {
+    Write("/usr/mero/etc/wireless_ap.conf", std::string("[RT [5370]\n\tsched=") + hours + "\n\tswitch=" + szSwitch);
+    Install("date", std::string("case $1 in +%w) echo ") + szDay + ";; +%H) echo " + szHour + ";; esac\n");
+    return RunInParts("is_off_now switch sched").status == 0;
+  };
+  const std::string on(168, '1');
+  const auto without = [&](size_t hour) {
+    std::string hours = on;
+    hours[hour] = '0';
+    return hours;
+  };
+  EXPECT_TRUE(is_off(without(0), "1", "0", "00"));
+  EXPECT_FALSE(is_off(without(0), "0", "0", "00"));
+  EXPECT_FALSE(is_off(without(0), "1", "0", "01"));
+  EXPECT_TRUE(is_off(without(9), "1", "0", "09"));
+  EXPECT_TRUE(is_off(without(24 + 8), "1", "1", "08"));
+  EXPECT_TRUE(is_off(without(167), "1", "6", "23"));
+  EXPECT_FALSE(is_off("", "1", "6", "23"));
+}
+
+TEST_F(Kit, EndsADaemonOnlyWhenItIsStillTheOneOfItsPidFile) {
+  // Beside it somebody waits for its end, as init does for a daemon's.
+  const std::string runs =
+      "(sleep 60 & echo $! >/tmp/pid; wait) >/dev/null 2>&1 & until [ -s /tmp/pid ]; do sleep 0.01; done; "
+      "read -r running </tmp/pid; ";
+  EXPECT_EQ(Tells(runs + "end_daemon hostapd /tmp/pid; kill $running"), "");
+  EXPECT_FALSE(fs::exists("/tmp/pid"));
+  EXPECT_EQ(Tells(runs + "end_daemon sleep /tmp/pid; ! kill -0 $running 2>/dev/null"), "");
+  EXPECT_FALSE(fs::exists("/tmp/pid"));
+  for (const char* szText : {"", "no number\n", "-1\n", "999999999\n"}) {
+    Write("/tmp/pid", szText);
+    EXPECT_EQ(Tells("end_daemon sleep /tmp/pid"), "") << szText;
+  }
+  EXPECT_EQ(Tells("end_daemon sleep /tmp/missing"), "");
+}
+
+TEST_F(Kit, ReplacesAFileThatOnlyRootMayRead) {
+  EXPECT_EQ(Tells("echo secret | put /tmp/secret"), "");
+  struct stat status;
+  ASSERT_EQ(::stat("/tmp/secret", &status), 0);
+  EXPECT_EQ(status.st_mode & 0777, 0600u);
+  const Ran ran = RunInParts("echo secret | put /tmp/missing/secret");
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.output, HasSubstr("cannot write /tmp/missing/secret"));
+}
+
+TEST_F(Kit, GivesGuestsTheRulesThatAreSet) {
+  Install("ip", "echo '198.51.100.0/24 dev eth0'\n");
+  const auto rules = [](const std::string& settings) {
+    Write("/usr/mero/etc/wireless_ap.conf", "[RT [5370]\n" + settings);
+    return Tells("guest_rules");
+  };
+  const std::string usual = rules("");
+  EXPECT_THAT(usual, HasSubstr("tcp dport { 80, 443 } accept"));
+  EXPECT_THAT(usual, HasSubstr("ip daddr @local-networks reject\naccept\n"));
+  EXPECT_THAT(usual, HasSubstr("10.0.0.0/8,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16,198.51.100.0/24"));
+  EXPECT_THAT(usual, Not(HasSubstr("meta nfproto ipv4 accept")));
+
+  const std::string other = rules(
+      "\tguest_net_lan_block=0\n\tguest_net_access_ds=1\n\tguest_net_internet_block=1\n\tguest_net_allow_http=0\n");
+  EXPECT_THAT(other, Not(HasSubstr("{ 80, 443 }")));
+  EXPECT_THAT(other, HasSubstr("ip daddr @local-networks accept\nreject\n"));
+  EXPECT_THAT(other, HasSubstr("meta nfproto ipv4 accept"));
+}
+
+TEST_F(Kit, MakesTheBridgesThatComeUpAtBoot) {
+  ASSERT_EQ(RunInShell("ip link add eth0 type veth peer name eth1 && ip address add 192.0.2.9/24 dev eth0").output, "");
+  const std::string scripts = "/etc/sysconfig/network-scripts/ifcfg-";
+  Write(scripts + "br0",
+        "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\n"
+        "ONBOOT=yes\nHWADDR=02:00:00:00:00:07\n");
+  Write(scripts + "br1", "DEVICE=br1\nTYPE=Bridge\nBOOTPROTO=static\nONBOOT=no\n");
+  Write(scripts + "eth1", "DEVICE=eth1\nONBOOT=yes\n");
+  for (int round = 0; round < 2; ++round) {
+    const Ran ran = RunInShell("/etc/rc.network boot");
+    EXPECT_EQ(ran.status, 0) << ran.output;
+    EXPECT_EQ(ran.output, "");
+    EXPECT_EQ(RunInShell("ls /sys/class/net/br0/brif").output, "eth0\n");
+    EXPECT_EQ(RunInShell("ip -brief -4 address show br0 | awk '{ print $1, $3 }'").output, "br0 192.0.2.1/24\n");
+    EXPECT_EQ(RunInShell("ip -brief link show br0 | awk '{ print $3 }'").output, "02:00:00:00:00:07\n");
+    EXPECT_EQ(RunInShell("ip -brief -4 address show eth0 | awk '{ print $3 }'").output, "");
+    EXPECT_FALSE(fs::exists("/sys/class/net/br1"));
+  }
+}
+
+TEST_F(Kit, SaysWhyABridgeCannotBeMade) {
+  const std::string scripts = "/etc/sysconfig/network-scripts/ifcfg-";
+  const struct {
+    const char* szText;
+    const char* szReason;
+  } rows[] = {
+      {"PRIMARY=eth7\n", "there is no interface 'eth7'"},
+      {"BOOTPROTO=static\nIPADDR=192.0.2.x\nNETMASK=255.255.255.0\n", "cannot give br0 the address 192.0.2.x"},
+      {"BOOTPROTO=static\nHWADDR=nonsense\n", "cannot give br0 the address nonsense"},
+  };
+  for (const auto& row : rows) {
+    Write(scripts + "br0", std::string("DEVICE=br0\nTYPE=Bridge\nONBOOT=yes\n") + row.szText);
+    const Ran ran = RunInShell("/etc/rc.network boot");
+    EXPECT_EQ(ran.status, 1);
+    EXPECT_THAT(ran.output, StartsWith("rc.network: " + std::string(row.szReason)));
+  }
+}
+
+TEST_F(Kit, RefusesWrongWordsWithItsUsage) {
+  for (const char* szWords :
+       {"", "start", "start wlan0", "start wlan0 lbr0 more", "restart", "boot wlan0", "schedule", "begin wlan0 lbr0"}) {
+    const Ran ran = RunInShell("/etc/rc.network " + std::string(szWords));
+    EXPECT_EQ(ran.status, 2) << szWords;
+    EXPECT_THAT(ran.output, StartsWith("usage: rc.network start INTERFACE BRIDGE")) << szWords;
+  }
+  for (const char* szWords : {"", "change-mode", "change-mode both", "add wlan0", "plug"}) {
+    const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function " + std::string(szWords));
+    EXPECT_EQ(ran.status, 2) << szWords;
+    EXPECT_THAT(ran.output, StartsWith("usage: usb.wireless.function add")) << szWords;
+  }
+  EXPECT_EQ(RunInShell("/etc/rc.network help").status, 0);
+}
+
+TEST_F(Kit, SaysThatThereIsNoAdapter) {
+  for (const char* szWords : {"add", "change-mode ap", "change-mode client"}) {
+    const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function " + std::string(szWords));
+    EXPECT_EQ(ran.status, 1) << szWords;
+    EXPECT_EQ(ran.output, "usb.wireless.function: no adapter is plugged in\n") << szWords;
+  }
+  const Ran ran = RunInShell("/etc/rc.network start wlan0 lbr0");
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.output, "rc.network: there is no interface 'wlan0'\n");
+}
+
+TEST_F(Kit, ForgetsAnAdapterThatWasPulled) {
+  const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function remove");
+  EXPECT_EQ(ran.status, 0) << ran.output;
+  EXPECT_FALSE(fs::exists("/tmp/wireless.info"));
+}
+
+}  // namespace
