@@ -154,4 +154,26 @@ doing 'asking the gateway for an answer: ping' expect_reachable nas 192.168.20.1
 on nas mero-call status
 remark "MEROWirelessConnStatusGet: ${OUTPUT##*status=}"
 
+heading 'Another appliance becomes an access point'
+doing 'switching it on' appliance shelf
+doing 'noting its adapter, as the hot-plug script does' plug_in shelf
+doing "saving its settings: MEROWirelessSetAPConfig" on shelf mero-call ap-save ssid='Shelf 7' channel=11 \
+  encryption=2 wpa=2 cipher=2 passphrase='among old books'
+doing 'bridge, addresses, hostapd and a DHCP server: MEROWirelessAPEnable' on shelf mero-call ap-enable
+remark "$(ip -n shelf -brief -4 address show lbr0 | xargs)"
+remark "$(ip netns exec shelf iw dev wlan0 info | awk '$1 ~ /^(ssid|type|channel)$/' | xargs)"
+
+heading 'And the first one joins it'
+doing 'leaving the café: MEROWirelessNetworkDisconnect' on nas mero-call disconnect
+doing 'scanning afresh: MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW)' on nas mero-call scan renew
+show_networks 'Shelf 7'
+doing 'joining it: MEROWirelessNetworkConnect' on nas mero-call connect essid='Shelf 7' bssid="$(address_of shelf)" \
+  auth=WPA2PSK encrypt=AES key='among old books'
+doing 'asking it for an address: MEROWirelessIfconfigSet' on nas mero-call ifconfig wlan0 ip=DHCP
+remark "its address: $(ipv4_of nas)"
+doing 'asking the access point for an answer: ping 10.1.14.1' expect_reachable nas 10.1.14.1
+doing 'taking the access point down: MEROWirelessAPDisable' on shelf mero-call ap-disable
+remark "it is a $(radio_type shelf) interface again, and nothing of the access point runs"
+expect_no_access_point shelf
+
 printf '\nThat took %d seconds.\n' "$(seconds_passed)"
