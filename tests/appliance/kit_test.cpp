@@ -190,8 +190,8 @@ TEST_F(Kit, FollowsAScheduleByTheHourOfTheWeek) {
 TEST_F(Kit, EndsADaemonOnlyWhenItIsStillTheOneOfItsPidFile) {
   // Beside it somebody waits for its end, as init does for a daemon's.
   const std::string runs =
-      "(sleep 60 & echo $! >/tmp/pid; wait) >/dev/null 2>&1 & until [ -s /tmp/pid ]; do sleep 0.01; done; "
-      "read -r running </tmp/pid; ";
+      "(sleep 60 & echo $! >/tmp/pid; wait) >/dev/null 2>&1 & until read -r running </tmp/pid && "
+      "grep -qx sleep /proc/$running/comm; do sleep 0.01; done 2>/dev/null; ";
   EXPECT_EQ(Tells(runs + "end_daemon hostapd /tmp/pid; kill $running"), "");
   EXPECT_FALSE(fs::exists("/tmp/pid"));
   EXPECT_EQ(Tells(runs + "end_daemon sleep /tmp/pid; ! kill -0 $running 2>/dev/null"), "");
