@@ -54,7 +54,7 @@ std::string SectionOf(int number) {
   const WIRELESS_NETWORK_CONFIG config = NetworkOf(number);
   char szBssid[18];
   MEROWirelessBssidStringGet(config.network.bssid, szBssid, sizeof szBssid);
-  const int64_t time = 1'600'000'000 + int64_t{number} * 7919 % 100'000'000;
+  const int64_t time = 1'600'000'000 + int64_t{number} * 38'196'601 % 100'000'000;
   char szSection[1024];
   const int size = std::snprintf(szSection, sizeof szSection,
                                  "[%s]\n\tKEY=%s\n\tIPADDR=%s\n\tNETMASK=%s\n\tGATEWAY=%s\n\tESSID=%s\n\tBSSID=%s\n"

@@ -1,41 +1,64 @@
 // Lists the known networks, the most recently saved first.
+#include <cstdlib>
+#include <memory>
+
+#include "holders.h"
 #include "known_networks.h"
 #include "ring.h"
 #include "wireless.h"
 
 namespace {
 
+// A record of the ring. Sorted apart from the records, which lie far from one another in memory.
+struct Place {
+  int32_t time;
+  uint32_t number;  // in the file; networks saved in the same second keep its order
+  WIRELESS_LIST* node;
+};
+
+// The order of two places, as qsort() wants it.
+int Compare(const void* a, const void* b) {
+  const auto& [timeA, numberA, nodeA] = *static_cast<const Place*>(a);
+  const auto& [timeB, numberB, nodeB] = *static_cast<const Place*>(b);
+  if (timeA != timeB) return timeA > timeB ? -1 : 1;
+  return numberA < numberB ? -1 : 1;
+}
+
 int32_t SaveTimeOf(WIRELESS_LIST& node) {
   return RecordOf<WIRELESS_NETWORK_CONFIG>(node).atime;
 }
 
-// Merges a sorted ring into another. Where times are equal, what is in `into` stays before what comes.
-void MergeInto(WIRELESS_LIST& into, WIRELESS_LIST& from) {
-  WIRELESS_LIST* at = into.q_forw;
-  while (!IsEmpty(from)) {
-    WIRELESS_LIST& node = TakeFirst(from);
-    while (at != &into && SaveTimeOf(*at) >= SaveTimeOf(node)) at = at->q_forw;
-    ::insque(&node, at->q_back);
-  }
+size_t LengthOf(const WIRELESS_LIST& head) {
+  size_t length = 0;
+  for (const WIRELESS_LIST* at = head.q_forw; at != &head; at = at->q_forw) ++length;
+  return length;
 }
 
-// A merge sort from the bottom up, since lists may be long and their order is any: runs[i] takes 2^i records at a time
-// and passes them on when it has twice as many. Higher runs hold what is earlier in the file, which keeps the order of
-// networks that were saved in the same second.
-void SortBySaveTime(WIRELESS_LIST& head) {
-  constexpr int kRuns = 32;  // for more records than memory can hold
-  WIRELESS_LIST runs[kRuns];
-  for (WIRELESS_LIST& run : runs) ResetRing(run);
-
-  for (unsigned count = 1; !IsEmpty(head); ++count) {
-    WIRELESS_LIST single;
-    ResetRing(single);
-    Append(single, TakeFirst(head));
-    MergeInto(runs[0], single);
-    for (int i = 0; (count & (1u << i)) == 0; ++i) MergeInto(runs[i + 1], runs[i]);
+// Sorts a ring without any memory, in quadratic time.
+void SortSlowly(WIRELESS_LIST& head) {
+  WIRELESS_LIST sorted;
+  ResetRing(sorted);
+  while (!IsEmpty(head)) {
+    WIRELESS_LIST& node = TakeFirst(head);
+    WIRELESS_LIST* at = &sorted;
+    while (at->q_back != &sorted && SaveTimeOf(*at->q_back) < SaveTimeOf(node)) at = at->q_back;
+    ::insque(&node, at->q_back);
   }
-  for (int i = 0; i + 1 < kRuns; ++i) MergeInto(runs[i + 1], runs[i]);
-  MergeInto(head, runs[kRuns - 1]);
+  while (!IsEmpty(sorted)) Append(head, TakeFirst(sorted));
+}
+
+void SortBySaveTime(WIRELESS_LIST& head) {
+  const std::unique_ptr<Place[], FreeRecord> places(static_cast<Place*>(std::calloc(LengthOf(head), sizeof(Place))));
+  if (!places) return SortSlowly(head);
+
+  Place* end = places.get();
+  for (WIRELESS_LIST* at = head.q_forw; at != &head; at = at->q_forw) {
+    *end = {SaveTimeOf(*at), static_cast<uint32_t>(end - places.get()), at};
+    ++end;
+  }
+  std::qsort(places.get(), static_cast<size_t>(end - places.get()), sizeof(Place), Compare);
+  ResetRing(head);
+  for (const Place* place = places.get(); place != end; ++place) Append(head, *place->node);
 }
 
 }  // namespace

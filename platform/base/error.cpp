@@ -27,3 +27,14 @@ int CodeOfError(int error) {
   }
   return ERR_UNKNOWN;
 }
+
+void ReportFailure(SourcePlace place, int error, const char* szVerb, const char* szSubject) {
+  PLIBCErrSet(CodeOfError(error));
+  errno = error;  // for %m
+  LOG_AS(place.szUnit, place.line, "Failed to %s %s: %m", szVerb, szSubject);
+}
+
+void ReportNull(SourcePlace place) {
+  PLIBCErrSet(ERR_BAD_PARAMETERS);
+  LOG_AS(place.szUnit, place.line, "Bad parameters");
+}

@@ -10,11 +10,21 @@
 // The error code of an errno.
 int CodeOfError(int error);
 
+// Where in the source something is reported.
+struct SourcePlace {
+  const char* szUnit;
+  int line;
+};
+#define HERE (SourcePlace{TextOfUnit<__FILE_NAME__>(), __LINE__})
+
+// Functions, since there are many places to report from.
+void ReportFailure(SourcePlace place, int error, const char* szVerb, const char* szSubject);
+void ReportNull(SourcePlace place);
+
 // Sets the error code and reports "Failed to VERB SUBJECT: reason"; both are texts. An expression without a value.
-#define FAIL(error, verb, subject) \
-  (PLIBCErrSet(CodeOfError(error)), errno = (error), LOG("Failed to %s %s: %m", verb, subject))
+#define FAIL(error, verb, subject) ReportFailure(HERE, error, verb, subject)
 
 // Refuses a null argument.
-#define REFUSE_NULL() (PLIBCErrSet(ERR_BAD_PARAMETERS), LOG("Bad parameters"))
+#define REFUSE_NULL() ReportNull(HERE)
 
 #endif  // MERO_PLATFORM_ERROR_H

@@ -125,3 +125,13 @@ Status FileEdit::Commit(std::string_view content) {
   }
   return FlushDirectory(szPath_);
 }
+
+Status EditFile(const char* szPath, mode_t mode, Composer compose) {
+  Result<FileEdit> edit = FileEdit::Open(szPath, mode);
+  if (!edit.ok()) return edit.status();
+  Bytes content;
+  Status status = compose(edit->text(), content);
+  if (status.ok()) status = edit->Commit(content.view());
+  if (!status.ok()) edit->Abandon();
+  return status;
+}

@@ -35,16 +35,24 @@ class FileEdit {
   char szPath_[PATH_MAX] = {};  // where the file really is
 };
 
-// Changes a file in one go: `compose(text, content)` gives its new content, or the reason why not.
-template <class Compose>
-Status EditFile(const char* szPath, mode_t mode, Compose compose) {
-  Result<FileEdit> edit = FileEdit::Open(szPath, mode);
-  if (!edit.ok()) return edit.status();
-  Bytes content;
-  Status status = compose(edit->text(), content);
-  if (status.ok()) status = edit->Commit(content.view());
-  if (!status.ok()) edit->Abandon();
-  return status;
-}
+// What composes the new content of a file from what it holds, or says why not. Refers to a function object that
+// outlives it.
+class Composer {
+ public:
+  template <class Compose>
+  Composer(const Compose& compose)  // NOLINT(google-explicit-constructor)
+      : object_(&compose), call_([](const void* object, std::string_view text, Bytes& content) {
+          return (*static_cast<const Compose*>(object))(text, content);
+        }) {}
+
+  Status operator()(std::string_view text, Bytes& content) const { return call_(object_, text, content); }
+
+ private:
+  const void* object_;
+  Status (*call_)(const void* object, std::string_view text, Bytes& content);
+};
+
+// Changes a file in one go.
+Status EditFile(const char* szPath, mode_t mode, Composer compose);
 
 #endif  // MERO_PLATFORM_FILE_EDIT_H

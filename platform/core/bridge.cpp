@@ -1,6 +1,6 @@
 // The bridges that the kernel has.
-#include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 
 #include "platform/base/directory.h"
@@ -41,8 +41,10 @@ Status AppendMembers(const char* szBridge, PLIBSZLIST& list) {
     TruncateList(list, before);
     return status;
   }
-  std::sort(list.ppszItem + before, list.ppszItem + list.nItem,
-            [](const char* szA, const char* szB) { return ::strverscmp(szA, szB) < 0; });
+  std::qsort(list.ppszItem + before, static_cast<size_t>(list.nItem - before), sizeof(char*),
+             [](const void* a, const void* b) {
+               return ::strverscmp(*static_cast<char* const*>(a), *static_cast<char* const*>(b));
+             });
   return Status::Ok();
 }
 

@@ -46,15 +46,17 @@ Result<FileStamp> StampOf(const char* szPath) {
   return FileStamp{info.st_dev, info.st_ino, info.st_size, info.st_mtim, info.st_ctim};
 }
 
+int64_t Nanoseconds(const timespec& time) {
+  return int64_t{time.tv_sec} * 1'000'000'000 + time.tv_nsec;
+}
+
 // Whether a change from now on is bound to show in the stamp: file times advance in ticks, and a second change within
 // one tick does not.
 bool HasSettled(const FileStamp& stamp) {
-  constexpr int64_t kNanoseconds = 1'000'000'000;
   constexpr int64_t kSeveralTicks = 50'000'000;
   timespec now;
   ::clock_gettime(CLOCK_REALTIME, &now);
-  const int64_t age = (int64_t{now.tv_sec} - stamp.changed.tv_sec) * kNanoseconds + now.tv_nsec - stamp.changed.tv_nsec;
-  return age > kSeveralTicks;
+  return Nanoseconds(now) - Nanoseconds(stamp.changed) > kSeveralTicks;
 }
 
 struct KeptFile {
@@ -87,9 +89,7 @@ void Advance(bool first, size_t total) {
 }
 
 // Keeps a text, if there is memory for it; not to keep it only costs time.
-void Keep(Bytes&& text, const FileStamp& stamp) {
-  SectionIndex index;
-  if (!index.Build(text.view())) return;
+void Keep(Bytes&& text, SectionIndex&& index, const FileStamp& stamp) {
   void* room = std::malloc(sizeof(KeptFile));
   if (room != nullptr) g_kept = new (room) KeptFile{std::move(text), stamp, std::move(index)};
 }
@@ -107,83 +107,87 @@ void TakeBssid(std::string_view text, WIRELESS_NETWORK& network) {
   std::memcpy(network.bssid, bssid.octets, sizeof network.bssid);
 }
 
+// The value of a text in one of the enumerations.
+template <class Value>
+Value ParseWord(Value (*parse)(const char*), std::string_view text) {
+  char szWord[32];  // longer than any word of an enumeration
+  CopyText(szWord, text);
+  return parse(szWord);
+}
+
 // Takes one pair of the section into the record; a pair of another program's is passed over.
 void Take(const Pair& pair, WIRELESS_NETWORK_CONFIG& config) {
   const auto [key, value] = pair;
-  char szWord[32];  // longer than any word of an enumeration
-  CopyText(szWord, value);
-
-  if (key == kKeySecret) CopyText(config.szKey, value);
-  if (key == kKeyAddress) CopyText(config.szIp, value);
-  if (key == kKeyMask) CopyText(config.szMask, value);
-  if (key == kKeyGateway) CopyText(config.szGateway, value);
-  if (key == kKeyEssid) CopyText(config.network.szEssid, value);
-  if (key == kKeyBssid) TakeBssid(value, config.network);
-  if (key == kKeyMode) config.network.opmode = ParseOpmode(szWord);
+  WIRELESS_NETWORK& network = config.network;
+  if (key == kKeySecret) return CopyText(config.szKey, value);
+  if (key == kKeyAddress) return CopyText(config.szIp, value);
+  if (key == kKeyMask) return CopyText(config.szMask, value);
+  if (key == kKeyGateway) return CopyText(config.szGateway, value);
+  if (key == kKeyEssid) return CopyText(network.szEssid, value);
+  if (key == kKeyBssid) return TakeBssid(value, network);
+  if (key == kKeyMode) network.opmode = ParseWord(ParseOpmode, value);
   if (key == kKeyAccessTime) config.atime = ParseTime(value);
-  if (key == kKeyAuth) config.network.auth = MEROWirelessAuthParse(szWord);
-  if (key == kKeyEncrypt) config.network.encrypt = MEROWirelessEncryptParse(szWord);
+  if (key == kKeyAuth) network.auth = ParseWord(MEROWirelessAuthParse, value);
+  if (key == kKeyEncrypt) network.encrypt = ParseWord(MEROWirelessEncryptParse, value);
 }
 
-WIRELESS_NETWORK_CONFIG ConfigOf(std::string_view section) {
-  WIRELESS_NETWORK_CONFIG config{};
+// Reads the network of a section in a text into the record; kNoSection, and the record as it was, when there is none.
+Status TakeSection(std::string_view text, const std::optional<SectionPlace>& place, WIRELESS_NETWORK_CONFIG& config) {
+  if (!place) return Status::Failed(kNoSection);
+  config = {};
   config.network.opmode = WIRELESS_OPMODE_UNKNOWN;
-  for (Lines lines(section); lines.Next();) {
+  for (Lines lines(Slice(text, place->body, place->end)); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
     if (pair) Take(*pair, config);
   }
-  return config;
+  return Status::Ok();
 }
 
 bool IsFirst(std::string_view text, const SectionPlace& place) {
-  Lines lines(Slice(text, 0, place.header));
-  while (lines.Next()) {
-    if (SectionOfLine(lines.text())) return false;
-  }
-  return true;
+  Sections sections(text);
+  return sections.Next() && sections.place().header == place.header;
 }
 
-// The network of a section in a text; kNoSection when there is none.
-Result<WIRELESS_NETWORK_CONFIG> ConfigAt(std::string_view text, const std::optional<SectionPlace>& place) {
-  if (!place) return Status::Failed(kNoSection);
-  return ConfigOf(Slice(text, place->body, place->end));
-}
-
-Result<WIRELESS_NETWORK_CONFIG> ReadKept(const char* szSection) {
+Status ReadKept(const char* szSection, WIRELESS_NETWORK_CONFIG& config) {
   const std::string_view text = g_kept->text.view();
-  Result<WIRELESS_NETWORK_CONFIG> config = ConfigAt(text, g_kept->index.Find(text, szSection));
+  const Status status = TakeSection(text, g_kept->index.Find(text, szSection), config);
   Advance(false, g_kept->index.headers());
-  return config;
+  return status;
 }
 
-Result<WIRELESS_NETWORK_CONFIG> ReadAnew(const char* szSection, const FileStamp& stamp) {
+Status ReadAnew(const char* szSection, const FileStamp& stamp, WIRELESS_NETWORK_CONFIG& config) {
   Result<Bytes> file = ReadFile(kKnownNetworksPath);
   if (!file.ok()) return file.status();
   const std::string_view text = file->view();
   const std::optional<SectionPlace> place = FindSection(text, szSection);
-  Result<WIRELESS_NETWORK_CONFIG> config = ConfigAt(text, place);
+  const Status status = TakeSection(text, place, config);
 
-  Advance(place && IsFirst(text, *place), CountSections(text));
-  if (g_asked > 0 && HasSettled(stamp)) Keep(std::move(*file), stamp);
-  return config;
+  const bool first = place && IsFirst(text, *place);
+  if (g_asked == 0 && !first) return status;  // no walk
+  if (!HasSettled(stamp)) return Advance(first, CountSections(text)), status;
+  SectionIndex index;
+  if (!index.Build(text)) return EndWalk(), status;
+  Advance(first, index.headers());
+  if (g_asked > 0) Keep(std::move(*file), std::move(index), stamp);
+  return status;
 }
 
 // kNoSection when there is no such section, ENOENT when there is no file.
-Result<WIRELESS_NETWORK_CONFIG> Read(const char* szSection) {
+Status Read(const char* szSection, WIRELESS_NETWORK_CONFIG& config) {
   Result<FileStamp> stamp = StampOf(kKnownNetworksPath);
   if (!stamp.ok()) return EndWalk(), stamp.status();
   if (g_kept != nullptr && !Equal(g_kept->stamp, *stamp)) Drop();
-  return g_kept != nullptr ? ReadKept(szSection) : ReadAnew(szSection, *stamp);
+  if (g_kept == nullptr) return ReadAnew(szSection, *stamp, config);
+  return ReadKept(szSection, config);
 }
 
 }  // namespace
 
 int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg) {
   if (szSection == nullptr || pNetCfg == nullptr) return REFUSE_NULL(), -1;
-  Result<WIRELESS_NETWORK_CONFIG> config = Read(szSection);
-  if (config.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), -1;
-  if (config.error() == kNoSection) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
-  if (!config.ok()) return FAIL(config.error(), "read", kKnownNetworksPath), -1;
-  *pNetCfg = *config;
+  const Status status = Read(szSection, *pNetCfg);
+  if (status.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), -1;
+  if (status.error() == kNoSection) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
+  if (!status.ok()) return FAIL(status.error(), "read", kKnownNetworksPath), -1;
   return 0;
 }

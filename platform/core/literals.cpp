@@ -1,12 +1,12 @@
 // The texts of the radio's enumerations, and back.
 #include "platform/core/literals.h"
 
-#include <charconv>
 #include <cstdio>
 #include <iterator>
 
 #include "common/literals.h"
 #include "common/protocol_texts.h"
+#include "common/text.h"
 #include "platform/base/error.h"
 
 namespace {
@@ -40,6 +40,15 @@ constexpr WIRELESS_LITERAL_MAPPING kOpmodeTexts[] = {
 };
 static_assert(std::size(kOpmodeTexts) == WIRELESS_OPMODE_MAX, "name every operating mode");
 
+// The value of a hexadecimal digit; negative for any other character.
+constexpr int HexDigit(char c) {
+  const bool digit = c >= '0' && c <= '9';
+  const char lower = ToLower(c);
+  const bool letter = lower >= 'a' && lower <= 'f';
+  if (!(digit | letter)) return -1;  // without a branch between the two, which no processor could foretell
+  return (c & 0xF) + 9 * letter;
+}
+
 }  // namespace
 
 WIRELESS_OPMODE ParseOpmode(const char* szOpmode) {
@@ -47,15 +56,15 @@ WIRELESS_OPMODE ParseOpmode(const char* szOpmode) {
 }
 
 std::optional<Bssid> ParseBssid(std::string_view text) {
-  constexpr size_t kDigits = 2;
+  constexpr size_t kStep = 3;  // two digits and a colon
   Bssid bssid;
-  if (text.size() != std::size(bssid.octets) * (kDigits + 1) - 1) return std::nullopt;
-  const char* octet = text.data();
-  for (unsigned char& value : bssid.octets) {
-    const char* end = octet + kDigits;
-    if (std::from_chars(octet, end, value, 16).ptr != end) return std::nullopt;
-    if (end != text.data() + text.size() && *end != ':') return std::nullopt;
-    octet = end + 1;
+  if (text.size() != std::size(bssid.octets) * kStep - 1) return std::nullopt;
+  for (size_t at = 0; at < text.size(); at += kStep) {
+    const int high = HexDigit(text[at]);
+    const int low = HexDigit(text[at + 1]);
+    if (high < 0 || low < 0) return std::nullopt;
+    if (at + 2 < text.size() && text[at + 2] != ':') return std::nullopt;
+    bssid.octets[at / kStep] = static_cast<unsigned char>(high << 4 | low);
   }
   return bssid;
 }

@@ -124,9 +124,8 @@ int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList) {
 
   PLIBSZLIST& list = **ppslList;
   const int before = list.nItem;
-  for (Lines lines(file->view()); lines.Next();) {
-    const std::optional<std::string_view> section = SectionOfLine(lines.text());
-    if (section && !AppendToList(list, *section)) {
+  for (Sections sections(file->view()); sections.Next();) {
+    if (!AppendToList(list, sections.name())) {
       TruncateList(list, before);
       return FAIL(ENOMEM, "read", szPath), -1;
     }

@@ -3,15 +3,40 @@
 
 #include <bit>
 #include <cstdlib>
+#include <cstring>
 
 #include "common/text.h"
 
 namespace {
 
-uint32_t HashOfName(std::string_view name) {
-  uint32_t hash = 2166136261u;
-  for (const char c : name) hash = (hash ^ static_cast<unsigned char>(ToLower(c))) * 16777619u;
-  return hash;
+constexpr size_t kWord = sizeof(uint64_t);
+
+// Eight bytes of a name, the same in any case of their letters.
+uint64_t WordAt(const char* text) {
+  uint64_t word;
+  std::memcpy(&word, text, kWord);
+  return word | 0x2020202020202020;
+}
+
+uint64_t Mix(uint64_t hash, uint64_t word) {
+  return (std::rotl(hash, 32) ^ word) * 0x9E3779B97F4A7C15;
+}
+
+// Equal for names that differ in nothing but the case of letters.
+size_t HashOfName(std::string_view name) {
+  uint64_t hash = name.size();
+  if (name.size() < kWord) {
+    for (const char c : name) hash = Mix(hash, static_cast<unsigned char>(ToLower(c)));
+  } else {
+    const char* last = name.data() + name.size() - kWord;  // may take in bytes that the word before it has
+    for (const char* at = name.data(); at < last; at += kWord) hash = Mix(hash, WordAt(at));
+    hash = Mix(hash, WordAt(last));
+  }
+  return static_cast<size_t>(Mix(hash, 0) >> 32);  // the product's middle, which all that went in has a part in
+}
+
+bool IsSameName(std::string_view a, std::string_view b) {
+  return a == b || EqualIgnoringCase(a, b);
 }
 
 bool IsFree(const SectionPlace& place) {
@@ -20,6 +45,13 @@ bool IsFree(const SectionPlace& place) {
 
 std::string_view NameAt(std::string_view text, const SectionPlace& place) {
   return *SectionOfLine(Slice(text, place.header, place.body));
+}
+
+// No less than the number of sections, and faster than to count them.
+size_t MostSections(std::string_view text) {
+  size_t brackets = 0;
+  for (size_t at = text.find('['); at != std::string_view::npos; at = text.find('[', at + 1)) ++brackets;
+  return brackets;
 }
 
 }  // namespace
@@ -31,32 +63,22 @@ SectionIndex::~SectionIndex() {
 // The slot of a name: where it stands, or the free one where it would.
 SectionPlace* SectionIndex::Slot(std::string_view text, std::string_view name) const {
   size_t slot = HashOfName(name) & (nPlaces_ - 1);
-  while (!IsFree(places_[slot]) && !EqualIgnoringCase(NameAt(text, places_[slot]), name)) {
+  while (!IsFree(places_[slot]) && !IsSameName(NameAt(text, places_[slot]), name)) {
     slot = (slot + 1) & (nPlaces_ - 1);
   }
   return &places_[slot];
 }
 
-// Of a repeated section the first stays.
-void SectionIndex::Add(std::string_view text, const SectionPlace& place) {
-  SectionPlace* slot = Slot(text, NameAt(text, place));
-  if (IsFree(*slot)) *slot = place;
-}
-
 bool SectionIndex::Build(std::string_view text) {
   *this = SectionIndex();
-  nHeaders_ = CountSections(text);
-  nPlaces_ = std::bit_ceil(2 * nHeaders_ + 1);
+  nPlaces_ = std::bit_ceil(2 * MostSections(text) + 1);
   places_ = static_cast<SectionPlace*>(std::calloc(nPlaces_, sizeof(SectionPlace)));
   if (places_ == nullptr) return false;
 
-  std::optional<SectionPlace> open;
-  for (Lines lines(text); lines.Next();) {
-    if (!SectionOfLine(lines.text())) continue;
-    if (open) Add(text, {open->header, open->body, lines.begin()});
-    open = SectionPlace{lines.begin(), lines.end(), text.size()};
+  for (Sections sections(text); sections.Next(); ++nHeaders_) {
+    SectionPlace* slot = Slot(text, sections.name());
+    if (IsFree(*slot)) *slot = sections.place();  // of a repeated section the first stays
   }
-  if (open) Add(text, *open);
   return true;
 }
 

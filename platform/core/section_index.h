@@ -25,7 +25,7 @@ class SectionIndex {
   }
   ~SectionIndex();
 
-  // Walks the text once. False when memory ran out.
+  // Takes linear time. False when memory ran out.
   [[nodiscard]] bool Build(std::string_view text);
 
   // How many sections there are, those included that stand twice.
@@ -36,7 +36,6 @@ class SectionIndex {
 
  private:
   SectionPlace* Slot(std::string_view text, std::string_view name) const;
-  void Add(std::string_view text, const SectionPlace& place);
 
   SectionPlace* places_ = nullptr;  // an open-addressing table; a place without a body is a free slot
   size_t nPlaces_ = 0;              // a power of two, at least twice the number of sections

@@ -3,22 +3,6 @@
 
 #include "common/text.h"
 
-bool Lines::Next() {
-  begin_ = end_;
-  if (begin_ == text_.size()) return false;
-  const size_t feed = text_.find('\n', begin_);
-  end_ = feed == std::string_view::npos ? text_.size() : feed + 1;
-  return true;
-}
-
-std::string_view Lines::text() const {
-  std::string_view line = whole();
-  if (!line.ends_with('\n')) return line;
-  line.remove_suffix(1);
-  if (line.ends_with('\r')) line.remove_suffix(1);
-  return line;
-}
-
 namespace {
 
 std::string_view Unquoted(std::string_view value) {
@@ -55,9 +39,10 @@ Status Expand(Bytes& to, std::string_view format, Pair pair) {
 
 std::optional<Pair> PairOfLine(std::string_view line, ValueForm form) {
   const size_t equals = line.find('=');
-  if (equals == std::string_view::npos || SectionOfLine(line)) return std::nullopt;
+  if (equals == std::string_view::npos) return std::nullopt;
   const std::string_view key = Trim(Slice(line, 0, equals));
   if (key.empty() || key.front() == '#' || key.front() == ';') return std::nullopt;
+  if (key.front() == '[' && SectionOfLine(line)) return std::nullopt;
   const std::string_view value = Slice(line, equals + 1);
   return Pair{key, form == ValueForm::kShell ? Unquoted(Trim(value)) : value};
 }
@@ -68,23 +53,38 @@ std::optional<std::string_view> SectionOfLine(std::string_view line) {
   return Trim(Slice(line, 1, line.size() - 1));
 }
 
-std::optional<SectionPlace> FindSection(std::string_view text, std::string_view name) {
-  std::optional<SectionPlace> place;
-  for (Lines lines(text); lines.Next();) {
-    const std::optional<std::string_view> section = SectionOfLine(lines.text());
-    if (!section) continue;
-    if (place) {
-      place->end = lines.begin();
-      return place;
-    }
-    if (EqualIgnoringCase(*section, name)) place = SectionPlace{lines.begin(), lines.end(), text.size()};
+// Looks for brackets, which are rare, so that most lines are never looked at one by one.
+std::optional<Sections::Header> Sections::HeaderFrom(size_t line) const {
+  for (size_t bracket = text_.find('[', line); bracket != std::string_view::npos; bracket = text_.find('[', line)) {
+    size_t begin = bracket;
+    while (begin > line && text_[begin - 1] != '\n' && IsSpace(text_[begin - 1])) --begin;
+    const bool first = begin == line || text_[begin - 1] == '\n';
+    line = LineEnd(text_, bracket);
+    if (!first) continue;
+    if (const auto name = SectionOfLine(Slice(text_, begin, line))) return Header{*name, begin, line};
   }
-  return place;
+  return std::nullopt;
+}
+
+bool Sections::Next() {
+  if (!next_) return false;
+  const Header header = *next_;
+  next_ = HeaderFrom(header.end);
+  name_ = header.name;
+  place_ = {header.begin, header.end, next_ ? next_->begin : text_.size()};
+  return true;
+}
+
+std::optional<SectionPlace> FindSection(std::string_view text, std::string_view name) {
+  for (Sections sections(text); sections.Next();) {
+    if (EqualIgnoringCase(sections.name(), name)) return sections.place();
+  }
+  return std::nullopt;
 }
 
 size_t CountSections(std::string_view text) {
   size_t count = 0;
-  for (Lines lines(text); lines.Next();) count += SectionOfLine(lines.text()).has_value() ? 1 : 0;
+  for (Sections sections(text); sections.Next();) ++count;
   return count;
 }
 

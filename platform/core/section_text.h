@@ -9,16 +9,33 @@
 #include "platform/base/bytes.h"
 #include "platform/base/result.h"
 
+// Where the line ends that holds the byte at `offset`: behind its feed, or where the text ends.
+inline size_t LineEnd(std::string_view text, size_t offset) {
+  const size_t feed = text.find('\n', offset);
+  return feed == std::string_view::npos ? text.size() : feed + 1;
+}
+
 // Walks a text line by line.
 class Lines {
  public:
   explicit Lines(std::string_view text) : text_(text) {}
 
   // Moves on to the next line; false at the end.
-  bool Next();
+  bool Next() {
+    begin_ = end_;
+    if (begin_ == text_.size()) return false;
+    end_ = LineEnd(text_, begin_);
+    return true;
+  }
 
   std::string_view whole() const { return Slice(text_, begin_, end_); }  // with its line end
-  std::string_view text() const;                                         // without
+  std::string_view text() const {                                        // without
+    std::string_view line = whole();
+    if (!line.ends_with('\n')) return line;
+    line.remove_suffix(1);
+    if (line.ends_with('\r')) line.remove_suffix(1);
+    return line;
+  }
   size_t begin() const { return begin_; }
   size_t end() const { return end_; }
 
@@ -50,6 +67,33 @@ struct SectionPlace {
   size_t header;
   size_t body;
   size_t end;
+};
+
+// Walks a text section by section.
+class Sections {
+ public:
+  explicit Sections(std::string_view text) : text_(text), next_(HeaderFrom(0)) {}
+
+  // Moves on to the next section; false at the end.
+  bool Next();
+
+  std::string_view name() const { return name_; }
+  const SectionPlace& place() const { return place_; }
+
+ private:
+  struct Header {
+    std::string_view name;
+    size_t begin;
+    size_t end;
+  };
+
+  // The first header from the line on that begins at this offset.
+  std::optional<Header> HeaderFrom(size_t line) const;
+
+  std::string_view text_;
+  std::optional<Header> next_;
+  std::string_view name_;
+  SectionPlace place_{};
 };
 
 // The first section of that name; none when absent. Names compare without regard to ASCII case.
