@@ -48,6 +48,7 @@ void SortSlowly(WIRELESS_LIST& head) {
 }
 
 void SortBySaveTime(WIRELESS_LIST& head) {
+  if (IsEmpty(head)) return;
   const std::unique_ptr<Place[], FreeRecord> places(static_cast<Place*>(std::calloc(LengthOf(head), sizeof(Place))));
   if (!places) return SortSlowly(head);
 
