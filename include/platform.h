@@ -232,6 +232,13 @@ int PLIBCFileSetSection(const char* szPath, const char* szSection, const char* s
 int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const char* szKey, const char* szValue,
                              const char* szFormat);
 
+/**
+ * Removes every section of a name, with all that stands in it up to the next section.
+ *
+ * @return 1 removed, 0 no such section or file, -1 on failure.
+ */
+int PLIBCFileRemoveSection(const char* szPath, const char* szSection);
+
 /* ---- Commands ------------------------------------------------------------------------------------------------- */
 
 /**

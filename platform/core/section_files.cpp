@@ -105,6 +105,18 @@ Status ComposeValue(std::string_view text, const char* szSection, const Pair& pa
   return AppendText(content, Slice(text, place.end));
 }
 
+// Appends a text but for its sections of a name; false when memory ran out.
+bool AppendWithout(Bytes& content, std::string_view text, std::string_view name) {
+  size_t copied = 0;
+  for (Sections sections(text); sections.Next();) {
+    if (!EqualIgnoringCase(sections.name(), name)) continue;
+    const SectionPlace& place = sections.place();
+    if (!content.Append(Slice(text, copied, place.header))) return false;
+    copied = place.end;
+  }
+  return content.Append(Slice(text, copied));
+}
+
 int WriteSection(const char* szPath, const char* szSection, const char* szNewName, const NewPairs& pairs) {
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
     return ComposeSection(text, szSection, szNewName, pairs, content);
@@ -172,4 +184,18 @@ int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const ch
   });
   if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
   return 0;
+}
+
+int PLIBCFileRemoveSection(const char* szPath, const char* szSection) {
+  if (szPath == nullptr || szSection == nullptr) return REFUSE_NULL(), -1;
+
+  Result<FileEdit> edit = FileEdit::Open(szPath, 0);
+  if (edit.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
+  if (!edit.ok()) return FAIL(edit.error(), "read", szPath), -1;
+
+  Bytes content;
+  if (!AppendWithout(content, edit->text(), szSection)) return FAIL(ENOMEM, "write", szPath), -1;
+  if (content.view().size() == edit->text().size()) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
+  if (Status status = edit->Commit(content.view()); !status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  return 1;
 }

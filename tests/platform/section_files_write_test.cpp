@@ -48,6 +48,31 @@ TEST_F(SectionFileThatIsWritten, GetsNoSecondSectionOfOneName) {
   EXPECT_EQ(Add("[A]\n\tKEY=rival\n[b]\n", "a", {{"KEY", "v"}}), "[A]\n\tKEY=v\n[b]\n");
 }
 
+TEST_F(SectionFileThatIsWritten, LosesASectionAndNoOtherByte) {
+  const struct {
+    const char* szBefore;
+    const char* szAfter;
+  } rows[] = {
+      {"[a]\n", ""},
+      {"[a]", ""},
+      {"HEAD=1\n\n[b]\nK=b\n [ A ] \r\nK=a\n# of a\n\n[c]\nK=c", "HEAD=1\n\n[b]\nK=b\n[c]\nK=c"},
+      {"[a]\nK=1\n[b]\nK=[a]\n[a]\nK=2\n", "[b]\nK=[a]\n"},
+  };
+  for (const auto& row : rows) {
+    WriteFile(kFile, row.szBefore);
+    EXPECT_EQ(PLIBCFileRemoveSection(kFile, "a"), 1) << row.szBefore;
+    EXPECT_EQ(ReadFile(kFile), row.szAfter);
+  }
+  EXPECT_EQ(PLIBCFileRemoveSection(kFile, "c"), 0);
+  EXPECT_EQ(PLIBCErrGet(), ERR_SECTION_NOT_FOUND);
+  EXPECT_EQ(ReadFile(kFile), "[b]\nK=[a]\n");
+  EXPECT_EQ(PLIBCFileRemoveSection("/tmp/platform/missing", "a"), 0);
+  EXPECT_EQ(PLIBCErrGet(), ERR_FILE_NOT_FOUND);
+  EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file"));
+  EXPECT_EQ(PLIBCFileRemoveSection(kFile, nullptr), -1);
+  ExpectFailure(ERR_BAD_PARAMETERS, "Bad parameters");
+}
+
 TEST_F(SectionFileThatIsWritten, HasThePairsOfOneSectionReplacedAndNoOtherByte) {
   const struct {
     std::string before;

@@ -62,6 +62,7 @@
   FAKE(PLIBCFileAddSection, kPlatform, 4)             \
   FAKE(PLIBCFileSetSection, kPlatform, 5)             \
   FAKE(PLIBCFileSetSectionValue, kPlatform, 5)        \
+  FAKE(PLIBCFileRemoveSection, kPlatform, 2)          \
   FAKE(PLIBCExec, kPlatform, 5)                       \
   FAKE(PLIBCSysUnlink, kPlatform, 1)                  \
   FAKE(PLIBCSysRemove, kPlatform, 1)                  \
