@@ -1,0 +1,248 @@
+// The commands about the access point.
+#include <cstring>
+
+#include "running.h"
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+
+namespace {
+
+MERO_AP_CONF Settings() {
+  MERO_AP_CONF conf{};
+  std::strcpy(conf.szSecName, "ExampleStick");
+  MERO_HOSTAP_CONF& main = conf.hostapConf;
+  std::strcpy(main.szSSID, "Office");
+  std::strcpy(main.szBridge, "lbr0");
+  main.hwMode = AP_MODE_80211G;
+  main.ieee80211n = 1;
+  main.wirelessWidth = AP_FREQ_ALL;
+  main.channel = 6;
+  main.maxStation = 256;
+  main.wmm = 1;
+  main.encryption = AP_ENCRYPT_WPA_PSK;
+  main.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
+  main.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
+  std::strcpy(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
+  std::strcpy(main.guestNet.szSSID, "Guests");
+  main.guestNet.maxStation = 10;
+  conf.txpower = 10;
+  conf.guestNetAccessRule.blLanBlock = TRUE;
+  return conf;
+}
+
+// What the last save was given; shared with the process that saves.
+void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
+  library::MEROWirelessSetAPConfig = [show](PMERO_AP_CONF conf) {
+    library::Record((conf->blEnable == TRUE ? "on: " : "off: ") + show(*conf));
+    return TRUE;
+  };
+}
+
+class AccessPoint : public ToolTest {
+ protected:
+  AccessPoint() { library::SavedAp(Settings()); }
+};
+
+TEST_F(AccessPoint, IsShownWithoutItsSecrets) {
+  const Ran ran = Tool({"ap", "show"});
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_THAT(ran.out, testing::StartsWith("access point           off\n"
+                                           "name                   Office\n"
+                                           "security               wpa2\n"
+                                           "cipher                 aes\n"
+                                           "RADIUS server          -\n"
+                                           "band                   2.4 GHz\n"
+                                           "mode                   gn\n"
+                                           "channel                6\n"
+                                           "width                  20 and 40 MHz\n"));
+  for (const char* form : {"-v", "--json", "--porcelain"}) {
+    EXPECT_THAT(Tool({"ap", "show", form}).out, Not(HasSubstr("sesame"))) << form;
+    EXPECT_THAT(Tool({"ap", "show", form, "--show-secrets"}).out, HasSubstr("open sesame")) << form;
+  }
+  EXPECT_THAT(Tool({"ap", "show", "--json"}).out, HasSubstr(R"("has_secret":true,"guest_has_secret":false}})"));
+}
+
+TEST_F(AccessPoint, KeepsItsSwitchAndOtherSettingsWhenOneIsChanged) {
+  RecordSaves([](const MERO_AP_CONF& of) {
+    return std::string(of.hostapConf.szSSID) + "|" + std::to_string(of.hostapConf.channel) + "|" +
+           of.hostapConf.encryptInfo.wpaPskInfo.szPassPhrase;
+  });
+  const Ran ran = Tool({"ap", "set", "--channel", "11"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: Office|11|open sesame",
+                                            "MEROWirelessSetAPConfig", "off: Office|11|open sesame"));
+}
+
+TEST_F(AccessPoint, WithoutSettingsKeepsItsGuestsFromWhatIsNotTheirs) {
+  library::MEROWirelessGetAPConfig = [](const char*, PMERO_AP_CONF conf) {
+    std::strcpy(conf->hostapConf.szSSID, "Office");
+    std::strcpy(conf->hostapConf.szBridge, "lbr0");
+    return 0;
+  };
+  RecordSaves([](const MERO_AP_CONF& of) {
+    return std::to_string(of.guestNetAccessRule.blLanBlock) + std::to_string(of.hostapConf.guestNet.blAPIsolate);
+  });
+  EXPECT_EQ(Tool({"ap", "set", "--guest", "yes", "--guest-ssid", "Guests"}).status, 0);
+  EXPECT_EQ(library::Calls()[1], "on: 11");
+}
+
+TEST_F(AccessPoint, ThatIsEnabledIsSavedOnce) {
+  MERO_AP_CONF conf = Settings();
+  conf.blEnable = TRUE;
+  library::SavedAp(conf);
+  EXPECT_EQ(Tool({"ap", "set", "--ssid", "New"}).status, 0);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig"));
+}
+
+TEST_F(AccessPoint, TakesAllSettingsByTheNamesThatPeopleHaveForThem) {
+  std::string week;
+  for (int day = 0; day < 7; ++day) week += "000000001111111111110000\n";
+  WriteText("/tmp/week", week);
+  RecordSaves([](const MERO_AP_CONF& of) {
+    const MERO_HOSTAP_CONF& main = of.hostapConf;
+    std::string text;
+    for (int value : {main.hwMode, main.ieee80211n, main.channel, main.wirelessWidth, int{main.encryption},
+                      main.encryptInfo.wpaPskInfo.wpaType, main.encryptInfo.wpaPskInfo.encryptType, main.hideSSID,
+                      main.maxStation, main.wmm, of.txpower, of.wifiSchedConf.wifiSchedEnabled,
+                      int{main.guestNet.blEnable}, int{main.guestNet.encryption}, int{main.guestNet.blAPIsolate},
+                      int{of.guestNetAccessRule.blLanBlock}, int{of.guestNetAccessRule.blInternetBlock},
+                      int{of.guestNetAccessRule.blAccessDS}, int{of.guestNetAccessRule.blAllowHttp}}) {
+      text += std::to_string(value) + " ";
+    }
+    return text + main.szBridge + " " + main.encryptInfo.wpaPskInfo.szPassPhrase + " " +
+           main.guestNet.encryptInfo.wpaPskInfo.szPassPhrase + " " +
+           std::string(of.wifiSchedConf.szWifiSched).substr(0, 12);
+  });
+  WriteText("/tmp/main-key", "main secret\n");
+  WriteText("/tmp/guest-key", "guest secret\n");
+  const Ran ran = Tool({"ap",
+                        "set",
+                        "--band",
+                        "5",
+                        "--mode",
+                        "an",
+                        "--channel",
+                        "44",
+                        "--width",
+                        "40",
+                        "--security",
+                        "mixed",
+                        "--cipher",
+                        "both",
+                        "--key-file",
+                        "/tmp/main-key",
+                        "--hidden",
+                        "yes",
+                        "--max-stations",
+                        "12",
+                        "--wmm",
+                        "no",
+                        "--tx-power",
+                        "20",
+                        "--schedule",
+                        "/tmp/week",
+                        "--guest",
+                        "yes",
+                        "--guest-security",
+                        "wpa2",
+                        "--guest-key-file",
+                        "/tmp/guest-key",
+                        "--guest-isolated",
+                        "yes",
+                        "--guest-lan",
+                        "yes",
+                        "--guest-internet",
+                        "no",
+                        "--guest-appliance",
+                        "yes",
+                        "--guest-web",
+                        "no",
+                        "--bridge",
+                        "br7"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(library::Calls()[1],
+            "on: 1 1 44 2 2 3 3 1 12 0 20 1 1 2 1 0 1 1 0 br7 main secret guest secret 000000001111");
+}
+
+TEST_F(AccessPoint, RefusesSettingsThatCannotBe) {
+  WriteText("/tmp/short", "seven77\n");
+  WriteText("/tmp/week", "0101\n");
+  const std::pair<std::vector<std::string>, int> wrong[] = {
+      {{}, 2},
+      {{"--channel", "36"}, 2},
+      {{"--band", "5", "--channel", "6"}, 2},
+      {{"--band", "6"}, 2},
+      {{"--channel", "eleven"}, 2},
+      {{"--ssid", ""}, 2},
+      {{"--ssid", std::string(33, 'x')}, 2},
+      {{"--security", "wpa3"}, 2},
+      {{"--security", "wep"}, 2},
+      {{"--security", "eap"}, 2},
+      {{"--security", "open", "--cipher", "aes"}, 2},
+      {{"--radius-server", "10.0.0.1"}, 2},
+      {{"--key-file", "/tmp/short"}, 5},
+      {{"--hidden", "perhaps"}, 2},
+      {{"--max-stations", "0"}, 2},
+      {{"--bridge", "../x"}, 2},
+      {{"--bridge", "a-name-of-sixteen"}, 2},
+      {{"--schedule", "/tmp/week"}, 2},
+      {{"--guest", "yes", "--guest-security", "wpa2"}, 2},
+      {{"--guest-security", "eap"}, 2},
+      {{"--guest-key-file", "/tmp/short"}, 2},
+  };
+  for (const auto& [options, status] : wrong) {
+    std::vector<std::string> arguments{"ap", "set"};
+    arguments.insert(arguments.end(), options.begin(), options.end());
+    const Ran ran = Tool(arguments);
+    EXPECT_EQ(ran.status, status) << testing::PrintToString(options) << ran.err;
+    EXPECT_THAT(ran.err, testing::MatchesRegex("merowireless: [^\n]+: [^\n]+\n")) << testing::PrintToString(options);
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(AccessPoint, IsEnabledAndDisabledTogetherWithItsSwitch) {
+  RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
+  EXPECT_EQ(Tool({"ap", "enable"}).out, "the access point Office is enabled\n");
+  EXPECT_EQ(Tool({"ap", "disable"}).out, "the access point is disabled\n");
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable",
+                                            "MEROWirelessAPDisable", "MEROWirelessSetAPConfig", "off: "));
+}
+
+TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
+  const std::pair<const char*, const char*> reports[] = {
+      {"Another ap construction is going", "is being set up already"},
+      {"Failed to restart /etc/rc.network", "the network start script failed"},
+      {"Failed to enable AP.", "could not be enabled"},
+  };
+  for (const auto& [szReport, szSentence] : reports) {
+    library::MEROWirelessAPEnable = [szReport] { return library::Report(szReport), FALSE; };
+    const Ran ran = Tool({"ap", "enable"});
+    EXPECT_EQ(ran.status, 1);
+    EXPECT_THAT(ran.err, HasSubstr(szSentence));
+  }
+}
+
+TEST_F(AccessPoint, TellsWhetherItIsOnTheAir) {
+  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}).out, "off\tOffice\tno\twlan0\n");
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
+    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
+  };
+  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}).out, "on-air\tOffice\tno\twlan0\n");
+  library::MEROWirelessTestAPMode = [] { return TRUE; };
+  EXPECT_EQ(Tool({"ap", "status", "--json"}).out,
+            R"({"result":"ok","access_point":{"state":"setting-up","name":"Office","enabled":false,)"
+            R"("interface":"wlan0"}})"
+            "\n");
+}
+
+TEST_F(AccessPoint, NeedsAnAdapterThatHasBeenAnnounced) {
+  library::MEROWirelessApConfigSecNameGet = [](char*, size_t) { return FALSE; };
+  EXPECT_EQ(Tool({"ap", "show"}).status, 1);
+  library::MEROWirelessAdapterNum = [] { return 0; };
+  EXPECT_EQ(Tool({"ap", "show"}).status, 3);
+}
+
+}  // namespace

@@ -1,0 +1,166 @@
+// The functions that the program comes upon instead of the library's.
+#include "library_fakes.h"
+
+#include <search.h>
+#include <sys/mman.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <sstream>
+
+namespace library {
+
+#define DEFINE(name, count) std::function<decltype(::name)> name;
+LIBRARY_QUERIES(DEFINE)
+LIBRARY_ACTIONS(DEFINE)
+#undef DEFINE
+
+namespace {
+
+int g_calls = -1;  // shared with the processes that are forked
+
+template <class Record>
+void Fill(WIRELESS_LIST* head, const std::vector<Record>& records) {
+  head->q_forw = head;
+  head->q_back = head;
+  for (const Record& record : records) {
+    auto* copy = static_cast<Record*>(std::malloc(sizeof(Record)));
+    std::memcpy(copy, &record, sizeof record);
+    ::insque(&copy->list, head->q_back);
+  }
+}
+
+template <std::size_t kSize>
+void SetText(char (&field)[kSize], std::string_view text) {
+  const std::size_t size = std::min(text.size(), kSize - 1);
+  std::copy_n(text.data(), size, field);
+  field[size] = '\0';
+}
+
+}  // namespace
+
+void Reset() {
+  if (g_calls >= 0) ::close(g_calls);
+  g_calls = ::memfd_create("calls", MFD_CLOEXEC);
+
+#define GIVE_ZERO(name, count) name = [](auto&&...) { return decltype(name)::result_type{}; };
+  LIBRARY_ACTIONS(GIVE_ZERO)
+  LIBRARY_QUERIES(GIVE_ZERO)
+#undef GIVE_ZERO
+  MEROWirelessAdapterNum = [] { return 1; };
+  MEROWirelessInterfaceGet = [] { return "wlan0"; };
+  MEROWirelessCheckBlock = [] { return 1; };
+  MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
+  for (auto* enable : {&MEROWirelessAPEnable, &MEROWirelessAPDisable}) *enable = [] { return TRUE; };
+  MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return TRUE; };
+  MEROWirelessApConfigSecNameGet = [](char* szName, size_t) { return std::strcpy(szName, "ExampleStick"), TRUE; };
+  MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return TRUE; };
+  InRange({});
+  Known({});
+}
+
+void Record(std::string_view what) {
+  const std::string line = std::string(what) + "\n";
+  if (::write(g_calls, line.data(), line.size()) < 0) std::abort();
+}
+
+std::vector<std::string> Calls() {
+  std::string text(static_cast<std::size_t>(::lseek(g_calls, 0, SEEK_END)), '\0');
+  if (::pread(g_calls, text.data(), text.size(), 0) < 0) std::abort();
+  std::istringstream lines(text);
+  std::vector<std::string> calls;
+  for (std::string line; std::getline(lines, line);) calls.push_back(line);
+  return calls;
+}
+
+WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt) {
+  WIRELESS_NETWORK network{};
+  SetText(network.szEssid, name);
+  for (unsigned char& octet : network.bssid) octet = 0x0A;
+  network.channel = 6;
+  network.signal = 74;
+  network.protocol = WIRELESS_PROTO_11BGN;
+  network.auth = auth;
+  network.encrypt = encrypt;
+  return network;
+}
+
+void InRange(std::vector<WIRELESS_NETWORK> networks) {
+  MEROWirelessNetworkScan = [networks](WIRELESS_SCAN, WIRELESS_LIST* head) { return Fill(head, networks), 0; };
+  MEROWirelessNetworkGet = [networks](const char* szValue, WIRELESS_FILTER filter, WIRELESS_NETWORK* found) {
+    for (const WIRELESS_NETWORK& network : networks) {
+      const bool matches = filter == WIRELESS_FILTER_ESSID ? std::strcmp(network.szEssid, szValue) == 0
+                                                           : std::memcmp(network.bssid, szValue, 6) == 0;
+      if (matches) return *found = network, 1;
+    }
+    return 0;
+  };
+}
+
+void Known(std::vector<WIRELESS_NETWORK_CONFIG> configs) {
+  MEROWirelessConfEnum = [configs](WIRELESS_LIST* head) { return Fill(head, configs), 0; };
+  std::ranges::sort(configs, std::greater{}, &WIRELESS_NETWORK_CONFIG::atime);
+  MEROWirelessConfEnumByAtime = [configs](WIRELESS_LIST* head) { return Fill(head, configs), 0; };
+}
+
+void Connected(std::string_view name) {
+  MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_CONNECTED_MANAGED; };
+  MEROWirelessCurInfoGet = [name = std::string(name)](WIRELESS_REQUEST request, PWIRELESS_INFO info) {
+    if (request == REQUEST_ESSID) SetText(info->szEssid, name);
+    if (request == REQUEST_AUTH) info->auth = WIRELESS_AUTH_WPA2PSK;
+    if (request == REQUEST_PROTOCOL) info->protocol = WIRELESS_PROTO_11BGN;
+    if (request == REQUEST_MODE) info->opmode = WIRELESS_OPMODE_MANAGED;
+    return 0;
+  };
+}
+
+void SavedAp(const MERO_AP_CONF& conf) {
+  MEROWirelessGetAPConfig = [conf](const char*, PMERO_AP_CONF read) { return *read = conf, 1; };
+}
+
+void Report(const char* szMessage) {
+  ::syslog(LOG_ERR, "%s:%d %s", "unit", 7, szMessage);
+}
+
+}  // namespace library
+
+namespace {
+
+template <class Function>
+struct Signature;
+
+template <class R, class... Args>
+struct Signature<R(Args...)> {
+  using Result = R;
+  template <std::size_t kIndex>
+  using Argument = std::tuple_element_t<kIndex, std::tuple<Args...>>;
+};
+
+}  // namespace
+
+#define ARGUMENT(name, index) Signature<decltype(::name)>::Argument<index>
+#define PARAMETERS_0(name)
+#define PARAMETERS_1(name) ARGUMENT(name, 0) a
+#define PARAMETERS_2(name) PARAMETERS_1(name), ARGUMENT(name, 1) b
+#define PARAMETERS_3(name) PARAMETERS_2(name), ARGUMENT(name, 2) c
+#define PARAMETERS_5(name) PARAMETERS_3(name), ARGUMENT(name, 3) d, ARGUMENT(name, 4) e
+#define VALUES_0
+#define VALUES_1 a
+#define VALUES_2 a, b
+#define VALUES_3 a, b, c
+#define VALUES_5 a, b, c, d, e
+
+#define DEFINE_QUERY(name, count)                                                 \
+  extern "C" Signature<decltype(::name)>::Result name(PARAMETERS_##count(name)) { \
+    return library::name(VALUES_##count);                                         \
+  }
+#define DEFINE_ACTION(name, count)                                                \
+  extern "C" Signature<decltype(::name)>::Result name(PARAMETERS_##count(name)) { \
+    library::Record(#name);                                                       \
+    return library::name(VALUES_##count);                                         \
+  }
+LIBRARY_QUERIES(DEFINE_QUERY)
+LIBRARY_ACTIONS(DEFINE_ACTION)

@@ -1,0 +1,196 @@
+// scan, known, save and forget.
+#include <cstring>
+
+#include "running.h"
+
+using library::Network;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+using testing::StartsWith;
+
+namespace {
+
+constexpr char kSecretPath[] = "/tmp/secret";
+
+WIRELESS_NETWORK_CONFIG Home() {
+  WIRELESS_NETWORK_CONFIG config{};
+  config.network = Network("Home");
+  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  config.atime = 1795174528;
+  std::strcpy(config.szKey, "open sesame");
+  std::strcpy(config.szIp, "DHCP");
+  return config;
+}
+
+// What a save was given.
+void RecordSaves() {
+  library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG* config) {
+    library::Record(std::string(config->network.szEssid) + "|" + config->szKey + "|" + config->szIp + "|" +
+                    config->szMask + "|" + config->szGateway + "|" + std::to_string(config->network.auth) + "|" +
+                    std::to_string(config->network.opmode));
+    return 0;
+  };
+}
+
+class Networks : public ToolTest {
+ protected:
+  Networks() {
+    library::InRange({Network("Home")});
+    RecordSaves();
+    WriteText(kSecretPath, "open sesame\n");
+  }
+};
+
+TEST_F(Networks, AreScannedForAfreshOnRequestOnly) {
+  library::MEROWirelessNetworkScan = [](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
+    head->q_forw = head->q_back = head;
+    library::Record(std::to_string(scan));
+    return 0;
+  };
+  EXPECT_EQ(Tool({"scan"}).out, "no network is in range\n");
+  EXPECT_EQ(Tool({"scan", "--renew", "--json"}).out, "{\"result\":\"ok\",\"networks\":[]}\n");
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkScan", "0", "MEROWirelessNetworkScan", "1"));
+}
+
+TEST_F(Networks, CannotBeScannedForWithoutAnAdapter) {
+  library::MEROWirelessNetworkScan = [](WIRELESS_SCAN, WIRELESS_LIST*) { return -1; };
+  EXPECT_EQ(Tool({"scan"}).status, 1);
+  library::MEROWirelessAdapterNum = [] { return 0; };
+  EXPECT_EQ(Tool({"scan"}).status, 3);
+}
+
+TEST_F(Networks, ThatAreKnownAreListedWithoutTheirSecrets) {
+  library::Known({Home()});
+  const Surroundings utc{.environment = {{"TZ", "UTC"}}};
+  EXPECT_EQ(Tool({"known"}, utc).out,
+            "NAME  SECURITY  ADDRESS  SAVED             ACCESS POINT\n"
+            "Home  WPA2 AES  DHCP     2026-11-20 11:35  0A:0A:0A:0A:0A:0A\n");
+  EXPECT_EQ(Tool({"known", "--json"}).out,
+            R"({"result":"ok","networks":[{"name":"Home","auth":"WPA2PSK","encryption":"AES","mode":"MANAGED",)"
+            R"("ip":"DHCP","mask":"","gateway":"","saved":"2026-11-20T11:35:28Z","address":"0A:0A:0A:0A:0A:0A",)"
+            R"("name_hex":null,"has_secret":true}]})"
+            "\n");
+  EXPECT_EQ(Tool({"known", "--porcelain"}).out,
+            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t2026-11-20T11:35:28Z\t0A:0A:0A:0A:0A:0A\t\tyes\n");
+}
+
+TEST_F(Networks, ShowTheirSecretsOnRequest) {
+  library::Known({Home()});
+  for (const char* form : {"--json", "--porcelain", "-v"}) {
+    EXPECT_THAT(Tool({"known", form, "--show-secrets"}).out, HasSubstr("open sesame")) << form;
+    EXPECT_THAT(Tool({"known", form}).out, Not(HasSubstr("open sesame"))) << form;
+  }
+}
+
+TEST_F(Networks, AreListedInTheOrderAskedFor) {
+  WIRELESS_NETWORK_CONFIG later = Home();
+  later.atime += 1;
+  std::strcpy(later.network.szEssid, "Later");
+  library::Known({Home(), later});
+  EXPECT_THAT(Tool({"known", "--porcelain"}).out, StartsWith("Home"));
+  EXPECT_THAT(Tool({"known", "--porcelain", "--by-time"}).out, StartsWith("Later"));
+}
+
+TEST_F(Networks, AreForgottenByNameWithAllTheirAccessPoints) {
+  WIRELESS_NETWORK_CONFIG other = Home();
+  other.network.bssid[5] = 0x0b;
+  WIRELESS_NETWORK_CONFIG cafe = Home();
+  cafe.network = Network("Cafe");
+  library::Known({Home(), cafe, other});
+  library::PLIBCFileRemoveSection = [](const char* szPath, const char* szSection) {
+    library::Record(std::string(szPath) + " " + szSection);
+    return 1;
+  };
+  EXPECT_EQ(Tool({"forget", "Home"}).out, "forgot Home\n");
+  EXPECT_THAT(library::Calls(), ElementsAre("PLIBCFileRemoveSection", "/usr/mero/etc/wireless.conf 0A:0A:0A:0A:0A:0A",
+                                            "PLIBCFileRemoveSection", "/usr/mero/etc/wireless.conf 0A:0A:0A:0A:0A:0B"));
+}
+
+TEST_F(Networks, AreForgottenByAddressAndToldToMachines) {
+  library::Known({Home()});
+  EXPECT_EQ(Tool({"forget", "0a:0a:0a:0a:0a:0a", "--porcelain"}).out,
+            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t2026-11-20T11:35:28Z\t0A:0A:0A:0A:0A:0A\t\tyes\n");
+  EXPECT_THAT(Tool({"forget", "Home", "--json"}).out, StartsWith(R"({"result":"ok","networks":[{"name":"Home")"));
+}
+
+TEST_F(Networks, ThatAreNotKnownOrCannotBeForgottenAreAFailure) {
+  library::Known({Home()});
+  Ran ran = Tool({"forget", "Elsewhere"});
+  EXPECT_EQ(ran.status, 4);
+  EXPECT_EQ(ran.err, "merowireless: no network named Elsewhere is known: `merowireless known` lists those that are\n");
+  library::PLIBCFileRemoveSection = [](const char*, const char*) { return -1; };
+  ran = Tool({"forget", "Home"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.err, "merowireless: Home could not be forgotten: are you root? -v shows more\n");
+}
+
+TEST_F(Networks, AreSavedAsTheScanDescribesThem) {
+  const Ran ran = Tool({"save", "Home", "--key-file", kSecretPath});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(ran.out, "saved Home (0A:0A:0A:0A:0A:0A)\n");
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessConfSet", "Home|open sesame|DHCP|||5|2"));
+}
+
+TEST_F(Networks, ThatHaveJustBeenSavedAreToldToMachines) {
+  EXPECT_EQ(Tool({"save", "Home", "--key-file", kSecretPath, "--porcelain"}).out,
+            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t\t0A:0A:0A:0A:0A:0A\t\tyes\n");
+}
+
+TEST_F(Networks, AreSavedByTheAddressOfTheirAccessPoint) {
+  EXPECT_EQ(Tool({"save", "0a:0a:0a:0a:0a:0a", "--key-stdin"}, {.input = "open sesame"}).status, 0);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessConfSet", "Home|open sesame|DHCP|||5|2"));
+}
+
+TEST_F(Networks, AreSavedWithAStaticAddress) {
+  EXPECT_EQ(Tool({"save", "Home", "--key-file", kSecretPath, "--ip", "10.0.0.9", "--mask", "255.255.255.0", "--gateway",
+                  "10.0.0.1"})
+                .status,
+            0);
+  EXPECT_THAT(library::Calls().back(), "Home|open sesame|10.0.0.9|255.255.255.0|10.0.0.1|5|2");
+}
+
+TEST_F(Networks, ThatHideAreSavedAsDescribed) {
+  library::InRange({});
+  EXPECT_EQ(Tool({"save", "Hidden", "--bssid", "00:11:22:33:44:55", "--security", "open"}).status, 0);
+  EXPECT_EQ(library::Calls().back(), "Hidden||DHCP|||1|2");
+}
+
+TEST_F(Networks, ThatAreOutOfRangeAreNotSaved) {
+  const Ran ran = Tool({"save", "Elsewhere"});
+  EXPECT_EQ(ran.status, 4);
+  EXPECT_EQ(ran.err,
+            "merowireless: no network named Elsewhere is in range: `merowireless scan --renew` shows those that are\n");
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirSecret) {
+  for (const std::string secret : {"", "short", "twenty-one\nlines", "non\xC3\xA9scii", "x\ty-z-1-2-3"}) {
+    const Ran ran = Tool({"save", "Home", "--key-stdin"}, {.input = secret});
+    EXPECT_EQ(ran.status, 5) << secret;
+    if (secret.empty()) continue;
+    EXPECT_THAT(ran.out + ran.err, Not(HasSubstr(secret)));
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirAddress) {
+  const std::vector<std::vector<std::string>> wrong = {
+      {"--ip", "dhcp"},       {"--ip", "10.0.0.256", "--mask", "255.0.0.0"}, {"--ip", "10.0.0.1"},
+      {"--gateway", "there"}, {"--ip", "10.0.0.1", "--mask", "255.0.255.0"},
+  };
+  for (const auto& options : wrong) {
+    std::vector<std::string> arguments{"save", "Home", "--key-file", kSecretPath};
+    arguments.insert(arguments.end(), options.begin(), options.end());
+    EXPECT_EQ(Tool(arguments).status, 2) << testing::PrintToString(options);
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(Networks, ThatCannotBeSavedAreAFailure) {
+  library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
+  EXPECT_EQ(Tool({"save", "Home", "--key-file", kSecretPath}).status, 1);
+}
+
+}  // namespace

@@ -1,0 +1,141 @@
+// The forms of the output.
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdio>
+
+#include "program.h"
+#include "running.h"
+
+using library::Network;
+using testing::HasSubstr;
+using testing::Not;
+
+namespace {
+
+class Output : public ToolTest {
+ protected:
+  Output() {
+    WIRELESS_NETWORK cafe = Network("Café du coin");
+    WIRELESS_NETWORK open = Network("guests", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE);
+    open.signal = 9;
+    open.channel = 11;
+    library::InRange({cafe, open});
+  }
+};
+
+TEST_F(Output, OfAScanIsATableWithAlignedColumnsAndSignalBars) {
+  const Ran ran = Tool({"scan"});
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_EQ(ran.out,
+            "NAME            SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT\n"
+            "Café du coin  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A\n"
+            "guests        ▂▁▁▁   9  11  open      11b/g/n   0A:0A:0A:0A:0A:0A\n");
+  EXPECT_EQ(ran.err, "");
+}
+
+TEST_F(Output, OfAScanIsOneDocumentInJson) {
+  EXPECT_EQ(Tool({"scan", "--json"}).out,
+            R"({"result":"ok","networks":[)"
+            R"({"name":"Café du coin","signal":74,"channel":6,"auth":"WPA2PSK","encryption":"AES",)"
+            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null},)"
+            R"({"name":"guests","signal":9,"channel":11,"auth":"OPEN","encryption":"NONE",)"
+            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null}]})"
+            "\n");
+}
+
+TEST_F(Output, OfAScanIsARecordALineForScripts) {
+  EXPECT_EQ(Tool({"--porcelain", "scan"}).out,
+            "Café du coin\t74\t6\tWPA2PSK\tAES\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\n"
+            "guests\t9\t11\tOPEN\tNONE\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\n");
+}
+
+TEST_F(Output, KeepsNamesFromBreakingALineForScripts) {
+  library::InRange({Network("a\tb\nc\\d")});
+  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::StartsWith("a\\tb\\nc\\\\d\t74\t"));
+}
+
+TEST_F(Output, ShowsPeopleControlCharactersOfNamesWithoutTheirEffect) {
+  library::InRange({Network("\x1b[2Jgone\r\u202Exyz\xff")});
+  EXPECT_THAT(Tool({"scan"}).out, HasSubstr("\n\\x1b[2Jgone\\x0d\\xe2\\x80\\xaexyz\\xff  "));
+}
+
+TEST_F(Output, GivesAllBytesOfANameThatIsNoTextInJson) {
+  library::InRange({Network("caf\xe9")});
+  EXPECT_THAT(Tool({"scan", "--json"}).out, HasSubstr(R"("name_hex":"636166e9")"));
+}
+
+TEST_F(Output, KeepsToAsciiWhereTheLocaleDoes) {
+  const std::string out = Tool({"scan"}, {.environment = {{"LC_ALL", "C"}}}).out;
+  EXPECT_THAT(out, HasSubstr("Caf\\xc3\\xa9 du coin  ###.  74"));
+}
+
+TEST_F(Output, AlignsNamesOfWideCharacters) {
+  library::InRange({Network("東京"), Network("abcd")});
+  EXPECT_EQ(Tool({"scan"}).out,
+            "NAME    SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT\n"
+            "東京  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A\n"
+            "abcd  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A\n");
+}
+
+TEST_F(Output, HasColourOnATerminal) {
+  EXPECT_THAT(ToolOnTerminal({"scan"}).out, HasSubstr("\x1b[32m▂▄▆▁  74\x1b[0m"));
+}
+
+TEST_F(Output, HasNoColourElsewhereNorWhereItIsNotWanted) {
+  EXPECT_THAT(Tool({"scan"}).out, Not(HasSubstr("\x1b")));
+  EXPECT_THAT(ToolOnTerminal({"scan"}, 80, {.environment = {{"NO_COLOR", "1"}}}).out, Not(HasSubstr("\x1b")));
+  EXPECT_THAT(ToolOnTerminal({"scan"}, 80, {.environment = {{"TERM", "dumb"}}}).out, Not(HasSubstr("\x1b")));
+}
+
+TEST_F(Output, FitsItsTablesToTheTerminal) {
+  library::InRange({Network("a name that is thirty-two long!!", WIRELESS_AUTH_WPA2PSK,
+                            static_cast<WIRELESS_ENCRYPT>(WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES))});
+  const std::string out = ToolOnTerminal({"scan"}, 80, {.environment = {{"NO_COLOR", "1"}}}).out;
+  EXPECT_THAT(out, HasSubstr("\na name that is thirty…  ▂▄▆▁  74   6  WPA2 TKIP+AES  11b/g/n   0A:0A:0A:0A:0A:0A\r\n"));
+}
+
+TEST_F(Output, ThatCannotBeWrittenIsAFailure) {
+  testing::internal::CaptureStderr();
+  const pid_t pid = ::fork();
+  if (pid == 0) {
+    if (std::freopen("/dev/full", "w", stdout) == nullptr) ::_exit(99);
+    const char* argv[] = {"merowireless", "status"};
+    ::_exit(RunProgram(2, argv));
+  }
+  int status = 0;
+  ::waitpid(pid, &status, 0);
+  EXPECT_EQ(WEXITSTATUS(status), 1);
+  EXPECT_THAT(testing::internal::GetCapturedStderr(), HasSubstr("could not be written"));
+}
+
+TEST_F(Output, OfTheStatusNamesWhatThereIs) {
+  library::Connected("Home");
+  EXPECT_EQ(Tool({"status"}).out,
+            "status     connected\n"
+            "network    Home\n"
+            "security   WPA2\n"
+            "standard   11b/g/n\n"
+            "interface  wlan0\n"
+            "address    -\n"
+            "netmask    -\n"
+            "radio      on\n");
+  EXPECT_EQ(Tool({"status", "--json"}).out,
+            R"({"result":"ok","status":{"state":"connected","name":"Home","auth":"WPA2PSK","standard":"11b/g/n",)"
+            R"("mode":"MANAGED","interface":"wlan0","ip":null,"mask":null,"radio":"on","name_hex":null}})"
+            "\n");
+  EXPECT_EQ(Tool({"status", "--porcelain"}).out, "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\n");
+}
+
+TEST_F(Output, OfAFailureIsASentenceAndInJsonADocumentToo) {
+  library::MEROWirelessAdapterNum = [] { return 0; };
+  const Ran ran = Tool({"connect", "Home", "--json"});
+  EXPECT_EQ(ran.status, 3);
+  EXPECT_EQ(ran.err, "merowireless: no adapter is plugged in: plug in a wireless USB adapter and try again\n");
+  EXPECT_EQ(ran.out, R"({"result":"failed","code":3,"error":"no adapter is plugged in",)"
+                     R"("advice":"plug in a wireless USB adapter and try again"})"
+                     "\n");
+  EXPECT_EQ(Tool({"connect", "Home", "--porcelain"}).out, "");
+}
+
+}  // namespace

@@ -1,0 +1,91 @@
+// The program as it is installed, with the real library and its files.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::Not;
+using testing::StartsWith;
+
+namespace {
+
+struct Ran {
+  int status;
+  std::string out;
+};
+
+// Runs a command line of the program, with its standard error output behind its output.
+Ran Tool(const std::string& arguments) {
+  FILE* pipe = ::popen(("LC_ALL=C.UTF-8 TZ=UTC " MERO_TOOL " " + arguments + " 2>&1").c_str(), "r");
+  Ran ran{};
+  char bytes[4096];
+  for (std::size_t size; (size = std::fread(bytes, 1, sizeof bytes, pipe)) > 0;) ran.out.append(bytes, size);
+  ran.status = WEXITSTATUS(::pclose(pipe));
+  return ran;
+}
+
+std::string ReadText(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  return {std::istreambuf_iterator<char>(file), {}};
+}
+
+void AnnounceAdapter() {
+  std::ofstream("/tmp/wireless.info") << "PRODUCT=\"Example Stick\"\n";
+}
+
+TEST(InstalledProgram, SavesANetworkThatItThenKnows) {
+  ASSERT_EQ(std::system("printf 'open sesame\\n' >/tmp/secret"), 0);
+  EXPECT_EQ(Tool("save 'My Café' --bssid 00:11:22:33:44:55 --security wpa2 --key-file /tmp/secret").out,
+            "saved My Café (00:11:22:33:44:55)\n");
+  EXPECT_THAT(ReadText("/usr/mero/etc/wireless.conf"),
+              AllOf(HasSubstr("[00:11:22:33:44:55]"), HasSubstr("\tKEY=open sesame\n"), HasSubstr("\tIPADDR=DHCP\n")));
+  EXPECT_THAT(Tool("known").out, AllOf(HasSubstr("\nMy Café  WPA2 TKIP+AES  DHCP"), Not(HasSubstr("sesame"))));
+  EXPECT_THAT(Tool("known --porcelain --show-secrets").out, HasSubstr("\topen sesame\n"));
+}
+
+TEST(InstalledProgram, SwitchesTheRadio) {
+  AnnounceAdapter();
+  EXPECT_EQ(Tool("radio --porcelain").out, "on\tExample Stick\n");
+  EXPECT_EQ(Tool("radio off --porcelain").out, "off\tExample Stick\n");
+  EXPECT_EQ(Tool("radio --porcelain").out, "off\tExample Stick\n");
+  EXPECT_EQ(Tool("radio on").out, "the radio is on\n");
+  EXPECT_EQ(Tool("radio --porcelain").out, "on\tExample Stick\n");
+}
+
+TEST(InstalledProgram, KeepsTheAccessPointsSettings) {
+  AnnounceAdapter();
+  EXPECT_EQ(Tool("radio on").status, 0);
+  ASSERT_EQ(std::system("printf 'open sesame\\n' >/tmp/secret"), 0);
+  EXPECT_EQ(Tool("ap set --ssid Office --security wpa2 --key-file /tmp/secret --channel 11").status, 0);
+  EXPECT_THAT(
+      ReadText("/usr/mero/etc/wireless_ap.conf"),
+      AllOf(HasSubstr("[Example Stick]"), HasSubstr("\tenable=no\n"), HasSubstr("\tssid=Office\n"),
+            HasSubstr("\tbridge=lbr0\n"), HasSubstr("\twpa_passphrase=open sesame\n"), HasSubstr("\tchannel=11\n")));
+  EXPECT_EQ(Tool("ap set --hidden yes").status, 0);
+  EXPECT_THAT(Tool("ap show --json --show-secrets").out,
+              AllOf(HasSubstr(R"("enabled":false,"ssid":"Office","security":"wpa2","cipher":"aes")"),
+                    HasSubstr(R"("hidden":true)"), HasSubstr(R"("secret":"open sesame")")));
+}
+
+TEST(InstalledProgram, SaysThatThereIsNoAdapterAndWhatTheLibraryReported) {
+  const Ran ran = Tool("scan -v");
+  EXPECT_EQ(ran.status, 3);
+  EXPECT_THAT(ran.out, StartsWith("library: wireless_network_scan:233 Wait for wlan0 ready, 0\n"));
+  EXPECT_THAT(ran.out, HasSubstr("\nmerowireless: no adapter is plugged in: plug in a wireless USB adapter"));
+  EXPECT_THAT(Tool("status").out, StartsWith("status     no adapter is plugged in\n"));
+  EXPECT_EQ(Tool("autoconnect").status, 3);
+}
+
+TEST(InstalledProgram, DisconnectsWhatIsNotConnected) {
+  EXPECT_EQ(Tool("disconnect").out, "disconnected\n");
+}
+
+}  // namespace

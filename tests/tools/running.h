@@ -1,0 +1,66 @@
+// The program under test, run in a process of its own.
+#ifndef MERO_TESTS_TOOLS_RUNNING_H
+#define MERO_TESTS_TOOLS_RUNNING_H
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/types.h>
+
+#include <functional>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "library_fakes.h"
+
+struct Surroundings {
+  std::string input = {};                               // on the standard input
+  std::map<std::string, std::string> environment = {};  // beside LC_ALL=C.UTF-8
+};
+
+struct Ran {
+  int status = -1;
+  std::string out;
+  std::string err;
+};
+
+Ran Tool(const std::vector<std::string>& arguments, const Surroundings& surroundings = {});
+
+// The same on a terminal of so many columns, which shows both outputs; `type` is typed once `prompt` was shown.
+struct Typing {
+  std::string prompt;
+  std::string text;
+};
+Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short columns = 80,
+                   const Surroundings& surroundings = {}, const Typing& typing = {});
+
+// A run that is not waited for.
+class StartedTool {
+ public:
+  explicit StartedTool(const std::vector<std::string>& arguments);
+  StartedTool(const StartedTool&) = delete;
+  StartedTool& operator=(const StartedTool&) = delete;
+  ~StartedTool();
+
+  pid_t pid() const { return pid_; }
+  std::string OutputSoFar() const;
+  Ran Wait();
+
+ private:
+  pid_t pid_;
+  int out_;
+  int err_;
+};
+
+// Whether something becomes true within seconds.
+bool Soon(const std::function<bool()>& happens);
+
+class ToolTest : public testing::Test {
+ protected:
+  ToolTest() { library::Reset(); }
+};
+
+std::string ReadText(const std::string& path);
+void WriteText(const std::string& path, const std::string& text);
+
+#endif  // MERO_TESTS_TOOLS_RUNNING_H

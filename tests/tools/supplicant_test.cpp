@@ -1,0 +1,168 @@
+// What the supplicant says, and what the program makes of it.
+#include "supplicant.h"
+
+#include <poll.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstring>
+
+#include "running.h"
+
+using library::Network;
+using testing::HasSubstr;
+
+namespace {
+
+constexpr char kDirectory[] = "/var/run/wpa_supplicant";
+constexpr char kSocket[] = "/var/run/wpa_supplicant/wlan0";
+
+// Plays the supplicant.
+class Supplicant {
+ public:
+  explicit Supplicant(const char* szPath = kSocket) : szPath_(szPath) {
+    ::mkdir(kDirectory, 0755);
+    ::unlink(szPath);
+    fd_ = ::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0);
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    std::strcpy(address.sun_path, szPath);
+    EXPECT_EQ(::bind(fd_, reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+  }
+  Supplicant(const Supplicant&) = delete;
+  Supplicant& operator=(const Supplicant&) = delete;
+  ~Supplicant() {
+    ::close(fd_);
+    ::unlink(szPath_);
+  }
+
+  // Waits for the next request; empty when none comes.
+  std::string Request() {
+    pollfd waited{fd_, POLLIN, 0};
+    if (::poll(&waited, 1, 20'000) <= 0) return "";
+    char request[64];
+    size_ = sizeof listener_;
+    const ssize_t size = ::recvfrom(fd_, request, sizeof request, 0, reinterpret_cast<sockaddr*>(&listener_), &size_);
+    return {request, static_cast<std::size_t>(std::max<ssize_t>(size, 0))};
+  }
+
+  void Say(std::string_view event) {
+    EXPECT_EQ(::sendto(fd_, event.data(), event.size(), 0, reinterpret_cast<sockaddr*>(&listener_), size_),
+              static_cast<ssize_t>(event.size()));
+  }
+
+ private:
+  const char* szPath_;
+  int fd_ = -1;
+  sockaddr_un listener_{};
+  socklen_t size_ = 0;
+};
+
+TEST(SupplicantEvents, TellWhyAJoinCameToNothing) {
+  const std::pair<const char*, Verdict> events[] = {
+      {"<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" auth_failures=1 duration=10 reason=WRONG_KEY",
+       Verdict::kSecretRefused},
+      {"<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect", Verdict::kSecretRefused},
+      {"<3>CTRL-EVENT-EAP-FAILURE EAP authentication failed", Verdict::kSecretRefused},
+      {"<3>CTRL-EVENT-ASSOC-REJECT bssid=02:00:00:00:01:00 status_code=17", Verdict::kRefused},
+      {"<3>CTRL-EVENT-AUTH-REJECT 02:00:00:00:01:00 auth_type=0 auth_transaction=2 status_code=1", Verdict::kRefused},
+      {"<3>CTRL-EVENT-NETWORK-NOT-FOUND ", Verdict::kNotFound},
+      {"<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" auth_failures=1 duration=10 reason=CONN_FAILED",
+       Verdict::kNone},
+      {"<3>CTRL-EVENT-SCAN-RESULTS ", Verdict::kNone},
+      {"OK\n", Verdict::kNone},
+      {"", Verdict::kNone},
+  };
+  for (const auto& [szEvent, verdict] : events) EXPECT_EQ(VerdictOf(szEvent), verdict) << szEvent;
+}
+
+TEST(SupplicantListener, KeepsTheMostTellingEvent) {
+  SupplicantListener listener(kSocket);
+  listener.Tick();
+  EXPECT_EQ(listener.fd(), -1) << "there is no supplicant yet";
+
+  Supplicant supplicant;
+  listener.Tick();
+  ASSERT_EQ(supplicant.Request(), "ATTACH");
+  supplicant.Say("<3>reason=WRONG_KEY");
+  supplicant.Say("<3>CTRL-EVENT-NETWORK-NOT-FOUND ");
+  listener.Receive();
+  EXPECT_EQ(listener.verdict(), Verdict::kSecretRefused);
+}
+
+TEST(SupplicantListener, FindsTheNextSupplicantWhenOneLeaves) {
+  SupplicantListener listener(kSocket);
+  {
+    Supplicant first;
+    listener.Tick();
+    ASSERT_EQ(first.Request(), "ATTACH");
+    first.Say("<3>CTRL-EVENT-TERMINATING ");
+    listener.Receive();
+  }
+  Supplicant second;
+  listener.Tick();
+  EXPECT_EQ(second.Request(), "ATTACH");
+}
+
+TEST(SupplicantListener, FindsTheNextSupplicantWhenOneVanishes) {
+  SupplicantListener listener(kSocket);
+  {
+    Supplicant first;
+    listener.Tick();
+    ASSERT_EQ(first.Request(), "ATTACH");
+  }
+  Supplicant second;
+  EXPECT_TRUE(Soon([&] { return listener.Tick(), listener.fd() == -1; })) << "it is asked now and then";
+  listener.Tick();
+  EXPECT_EQ(second.Request(), "ATTACH");
+}
+
+TEST(SupplicantListener, BearsAPathThatNoSocketCanHave) {
+  SupplicantListener listener(std::string(500, 'x'));
+  listener.Tick();
+  EXPECT_EQ(listener.fd(), -1);
+}
+
+// Joins a network that does not let it in, while the supplicant says `event`.
+class RefusedJoin : public ToolTest {
+ protected:
+  RefusedJoin() {
+    WIRELESS_NETWORK_CONFIG home{};
+    home.network = Network("Home");
+    std::strcpy(home.szKey, "open sesame");
+    library::Known({home});
+    library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+      return Soon([] { return ::access("/tmp/said", F_OK) == 0; }), -1;
+    };
+  }
+
+  Ran Join(std::string_view event) {
+    ::unlink("/tmp/said");
+    Supplicant supplicant;
+    StartedTool tool({"connect", "Home"});
+    EXPECT_EQ(supplicant.Request(), "ATTACH");
+    supplicant.Say(event);
+    EXPECT_EQ(supplicant.Request(), "PING") << "the event has been read by then";
+    WriteText("/tmp/said", "");
+    return tool.Wait();
+  }
+};
+
+TEST_F(RefusedJoin, TellsAWrongSecretFromANetworkOutOfRange) {
+  const Ran wrong = Join("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" reason=WRONG_KEY");
+  EXPECT_EQ(wrong.status, 5);
+  EXPECT_THAT(wrong.err, HasSubstr("Home does not accept the secret: `merowireless save`"));
+
+  const Ran absent = Join("<3>CTRL-EVENT-NETWORK-NOT-FOUND ");
+  EXPECT_EQ(absent.status, 4);
+  EXPECT_THAT(absent.err, HasSubstr("Home is not in range: move closer"));
+
+  const Ran refused = Join("<3>CTRL-EVENT-ASSOC-REJECT bssid=02:00:00:00:01:00 status_code=17");
+  EXPECT_EQ(refused.status, 1);
+  EXPECT_THAT(refused.err, HasSubstr("Home refuses this appliance"));
+}
+
+}  // namespace

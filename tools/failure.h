@@ -1,0 +1,37 @@
+// How the program ends.
+#ifndef MERO_TOOLS_FAILURE_H
+#define MERO_TOOLS_FAILURE_H
+
+#include <stdexcept>
+#include <string>
+
+// Exit codes are part of the interface: scripts depend on them.
+enum class Exit : int {
+  kDone = 0,
+  kFailed = 1,
+  kUsage = 2,
+  kNoAdapter = 3,
+  kOutOfRange = 4,  // no such network, or not in range
+  kSecretRefused = 5,
+  kRadioOff = 6,
+  kInterrupted = 130,
+};
+
+// A failure that the user is told about: what happened, and what to do next.
+class Failure : public std::runtime_error {
+ public:
+  Failure(Exit exit, const std::string& what, std::string advice)
+      : std::runtime_error(what), exit_(exit), advice_(std::move(advice)) {}
+
+  Exit exit() const { return exit_; }
+  const std::string& advice() const { return advice_; }
+
+ private:
+  Exit exit_;
+  std::string advice_;
+};
+
+// The user, or whoever ended the program, did not want to wait.
+struct Interrupted {};
+
+#endif  // MERO_TOOLS_FAILURE_H

@@ -1,0 +1,77 @@
+// What the library reports.
+#include "library_log.h"
+
+#include <syslog.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdarg>
+#include <cstdio>
+
+#include "text.h"
+
+namespace library_log {
+namespace {
+
+std::vector<std::string> g_lines;
+std::function<void(std::string_view)> g_take;
+bool g_shown = false;
+
+void Report(int priority, const char* szFormat, va_list values) {
+  char szLine[1024];
+  va_list again;
+  va_copy(again, values);
+  // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): both callers have started it
+  std::vsnprintf(szLine, sizeof szLine, szFormat, values);  // first: %m is the errno of this moment
+  ::vsyslog(priority, szFormat, again);
+  va_end(again);
+  g_take ? g_take(szLine) : Keep(szLine);
+}
+
+}  // namespace
+
+const std::vector<std::string>& Lines() {
+  return g_lines;
+}
+
+bool Says(std::string_view text) {
+  return std::ranges::any_of(g_lines, [&](const std::string& line) { return line.find(text) != line.npos; });
+}
+
+void Keep(std::string_view line) {
+  g_lines.emplace_back(line);
+  if (g_shown) std::fprintf(stderr, "library: %s\n", Harmless(line, false).c_str());
+}
+
+void ShowLines() {
+  g_shown = true;
+}
+
+void SendTo(std::function<void(std::string_view)> take) {
+  g_take = std::move(take);
+}
+
+void Reset() {
+  g_lines.clear();
+  g_take = nullptr;
+  g_shown = false;
+}
+
+}  // namespace library_log
+
+// The libraries come upon these before libc's.
+extern "C" void syslog(int priority, const char* szFormat, ...) {
+  va_list values;
+  va_start(values, szFormat);
+  library_log::Report(priority, szFormat, values);
+  va_end(values);
+}
+
+// What syslog() becomes in a library that is built with _FORTIFY_SOURCE.
+// NOLINTNEXTLINE(bugprone-reserved-identifier)
+extern "C" void __syslog_chk(int priority, int, const char* szFormat, ...) {
+  va_list values;
+  va_start(values, szFormat);
+  library_log::Report(priority, szFormat, values);
+  va_end(values);
+}

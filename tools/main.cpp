@@ -1,0 +1,6 @@
+// merowireless: the appliance's wireless networking, managed from a command line.
+#include "program.h"
+
+int main(int argc, char** argv) {
+  return RunProgram(argc, argv);
+}

@@ -1,0 +1,18 @@
+// The commands about the adapter as a whole: radio, mode.
+#ifndef MERO_TOOLS_RADIO_H
+#define MERO_TOOLS_RADIO_H
+
+#include <string>
+
+#include "program.h"
+
+void ShowRadio(const Program& program);
+void SwitchRadio(const Program& program, bool on);
+
+// "ap" or "client".
+void ChangeMode(const Program& program, const std::string& mode);
+
+// The settings section of the adapter that is plugged in; fails when it has not been announced.
+std::string AdapterModel();
+
+#endif  // MERO_TOOLS_RADIO_H

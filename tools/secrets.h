@@ -1,0 +1,19 @@
+// Secrets come from a file, the standard input or a prompt; never from the command line, which everybody can read.
+#ifndef MERO_TOOLS_SECRETS_H
+#define MERO_TOOLS_SECRETS_H
+
+#include <optional>
+#include <string>
+
+struct SecretSource {
+  std::string file;
+  bool standardInput = false;
+
+  bool isGiven() const { return !file.empty() || standardInput; }
+};
+
+// The secret from its source, or from the terminal by a prompt; nothing when there is neither. One line end behind it
+// is no part of it.
+std::optional<std::string> ReadSecret(const SecretSource& source, const std::string& prompt);
+
+#endif  // MERO_TOOLS_SECRETS_H

@@ -1,0 +1,25 @@
+// How a network is protected, and what a secret for it may be.
+#ifndef MERO_TOOLS_SECURITY_H
+#define MERO_TOOLS_SECURITY_H
+
+#include <string>
+#include <string_view>
+
+#include "wireless.h"
+
+// "WPA2 AES", "open".
+std::string SecurityText(WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt);
+
+bool NeedsSecret(WIRELESS_AUTH auth);
+bool NeedsUser(WIRELESS_AUTH auth);
+
+// Sets the protection that people call `name`: open, wep, wpa, wpa2, wpa-eap, wpa2-eap; false when there is none.
+bool SetSecurity(WIRELESS_NETWORK& network, std::string_view name);
+inline constexpr char kSecurityNames[] = "open, wep, wpa, wpa2, wpa-eap, wpa2-eap";
+
+// Fail, with what would do, when a secret is none.
+void RequireWepKey(std::string_view key);
+void RequirePassphrase(std::string_view passphrase);
+void RequireSecretFor(WIRELESS_AUTH auth, std::string_view secret);
+
+#endif  // MERO_TOOLS_SECURITY_H

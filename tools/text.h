@@ -1,0 +1,39 @@
+// Bytes from the air as text that can be shown.
+#ifndef MERO_TOOLS_TEXT_H
+#define MERO_TOOLS_TEXT_H
+
+#include <array>
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+
+// `bytes` with everything written out as \xNN that is no printable text, so that it can neither command a terminal nor
+// reorder what stands around it. Without `utf8` that is all but ASCII.
+std::string Harmless(std::string_view bytes, bool utf8);
+
+// How many columns a harmless text takes.
+std::size_t WidthOf(std::string_view text, bool utf8);
+
+// A harmless text, cut to `width` columns with a sign that it was.
+std::string CutToWidth(std::string_view text, std::size_t width, bool utf8);
+
+bool IsUtf8(std::string_view bytes);
+std::string Hex(std::string_view bytes);
+
+using Address = std::array<unsigned char, 6>;
+
+std::string AddressText(const unsigned char (&address)[6]);
+
+// Six hexadecimal octets between colons, and nothing else.
+std::optional<Address> ParseAddress(std::string_view text);
+
+bool IsIpAddress(const std::string& text);
+
+// A dotted netmask: ones, then zeros.
+bool IsNetmask(const std::string& text);
+
+// A whole decimal number.
+std::optional<int> ParseNumber(std::string_view text);
+
+#endif  // MERO_TOOLS_TEXT_H
