@@ -10,11 +10,18 @@ state=/var/run/rc.network
 # value_of KEY FILE: what a key/value file holds for a key, without quotes; empty when there is neither.
 value_of() {
 	[ -f "$2" ] || return 0
-	sed -n "s/\r\$//; s/^[[:space:]]*$1[[:space:]]*=[[:space:]]*//p" "$2" | sed -n '
-		s/[[:space:]]*$//
-		s/^"\(.*\)"$/\1/
-		s/^'\''\(.*\)'\''$/\1/
-		$p'
+	sed -n "
+		/^[[:space:]]*$1[[:space:]]*=/{
+			s/^[^=]*=[[:space:]]*//
+			s/[[:space:]]*\$//
+			s/^\"\(.*\)\"\$/\1/
+			s/^'\(.*\)'\$/\1/
+			h
+		}
+		\${
+			g
+			p
+		}" "$2"
 }
 
 # setting KEY DEFAULT: a setting of the adapter that is plugged in.
