@@ -1,0 +1,226 @@
+#!/bin/sh
+# manual_test.sh CHECK SOURCE_DIRECTORY [ARGUMENT]
+#
+# One of the checks below: the manual agrees with the headers, the sources or the program. What differs is named, with
+# "<" before what the manual lacks and ">" before what only the manual has.
+set -eu
+export LC_ALL=C
+check=$1 source=$2 argument=${3-}
+manual=$source/docs/man
+
+work=$(mktemp -d)
+trap 'rm -r "$work"' EXIT
+
+# ---- What there is -------------------------------------------------------------------------------------------------
+
+exported() {
+  sed -n 's/^ *\([A-Za-z0-9_]*\);$/\1/p' "$source/platform/core/merocore.map" "$source/platform/sdk/merosdk.map" \
+    "$source/lib/merowireless-core.map"
+}
+
+# Both headers, without comments and directives.
+headers() {
+  cat "$source/include/wireless.h" "$source/include/platform.h" | awk '
+    { text = text $0 "\n" }
+    END {
+      while ((start = index(text, "/*")) > 0) {
+        rest = substr(text, start)
+        text = substr(text, 1, start - 1) substr(rest, index(rest, "*/") + 2)
+      }
+      printf "%s", text
+    }' | grep -v '^#'
+}
+
+headers_in_one_line() { headers | tr -s ' \n' ' '; }
+
+declared() {
+  headers_in_one_line | grep -oE '[^{};]*\b(MERO|PLIB)[A-Za-z0-9]+\([^)]*\);' | sed 's/^ *//; s/);$/)/'
+}
+
+types() {
+  headers_in_one_line | grep -oE '(enum [A-Z_]+ MERO_INT32|(\}|struct [A-Z_]+) [A-Z_]+(, \*[A-Z_]+)*;)' |
+    sed 's/^enum \([A-Z_]*\) .*/\1/; s/^struct [A-Z_]* //' | tr -c 'A-Z_\n' '\n' | sed '/^$/d'
+}
+
+constants() { headers_in_one_line | grep -oE '\b[A-Z][A-Z0-9_]+ = [0-9][0-9A-Fx]*'; }
+
+# Each as "RECORD: TYPE MEMBER"; those of a union within a record have its name before theirs.
+members() {
+  headers | awk '
+    /^typedef (struct|union) .*\{$/ { record = $3; next }
+    /^\}/ { record = "" }
+    record == "" { next }
+    / union \{$/ { inner = 1; count = 0; next }
+    inner && / \} / {
+      sub(/;/, "", $2)
+      for (i = 1; i <= count; ++i) { sub(/[^ ]+$/, $2 ".&", held[i]); print record ": " held[i] }
+      inner = 0
+      next
+    }
+    /;/ {
+      sub(/^ +/, "")
+      sub(/;.*/, "")
+      if (inner) held[++count] = $0; else print record ": " $0
+    }'
+}
+
+# As patterns, in which any word in capitals stands for what a program fills in.
+files() {
+  (cd "$source" && find lib common platform tools -name '*.[ch]*' -exec grep -hoE '"[^"]*"' {} +) |
+    grep -oE '/(etc|etc\.defaults|usr/mero|var|tmp)/[^" \]+'
+  grep -rhoE '^[a-z_]+=/(etc|usr/mero|var|tmp)/[^ ]+' "$source/appliance" | sed 's/.*=//'
+  sed -n 's/^## \(\/.*\)/\1/p' "$source/docs/file-formats.md"
+  cat "$source/README.md" "$source"/docs/*.md | sed -n 's/^|\([^|]*\)|.*/\1/p' | tr '`' ' ' | grep -oE ' /[^ ,*]+' |
+    tr -d ' '
+}
+
+as_pattern() { sed 's/[.*]/\\&/g; s/%\([0-9]*\$\)\{0,1\}s/[A-Z]+/g'; }
+
+# program_options COMMAND...: each as "COMMAND: OPTION". Every command has --help.
+program_options() {
+  help=$("$argument" "$@" --help)
+  printf '%s\n' "$help" | sed -n '/^Options:/,/^$/s/^  \(-[^ {]*\).*/\1/p' | tr ',' '\n' |
+    if [ $# -eq 0 ]; then cat; else grep -vxE -e '-h|--help' || [ $? -eq 1 ]; fi | sed "s/^/$*: /"
+  subcommands=$(printf '%s\n' "$help" | sed -n '/^Subcommands:/,/^$/s/^  \([a-z]\{1,\}\) .*/\1/p')
+  if [ -z "$subcommands" ]; then echo "$*"; fi
+  for subcommand in $subcommands; do (program_options "$@" "$subcommand"); done
+}
+
+# The commands of a script of the appliance, by its usage.
+script_commands() {
+  sed -n "s/^\(usage:\| *\) ${argument##*/} //p" "$argument" | sed 's/  .*//; s/ [A-Z[].*//' | split_choices
+}
+
+# "change-mode ap|client" is two commands.
+split_choices() { sed 's/^\(.*\) \(.*\)|\(.*\)$/\1 \2\n\1 \3/'; }
+
+# ---- What the manual has -------------------------------------------------------------------------------------------
+
+# Each as "NAME PAGE".
+names() { # SECTION
+  for page in "$manual"/*."$1"; do
+    sed -n "/^\.Sh NAME/,/^\.Nd/s/^\.Nm \([^ ]*\).*/\1 $(basename "$page" ".$1")/p" "$page"
+  done
+}
+
+described_functions() {
+  cat "$manual"/*.3 | awk '
+    /^\.Sh/ { inside = /SYNOPSIS/ }
+    !inside { next }
+    /^\.Ft / { gsub(/"/, ""); type = substr($0, 5) }
+    /^\.Fn / {
+      sub(/^\.Fn /, "")
+      sub(/ /, "(")
+      gsub(/" "/, ", ")
+      gsub(/"/, "")
+      print type " " $0 ")"
+    }'
+}
+
+described_constants() { cat "$manual"/*.3 | sed -n 's/^\.It Dv \(.* = .*\)/\1/p'; }
+
+described_members() {
+  cat "$manual"/*.3 | awk '
+    /^\.Vt (struct|union) / { record = $3 }
+    /^\.It Li "/ && record != "" { gsub(/"/, ""); print record ": " substr($0, 8) }
+    /^\.El/ { record = "" }'
+}
+
+described_options() {
+  awk '
+    /^\.Sh/ { inside = /DESCRIPTION/; command = "" }
+    !inside { next }
+    /^\.It Cm / {
+      command = $3
+      for (i = 4; i <= NF && $i ~ /^[a-z]+$/; ++i) command = command " " $i
+      print command
+    }
+    command != "" || /^\.It/ {
+      while (match($0, /Fl -?[a-z]([a-z-]*[a-z])?/)) {
+        print command ": -" substr($0, RSTART + 3, RLENGTH - 3)
+        $0 = substr($0, RSTART + RLENGTH)
+        if (command == "") while (match($0, /^ , -?[a-z]+/)) {
+          print ": -" substr($0, 4, RLENGTH - 3)
+          $0 = substr($0, RLENGTH + 1)
+        }
+      }
+    }' "$manual/merowireless.1"
+}
+
+described_script_commands() {
+  sed -n 's/^\.It Cm \([a-z -]*[a-z]\).*/\1/p' "$manual/${argument##*/}.8" | grep -vx help
+}
+
+# ---- The checks ----------------------------------------------------------------------------------------------------
+
+# expect_same THERE_IS MANUAL_HAS: what two functions tell, of which there is more than nothing.
+expect_same() {
+  $1 | sort -u >"$work/there"
+  $2 | sort -u >"$work/manual"
+  [ -s "$work/there" ] || fail "$1 tells nothing"
+  diff "$work/there" "$work/manual"
+}
+
+fail() {
+  echo "$*"
+  exit 1
+}
+
+expect_all() { # WHAT: each line of the file "lacking" is something that no page has
+  [ ! -s "$work/lacking" ] || fail "no page has the $1 $(tr '\n' ' ' <"$work/lacking")"
+}
+
+# expect_named THERE_IS: all that a function tells is a name of a page.
+expect_named() {
+  $1 | sort -u >"$work/there"
+  [ -s "$work/there" ] || fail "$1 tells nothing"
+  names 3 | cut -d ' ' -f 1 | sort | comm -23 "$work/there" - >"$work/lacking"
+  expect_all "$1"
+}
+
+expect_functions() {
+  expect_named exported
+  expect_same declared described_functions
+}
+
+expect_files() {
+  files | as_pattern | sort -u >"$work/files"
+  [ -s "$work/files" ] || fail 'there is no file'
+  grep -hE '(^|[. ])Pa ' "$manual"/*.[1358] >"$work/paths"
+  while IFS= read -r file; do
+    grep -qE -- "$file([^A-Za-z0-9_]|$)" "$work/paths" || echo "$file"
+  done <"$work/files" >"$work/lacking"
+  expect_all files
+}
+
+# Further names have a page that leads to the one that describes them; and all are something that there is.
+expect_names() {
+  names 3 | while read -r name page; do
+    [ "$name" = "$page" ] || echo ".so man3/$page.3" | diff - "$argument/$name.3"
+  done
+  { exported && types && names 3 | cut -d ' ' -f 2 && echo libmerosdk; } | sort -u >"$work/there"
+  names 3 | cut -d ' ' -f 1 | sort | diff "$work/there" -
+}
+
+# References to other packages' pages are few, and listed.
+expect_references() {
+  for section in 1 3 5 8; do names "$section" | sed "s/ .*/ $section/"; done >"$work/pages"
+  printf '%s\n' 'flock 2' 'free 3' 'insque 3' 'remque 3' 'syslog 3' 'dnsmasq 8' 'hostapd 8' 'nft 8' >>"$work/pages"
+  sort -u -o "$work/pages" "$work/pages"
+  cat "$manual"/*.[1358] | sed -n 's/^\.Xr \([^ ]* [0-9]\).*/\1/p' | sort -u | comm -13 "$work/pages" - >"$work/lacking"
+  expect_all 'references to'
+}
+
+case $check in
+  functions) expect_functions ;;
+  types) expect_named types ;;
+  constants) expect_same constants described_constants ;;
+  members) expect_same members described_members ;;
+  files) expect_files ;;
+  script) expect_same script_commands described_script_commands ;;
+  commands) expect_same program_options described_options ;;
+  names) expect_names ;;
+  references) expect_references ;;
+  form) "$argument" -Tlint -Wwarning "$manual"/*.[1358] ;;
+  *) fail "there is no check '$check'" ;;
+esac
