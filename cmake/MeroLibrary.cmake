@@ -10,14 +10,17 @@ else()
   set(MERO_SMALL -Os)
 endif()
 
+set(MERO_LIBRARY_OPTIONS "" CACHE STRING "Options that the shared libraries are compiled with, after all others")
+
 # How the parts of the shared libraries are compiled: to be small, except in debug builds. Nothing unwinds through them
 # at run time, and what debuggers unwind by goes with the debugging information.
 function(mero_compile_part name)
-  target_include_directories(${name} PUBLIC ${CMAKE_SOURCE_DIR}/include PRIVATE ${CMAKE_SOURCE_DIR})
+  target_include_directories(${name} PUBLIC $<BUILD_INTERFACE:${CMAKE_SOURCE_DIR}/include> PRIVATE ${CMAKE_SOURCE_DIR})
   target_compile_options(${name} PRIVATE -fno-exceptions -fno-rtti -fvisibility=hidden -fvisibility-inlines-hidden
                                          -ffunction-sections -fdata-sections
                                          $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};-fno-plt;-fno-ident>
-                                         $<$<NOT:$<CONFIG:Debug>>:-fno-asynchronous-unwind-tables>)
+                                         $<$<NOT:$<CONFIG:Debug>>:-fno-asynchronous-unwind-tables>
+                                         ${MERO_LIBRARY_OPTIONS})
   set_target_properties(${name} PROPERTIES POSITION_INDEPENDENT_CODE ON)
   if(CMAKE_SIZEOF_VOID_P EQUAL 4)
     # Files beyond 2 GiB and times beyond 2038. Machines with 64-bit longs have them anyway.
@@ -60,6 +63,7 @@ function(mero_library name)
     LINK_DEPENDS ${arg_EXPORTS}
     SOVERSION 1
     VERSION ${PROJECT_VERSION})
+  mero_install_library(${name})
 endfunction()
 
 set(CMAKE_CXX_IMPLICIT_LINK_LIBRARIES "")

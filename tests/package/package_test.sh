@@ -1,0 +1,241 @@
+#!/usr/bin/env bash
+# package_test.sh DIRECTORY: what the packages in that directory do to a Debian system of their own. Says `ok` or
+# `not ok` and what it is about, in a line each; fails if anything did.
+#
+# The system is made by mmdebstrap, of the Debian archives that this machine uses, and kept beside the packages for the
+# next time. It has compilers and what the packages depend on, and nothing of ours; while it is looked at, it has no
+# network.
+set -euo pipefail
+
+readonly settings=(
+  /usr/mero/etc/wireless.conf
+  /usr/mero/etc/wireless_ap.conf
+  /etc/hostapd/hostapd-wlan0.info
+  /etc/dhcpd/dhcpd-lbr0-lbr0.conf
+  /etc/sysconfig/network-scripts/ifcfg-lbr0
+)
+
+failures=0
+
+check() { # TEXT COMMAND...
+  local text=$1
+  shift
+  if "$@"; then
+    echo "ok $text"
+  else
+    echo "not ok $text"
+    failures=$((failures + 1))
+  fi
+}
+
+inside() {
+  chroot "$root" env -i PATH=/usr/sbin:/usr/bin:/sbin:/bin DEBIAN_FRONTEND=noninteractive LC_ALL=C.UTF-8 "$@"
+}
+
+# Runs a command quietly, and shows what it said if it fails.
+quietly() {
+  local said
+  said=$("$@" 2>&1) || {
+    printf '%s\n' "$said" >&2
+    return 1
+  }
+}
+
+# ---- The system -------------------------------------------------------------------------------------------------
+
+debian_archives() {
+  # shellcheck disable=SC2016  # the fields are apt's
+  apt-get indextargets --format 'deb $(REPO_URI) $(RELEASE) $(COMPONENT)' 'Created-By: Packages' 'Origin: Debian' |
+    sort -u
+}
+
+dependencies() { # DIRECTORY
+  local package
+  for package in "$1"/*.deb; do dpkg-deb --field "$package" Depends; done |
+    tr ',' '\n' | sed -E 's/^ *([^ ]+).*/\1/; /mero/d' | sort -u | paste --serial --delimiters=,
+}
+
+make_system() { # ARCHIVE DIRECTORY
+  local suite
+  # shellcheck source=/dev/null
+  suite=$(. /etc/os-release && echo "$VERSION_CODENAME")
+  echo "making a Debian system" >&2
+  debian_archives |
+    mmdebstrap --quiet --format=tar --variant=apt --include="cmake,g++,make,pkgconf,$(dependencies "$2")" \
+      --aptopt='APT::Install-Recommends "false"' "$suite" "$1.new" - >&2
+  mv "$1.new" "$1"
+}
+
+enter_system() { # ARCHIVE DIRECTORY
+  mount -t tmpfs system "$root"
+  tar --extract --file "$1" --directory "$root"
+  mount -t proc proc "$root/proc"
+  mount -t sysfs -o ro sys "$root/sys"
+  mkdir "$root/tmp/packages" "$root/tmp/upgrades"
+  cp "$2"/*.deb "$root/tmp/packages/"
+}
+
+# Every file, and every directory that is empty, with what can be seen of it; besides what apt and dpkg write down for
+# themselves.
+files() {
+  (cd "$root" && find . -xdev \
+    '(' -path ./tmp -o -path ./var/cache -o -path ./var/log -o -path ./var/lib/apt -o -path ./var/lib/dpkg ')' -prune -o \
+    '(' -not -type d -o -empty ')' -printf '%P %y %m %u:%g %s %l\n') | sort
+}
+
+# ---- The packages -----------------------------------------------------------------------------------------------
+
+names() { (cd "$root/tmp/packages" && printf '%s\n' *.deb | sed 's/_.*//'); }
+
+# The same packages, of a later version.
+make_upgrades() {
+  local package work=$root/tmp/work
+  for package in "$root"/tmp/packages/*.deb; do
+    dpkg-deb --raw-extract "$package" "$work"
+    sed -Ei 's/^(Version: .*)/\1+later/; s/(\(= [^)]*)\)/\1+later)/' "$work/DEBIAN/control"
+    dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/upgrades/${package##*/}" >/dev/null
+    rm -r "$work"
+  done
+}
+
+apt() { quietly inside apt-get --yes -o Dpkg::Use-Pty=0 "$@"; }
+
+install_from() { # DIRECTORY [OPTION...]
+  local directory=$1 packages
+  shift
+  packages=("$root/tmp/$directory"/*.deb)
+  apt install "$@" "${packages[@]#"$root"}"
+}
+
+libraries_are_small() {
+  local library total=0 count=0
+  for library in "$root"/usr/lib/*/libmero*.so.*.*; do
+    [[ -f $library ]] || return
+    total=$((total + $(stat --format %s "$library")))
+    count=$((count + 1))
+  done
+  [[ $count -eq 3 && $total -lt 102400 ]]
+}
+
+scan_says_that_there_is_no_adapter() {
+  local status=0 said
+  said=$(inside merowireless scan 2>&1) || status=$?
+  echo "merowireless scan: exit status $status: $said" >&2
+  [[ $status -eq 3 && $said == 'merowireless: '*adapter* && $said != *$'\n'* ]]
+}
+
+iwlist_passes_on() {
+  [[ $(inside iwlist --help 2>&1) == *frequency* ]]
+}
+
+iwlist_lists() {
+  [[ $(inside iwlist wlan0 scanning mero 2>&1) == 'iwlist: '* ]]
+}
+
+completes_in_bash() {
+  quietly inside bash -c '. /usr/share/bash-completion/completions/merowireless && complete -p merowireless'
+}
+
+# The example, built by a command in a directory of its own, runs and says that there is no such network.
+builds_and_runs() { # PROGRAM COMMAND
+  local status=0
+  rm -rf "$root/tmp/example"
+  cp -r "$root/usr/share/doc/libmerowireless-core-dev/examples/scan-one" "$root/tmp/example"
+  quietly inside sh -c "cd /tmp/example && $2" || return
+  inside "/tmp/example/$1" || status=$?
+  [[ $status -eq 1 ]]
+}
+
+write_settings() {
+  local file
+  for file in "${settings[@]}"; do echo "the user's $file" >"$root$file"; done
+}
+
+settings_are_kept() {
+  local file
+  for file in "${settings[@]}"; do
+    grep -qFx "the user's $file" "$root$file" || return 1
+  done
+}
+
+is_upgraded() {
+  # shellcheck disable=SC2016  # the field is dpkg's
+  [[ $(inside dpkg-query --show --showformat '${Version}' merowireless-appliance) == *+later ]]
+}
+
+# What the kit's scripts take for an access point's daemon.
+start_daemon() {
+  mkdir -p "$root/run/rc.network"
+  cp "$root/bin/sleep" "$root/tmp/hostapd"
+  chroot "$root" /tmp/hostapd 600 &
+  daemon=$!
+  echo "$daemon" >"$root/run/rc.network/hostapd-wlan0.pid"
+  until [[ $(<"$root/proc/$daemon/comm") == hostapd ]]; do sleep 0.01; done
+}
+
+daemon_has_ended() { [[ ! -e $root/proc/$daemon ]]; }
+
+# Files that there are now and were not, or the reverse, or that are others: the settings, and what a pattern names.
+only_settings_are_new() { # [PATTERN]
+  diff <(printf '%s\n' "${settings[@]#/}" | sort) \
+    <(files | diff "$root/tmp/before" - | sed -nE 's/^[<>] (\S+) .*/\1/p' | grep -vE "${1:-^$}" | sort -u) >&2
+}
+
+look_at_packages() { # ARCHIVE DIRECTORY
+  # shellcheck disable=SC2016  # for the shell in the system
+  local ours cc='scan_one.c -o scan-one $(pkg-config --cflags --libs libmerowireless-core)'
+  enter_system "$1" "$2"
+  make_upgrades
+  mapfile -t ours < <(names)
+  files >"$root/tmp/before"
+
+  check 'the packages can be installed' install_from packages
+  check 'the libraries take less than 100 KiB together' libraries_are_small
+  check 'a scan without an adapter says so in one sentence, and exits with 3' scan_says_that_there_is_no_adapter
+  check 'the listing tool has its own form' iwlist_lists
+  check 'the listing tool passes the others on' iwlist_passes_on
+  check 'bash completes the program' completes_in_bash
+
+  check 'the example builds with pkg-config and runs' builds_and_runs scan-one "cc -Wall -Wextra -Werror $cc"
+  check 'the example builds as C++ and runs' builds_and_runs scan-one "c++ -Wall -Wextra -Werror -x c++ $cc"
+  check 'the example builds with CMake and runs' builds_and_runs build/scan-one 'cmake -B build && cmake --build build'
+
+  write_settings
+  check 'the packages can be installed again' install_from packages --reinstall
+  check 'settings are kept when packages are installed again' settings_are_kept
+  check 'the packages can be upgraded' install_from upgrades
+  check 'the upgrade has taken place' is_upgraded
+  check 'settings are kept in an upgrade' settings_are_kept
+  check 'the listing tool still passes on after an upgrade' iwlist_passes_on
+
+  start_daemon
+  check 'the packages can be removed' apt remove "${ours[@]}"
+  check 'settings are kept when packages are removed' settings_are_kept
+  check 'access points end when the kit is removed' daemon_has_ended
+  check 'the ordinary listing tool is back' iwlist_passes_on
+  check 'until packages are purged, nothing but settings and notes of systemd is left' \
+    only_settings_are_new '^(etc|var/lib)/systemd/'
+  check 'the packages can be purged' quietly inside dpkg --purge "${ours[@]}"
+  check 'settings are kept when packages are purged' settings_are_kept
+  check 'when packages are purged, nothing but settings is left' only_settings_are_new
+
+  [[ $failures -eq 0 ]]
+}
+
+case $#,${1:-} in
+1,*)
+  archive=$(dirname "$1")/package-test-$(dependencies "$1" | cksum | cut -d ' ' -f 1).tar
+  [[ -e $archive ]] || make_system "$archive" "$1"
+  root=$(mktemp -d)
+  trap 'rmdir "$root"' EXIT
+  unshare --mount --net --pid --fork --kill-child "$0" "$archive" "$1" "$root"
+  ;;
+3,*)
+  root=$3
+  look_at_packages "$1" "$2"
+  ;;
+*)
+  echo "usage: $0 DIRECTORY" >&2
+  exit 2
+  ;;
+esac
