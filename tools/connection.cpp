@@ -5,7 +5,9 @@
 #include <poll.h>
 #include <sys/socket.h>
 
+#include <chrono>
 #include <cstdio>
+#include <thread>
 
 #include "library.h"
 #include "library_log.h"
@@ -59,8 +61,22 @@ Failure JoinFailed(const std::string& name, Verdict verdict) {
   return Failed(name + " could not be joined in time", "try again closer to it; -v shows what the library reports");
 }
 
+// The library tells a supplicant that runs to end, and starts the next one without waiting; that one gives up when it
+// comes upon the former one's socket.
+void EndFormerSupplicant(const Program& program) {
+  if (PLIBCFileExist(kSupplicantPid) == 0) return;
+  Run<int>(program.Doing("leaving the former network"), [] {
+    if (PLIBCExec(kSupplicantClient, "terminate", nullptr, nullptr, nullptr) != 0) return -1;  // none runs
+    for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPid) != 0; --tries) {
+      std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    }
+    return 0;
+  });
+}
+
 void Join(const Program& program, const KnownNetwork& config) {
   const std::string name = program.output.Name(config.network.szEssid);
+  EndFormerSupplicant(program);
   SupplicantListener listener(SupplicantSocket());
   const int result =
       Run<int>(Joining(program, "joining " + name, listener), [&] { return MEROWirelessNetworkConnect(&config); });

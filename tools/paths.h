@@ -13,6 +13,10 @@ inline constexpr char kKnownNetworks[] = "/usr/mero/etc/wireless.conf";
 inline constexpr char kApSettings[] = "/usr/mero/etc/wireless_ap.conf";
 inline constexpr char kApSettingsLine[] = "\t%s=%s\n";
 
+// The supplicant's pid file, which goes with it, and what talks to it.
+inline constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
+inline constexpr char kSupplicantClient[] = "/usr/sbin/wpa_cli";
+
 // Where the supplicant has a control socket named after each interface.
 inline constexpr char kSupplicantDirectory[] = "/var/run/wpa_supplicant/";
 
