@@ -65,13 +65,15 @@ Failure JoinFailed(const std::string& name, Verdict verdict) {
 // comes upon the former one's socket.
 void EndFormerSupplicant(const Program& program) {
   if (PLIBCFileExist(kSupplicantPid) == 0) return;
-  Run<int>(program.Doing("leaving the former network"), [] {
-    if (PLIBCExec(kSupplicantClient, "terminate", nullptr, nullptr, nullptr) != 0) return -1;  // none runs
+  const bool gone = Run<bool>(program.Doing("leaving the former network"), [] {
+    if (PLIBCExec(kSupplicantClient, "terminate", nullptr, nullptr, nullptr) != 0)
+      return true;  // only its file is left
     for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPid) != 0; --tries) {
       std::this_thread::sleep_for(std::chrono::milliseconds(100));
     }
-    return 0;
+    return PLIBCFileExist(kSupplicantPid) == 0;
   });
+  if (!gone) throw Failed("the former connection does not end", "`merowireless disconnect` ends it by force");
 }
 
 void Join(const Program& program, const KnownNetwork& config) {

@@ -1,5 +1,6 @@
 // connect, autoconnect, disconnect, address, gateway, adhoc, watch, radio and mode.
 #include <cstring>
+#include <filesystem>
 
 #include "running.h"
 
@@ -47,6 +48,43 @@ TEST_F(Connection, ToAKnownNetworkTakesItsSecretAndAddress) {
   EXPECT_EQ(ran.out, "connected to Home without an address\n");
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||0",
                                             "MEROWirelessIfconfigSet", "wlan0|DHCP|255.255.255.0"));
+}
+
+constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
+
+// A supplicant's client that does this.
+void InstallSupplicantClient(const std::string& script) {
+  constexpr char kPath[] = "/usr/sbin/wpa_cli";
+  WriteText(kPath, "#!/bin/sh\n" + script);
+  std::filesystem::permissions(kPath, std::filesystem::perms(0755));
+}
+
+TEST_F(Connection, IsMadeOnlyWhenTheFormerSupplicantHasGone) {
+  WriteText(kSupplicantPid, "1\n");
+  InstallSupplicantClient("echo $* >/tmp/told\n(sleep 0.3; rm /var/run/wpa_supplicant.pid) &\n");
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    library::Record(std::filesystem::exists(kSupplicantPid) ? "too early" : "joined");
+    return 0;
+  };
+  EXPECT_EQ(Tool({"connect", "Home", "--no-address"}).status, 0);
+  EXPECT_THAT(library::Calls(), Contains("joined"));
+  EXPECT_EQ(ReadText("/tmp/told"), "terminate\n");
+}
+
+TEST_F(Connection, IsMadeWhenOnlyTheFileOfASupplicantIsLeft) {
+  WriteText(kSupplicantPid, "1\n");
+  InstallSupplicantClient("exit 255\n");
+  EXPECT_EQ(Tool({"connect", "Home", "--no-address"}).status, 0);
+  EXPECT_THAT(library::Calls(), Contains("MEROWirelessNetworkConnect"));
+}
+
+TEST_F(Connection, IsNotMadeBesideASupplicantThatDoesNotEnd) {
+  WriteText(kSupplicantPid, "1\n");
+  InstallSupplicantClient("exit 0\n");
+  const Ran ran = Tool({"connect", "Home"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("the former connection does not end"));
+  EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessNetworkConnect")));
 }
 
 TEST_F(Connection, OfAStaticNetworkSetsItsGatewayToo) {
