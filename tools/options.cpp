@@ -18,8 +18,8 @@ namespace {
 constexpr char kAbout[] =
     "Manages the appliance's wireless networking.\n"
     "\n"
-    "Exit status: 0 done, 1 failed, 2 wrong usage, 3 no adapter, 4 no such network or out of range,\n"
-    "5 secret refused, 6 radio switched off, 130 interrupted.";
+    "Exit status: 0 done, 1 failed, 2 wrong usage, 3 no adapter, 4 no such network or\n"
+    "out of range, 5 secret refused, 6 radio switched off, 130 interrupted.";
 
 // Commands are made known with what they are to be given and what they then do. The values live as long as the
 // command, which is as long as the action that holds them.
@@ -103,9 +103,9 @@ void AddNetworkCommands(Commands& commands) {
         DescribeMask(command, values.addressing);
         command.add_option("--gateway", values.addressing.gateway, "default gateway of a static address")
             ->option_text("A.B.C.D");
-        auto* security = command.add_option("--security", values.security, "how a network is protected that hides")
+        auto* security = command.add_option("--security", values.security, "how a network that hides is protected")
                              ->option_text("open|wep|wpa|wpa2|wpa-eap|wpa2-eap");
-        command.add_option("--bssid", values.address, "access point of a network that hides; nothing is scanned for")
+        command.add_option("--bssid", values.address, "access point of a network that hides its name")
             ->option_text("ADDRESS")
             ->needs(security);
       },
@@ -136,7 +136,7 @@ void AddConnectionCommands(Commands& commands) {
         command.add_flag("!--no-address", values.address, "only join; leave the addresses alone");
       },
       Connect);
-  commands.AddPlain("autoconnect", "Join the known network saved last of those that can be joined", AutoConnect);
+  commands.AddPlain("autoconnect", "Join the newest known network that can be joined", AutoConnect);
   commands.AddPlain("disconnect", "End the connection", Disconnect);
   commands.AddPlain("status", "Show the state of the connection", ShowStatus);
 
@@ -144,7 +144,7 @@ void AddConnectionCommands(Commands& commands) {
     int times = 0;
   };
   commands.Add<Watching>(
-      "watch", "Show the state of the connection whenever it changes",
+      "watch", "Show the connection's state whenever it changes",
       [](CLI::App& command, Watching& values) {
         command.add_option("--count", values.times, "end after so many")->option_text("N")->check(CLI::PositiveNumber);
       },
@@ -174,7 +174,7 @@ void AddConnectionCommands(Commands& commands) {
 }
 
 void AddApCommands(Commands& commands, CLI::App& app) {
-  CLI::App* ap = app.add_subcommand("ap", "The access point: show, set, enable, disable, status");
+  CLI::App* ap = app.add_subcommand("ap", "Show, change and switch the access point");
   ap->require_subcommand(1);
   ap->fallthrough();
 

@@ -30,7 +30,12 @@ constexpr State kStates[] = {
     {"monitor", "monitoring", WIRELESS_STATUS_MONITOR, Tone::kFair},
 };
 
+// For the library it has no connection whose state could be known.
+constexpr State kAccessPoint = {"access-point", "an access point (see `merowireless ap status`)",
+                                WIRELESS_STATUS_UNKNOWN, Tone::kGood};
+
 const State& StateOf(const Status& status) {
+  if (status.isAccessPoint) return kAccessPoint;
   const auto* found = std::ranges::find(kStates, status.state, &State::value);
   return found != std::end(kStates) ? *found : kStates[0];
 }
@@ -48,6 +53,16 @@ Shown ShowAuth(const Status& status, bool) {
   return {SecurityText(status.auth, WIRELESS_ENCRYPT_UNKNOWN)};
 }
 
+Value StandardOf(const Status& status) {
+  return status.isConnected() ? Value(MEROWirelessProtocolStringGet(status.protocol)) : nullptr;
+}
+
+// A network that is joined as it was saved: no scan has told its standard.
+Shown ShowStandard(const Status& status, bool) {
+  if (!status.isConnected() || status.protocol == WIRELESS_PROTO_UNKNOWN) return {"-", Tone::kFaint};
+  return {MEROWirelessProtocolStringGet(status.protocol)};
+}
+
 constexpr Field<Status> kStatusFields[] = {
     {"state", "status", [](const Status& of) { return Value(StateOf(of).szKey); }, Layout::kLeft,
      [](const Status& of, bool) {
@@ -55,8 +70,7 @@ constexpr Field<Status> kStatusFields[] = {
      }},
     {"name", "network", [](const Status& of) { return of.isConnected() ? Value(of.name) : nullptr; }},
     {"auth", "security", AuthOf, Layout::kLeft, ShowAuth},
-    {"standard", "standard",
-     [](const Status& of) { return of.isConnected() ? Value(MEROWirelessProtocolStringGet(of.protocol)) : nullptr; }},
+    {"standard", "standard", StandardOf, Layout::kLeft, ShowStandard},
     {"mode", "",
      [](const Status& of) { return of.isConnected() ? Value(MEROWirelessOpmodeStringGet(of.mode)) : nullptr; }},
     {"interface", "interface", [](const Status& of) { return Value(of.interface); }},
@@ -101,6 +115,8 @@ Status ReadStatus() {
   status.interface = MEROWirelessInterfaceGet();
   status.radio = MEROWirelessCheckBlock();
   ReadAddress(status);
+  if (status.state == WIRELESS_STATUS_UNKNOWN) Ask(REQUEST_MODE, &WIRELESS_INFO::opmode, status.mode);
+  status.isAccessPoint = status.mode == WIRELESS_OPMODE_MASTER;
   if (!status.isConnected()) return status;
 
   WIRELESS_INFO info{};

@@ -18,6 +18,7 @@ struct Status {
   std::string ip;  // also without a connection
   std::string mask;
   int radio = -1;
+  bool isAccessPoint = false;
 
   bool operator==(const Status&) const = default;
   bool isConnected() const {

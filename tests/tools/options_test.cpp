@@ -1,6 +1,8 @@
 // The command line and its completions.
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
+#include <sstream>
 
 #include "ap_settings.h"
 #include "running.h"
@@ -39,8 +41,25 @@ TEST_F(CommandLine, ExplainsItselfOnRequest) {
   EXPECT_THAT(Tool({"ap", "set", "--help"}).out, HasSubstr("--channel VALUE"));
 }
 
-const char* const kCommands[] = {"scan",  "known",   "save",    "connect", "autoconnect", "disconnect", "status",
-                                 "watch", "address", "gateway", "adhoc",   "ap",          "mode",       "radio"};
+const char* const kCommands[] = {"scan",        "known",      "save",   "forget", "connect",
+                                 "autoconnect", "disconnect", "status", "watch",  "address",
+                                 "gateway",     "adhoc",      "ap",     "mode",   "radio"};
+
+// Columns, where every byte but the continuation of a character is one.
+std::size_t WidthOf(std::string_view line) {
+  return std::ranges::count_if(line, [](char byte) { return (byte & 0xC0) != 0x80; });
+}
+
+TEST_F(CommandLine, HasHelpThatFitsATerminal) {
+  std::vector<std::vector<std::string>> commands = {
+      {}, {"ap", "show"}, {"ap", "set"}, {"ap", "enable"}, {"ap", "disable"}, {"ap", "status"}};
+  for (const char* szCommand : kCommands) commands.push_back({szCommand});
+  for (std::vector<std::string>& words : commands) {
+    words.emplace_back("--help");
+    std::istringstream help(Tool(words).out);
+    for (std::string line; std::getline(help, line);) EXPECT_LE(WidthOf(line), 80U) << line;
+  }
+}
 
 // What bash would offer for the last word of a line.
 std::string Offered(const std::string& line) {

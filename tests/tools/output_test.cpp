@@ -127,6 +127,24 @@ TEST_F(Output, OfTheStatusNamesWhatThereIs) {
   EXPECT_EQ(Tool({"status", "--porcelain"}).out, "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\n");
 }
 
+TEST_F(Output, OfTheStatusLeavesOutAStandardThatNoScanHasTold) {
+  library::Connected("Home");
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO) { return 0; };
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("\nstandard   -\n"));
+  EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("standard":"unknown")"));
+}
+
+TEST_F(Output, OfTheStatusTellsAnAccessPoint) {
+  library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_UNKNOWN; };
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("status     unknown\n"));
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
+    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
+  };
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("status     an access point (see `merowireless ap status`)\n"));
+  EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("state":"access-point","name":null)"));
+  EXPECT_EQ(Tool({"status", "--porcelain"}).out, "access-point\t\t\t\t\twlan0\t\t\ton\t\n");
+}
+
 TEST_F(Output, OfAFailureIsASentenceAndInJsonADocumentToo) {
   library::MEROWirelessAdapterNum = [] { return 0; };
   const Ran ran = Tool({"connect", "Home", "--json"});
