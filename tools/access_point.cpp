@@ -8,6 +8,7 @@
 #include "library_log.h"
 #include "paths.h"
 #include "radio.h"
+#include "signals.h"
 
 namespace {
 
@@ -36,13 +37,20 @@ ApConf ReadSettings() {
 
 void SaveSettings(ApConf conf) {
   if (MEROWirelessSetAPConfig(&conf) == FALSE) {
-    throw Failed("the settings could not be saved", "are you root, and is there room on the disk? -v shows more");
+    throw Failed("the settings could not be saved", "is there room on the disk? -v shows more");
   }
 }
 
 void SaveSwitch(ApConf conf, bool on) {
   conf.blEnable = on ? TRUE : FALSE;
   SaveSettings(conf);
+}
+
+// The library saves settings only together with the switch on; where it was off, it is put back, whoever interrupts.
+void SaveKeepingSwitch(const ApConf& conf) {
+  const Signals signals;
+  SaveSwitch(conf, true);
+  if (conf.blEnable == FALSE) SaveSwitch(conf, false);
 }
 
 void ApplySecrets(const Program& program, ApConf& conf, const ApChanges& changes) {
@@ -61,6 +69,15 @@ void ApplySettings(ApConf& conf, const ApChanges& changes) {
     const auto change = changes.settings.find(setting.szOption);
     if (change != changes.settings.end()) setting.set(conf, change->second);
   }
+}
+
+// What was off before something came to nothing is off again.
+void PutSwitchBack(const ApConf& before) {
+  if (before.blEnable == FALSE) SaveSwitch(before, false);
+}
+
+bool TakeDown(const Program& program) {
+  return Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) != FALSE;
 }
 
 Failure EnableFailed() {
@@ -122,19 +139,16 @@ void ShowAp(const Program& program, bool showSecrets) {
   program.output.One<ApConf>("access_point", fields, ReadSettings());
 }
 
-// The library saves settings only together with the switch on; where it was off, it is put back.
 void SetAp(const Program& program, const ApChanges& changes) {
   if (changes.settings.empty() && !changes.secret.isGiven() && changes.guestKeyFile.empty()) {
     throw Failure(Exit::kUsage, "there is nothing to change", "`merowireless ap set --help` lists the settings");
   }
   ApConf conf = ReadSettings();
-  const bool wasEnabled = conf.blEnable != FALSE;
   SetBridgeDefault(conf);
   ApplySettings(conf, changes);
   ApplySecrets(program, conf, changes);
   RequireComplete(conf);
-  SaveSwitch(conf, true);
-  if (!wasEnabled) SaveSwitch(conf, false);
+  SaveKeepingSwitch(conf);
   const auto fields = ApFields(false);
   program.output.Done<ApConf>("saved; `merowireless ap enable` puts the settings on the air", "access_point", fields,
                               conf);
@@ -144,17 +158,24 @@ void EnableAp(const Program& program) {
   const ApConf conf = ReadSettings();
   RequireAdapter();
   RequireComplete(conf);
-  if (conf.blEnable == FALSE) SaveSwitch(conf, true);
   Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
   task.szMarker = kApMarker;
-  if (Run<BOOL>(task, [] { return MEROWirelessAPEnable(); }) == FALSE) throw EnableFailed();
+  task.undo = [&] {
+    (void)TakeDown(program);  // has reported what it could not
+    PutSwitchBack(conf);
+  };
+  if (conf.blEnable == FALSE) SaveSwitch(conf, true);
+  if (Run<BOOL>(task, [] { return MEROWirelessAPEnable(); }) == FALSE) {
+    PutSwitchBack(conf);
+    throw EnableFailed();
+  }
   program.output.Done<ApStatus>("the access point " + program.output.Name(conf.hostapConf.szSSID) + " is enabled",
                                 "access_point", kApStatusFields, ReadApStatus());
 }
 
 void DisableAp(const Program& program) {
   const ApConf conf = ReadSettings();
-  if (Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) == FALSE) {
+  if (!TakeDown(program)) {
     throw Failed("the access point could not be taken down whole");
   }
   SaveSwitch(conf, false);

@@ -23,13 +23,11 @@ struct Mode {
   std::string_view text;
   int hwMode;
   int n;
-  std::string_view band;
 };
 
 constexpr Mode kModes[] = {
-    {"b", AP_MODE_80211B, 0, "2.4"},  {"g", AP_MODE_80211G, 0, "2.4"}, {"bn", AP_MODE_80211B, 1, "2.4"},
-    {"gn", AP_MODE_80211G, 1, "2.4"}, {"n", AP_MODE_80211N, 1, "2.4"}, {"a", AP_MODE_80211A, 0, "5"},
-    {"an", AP_MODE_80211A, 1, "5"},
+    {"b", AP_MODE_80211B, 0}, {"g", AP_MODE_80211G, 0}, {"bn", AP_MODE_80211B, 1}, {"gn", AP_MODE_80211G, 1},
+    {"n", AP_MODE_80211N, 1}, {"a", AP_MODE_80211A, 0}, {"an", AP_MODE_80211A, 1},
 };
 
 constexpr int k5GHzChannels[] = {36,  40,  44,  48,  52,  56,  60,  64,  100, 104, 108, 112, 116,
@@ -39,21 +37,7 @@ BOOL SwitchOf(const std::string& text, const char* szOption) {
   return ValueOf(kSwitch, text, szOption) != 0 ? TRUE : FALSE;
 }
 
-int NumberOf(const std::string& text, int least, int greatest, const char* szOption) {
-  const auto number = ParseNumber(text);
-  if (number && *number >= least && *number <= greatest) return *number;
-  throw Wrong("--" + std::string(szOption) + " cannot be this",
-              "it is a number from " + std::to_string(least) + " to " + std::to_string(greatest));
-}
-
 // ---- Names, modes, protection ----
-
-void SetName(char (&field)[128], const std::string& text, const char* szWhat) {
-  constexpr std::size_t kLongest = 32;
-  if (text.empty() || text.size() > kLongest)
-    throw Wrong(std::string(szWhat) + " cannot be this", "give 1 to 32 bytes");
-  SetText(field, text, szWhat);
-}
 
 const Mode* ModeOf(const ApConf& conf) {
   const auto* found = std::ranges::find_if(kModes, [&](const Mode& mode) {
@@ -62,13 +46,18 @@ const Mode* ModeOf(const ApConf& conf) {
   return found != std::end(kModes) ? found : nullptr;
 }
 
-void SetMode(ApConf& conf, const Mode& mode) {
-  conf.hostapConf.hwMode = mode.hwMode;
-  conf.hostapConf.ieee80211n = mode.n;
-}
-
 bool Is5GHz(const ApConf& conf) {
   return conf.hostapConf.hwMode == AP_MODE_80211A;
+}
+
+void SetMode(ApConf& conf, const std::string& text) {
+  const Mode& mode = RowOf<Mode>(kModes, text, "mode");
+  if ((mode.hwMode == AP_MODE_80211A) != Is5GHz(conf)) {
+    throw Wrong("this is no mode of the " + std::string(Is5GHz(conf) ? "5" : "2.4") + " GHz band",
+                std::string("add --band ") + (Is5GHz(conf) ? "2.4" : "5") + ", or use another mode");
+  }
+  conf.hostapConf.hwMode = mode.hwMode;
+  conf.hostapConf.ieee80211n = mode.n;
 }
 
 void SetBand(ApConf& conf, const std::string& text) {
@@ -180,7 +169,7 @@ const ApSetting kSettings[] = {
     {{"ssid", "name", [](const ApConf& of) { return Value(of.hostapConf.szSSID); }},
      "ssid",
      "the network's name",
-     [](ApConf& of, const std::string& text) { SetName(of.hostapConf.szSSID, text, "the name"); }},
+     [](ApConf& of, const std::string& text) { SetNetworkName(of.hostapConf.szSSID, text); }},
     {{"security", "security",
       [](const ApConf& of) { return Value(ProtectionText(of.hostapConf.encryption, of.hostapConf.encryptInfo)); }},
      "security",
@@ -208,7 +197,7 @@ const ApSetting kSettings[] = {
       [](const ApConf& of) { return ModeOf(of) != nullptr ? Value(std::string(ModeOf(of)->text)) : nullptr; }},
      "mode",
      "b, g, bn, gn, n, a or an",
-     [](ApConf& of, const std::string& text) { SetMode(of, RowOf<Mode>(kModes, text, "mode")); }},
+     SetMode},
     {{"channel", "channel", [](const ApConf& of) { return Value(int64_t{of.hostapConf.channel}); }, Layout::kLeft,
       [](const ApConf& of, bool) {
         return Shown{of.hostapConf.channel == 0 ? "auto" : std::to_string(of.hostapConf.channel)};
@@ -242,7 +231,7 @@ const ApSetting kSettings[] = {
      [](ApConf& of, const std::string& text) { of.hostapConf.wmm = SwitchOf(text, "wmm"); }},
     {{"tx_power", "power", [](const ApConf& of) { return Value(int64_t{of.txpower}); }},
      "tx-power",
-     "0 to 30",
+     "0 to 30; kept for other programs, nothing sets it",
      [](ApConf& of, const std::string& text) { of.txpower = NumberOf(text, 0, 30, "tx-power"); }},
     {{"bridge", "bridge", [](const ApConf& of) { return Value(of.hostapConf.szBridge); }},
      "bridge",
@@ -261,7 +250,7 @@ const ApSetting kSettings[] = {
     {{"guest_ssid", "guest name", [](const ApConf& of) { return Value(Guest(of).szSSID); }},
      "guest-ssid",
      "the guest network's name",
-     [](ApConf& of, const std::string& text) { SetName(Guest(of).szSSID, text, "the guest network's name"); }},
+     [](ApConf& of, const std::string& text) { SetNetworkName(Guest(of).szSSID, text, "the guest network's name"); }},
     {{"guest_security", "guest security",
       [](const ApConf& of) { return Value(ProtectionText(Guest(of).encryption, Guest(of).encryptInfo)); }},
      "guest-security",

@@ -8,10 +8,7 @@
 #include <string_view>
 
 #include "failure.h"
-
-inline Failure Wrong(const std::string& what, const std::string& advice) {
-  return {Exit::kUsage, what, advice};
-}
+#include "text.h"
 
 // Tables of choices have rows with a `text`.
 template <class Row>
@@ -43,6 +40,13 @@ inline std::string NameOf(std::span<const Name> names, int value) {
 
 inline int ValueOf(std::span<const Name> names, const std::string& text, const char* szOption) {
   return RowOf(names, text, szOption).value;
+}
+
+inline int NumberOf(const std::string& text, int least, int greatest, const char* szOption) {
+  const auto number = ParseNumber(text);
+  if (number && *number >= least && *number <= greatest) return *number;
+  throw Wrong("--" + std::string(szOption) + " cannot be this",
+              "it is a number from " + std::to_string(least) + " to " + std::to_string(greatest));
 }
 
 #endif  // MERO_TOOLS_CHOICES_H

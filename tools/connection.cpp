@@ -1,19 +1,16 @@
 // The commands about the connection.
 #include "connection.h"
 
-#include <linux/rtnetlink.h>
-#include <poll.h>
-#include <sys/socket.h>
-
 #include <chrono>
-#include <cstdio>
+#include <optional>
 #include <thread>
 
+#include "addressing.h"
 #include "library.h"
 #include "library_log.h"
+#include "networks.h"
 #include "paths.h"
 #include "security.h"
-#include "signals.h"
 #include "status.h"
 #include "supplicant.h"
 
@@ -38,7 +35,8 @@ std::string SupplicantSocket() {
   return std::string(kSupplicantDirectory) + MEROWirelessInterfaceGet();
 }
 
-Failure JoinFailed(const std::string& name, Verdict verdict) {
+// What the library says about an attempt that came to nothing before any access point had a say.
+std::optional<Failure> AttemptFailed(const std::string& name) {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
   if (library_log::Says("Another connection construction is going")) {
     return Failed("a network is being joined already, or an attempt was cut off", "wait a moment and try again");
@@ -46,19 +44,44 @@ Failure JoinFailed(const std::string& name, Verdict verdict) {
   if (library_log::Says("Failed to detect authentication/encryption type")) {
     return Failed(name + " is protected in a way that cannot be joined", "`merowireless scan` shows how");
   }
+  if (library_log::Says("Failed to set [") || library_log::Says("Failed to record this connection")) {
+    return Failed("the join could not be written down", "is there room on the disk? -v shows which file it is");
+  }
+  return std::nullopt;
+}
+
+// What the supplicant says about one that did.
+std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
   switch (verdict) {
     case Verdict::kSecretRefused:
-      return {Exit::kSecretRefused, name + " does not accept the secret",
-              "`merowireless save` saves the network again with the right one"};
+      return Failure(Exit::kSecretRefused, name + " does not accept the secret",
+                     "`merowireless save` saves the network again with the right one");
     case Verdict::kRefused:
       return Failed(name + " refuses this appliance",
                     "look for address filters and station limits at the access point");
     case Verdict::kNotFound:
-      return {Exit::kOutOfRange, name + " is not in range", "move closer; `merowireless scan --renew` shows what is"};
+      return Failure(Exit::kOutOfRange, name + " is not in range",
+                     "move closer; `merowireless scan --renew` shows what is");
     case Verdict::kNone:
       break;
   }
+  return std::nullopt;
+}
+
+Failure JoinFailed(const std::string& name, Verdict verdict) {
+  if (const auto failure = AttemptFailed(name)) return *failure;
+  if (const auto failure = Refused(name, verdict)) return *failure;
   return Failed(name + " could not be joined in time", "try again closer to it; -v shows what the library reports");
+}
+
+Failure AutoConnectFailed(Verdict verdict) {
+  if (const auto failure = AttemptFailed("a known network")) return *failure;
+  if (library_log::Says("Failed to set interface configuration")) {
+    return Failed("a network was joined, but its address could not be set");
+  }
+  if (verdict > Verdict::kNotFound) return *Refused("one of the known networks", verdict);
+  return {Exit::kOutOfRange, "none of the known networks could be joined",
+          "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
 }
 
 // The library tells a supplicant that runs to end, and starts the next one without waiting; that one gives up when it
@@ -86,32 +109,6 @@ void Join(const Program& program, const KnownNetwork& config) {
 }
 
 // ---- Addressing ----
-
-bool IsDhcp(const KnownNetwork& config) {
-  return std::string_view(config.szIp) == "DHCP";
-}
-
-Task SettingAddress(const Program& program, const KnownNetwork& config) {
-  return program.Doing(IsDhcp(config) ? "asking for an address" : "setting the address");
-}
-
-void ApplyAddress(const Task& task, const KnownNetwork& config) {
-  const std::string interface = MEROWirelessInterfaceGet();
-  const int result = Run<int>(task, [&] { return MEROWirelessIfconfigSet(interface.c_str(), config); });
-  if (library_log::Says("Failed to get IP from DHCP")) {
-    throw Failed("no DHCP server answered", "give a static address: merowireless address A.B.C.D --mask M");
-  }
-  if (result < 0) throw Failed("the address could not be set");
-}
-
-void ApplyGateway(const std::string& gateway) {
-  if (MEROWirelessDefaultGatewaySet(gateway.c_str()) < 0) throw Failed("the gateway could not be set");
-}
-
-// A DHCP server names the gateway along with the address.
-void ApplySavedGateway(const KnownNetwork& config) {
-  if (config.szGateway[0] != '\0' && !IsDhcp(config)) ApplyGateway(config.szGateway);
-}
 
 void ApplyAddressing(const Program& program, const KnownNetwork& config) {
   if (config.szIp[0] == '\0') return;
@@ -159,37 +156,11 @@ void ApplyGatewayOfConnection() {
   if (const auto known = FindKnown(ReadStatus().name)) ApplySavedGateway(*known);
 }
 
-Failure AutoConnectFailed() {
-  if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (library_log::Says("Failed to set interface configuration")) {
-    return Failed("a network was joined, but its address could not be set", "-v shows what the library reports");
-  }
-  return {Exit::kOutOfRange, "none of the known networks could be joined",
-          "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
-}
-
-// ---- Watching ----
-
-// Readable whenever the kernel has news about links and addresses.
-Descriptor News() {
-  Descriptor socket(Require(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC | SOCK_NONBLOCK, NETLINK_ROUTE), "netlink"));
-  sockaddr_nl address{};
-  address.nl_family = AF_NETLINK;
-  address.nl_groups = RTMGRP_LINK | RTMGRP_IPV4_IFADDR;
-  Require(::bind(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address), "netlink");
-  return socket;
-}
-
-// Waits until there is news, or time has passed in which some drivers have news that they do not tell. False when the
-// program is to end.
-bool WaitForNews(const Descriptor& news, const Signals& signals) {
-  constexpr int kPatience = 1000;
-  pollfd waited[] = {{news.get(), POLLIN, 0}, {signals.fd(), POLLIN, 0}};
-  if (::poll(waited, std::size(waited), kPatience) <= 0) return true;
-  if (signals.HasCome()) return false;
-  char drained[8192];
-  while (::recv(news.get(), drained, sizeof drained, 0) > 0) continue;
-  return true;
+// The library reports a command that could not be run, and none that the driver refused.
+bool IsInCell(const std::string& name) {
+  WIRELESS_INFO info{};
+  return MEROWirelessCurInfoGet(REQUEST_MODE, &info) == 0 && info.opmode == WIRELESS_OPMODE_ADHOC &&
+         MEROWirelessCurInfoGet(REQUEST_ESSID, &info) == 0 && name == info.szEssid;
 }
 
 }  // namespace
@@ -199,7 +170,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
   RequireRadio();
   const KnownNetwork config = NetworkOf(program, wanted);
   Join(program, config);
-  if (wanted.address) ApplyAddressing(program, config);
+  if (!wanted.noAddress) ApplyAddressing(program, config);
   SayConnected(program);
 }
 
@@ -208,11 +179,16 @@ void AutoConnect(const Program& program) {
   RequireRadio();
   // The library ends a connection that exists, and calls that a failure.
   if (ReadStatus().isConnected()) return SayConnected(program);
+  if (Known(Order::kByTime).empty()) {
+    throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");
+  }
 
+  EndFormerSupplicant(program);
   SupplicantListener listener(SupplicantSocket());
   if (Run<int>(Joining(program, "joining a known network", listener), [] { return MEROWirelessAutoConnect(); }) < 0) {
-    throw AutoConnectFailed();
+    throw AutoConnectFailed(listener.verdict());
   }
+  RequireLease();
   ApplyGatewayOfConnection();
   SayConnected(program);
 }
@@ -228,30 +204,11 @@ void ShowStatus(const Program& program) {
   program.output.One("status", StatusFields(), ReadStatus());
 }
 
-void SetAddress(const Program& program, const Addressing& addressing) {
-  KnownNetwork config{};
-  SetAddressing(config, addressing);
-  RequireAdapter();
-  ApplyAddress(SettingAddress(program, config), config);
-  const Status status = ReadStatus();
-  program.output.Done("the address is " + (status.ip.empty() ? "not known yet" : status.ip), "status", StatusFields(),
-                      status);
-}
-
-void SetGateway(const Program& program, const std::string& gateway) {
-  if (!IsIpAddress(gateway)) {
-    throw Failure(Exit::kUsage, "the gateway is no IPv4 address", "give an address such as 192.168.1.1");
-  }
-  RequireAdapter();
-  ApplyGateway(gateway);
-  program.output.Done("the gateway is " + gateway);
-}
-
 void MakeCell(const Program& program, const CellToMake& wanted) {
   RequireAdapter();
   RequireRadio();
   KnownNetwork config{};
-  SetText(config.network.szEssid, wanted.name, "the name");
+  SetNetworkName(config.network.szEssid, wanted.name);
   config.network.opmode = WIRELESS_OPMODE_ADHOC;
   config.network.auth = wanted.wep ? WIRELESS_AUTH_SHARED : WIRELESS_AUTH_OPEN;
   config.network.encrypt = wanted.wep ? WIRELESS_ENCRYPT_WEP : WIRELESS_ENCRYPT_NONE;
@@ -259,27 +216,9 @@ void MakeCell(const Program& program, const CellToMake& wanted) {
   const std::string name = program.output.Name(wanted.name);
   Task task = program.Doing("starting " + name);
   task.undo = LeaveNothing;
-  if (Run<int>(task, [&] { return MEROWirelessAdhocCreate(&config); }) < 0) {
+  if (Run<int>(task, [&] { return MEROWirelessAdhocCreate(&config); }) < 0 || !IsInCell(wanted.name)) {
     throw Failed("the cell " + name + " could not be started",
                  "not every adapter can; -v shows what the library reports");
   }
   program.output.Done("started the ad-hoc cell " + name);
-}
-
-void Watch(const Program& program, int times) {
-  const Signals signals;
-  const Descriptor news = News();
-  Status shown = ReadStatus();
-  for (int count = 1;; ++count) {
-    program.output.One("status", StatusFields(), shown);
-    if (program.output.form() == Form::kHuman) std::fputs("\n", stdout);
-    std::fflush(stdout);
-    if (count == times) return;
-    Status status = shown;
-    while (status == shown) {
-      if (!WaitForNews(news, signals)) return;
-      status = ReadStatus();
-    }
-    shown = std::move(status);
-  }
 }

@@ -1,10 +1,9 @@
-// The commands about the connection: connect, autoconnect, disconnect, status, watch, address, gateway, adhoc.
+// The commands about the connection: connect, autoconnect, disconnect, status, adhoc.
 #ifndef MERO_TOOLS_CONNECTION_H
 #define MERO_TOOLS_CONNECTION_H
 
 #include <string>
 
-#include "networks.h"
 #include "program.h"
 #include "secrets.h"
 
@@ -13,7 +12,7 @@ struct NetworkToJoin {
   SecretSource secret;
   std::string user;
   bool anyAccessPoint = false;
-  bool address = true;
+  bool noAddress = false;
 };
 
 struct CellToMake {
@@ -26,11 +25,6 @@ void Connect(const Program& program, const NetworkToJoin& wanted);
 void AutoConnect(const Program& program);
 void Disconnect(const Program& program);
 void ShowStatus(const Program& program);
-void SetAddress(const Program& program, const Addressing& addressing);
-void SetGateway(const Program& program, const std::string& gateway);
 void MakeCell(const Program& program, const CellToMake& wanted);
-
-// Shows the status now and whenever it has changed, `times` times or, with 0, until the program is ended.
-void Watch(const Program& program, int times);
 
 #endif  // MERO_TOOLS_CONNECTION_H

@@ -31,6 +31,11 @@ class Failure : public std::runtime_error {
   std::string advice_;
 };
 
+// What was asked for cannot be.
+inline Failure Wrong(const std::string& what, const std::string& advice) {
+  return {Exit::kUsage, what, advice};
+}
+
 // The user, or whoever ended the program, did not want to wait.
 struct Interrupted {};
 

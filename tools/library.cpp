@@ -2,6 +2,7 @@
 #include "library.h"
 
 #include <search.h>
+#include <unistd.h>
 
 #include <cstddef>
 #include <cstdlib>
@@ -87,7 +88,7 @@ std::vector<KnownNetwork> Known(Order order) {
   Ring<KnownNetwork> ring;
   const auto list = order == Order::kByTime ? MEROWirelessConfEnumByAtime : MEROWirelessConfEnum;
   if (list(ring.head()) < 0) {
-    throw Failed("the known networks cannot be read", "are you root? -v shows what the library reports");
+    throw Failed("the known networks cannot be read", "-v shows what the library reports");
   }
   return ring.Records();
 }
@@ -146,5 +147,5 @@ Failure NoAdapter() {
 }
 
 Failure Failed(const std::string& what, const std::string& advice) {
-  return {Exit::kFailed, what, advice};
+  return {Exit::kFailed, what, ::geteuid() == 0 ? advice : "run it as root; -v shows what the library reports"};
 }

@@ -42,7 +42,8 @@ void RequireRadio();
 // What became of a call that went wrong, when the library says that it was the adapter.
 Failure NoAdapter();
 
-// The failure of a call for which the library gave no reason of interest; what it reported follows on request.
+// The failure of a call for which the library gave no reason of interest; what it reported follows on request. Who is
+// not root is told to be.
 Failure Failed(const std::string& what, const std::string& advice = "-v shows what the library reports");
 
 // Copies a text that must fit; what it is called is for the failure.
@@ -53,6 +54,14 @@ void SetText(char (&field)[kSize], std::string_view text, std::string_view what)
                   "give one line of up to " + std::to_string(kSize - 1) + " bytes");
   }
   *std::copy(text.begin(), text.end(), std::begin(field)) = '\0';
+}
+
+// A network's name is 1 to 32 bytes on the air.
+template <std::size_t kSize>
+void SetNetworkName(char (&field)[kSize], std::string_view name, const std::string& what = "the name") {
+  constexpr std::size_t kLongest = 32;
+  if (name.empty() || name.size() > kLongest) throw Wrong(what + " cannot be this", "give 1 to 32 bytes");
+  SetText(field, name, what);
 }
 
 #endif  // MERO_TOOLS_LIBRARY_H

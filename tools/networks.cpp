@@ -77,7 +77,10 @@ constexpr Field<KnownNetwork> kKnownFields[] = {
     {"gateway", "", [](const KnownNetwork& of) { return Value(of.szGateway); }},
     {"saved", "SAVED",
      [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(TimeText(of.atime, "%FT%TZ", ::gmtime_r)); },
-     Layout::kLeft, [](const KnownNetwork& of, bool) { return Shown{TimeText(of.atime, "%F %R", ::localtime_r)}; }},
+     Layout::kLeft,
+     [](const KnownNetwork& of, bool) {
+       return of.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{TimeText(of.atime, "%F %R", ::localtime_r)};
+     }},
     {"address", "ACCESS POINT", [](const KnownNetwork& of) { return Value(AddressText(of.network.bssid)); }},
     {"name_hex", "", [](const KnownNetwork& of) { return NameInHex(of.network.szEssid); }},
     {"has_secret", "", [](const KnownNetwork& of) { return Value(of.szKey[0] != '\0'); }},
@@ -89,13 +92,20 @@ constexpr std::span kWithoutSecret = kWithSecret.first(kWithSecret.size() - 1);
 
 // ---- Saving ----
 
+// Neither nobody's address nor one of many.
+bool IsStation(const Address& address) {
+  return address != Address{} && (address[0] & 1) == 0;
+}
+
 // A network as its user describes it, for those that hide or are out of range.
 Network Described(const NetworkToSave& wanted) {
   const auto address = ParseAddress(wanted.address);
-  if (!address) throw Failure(Exit::kUsage, "--bssid is no hardware address", "write it as 00:11:22:33:44:55");
+  if (!address || !IsStation(*address)) {
+    throw Failure(Exit::kUsage, "--bssid is no access point's address", "write it as 00:11:22:33:44:55");
+  }
   Network network{};
   std::ranges::copy(*address, network.bssid);
-  SetText(network.szEssid, wanted.name, "the name");
+  SetNetworkName(network.szEssid, wanted.name);
   if (!SetSecurity(network, wanted.security)) {
     throw Failure(Exit::kUsage, "with --bssid, --security says how the network is protected", kSecurityNames);
   }
@@ -103,7 +113,7 @@ Network Described(const NetworkToSave& wanted) {
 }
 
 Failure NotSaved() {
-  return Failed("the network could not be saved", "are you root, and is there room on the disk? -v shows more");
+  return Failed("the network could not be saved", "is there room on the disk? -v shows more");
 }
 
 }  // namespace
@@ -139,15 +149,18 @@ void Forget(const Program& program, const std::string& name) {
                   "`merowireless known` lists those that are");
   }
   for (const KnownNetwork& network : known) {
-    if (PLIBCFileRemoveSection(kKnownNetworks, AddressText(network.network.bssid).c_str()) >= 0) continue;
-    throw Failed(shown + " could not be forgotten", "are you root? -v shows more");
+    if (PLIBCFileRemoveSection(kKnownNetworks, AddressText(network.network.bssid).c_str()) > 0) continue;
+    throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworks));
   }
   program.output.ListDone<KnownNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
 }
 
 void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const SecretSource& source) {
-  if (!NeedsSecret(config.network.auth)) return;
   const std::string name = program.output.Name(config.network.szEssid);
+  if (!NeedsSecret(config.network.auth)) {
+    if (source.isGiven()) throw Failure(Exit::kUsage, name + " is open and takes no secret", "give none");
+    return;
+  }
   const auto secret = ReadSecret(source, "secret of " + name);
   if (!secret) {
     throw Failure(Exit::kUsage, name + " needs a secret, and there is no terminal to ask on",
@@ -155,21 +168,4 @@ void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const Se
   }
   RequireSecretFor(config.network.auth, *secret);
   SetText(config.szKey, *secret, "the secret");
-}
-
-void SetAddressing(WIRELESS_NETWORK_CONFIG& config, const Addressing& addressing) {
-  const bool isStatic = addressing.ip != "DHCP" && addressing.ip != "none";
-  if (isStatic && !IsIpAddress(addressing.ip)) {
-    throw Failure(Exit::kUsage, "this is no IPv4 address: " + Harmless(addressing.ip, false),
-                  "give DHCP or an address such as 192.168.1.20");
-  }
-  if (isStatic && !IsNetmask(addressing.mask)) {
-    throw Failure(Exit::kUsage, "a static address needs its netmask", "add --mask, such as 255.255.255.0");
-  }
-  if (!addressing.gateway.empty() && !IsIpAddress(addressing.gateway)) {
-    throw Failure(Exit::kUsage, "the gateway is no IPv4 address", "give an address such as 192.168.1.1");
-  }
-  SetText(config.szIp, addressing.ip == "none" ? "" : addressing.ip, "the address");
-  SetText(config.szMask, addressing.mask, "the netmask");
-  SetText(config.szGateway, addressing.gateway, "the gateway");
 }

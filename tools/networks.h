@@ -4,16 +4,10 @@
 
 #include <string>
 
+#include "addressing.h"
 #include "program.h"
 #include "secrets.h"
 #include "wireless.h"
-
-// How a network is to be addressed: "DHCP", or an address with its mask, or not at all.
-struct Addressing {
-  std::string ip = "DHCP";
-  std::string mask;
-  std::string gateway;
-};
 
 struct NetworkToSave {
   std::string name;  // or the address of its access point
@@ -32,7 +26,5 @@ void Forget(const Program& program, const std::string& name);
 
 // Puts a secret into a network that needs one; from a prompt when no source is given.
 void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const SecretSource& source);
-
-void SetAddressing(WIRELESS_NETWORK_CONFIG& config, const Addressing& addressing);
 
 #endif  // MERO_TOOLS_NETWORKS_H

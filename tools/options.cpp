@@ -4,14 +4,18 @@
 #include <CLI/App.hpp>
 #include <CLI/Config.hpp>
 #include <CLI/Formatter.hpp>
+#include <limits>
 #include <memory>
 #include <sstream>
 
 #include "access_point.h"
+#include "addressing.h"
 #include "ap_settings.h"
+#include "choices.h"
 #include "connection.h"
 #include "networks.h"
 #include "radio.h"
+#include "watch.h"
 
 namespace {
 
@@ -133,7 +137,7 @@ void AddConnectionCommands(Commands& commands) {
         DescribeSecret(command, values.secret);
         command.add_option("--user", values.user, "who you are, for networks with EAP")->option_text("NAME");
         command.add_flag("--any-ap", values.anyAccessPoint, "through any access point that bears the name");
-        command.add_flag("!--no-address", values.address, "only join; leave the addresses alone");
+        command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
       },
       Connect);
   commands.AddPlain("autoconnect", "Join the newest known network that can be joined", AutoConnect);
@@ -141,14 +145,17 @@ void AddConnectionCommands(Commands& commands) {
   commands.AddPlain("status", "Show the state of the connection", ShowStatus);
 
   struct Watching {
-    int times = 0;
+    std::string times;
   };
   commands.Add<Watching>(
       "watch", "Show the connection's state whenever it changes",
       [](CLI::App& command, Watching& values) {
-        command.add_option("--count", values.times, "end after so many")->option_text("N")->check(CLI::PositiveNumber);
+        command.add_option("--count", values.times, "end after so many")->option_text("N");
       },
-      [](const Program& program, const Watching& values) { Watch(program, values.times); });
+      [](const Program& program, const Watching& values) {
+        constexpr int kMost = std::numeric_limits<int>::max();
+        Watch(program, values.times.empty() ? 0 : NumberOf(values.times, 1, kMost, "count"));
+      });
 
   commands.Add<Addressing>(
       "address", "Give the interface an address",
@@ -213,21 +220,16 @@ void AddAdapterCommands(Commands& commands) {
   commands.Add<std::string>(
       "mode", "Make the adapter an access point's or a client's",
       [](CLI::App& command, std::string& mode) {
-        command.add_option("mode", mode, "ap or client")
-            ->required()
-            ->option_text("ap|client")
-            ->check(CLI::IsMember({"ap", "client"}));
+        command.add_option("mode", mode, "ap or client")->required()->option_text("ap|client");
       },
       ChangeMode);
   commands.Add<std::string>(
       "radio", "Show whether the radio may be used, or switch it",
       [](CLI::App& command, std::string& state) {
-        command.add_option("state", state, "on or off; nothing shows it")
-            ->option_text("[on|off]")
-            ->check(CLI::IsMember({"on", "off"}));
+        command.add_option("state", state, "on or off; nothing shows it")->option_text("[on|off]");
       },
       [](const Program& program, const std::string& state) {
-        state.empty() ? ShowRadio(program) : SwitchRadio(program, state == "on");
+        state.empty() ? ShowRadio(program) : SwitchRadio(program, state);
       });
 }
 
@@ -239,9 +241,10 @@ void FallThrough(CLI::App& app) {
   }
 }
 
-// What is wrong. Words that nobody expected are not repeated: one of them may be a secret.
+// What is wrong. What was given is not repeated: it may be a secret at a wrong place.
 std::string Complaint(const CLI::ParseError& error) {
   if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr) return "there are more arguments than were expected";
+  if (dynamic_cast<const CLI::ConversionError*>(&error) != nullptr) return "an option takes no value and was given one";
   return error.what();
 }
 

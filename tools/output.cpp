@@ -41,23 +41,18 @@ void PutDocument(const Json& document) {
 
 // ---- Porcelain: one record a line, its fields between tabs ----
 
+// As printf's %b reads it. Other bytes than these do nothing to a terminal.
+std::string Escaped(char byte) {
+  if (byte == '\t') return "\\t";
+  if (byte == '\n') return "\\n";
+  if (byte == '\\') return "\\\\";
+  const bool control = static_cast<unsigned char>(byte) < ' ' || byte == '\x7F';
+  return control ? "\\x" + Hex({&byte, 1}) : std::string(1, byte);
+}
+
 std::string Escaped(std::string_view text) {
   std::string escaped;
-  for (char byte : text) {
-    switch (byte) {
-      case '\t':
-        escaped += "\\t";
-        break;
-      case '\n':
-        escaped += "\\n";
-        break;
-      case '\\':
-        escaped += "\\\\";
-        break;
-      default:
-        escaped += byte;
-    }
-  }
+  for (char byte : text) escaped += Escaped(byte);
   return escaped;
 }
 

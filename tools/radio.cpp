@@ -48,20 +48,23 @@ void ShowRadio(const Program& program) {
 
 // The switch lies in the access-point settings, where the library saves it along with all others, and only while an
 // access point is enabled.
-void SwitchRadio(const Program& program, bool on) {
+void SwitchRadio(const Program& program, const std::string& state) {
+  if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
+  const bool on = state == "on";
   const std::string model = AdapterModel();
   if (PLIBCFileSetSectionValue(kApSettings, model.c_str(), "unblock", on ? "yes" : "no", kApSettingsLine) < 0) {
-    throw Failed("the radio could not be switched", "are you root, and is there room on the disk? -v shows more");
+    throw Failed("the radio could not be switched", "is there room on the disk? -v shows more");
   }
   program.output.Done<Radio>(on ? "the radio is on" : "the radio is off: no network will be joined", "radio",
                              kRadioFields, ReadRadio());
 }
 
 void ChangeMode(const Program& program, const std::string& mode) {
+  if (mode != "ap" && mode != "client") throw Wrong("there is no such mode", "it is ap or client");
   const MERO_WIRELESS_MODE value = mode == "ap" ? WIRELESS_AP_MODE : WIRELESS_CLIENT_MODE;
   if (Run<BOOL>(program.Doing("changing the mode"), [&] { return MEROWirelessModeChange(value); }) == FALSE) {
     if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
-    throw Failed("the mode could not be changed", "-v shows what the library reports");
+    throw Failed("the mode could not be changed");
   }
   program.output.Done(mode == "ap" ? "the adapter is an access point's now" : "the adapter is a client's now");
 }

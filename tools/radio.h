@@ -7,7 +7,9 @@
 #include "program.h"
 
 void ShowRadio(const Program& program);
-void SwitchRadio(const Program& program, bool on);
+
+// "on" or "off".
+void SwitchRadio(const Program& program, const std::string& state);
 
 // "ap" or "client".
 void ChangeMode(const Program& program, const std::string& mode);

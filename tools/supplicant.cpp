@@ -9,18 +9,30 @@
 
 namespace {
 
+// An event tells something by how it begins and ends; names from the air stand between.
 struct Clue {
-  std::string_view text;
+  std::string_view start;
+  std::string_view end;
   Verdict verdict;
 };
 
 constexpr Clue kClues[] = {
-    {"reason=WRONG_KEY", Verdict::kSecretRefused},       {"pre-shared key may be incorrect", Verdict::kSecretRefused},
-    {"CTRL-EVENT-EAP-FAILURE", Verdict::kSecretRefused}, {"CTRL-EVENT-AUTH-REJECT", Verdict::kRefused},
-    {"CTRL-EVENT-ASSOC-REJECT", Verdict::kRefused},      {"CTRL-EVENT-NETWORK-NOT-FOUND", Verdict::kNotFound},
+    {"CTRL-EVENT-SSID-TEMP-DISABLED", "reason=WRONG_KEY", Verdict::kSecretRefused},
+    {"WPA: 4-Way Handshake failed", "pre-shared key may be incorrect", Verdict::kSecretRefused},
+    {"CTRL-EVENT-EAP-FAILURE", "", Verdict::kSecretRefused},
+    {"CTRL-EVENT-AUTH-REJECT", "status_code=15", Verdict::kSecretRefused},  // it failed WEP's challenge
+    {"CTRL-EVENT-AUTH-REJECT", "", Verdict::kRefused},
+    {"CTRL-EVENT-ASSOC-REJECT", "", Verdict::kRefused},
+    {"CTRL-EVENT-NETWORK-NOT-FOUND", "", Verdict::kNotFound},
 };
 
 constexpr std::string_view kLeaving = "CTRL-EVENT-TERMINATING";
+
+// An event without how much it matters, such as "<3>".
+std::string_view WithoutLevel(std::string_view event) {
+  if (event.starts_with('<')) event.remove_prefix(std::min(event.find('>'), event.size() - 1) + 1);
+  return event;
+}
 
 bool Send(int fd, std::string_view request) {
   return ::send(fd, request.data(), request.size(), MSG_DONTWAIT | MSG_NOSIGNAL) ==
@@ -30,8 +42,10 @@ bool Send(int fd, std::string_view request) {
 }  // namespace
 
 Verdict VerdictOf(std::string_view event) {
-  for (const auto& [text, verdict] : kClues) {
-    if (event.find(text) != event.npos) return verdict;
+  event = WithoutLevel(event);
+  while (event.ends_with(' ')) event.remove_suffix(1);
+  for (const auto& [start, end, verdict] : kClues) {
+    if (event.starts_with(start) && event.ends_with(end)) return verdict;
   }
   return Verdict::kNone;
 }
@@ -74,6 +88,6 @@ void SupplicantListener::Receive() {
     }
     const std::string_view text(event, static_cast<std::size_t>(size));
     verdict_ = std::max(verdict_, VerdictOf(text));
-    if (text.find(kLeaving) != text.npos) socket_.Close();
+    if (WithoutLevel(text).starts_with(kLeaving)) socket_.Close();
   }
 }

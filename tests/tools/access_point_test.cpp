@@ -1,5 +1,11 @@
 // The commands about the access point.
+#include <unistd.h>
+
+#include <algorithm>
+#include <csignal>
 #include <cstring>
+#include <iterator>
+#include <sstream>
 
 #include "running.h"
 
@@ -31,6 +37,11 @@ MERO_AP_CONF Settings() {
   conf.txpower = 10;
   conf.guestNetAccessRule.blLanBlock = TRUE;
   return conf;
+}
+
+std::vector<std::string> Words(const std::string& text) {
+  std::istringstream stream(text);
+  return {std::istream_iterator<std::string>(stream), {}};
 }
 
 // What the last save was given; shared with the process that saves.
@@ -118,50 +129,11 @@ TEST_F(AccessPoint, TakesAllSettingsByTheNamesThatPeopleHaveForThem) {
   });
   WriteText("/tmp/main-key", "main secret\n");
   WriteText("/tmp/guest-key", "guest secret\n");
-  const Ran ran = Tool({"ap",
-                        "set",
-                        "--band",
-                        "5",
-                        "--mode",
-                        "an",
-                        "--channel",
-                        "44",
-                        "--width",
-                        "40",
-                        "--security",
-                        "mixed",
-                        "--cipher",
-                        "both",
-                        "--key-file",
-                        "/tmp/main-key",
-                        "--hidden",
-                        "yes",
-                        "--max-stations",
-                        "12",
-                        "--wmm",
-                        "no",
-                        "--tx-power",
-                        "20",
-                        "--schedule",
-                        "/tmp/week",
-                        "--guest",
-                        "yes",
-                        "--guest-security",
-                        "wpa2",
-                        "--guest-key-file",
-                        "/tmp/guest-key",
-                        "--guest-isolated",
-                        "yes",
-                        "--guest-lan",
-                        "yes",
-                        "--guest-internet",
-                        "no",
-                        "--guest-appliance",
-                        "yes",
-                        "--guest-web",
-                        "no",
-                        "--bridge",
-                        "br7"});
+  const Ran ran = Tool(Words(
+      "ap set --band 5 --mode an --channel 44 --width 40 --security mixed --cipher both --key-file /tmp/main-key"
+      " --hidden yes --max-stations 12 --wmm no --tx-power 20 --schedule /tmp/week --guest yes --guest-security wpa2"
+      " --guest-key-file /tmp/guest-key --guest-isolated yes --guest-lan yes --guest-internet no --guest-appliance yes"
+      " --guest-web no --bridge br7"));
   EXPECT_EQ(ran.status, 0) << ran.err;
   EXPECT_EQ(library::Calls()[1],
             "on: 1 1 44 2 2 3 3 1 12 0 20 1 1 2 1 0 1 1 0 br7 main secret guest secret 000000001111");
@@ -175,6 +147,8 @@ TEST_F(AccessPoint, RefusesSettingsThatCannotBe) {
       {{"--channel", "36"}, 2},
       {{"--band", "5", "--channel", "6"}, 2},
       {{"--band", "6"}, 2},
+      {{"--mode", "an"}, 2},
+      {{"--band", "5", "--mode", "gn"}, 2},
       {{"--channel", "eleven"}, 2},
       {{"--ssid", ""}, 2},
       {{"--ssid", std::string(33, 'x')}, 2},
@@ -223,6 +197,40 @@ TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
     EXPECT_EQ(ran.status, 1);
     EXPECT_THAT(ran.err, HasSubstr(szSentence));
   }
+}
+
+TEST_F(AccessPoint, ThatCannotBeEnabledHasItsSwitchPutBack) {
+  library::MEROWirelessAPEnable = [] { return FALSE; };
+  RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
+  EXPECT_EQ(Tool({"ap", "enable"}).status, 1);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable",
+                                            "MEROWirelessSetAPConfig", "off: "));
+}
+
+TEST_F(AccessPoint, WhoseStartIsInterruptedIsTakenDownAndHasItsSwitchPutBack) {
+  library::MEROWirelessAPEnable = [] {
+    library::Record("enabling");
+    while (true) ::pause();
+    return TRUE;
+  };
+  RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
+  StartedTool tool({"ap", "enable"});
+  ASSERT_TRUE(Soon([] { return std::ranges::count(library::Calls(), "enabling") > 0; }));
+  ::kill(tool.pid(), SIGINT);
+  EXPECT_EQ(tool.Wait().status, 130);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable", "enabling",
+                                            "MEROWirelessAPDisable", "MEROWirelessSetAPConfig", "off: "));
+}
+
+TEST_F(AccessPoint, WhoseChangeIsInterruptedHasItsSwitchAsItWas) {
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF conf) {
+    library::Record(conf->blEnable == TRUE ? "on" : "off");
+    ::kill(::getpid(), SIGINT);
+    return TRUE;
+  };
+  StartedTool tool({"ap", "set", "--ssid", "New"});
+  (void)tool.Wait();
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on", "MEROWirelessSetAPConfig", "off"));
 }
 
 TEST_F(AccessPoint, TellsWhetherItIsOnTheAir) {

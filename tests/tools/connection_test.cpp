@@ -1,7 +1,13 @@
-// connect, autoconnect, disconnect, address, gateway, adhoc, watch, radio and mode.
+// connect, autoconnect, disconnect, adhoc, watch, radio and mode.
+#include <fcntl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <csignal>
 #include <cstring>
 #include <filesystem>
 
+#include "program.h"
 #include "running.h"
 
 using library::Network;
@@ -38,7 +44,6 @@ class Connection : public ToolTest {
       library::Record(std::string(szInterface) + "|" + config.szIp + "|" + config.szMask);
       return 0;
     };
-    library::MEROWirelessDefaultGatewaySet = [](const char* szGateway) { return library::Record(szGateway), 0; };
   }
 };
 
@@ -87,14 +92,6 @@ TEST_F(Connection, IsNotMadeBesideASupplicantThatDoesNotEnd) {
   EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessNetworkConnect")));
 }
 
-TEST_F(Connection, OfAStaticNetworkSetsItsGatewayToo) {
-  library::Known({Home("10.0.0.9")});
-  EXPECT_EQ(Tool({"connect", "0A:0A:0A:0A:0A:0A", "--any-ap"}).status, 0);
-  EXPECT_THAT(library::Calls(),
-              ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||1", "MEROWirelessIfconfigSet",
-                          "wlan0|10.0.0.9|255.255.255.0", "MEROWirelessDefaultGatewaySet", "10.0.0.1"));
-}
-
 TEST_F(Connection, CanLeaveTheAddressesAlone) {
   EXPECT_EQ(Tool({"connect", "Home", "--no-address"}).status, 0);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||0"));
@@ -139,20 +136,21 @@ TEST_F(Connection, ThatMeetsAnotherAttemptSaysSo) {
   EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("is being joined already"));
 }
 
+TEST_F(Connection, ThatCannotBeWrittenDownSaysSo) {
+  for (const char* szReport :
+       {"Failed to set [/usr/mero/etc/wpa_supplicant.conf]", "Failed to record this connection."}) {
+    library::MEROWirelessNetworkConnect = [szReport](const WIRELESS_NETWORK_CONFIG*) {
+      return library::Report(szReport), -1;
+    };
+    EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("could not be written down")) << szReport;
+  }
+}
+
 TEST_F(Connection, ThatLosesItsAdapterSaysSo) {
   library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
   int asked = 0;
   library::MEROWirelessAdapterNum = [asked]() mutable { return asked++ < 1 ? 1 : 0; };
   EXPECT_EQ(Tool({"connect", "Home"}).status, 3);
-}
-
-TEST_F(Connection, WithoutADhcpServerIsAFailureThoughTheNetworkWasJoined) {
-  library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) {
-    return library::Report("Failed to get IP from DHCP"), 0;
-  };
-  const Ran ran = Tool({"connect", "Home"});
-  EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.err, HasSubstr("no DHCP server answered"));
 }
 
 TEST_F(Connection, ThatExistsIsKeptByAutoconnect) {
@@ -168,6 +166,27 @@ TEST_F(Connection, IsMadeByAutoconnectOrNotAtAll) {
   EXPECT_EQ(Tool({"autoconnect"}).status, 0);
 }
 
+TEST_F(Connection, IsNotMadeByAutoconnectWhenNoNetworkIsKnown) {
+  library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
+  library::Known({});
+  const Ran ran = Tool({"autoconnect"});
+  EXPECT_EQ(ran.status, 4);
+  EXPECT_THAT(ran.err, HasSubstr("no network is known"));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(Connection, IsMadeByAutoconnectOnlyWhenTheFormerSupplicantHasGone) {
+  library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
+  WriteText(kSupplicantPid, "1\n");
+  InstallSupplicantClient("rm /var/run/wpa_supplicant.pid\n");
+  library::MEROWirelessAutoConnect = [] {
+    library::Record(std::filesystem::exists(kSupplicantPid) ? "too early" : "joined");
+    return 0;
+  };
+  EXPECT_EQ(Tool({"autoconnect"}).status, 0);
+  EXPECT_THAT(library::Calls(), Contains("joined"));
+}
+
 TEST_F(Connection, Ends) {
   EXPECT_EQ(Tool({"disconnect"}).out, "disconnected\n");
   EXPECT_EQ(Tool({"disconnect", "--json"}).out, "{\"result\":\"ok\"}\n");
@@ -175,18 +194,8 @@ TEST_F(Connection, Ends) {
   EXPECT_EQ(Tool({"disconnect"}).status, 1);
 }
 
-TEST_F(Connection, TakesAddressesThatAreAddresses) {
-  EXPECT_EQ(Tool({"address", "10.0.0.9", "--mask", "255.255.255.0"}).status, 0);
-  EXPECT_EQ(Tool({"address", "DHCP"}).status, 0);
-  EXPECT_EQ(Tool({"gateway", "10.0.0.1"}).status, 0);
-  EXPECT_THAT(library::Calls(),
-              ElementsAre("MEROWirelessIfconfigSet", "wlan0|10.0.0.9|255.255.255.0", "MEROWirelessIfconfigSet",
-                          "wlan0|DHCP|", "MEROWirelessDefaultGatewaySet", "10.0.0.1"));
-  EXPECT_EQ(Tool({"address", "10.0.0.9"}).status, 2);
-  EXPECT_EQ(Tool({"gateway", "; reboot"}).status, 2);
-}
-
 TEST_F(Connection, OfEqualsIsACell) {
+  library::InCell("cell");
   library::MEROWirelessAdhocCreate = [](const WIRELESS_NETWORK_CONFIG* config) {
     library::Record(std::string(config->network.szEssid) + "|" + config->szKey + "|" +
                     std::to_string(config->network.opmode) + "|" + std::to_string(config->network.encrypt));
@@ -197,6 +206,37 @@ TEST_F(Connection, OfEqualsIsACell) {
   EXPECT_EQ(Tool({"adhoc", "cell", "--wep", "--key-stdin"}, {.input = "123456"}).status, 5);
   EXPECT_THAT(library::Calls(),
               ElementsAre("MEROWirelessAdhocCreate", "cell||1|1", "MEROWirelessAdhocCreate", "cell|12345|1|2"));
+}
+
+// The library reports no command that the driver refuses.
+TEST_F(Connection, OfEqualsThatTheDriverDoesNotMakeIsAFailure) {
+  for (const char* szName : {"another cell", "Home"}) {
+    szName == std::string("Home") ? library::Connected(szName) : library::InCell(szName);
+    const Ran ran = Tool({"adhoc", "cell"});
+    EXPECT_EQ(ran.status, 1);
+    EXPECT_THAT(ran.err, HasSubstr("the cell cell could not be started"));
+  }
+  EXPECT_EQ(Tool({"adhoc", ""}).status, 2);
+}
+
+TEST_F(Connection, ThatIsWatchedIsNoLongerWhenNobodyReads) {
+  for (const bool full : {true, false}) {
+    int ends[2];
+    ASSERT_EQ(::pipe(ends), 0);
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+      ::signal(SIGPIPE, SIG_IGN);
+      ::dup2(full ? ::open("/dev/full", O_WRONLY) : ends[1], STDOUT_FILENO);
+      for (int end : ends) ::close(end);
+      const char* argv[] = {"merowireless", "watch"};
+      ::_exit(RunProgram(2, argv));
+    }
+    char byte;
+    ::close(ends[1]);
+    EXPECT_GE(::read(ends[0], &byte, 1), 0);
+    ::close(ends[0]);
+    EXPECT_TRUE(Soon([&] { return ::waitpid(pid, nullptr, WNOHANG) == pid; })) << (full ? "full disk" : "broken pipe");
+  }
 }
 
 TEST_F(Connection, IsShownAgainWhenItHasChanged) {

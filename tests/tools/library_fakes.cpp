@@ -18,6 +18,8 @@ LIBRARY_QUERIES(DEFINE)
 LIBRARY_ACTIONS(DEFINE)
 #undef DEFINE
 
+uid_t g_user = 0;
+
 namespace {
 
 int g_calls = -1;  // shared with the processes that are forked
@@ -45,6 +47,7 @@ void SetText(char (&field)[kSize], std::string_view text) {
 void Reset() {
   if (g_calls >= 0) ::close(g_calls);
   g_calls = ::memfd_create("calls", MFD_CLOEXEC);
+  g_user = 0;
 
 #define GIVE_ZERO(name, count) name = [](auto&&...) { return decltype(name)::result_type{}; };
   LIBRARY_ACTIONS(GIVE_ZERO)
@@ -58,6 +61,7 @@ void Reset() {
   MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return TRUE; };
   MEROWirelessApConfigSecNameGet = [](char* szName, size_t) { return std::strcpy(szName, "ExampleStick"), TRUE; };
   MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return TRUE; };
+  PLIBCFileRemoveSection = [](const char*, const char*) { return 1; };
   InRange({});
   Known({});
 }
@@ -117,6 +121,15 @@ void Connected(std::string_view name) {
   };
 }
 
+void InCell(std::string_view name) {
+  MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_CONNECTED_ADHOC; };
+  MEROWirelessCurInfoGet = [name = std::string(name)](WIRELESS_REQUEST request, PWIRELESS_INFO info) {
+    if (request == REQUEST_MODE) info->opmode = WIRELESS_OPMODE_ADHOC;
+    if (request == REQUEST_ESSID) SetText(info->szEssid, name);
+    return 0;
+  };
+}
+
 void SavedAp(const MERO_AP_CONF& conf) {
   MEROWirelessGetAPConfig = [conf](const char*, PMERO_AP_CONF read) { return *read = conf, 1; };
 }
@@ -164,3 +177,7 @@ struct Signature<R(Args...)> {
   }
 LIBRARY_QUERIES(DEFINE_QUERY)
 LIBRARY_ACTIONS(DEFINE_ACTION)
+
+extern "C" uid_t geteuid() {
+  return library::g_user;
+}

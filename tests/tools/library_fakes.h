@@ -3,6 +3,8 @@
 #ifndef MERO_TESTS_TOOLS_LIBRARY_FAKES_H
 #define MERO_TESTS_TOOLS_LIBRARY_FAKES_H
 
+#include <sys/types.h>
+
 #include <functional>
 #include <string>
 #include <string_view>
@@ -61,7 +63,11 @@ WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth = WIRELESS_AU
 void InRange(std::vector<WIRELESS_NETWORK> networks);
 void Known(std::vector<WIRELESS_NETWORK_CONFIG> configs);
 void Connected(std::string_view name);
+void InCell(std::string_view name);
 void SavedAp(const MERO_AP_CONF& conf);
+
+// Who runs the program, 0 for root.
+extern uid_t g_user;
 
 // As the library reports.
 void Report(const char* szMessage);

@@ -120,10 +120,12 @@ TEST_F(Networks, ThatAreNotKnownOrCannotBeForgottenAreAFailure) {
   Ran ran = Tool({"forget", "Elsewhere"});
   EXPECT_EQ(ran.status, 4);
   EXPECT_EQ(ran.err, "merowireless: no network named Elsewhere is known: `merowireless known` lists those that are\n");
-  library::PLIBCFileRemoveSection = [](const char*, const char*) { return -1; };
-  ran = Tool({"forget", "Home"});
-  EXPECT_EQ(ran.status, 1);
-  EXPECT_EQ(ran.err, "merowireless: Home could not be forgotten: are you root? -v shows more\n");
+  for (int answer : {-1, 0}) {
+    library::PLIBCFileRemoveSection = [answer](const char*, const char*) { return answer; };
+    ran = Tool({"forget", "Home"});
+    EXPECT_EQ(ran.status, 1);
+    EXPECT_EQ(ran.err, "merowireless: Home could not be forgotten: its section is in /usr/mero/etc/wireless.conf\n");
+  }
 }
 
 TEST_F(Networks, AreSavedAsTheScanDescribesThem) {
@@ -177,8 +179,14 @@ TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirSecret) {
 
 TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirAddress) {
   const std::vector<std::vector<std::string>> wrong = {
-      {"--ip", "dhcp"},       {"--ip", "10.0.0.256", "--mask", "255.0.0.0"}, {"--ip", "10.0.0.1"},
-      {"--gateway", "there"}, {"--ip", "10.0.0.1", "--mask", "255.0.255.0"},
+      {"--ip", "dhcp"},
+      {"--ip", "10.0.0.256", "--mask", "255.0.0.0"},
+      {"--ip", "10.0.0.1"},
+      {"--ip", "10.0.0.1", "--mask", "255.0.255.0"},
+      {"--ip", "10.0.0.1", "--mask", "255.0.0.0", "--gateway", "there"},
+      {"--gateway", "10.0.0.1"},
+      {"--mask", "255.0.0.0"},
+      {"--ip", "none", "--mask", "255.0.0.0"},
   };
   for (const auto& options : wrong) {
     std::vector<std::string> arguments{"save", "Home", "--key-file", kSecretPath};
@@ -188,9 +196,38 @@ TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirAddress) {
   EXPECT_THAT(library::Calls(), IsEmpty());
 }
 
+TEST_F(Networks, AreNotSavedAsDescribedWhenTheyCannotBe) {
+  const std::vector<std::vector<std::string>> wrong = {
+      {"", "--bssid", "00:11:22:33:44:55"},
+      {std::string(33, 'x'), "--bssid", "00:11:22:33:44:55"},
+      {"Hidden", "--bssid", "00:00:00:00:00:00"},
+      {"Hidden", "--bssid", "FF:FF:FF:FF:FF:FF"},
+      {"Hidden", "--bssid", "01:11:22:33:44:55"},
+      {"Hidden", "--bssid", "00:11:22:33:44"},
+      {"Hidden", "--bssid", "00:11:22:33:44:55", "--key-file", kSecretPath},  // an open one has no secret
+  };
+  for (std::vector<std::string> arguments : wrong) {
+    arguments.insert(arguments.begin(), "save");
+    arguments.insert(arguments.end(), {"--security", "open"});
+    EXPECT_EQ(Tool(arguments).status, 2) << testing::PrintToString(arguments);
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
 TEST_F(Networks, ThatCannotBeSavedAreAFailure) {
   library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
-  EXPECT_EQ(Tool({"save", "Home", "--key-file", kSecretPath}).status, 1);
+  const Ran ran = Tool({"save", "Home", "--key-file", kSecretPath});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("is there room on the disk?"));
+  library::g_user = 1000;
+  EXPECT_THAT(Tool({"save", "Home", "--key-file", kSecretPath}).err, HasSubstr("run it as root"));
+}
+
+TEST_F(Networks, ThatWereSavedAtNoKnownTimeSaySo) {
+  WIRELESS_NETWORK_CONFIG home = Home();
+  home.atime = 0;
+  library::Known({home});
+  EXPECT_THAT(Tool({"known"}).out, HasSubstr("\nHome  WPA2 AES  DHCP     -      0A:"));
 }
 
 }  // namespace

@@ -24,6 +24,10 @@ TEST_F(CommandLine, ThatIsWrongIsExplainedInOneLine) {
       {"ap", "bogus"},
       {"mode", "both"},
       {"watch", "--count", "0"},
+      {"watch", "--count", "+1"},
+      {"watch", "--count", " 1"},
+      {"watch", "--count", "0x2"},
+      {"radio", "sideways"},
       {"scan", "--json", "--porcelain"},
   };
   for (const auto& arguments : wrong) {
@@ -31,6 +35,21 @@ TEST_F(CommandLine, ThatIsWrongIsExplainedInOneLine) {
     EXPECT_EQ(ran.status, 2) << testing::PrintToString(arguments);
     EXPECT_EQ(ran.out, "");
     EXPECT_THAT(ran.err, MatchesRegex("merowireless: [^\n]+\n")) << testing::PrintToString(arguments);
+  }
+}
+
+TEST_F(CommandLine, ThatIsWrongIsNotRepeatedSinceItMayHoldASecret) {
+  const std::vector<std::vector<std::string>> wrong = {{"save", "Home", "open-sesame"},
+                                                       {"save", "Home", "--key-stdin=open-sesame"},
+                                                       {"mode", "open-sesame"},
+                                                       {"radio", "open-sesame"},
+                                                       {"watch", "--count", "open-sesame"},
+                                                       {"gateway", "open-sesame"},
+                                                       {"ap", "set", "--hidden", "open-sesame"}};
+  for (const auto& arguments : wrong) {
+    const Ran ran = Tool(arguments);
+    EXPECT_EQ(ran.status, 2) << testing::PrintToString(arguments);
+    EXPECT_THAT(ran.out + ran.err, testing::Not(HasSubstr("sesame"))) << testing::PrintToString(arguments);
   }
 }
 

@@ -51,8 +51,8 @@ TEST_F(Output, OfAScanIsARecordALineForScripts) {
 }
 
 TEST_F(Output, KeepsNamesFromBreakingALineForScripts) {
-  library::InRange({Network("a\tb\nc\\d")});
-  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::StartsWith("a\\tb\\nc\\\\d\t74\t"));
+  library::InRange({Network("a\tb\nc\\d\x1b[2J\r\x7f\xc3\xa9")});
+  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::StartsWith("a\\tb\\nc\\\\d\\x1b[2J\\x0d\\x7f\xc3\xa9\t74\t"));
 }
 
 TEST_F(Output, ShowsPeopleControlCharactersOfNamesWithoutTheirEffect) {

@@ -69,7 +69,11 @@ TEST(SupplicantEvents, TellWhyAJoinCameToNothing) {
       {"<3>CTRL-EVENT-EAP-FAILURE EAP authentication failed", Verdict::kSecretRefused},
       {"<3>CTRL-EVENT-ASSOC-REJECT bssid=02:00:00:00:01:00 status_code=17", Verdict::kRefused},
       {"<3>CTRL-EVENT-AUTH-REJECT 02:00:00:00:01:00 auth_type=0 auth_transaction=2 status_code=1", Verdict::kRefused},
+      {"<3>CTRL-EVENT-AUTH-REJECT 02:00:00:00:01:00 auth_type=1 auth_transaction=4 status_code=15",
+       Verdict::kSecretRefused},
       {"<3>CTRL-EVENT-NETWORK-NOT-FOUND ", Verdict::kNotFound},
+      {"<3>SME: Trying to authenticate with 02:00:00:00:01:00 (SSID='reason=WRONG_KEY' freq=2412 MHz)", Verdict::kNone},
+      {"<3>Trying to associate with SSID 'CTRL-EVENT-EAP-FAILURE'", Verdict::kNone},
       {"<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" auth_failures=1 duration=10 reason=CONN_FAILED",
        Verdict::kNone},
       {"<3>CTRL-EVENT-SCAN-RESULTS ", Verdict::kNone},
@@ -87,7 +91,7 @@ TEST(SupplicantListener, KeepsTheMostTellingEvent) {
   Supplicant supplicant;
   listener.Tick();
   ASSERT_EQ(supplicant.Request(), "ATTACH");
-  supplicant.Say("<3>reason=WRONG_KEY");
+  supplicant.Say("<3>CTRL-EVENT-EAP-FAILURE EAP authentication failed");
   supplicant.Say("<3>CTRL-EVENT-NETWORK-NOT-FOUND ");
   listener.Receive();
   EXPECT_EQ(listener.verdict(), Verdict::kSecretRefused);
@@ -137,12 +141,13 @@ class RefusedJoin : public ToolTest {
     library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
       return Soon([] { return ::access("/tmp/said", F_OK) == 0; }), -1;
     };
+    library::MEROWirelessAutoConnect = [] { return Soon([] { return ::access("/tmp/said", F_OK) == 0; }), -1; };
   }
 
-  Ran Join(std::string_view event) {
+  Ran Join(std::string_view event, const std::vector<std::string>& command = {"connect", "Home"}) {
     ::unlink("/tmp/said");
     Supplicant supplicant;
-    StartedTool tool({"connect", "Home"});
+    StartedTool tool(command);
     EXPECT_EQ(supplicant.Request(), "ATTACH");
     supplicant.Say(event);
     EXPECT_EQ(supplicant.Request(), "PING") << "the event has been read by then";
@@ -163,6 +168,16 @@ TEST_F(RefusedJoin, TellsAWrongSecretFromANetworkOutOfRange) {
   const Ran refused = Join("<3>CTRL-EVENT-ASSOC-REJECT bssid=02:00:00:00:01:00 status_code=17");
   EXPECT_EQ(refused.status, 1);
   EXPECT_THAT(refused.err, HasSubstr("Home refuses this appliance"));
+}
+
+TEST_F(RefusedJoin, ByAutoconnectTellsThemApartToo) {
+  const Ran wrong = Join("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" reason=WRONG_KEY", {"autoconnect"});
+  EXPECT_EQ(wrong.status, 5);
+  EXPECT_THAT(wrong.err, HasSubstr("one of the known networks does not accept the secret"));
+
+  const Ran absent = Join("<3>CTRL-EVENT-NETWORK-NOT-FOUND ", {"autoconnect"});
+  EXPECT_EQ(absent.status, 4);
+  EXPECT_THAT(absent.err, HasSubstr("none of the known networks could be joined"));
 }
 
 }  // namespace

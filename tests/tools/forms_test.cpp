@@ -1,0 +1,162 @@
+// Every command in each of the three forms, byte by byte.
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <sstream>
+
+#include "running.h"
+
+namespace {
+
+using library::Network;
+
+// ---- Worlds for commands to be run in ----
+
+WIRELESS_NETWORK_CONFIG Home() {
+  WIRELESS_NETWORK_CONFIG config{};
+  config.network = Network("Home");
+  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  std::strcpy(config.szKey, "open sesame");
+  std::strcpy(config.szIp, "DHCP");
+  config.atime = 86400;
+  return config;
+}
+
+MERO_AP_CONF Office() {
+  MERO_AP_CONF conf{};
+  std::strcpy(conf.szSecName, "ExampleStick");
+  conf.blEnable = TRUE;
+  conf.txpower = 10;
+  MERO_HOSTAP_CONF& main = conf.hostapConf;
+  std::strcpy(main.szSSID, "Office");
+  std::strcpy(main.szBridge, "lbr0");
+  main.hwMode = AP_MODE_80211G;
+  main.ieee80211n = 1;
+  main.wirelessWidth = AP_FREQ_ALL;
+  main.channel = 6;
+  main.maxStation = 256;
+  main.wmm = 1;
+  main.encryption = AP_ENCRYPT_WPA_PSK;
+  main.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
+  main.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
+  std::strcpy(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
+  std::strcpy(main.guestNet.szSSID, "Guests");
+  main.guestNet.maxStation = 10;
+  conf.guestNetAccessRule.blLanBlock = TRUE;
+  return conf;
+}
+
+void Connected() {
+  library::InRange({Network("Home"), Network("square", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE)});
+  library::Known({Home()});
+  library::Connected("Home");
+}
+
+void InACell() {
+  library::InCell("Bench");
+}
+
+void WithAGateway() {
+  EXPECT_EQ(std::system("ip link add wire0 type veth && ip address add 10.0.0.8/24 dev wire0 &&"
+                        "ip link set wire0 up && ip route add default via 10.0.0.1"),
+            0);
+}
+
+void OffTheAir() {
+  MERO_AP_CONF conf = Office();
+  conf.blEnable = FALSE;
+  library::SavedAp(conf);
+}
+
+void OnTheAir() {
+  library::SavedAp(Office());
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
+    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
+  };
+}
+
+// ---- What each command says ----
+
+struct Command {
+  void (*world)();
+  std::vector<std::string> words;
+};
+
+const Command kCommands[] = {
+    {Connected, {"scan"}},
+    {Connected, {"known"}},
+    {Connected, {"save", "square"}},
+    {Connected, {"forget", "Home"}},
+    {Connected, {"connect", "Home"}},
+    {Connected, {"autoconnect"}},
+    {Connected, {"disconnect"}},
+    {Connected, {"status"}},
+    {Connected, {"watch", "--count", "1"}},
+    {Connected, {"address", "DHCP"}},
+    {WithAGateway, {"gateway", "10.0.0.1"}},
+    {InACell, {"adhoc", "Bench"}},
+    {OnTheAir, {"ap", "show"}},
+    {OnTheAir, {"ap", "set", "--channel", "11"}},
+    {OnTheAir, {"ap", "enable"}},
+    {OffTheAir, {"ap", "disable"}},
+    {OnTheAir, {"ap", "status"}},
+    {Connected, {"mode", "client"}},
+    {Connected, {"mode", "ap"}},
+    {Connected, {"radio"}},
+    {Connected, {"radio", "off"}},
+};
+
+std::vector<std::string> With(std::vector<std::string> words, const char* szOption) {
+  words.emplace_back(szOption);
+  return words;
+}
+
+std::string Joined(const std::vector<std::string>& words) {
+  std::string joined;
+  for (const std::string& word : words) joined += (joined.empty() ? "" : " ") + word;
+  return joined;
+}
+
+// What somebody has on the screen who gives the command.
+std::string Screen(const std::vector<std::string>& words) {
+  return "$ merowireless " + Joined(words) + "\n" + Tool(words).out;
+}
+
+class Forms : public ToolTest {
+ protected:
+  Forms() { ::setenv("TZ", "UTC", 1); }
+};
+
+TEST_F(Forms, OfEveryCommandAreAsTheyAlwaysWere) {
+  std::string screens;
+  for (const auto& [world, words] : kCommands) {
+    library::Reset();
+    world();
+    screens += Screen(words) + Screen(With(words, "--json")) + Screen(With(words, "--porcelain"));
+  }
+  EXPECT_EQ(screens, ReadText(MERO_SCREENS));
+}
+
+// The commands that a help text lists, each behind `prefix`.
+std::vector<std::string> Listed(const std::vector<std::string>& words, const std::string& prefix) {
+  std::istringstream help(Tool(With(words, "--help")).out);
+  std::vector<std::string> listed;
+  std::string line;
+  while (std::getline(help, line) && line != "Subcommands:") continue;
+  for (std::string name; std::getline(help, line) && std::istringstream(line) >> name;) listed.push_back(prefix + name);
+  return listed;
+}
+
+TEST_F(Forms, AreLookedAtForEveryCommand) {
+  std::vector<std::string> commands = Listed({}, "");
+  std::erase(commands, "ap");
+  for (const std::string& command : Listed({"ap"}, "ap ")) commands.push_back(command);
+  EXPECT_GT(commands.size(), 15U);
+  for (const std::string& command : commands) {
+    EXPECT_TRUE(std::ranges::any_of(kCommands, [&](const Command& known) {
+      return (Joined(known.words) + " ").starts_with(command + " ");
+    })) << command;
+  }
+}
+
+}  // namespace
