@@ -10,6 +10,7 @@
 #include "ap_protection.h"
 #include "choices.h"
 #include "library.h"
+#include "paths.h"
 
 namespace {
 
@@ -159,6 +160,14 @@ const MERO_HOSTAP_GUEST_NET& Guest(const ApConf& conf) {
   return conf.hostapConf.guestNet;
 }
 
+// Elsewhere the library would write no guest network, and say nothing.
+void SetGuest(ApConf& conf, const std::string& text) {
+  Guest(conf).blEnable = SwitchOf(text, "guest");
+  if (Guest(conf).blEnable == FALSE || PLIBCFileCheckKeyValue(kModelFacts, "support_pci_wifi", "yes", 0) != 0) return;
+  throw Failure(Exit::kFailed, "this appliance has no guest network",
+                "it takes a built-in card, of which " + std::string(kModelFacts) + " says support_pci_wifi=\"yes\"");
+}
+
 constexpr int kMostStations = 2007;  // as many as an access point can tell apart
 
 // Later rows build on earlier ones: --band sets a channel that --channel replaces, and a cipher is one of its
@@ -246,7 +255,7 @@ const ApSetting kSettings[] = {
       [](const ApConf& of, bool) { return ShowSwitch(Guest(of).blEnable != FALSE); }},
      "guest",
      "yes puts the guest network up beside the main one",
-     [](ApConf& of, const std::string& text) { Guest(of).blEnable = SwitchOf(text, "guest"); }},
+     SetGuest},
     {{"guest_ssid", "guest name", [](const ApConf& of) { return Value(Guest(of).szSSID); }},
      "guest-ssid",
      "the guest network's name",

@@ -13,6 +13,9 @@ inline constexpr char kKnownNetworks[] = "/usr/mero/etc/wireless.conf";
 inline constexpr char kApSettings[] = "/usr/mero/etc/wireless_ap.conf";
 inline constexpr char kApSettingsLine[] = "\t%s=%s\n";
 
+// What the appliance's model can do.
+inline constexpr char kModelFacts[] = "/etc.defaults/meroinfo.conf";
+
 // The supplicant's pid file, which goes with it, and what talks to it.
 inline constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
 inline constexpr char kSupplicantClient[] = "/usr/sbin/wpa_cli";

@@ -4,9 +4,11 @@
 #include <algorithm>
 #include <csignal>
 #include <cstring>
+#include <filesystem>
 #include <iterator>
 #include <sstream>
 
+#include "paths.h"
 #include "running.h"
 
 using testing::ElementsAre;
@@ -54,7 +56,11 @@ void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
 
 class AccessPoint : public ToolTest {
  protected:
-  AccessPoint() { library::SavedAp(Settings()); }
+  AccessPoint() {
+    library::SavedAp(Settings());
+    std::filesystem::create_directory("/etc.defaults");
+    WriteText(kModelFacts, "support_pci_wifi=\"yes\"\n");
+  }
 };
 
 TEST_F(AccessPoint, IsShownWithoutItsSecrets) {
@@ -137,6 +143,14 @@ TEST_F(AccessPoint, TakesAllSettingsByTheNamesThatPeopleHaveForThem) {
   EXPECT_EQ(ran.status, 0) << ran.err;
   EXPECT_EQ(library::Calls()[1],
             "on: 1 1 44 2 2 3 3 1 12 0 20 1 1 2 1 0 1 1 0 br7 main secret guest secret 000000001111");
+}
+
+TEST_F(AccessPoint, HasNoGuestsWhereTheModelHasNone) {
+  WriteText(kModelFacts, "support_pci_wifi=\"no\"\n");
+  const Ran ran = Tool({"ap", "set", "--guest", "yes", "--guest-ssid", "Guests"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("this appliance has no guest network"));
+  EXPECT_EQ(Tool({"ap", "set", "--guest", "no"}).status, 0);
 }
 
 TEST_F(AccessPoint, RefusesSettingsThatCannotBe) {
