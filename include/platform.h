@@ -462,7 +462,8 @@ int MERONetIsSameSubnet(const char* szAddress, const char* szReference, const ch
 const char* MERONetNtoa(struct in_addr address);
 
 /**
- * Applies an address to an interface, at once and, through its network-script file, at every boot.
+ * Applies an address to an interface at once, and notes it in the interface's network-script file. Who applies that at
+ * boot is the appliance's own affair: the kit does so for bridges only.
  *
  * @param flags  0.
  * @return 0; -1 when the address or the mask is none (the interface stays as it was), or the interface cannot be set.
@@ -473,8 +474,11 @@ int MERONetSetCard1(const NETINFO* pNetInfo, int flags);
  * Leases an address by DHCP for the interface that the record names, and keeps the lease renewed after it returns.
  *
  * @param pNetInfo  names the interface; receives its hardware address, the address leased and its mask.
- * @param seconds   how long to wait for a server; the call blocks for as long at most.
- * @return 0; -1 when no server answered.
+ * @param seconds   how long to wait for a server, at most; less than 4 counts as 4.
+ * @return 0; -1 when no server answered, or the interface cannot be brought up.
+ *
+ * Blocks for as long at most, and before that up to 2 s for a DHCP client that runs to end; one that does not is
+ * killed.
  */
 int MEROIGetDHCPTestNetInfo(PNETINFO pNetInfo, int seconds);
 

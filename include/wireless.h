@@ -332,7 +332,7 @@ typedef struct MERO_WIFI_SCHED_CONF {
 /** All settings of the access point. */
 typedef struct _tag_MERO_AP_INFO {
   BOOL blEnable;
-  int txpower;
+  int txpower;        /**< kept for others: nothing here sets it */
   char szSecName[32]; /**< the settings section: the adapter's product name */
   MERO_HOSTAP_CONF hostapConf;
   BOOL blWifiUnblock;                     /**< the user has not switched the radio off */
@@ -389,9 +389,11 @@ int MEROWirelessConfEnumByAtime(WIRELESS_LIST* pHead);
  *
  * @param scan   WIRELESS_SCAN_RENEW scans afresh; any other value reads what the adapter's last scan found.
  * @param pHead  the caller's ring head; filled with WIRELESS_NETWORK records, threaded through `list`. Every record
- *               is the caller's, also after a failure. When no adapter comes up in time it is left as it was.
+ *               is the caller's, also after a failure. When no adapter is plugged in in time, or its interface cannot
+ *               be brought up, it is left as it was.
  * @return 0 (also when nothing is in range); -1 when there is no adapter, pHead is null, the interface cannot be
- *         brought up, a command cannot be started, or the adapter's results could not be read.
+ *         brought up, no shell can be started, or memory ran out. A listing tool that is missing or fails looks like
+ *         nothing in range.
  *
  * Waits up to 5 s for an adapter to be plugged in, brings its interface up and waits 1 s; a fresh scan takes a few
  * seconds more. Runs /sbin/iwlist; reads and writes no file.
@@ -406,9 +408,9 @@ int MEROWirelessNetworkScan(const WIRELESS_SCAN scan, WIRELESS_LIST* pHead);
  * @param filter    what szValue is; any other value takes the first network in range.
  * @param pNetwork  receives the network, untouched unless one was found. Its `list` member is meaningless: do not
  *                  unlink it.
- * @return 1 found, 0 not found, -1 when an argument is null or the scan failed.
+ * @return 1 found, 0 not found, -1 when an argument is null or MEROWirelessNetworkScan() failed.
  *
- * Scans as MEROWirelessNetworkScan() does, afresh only when the adapter's last scan found nothing; blocks as long.
+ * Reads what the adapter's last scan found, and scans afresh only when that is nothing; blocks as long as that does.
  */
 int MEROWirelessNetworkGet(const char* szValue, const WIRELESS_FILTER filter, WIRELESS_NETWORK* pNetwork);
 
@@ -441,25 +443,31 @@ int MEROWirelessAdhocCreate(const WIRELESS_NETWORK_CONFIG* pNetCfg);
  *
  * @param pNetCfg  the network; borrowed. The access point's address is pinned unless it is all zero or noneBssid is
  *                 set.
- * @return 0 when joined, and also, silently and without doing anything, when the user has switched the radio off;
- *         -1 when pNetCfg is null, there is no adapter, another attempt is under way, or the network could not be
- *         joined in time.
+ * @return 0 when joined; -1 when there is no adapter, another attempt is under way, pNetCfg is null, or the network
+ *         could not be joined, in time or at all. With an adapter whose radio is switched off, or may be
+ *         (MEROWirelessCheckBlock() does not give 1), nothing is tried, and the result is 0, without a report.
  *
- * Blocks up to about 15 s. Writes /usr/mero/etc/wpa_supplicant.conf and, once joined,
- * /var/tmp/.wireless_current_connection; holds the marker /var/tmp/.wireless_connecting meanwhile (an attempt that is
- * refused because of the marker removes it); copies /etc/resolv.conf to /etc/resolv.conf.wireless.bak; leaves the
- * supplicant running, with its pid in /var/run/wpa_supplicant.pid.
+ * Blocks up to about 15 s, and then for the media service to start anew where /etc/meroinfo.conf has it on the
+ * interface. Writes /usr/mero/etc/wpa_supplicant.conf and, once joined, /var/tmp/.wireless_current_connection; holds
+ * the marker /var/tmp/.wireless_connecting meanwhile (every call removes it at its end, also one that is refused
+ * because of it); copies /etc/resolv.conf to /etc/resolv.conf.wireless.bak; leaves the supplicant running, with its pid
+ * in /var/run/wpa_supplicant.pid.
  */
 int MEROWirelessNetworkConnect(const WIRELESS_NETWORK_CONFIG* pNetCfg);
 
 /**
- * Joins the most recently saved network that can be joined, and addresses the interface as saved.
+ * Joins the most recently saved network that can be joined, and addresses the interface as saved. The saved gateway is
+ * not set: that is MEROWirelessDefaultGatewaySet(). A network that is not found in the air may hide its name, and is
+ * tried all the same if its authentication and encryption are known.
  *
- * @return 0 when connected and addressed; -1 otherwise. When a connection exists already it is ended, and the result
- *         is -1.
+ * @return 0 when connected and addressed; -1 otherwise, with nothing left connected: also a connection that exists
+ *         already is ended, and the result is -1. Where MEROWirelessNetworkConnect() gives 0 because the radio may not
+ *         be used, so does this: nothing is joined, and the interface is addressed as for the first network tried.
  *
- * Blocks for a scan and up to about 15 s for each network tried. Files as for MEROWirelessNetworkConnect() and
- * MEROWirelessIfconfigSet().
+ * Blocks, for each known network up to the one that is joined, as long as MEROWirelessNetworkGet() (5 s without an
+ * adapter), once in a call for as long again, and up to about 15 s more if the network is tried; then as
+ * MEROWirelessIfconfigSet(), up to 16 s for DHCP; after a failure, up to 2 s for each daemon to end. Files as for
+ * MEROWirelessNetworkConnect() and MEROWirelessIfconfigSet().
  */
 int MEROWirelessAutoConnect(void);
 
@@ -472,7 +480,8 @@ int MEROWirelessAutoConnect(void);
  * @return 0; -1 when szIfName is null or the interface could not be set. A DHCP server that does not answer is
  *         reported, and is not by itself a failure.
  *
- * Blocks up to 16 s for DHCP. Writes the interface's file in /etc/sysconfig/network-scripts.
+ * Blocks up to 16 s for DHCP, and before that up to 2 s for a DHCP client that runs to end. Writes the interface's file
+ * in /etc/sysconfig/network-scripts.
  */
 int MEROWirelessIfconfigSet(const char* szIfName, WIRELESS_NETWORK_CONFIG config);
 
@@ -480,10 +489,10 @@ int MEROWirelessIfconfigSet(const char* szIfName, WIRELESS_NETWORK_CONFIG config
  * Adds a default route through the wireless interface.
  *
  * @param szGateway  the gateway's IPv4 address in dotted form.
- * @return 0; -1 when szGateway is null or empty, or the command could not be started. An existing default route is
- *         not removed, and a refusal by the kernel is not noticed.
+ * @return 0; -1 when szGateway is null, empty, or longer than a command can be, or no shell could be started. Whether
+ *         the command was run, and whether it succeeded, is not noticed. An existing default route is not removed.
  *
- * Runs /sbin/route. Does not block.
+ * Runs /sbin/route, and blocks for as long as that takes.
  */
 int MEROWirelessDefaultGatewaySet(const char* szGateway);
 
@@ -520,12 +529,13 @@ int MEROWirelessGetAPConfig(const char* szSecName, PMERO_AP_CONF pConf);
 BOOL MEROWirelessApConfigSecNameGet(char* szSecName, size_t cbSize);
 
 /**
- * Saves the access-point settings. With `blEnable` FALSE only the switch itself is saved, and all else stays.
+ * Saves the access-point settings. With `blEnable` FALSE only the switch itself is saved, and all else stays; a section
+ * that is new then holds nothing else.
  *
  * @param pConf  the settings; `szSecName` names the section. No text may hold a line feed or end with a carriage
  *               return, nor may the name begin or end with white space: the file could not carry it.
  * @return TRUE; FALSE when pConf is null, a text cannot be saved, an encryption is none of MERO_AP_ENCRYPT or none for
- * a guest network, memory ran out, or the file could not be written.
+ *         a guest network, memory ran out, or the file could not be written.
  *
  * Reads and replaces /usr/mero/etc/wireless_ap.conf (created with mode 0600), all or nothing. Does not block on the
  * network.
@@ -535,7 +545,9 @@ BOOL MEROWirelessSetAPConfig(const PMERO_AP_CONF pConf);
 /**
  * Tells whether the user has switched the radio off in the access-point settings.
  *
- * @return 1 the radio may be used, 0 it is switched off, -1 unknown. Nothing is reported to syslog.
+ * @return 1 the radio may be used: also when there is no settings file, or no section of the adapter in it; 0 it is
+ *         switched off; -1 unknown: there are settings, but no adapter has been announced, or its section lacks
+ *         `unblock`, or memory ran out. None of this is reported to syslog.
  *
  * Reads /usr/mero/etc/wireless_ap.conf and /tmp/wireless.info. Does not block.
  */
@@ -555,14 +567,19 @@ int MEROWirelessCheckBlock(void);
 BOOL MEROWirelessSetHostAPConf(const char* szIfName, PMERO_HOSTAP_CONF pConf);
 
 /**
- * Turns the adapter into an access point, by the saved settings.
+ * Turns the adapter into an access point, by the settings that are saved for it. Callers name the section with
+ * MEROWirelessApConfigSecNameGet(), read it with MEROWirelessGetAPConfig(), set `blEnable` to TRUE and what else they
+ * want, save it with MEROWirelessSetAPConfig(), and then call this.
  *
- * @return TRUE when everything, also the network start script, succeeded; FALSE otherwise. Nothing is undone after a
- *         failure.
+ * @return TRUE when everything, also the network start script, succeeded; FALSE otherwise, above all when no adapter
+ *         has been announced, or its saved settings are missing, have `blEnable` FALSE, or name no bridge. Nothing is
+ *         undone after a failure.
  *
- * Blocks until the network start script /etc/rc.network has finished. Writes the access-point daemon's files, the
- * bridge's and the interface's network-script files and the DHCP server's files; holds the marker
- * /var/tmp/.wireless_ap_connecting meanwhile (a call that is refused because of the marker removes it).
+ * Blocks until the network start script /etc/rc.network has finished: as a rule a few seconds, but up to 60 s for
+ * another run of the script to end, and up to about 30 s for the daemon to be on the air. Writes the access-point
+ * daemon's files, the bridge's and the interface's network-script files and the DHCP server's files; holds the marker
+ * /var/tmp/.wireless_ap_connecting meanwhile (every call removes it at its end, also one that is refused because of
+ * it).
  */
 BOOL MEROWirelessAPEnable(void);
 
@@ -572,7 +589,8 @@ BOOL MEROWirelessAPEnable(void);
  * @return TRUE; FALSE when the interface's file is missing, the DHCP server's files could not be written, or the
  *         network start script failed.
  *
- * Blocks until the network start script /etc/rc.network has finished. Must not run beside MEROWirelessAPEnable().
+ * Blocks until the network start script /etc/rc.network has finished, up to 60 s of it for another run of the script to
+ * end. Must not run beside MEROWirelessAPEnable().
  */
 BOOL MEROWirelessAPDisable(void);
 
@@ -584,7 +602,8 @@ BOOL MEROWirelessAPDisable(void);
  * @param mode  WIRELESS_AP_MODE or WIRELESS_CLIENT_MODE.
  * @return TRUE when the hot-plug script ran with success; FALSE otherwise, and for any other mode.
  *
- * Blocks until /usr/mero/hotplug/usb.wireless.function has finished.
+ * Blocks until /usr/mero/hotplug/usb.wireless.function has finished, which waits for the network start script as
+ * MEROWirelessAPEnable() and MEROWirelessAPDisable() do.
  */
 BOOL MEROWirelessModeChange(MERO_WIRELESS_MODE mode);
 

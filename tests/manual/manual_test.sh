@@ -69,7 +69,6 @@ files() {
   (cd "$source" && find lib common platform tools -name '*.[ch]*' -exec grep -hoE '"[^"]*"' {} +) |
     grep -oE '/(etc|etc\.defaults|usr/mero|var|tmp)/[^" \]+'
   grep -rhoE '^[a-z_]+=/(etc|usr/mero|var|tmp)/[^ ]+' "$source/appliance" | sed 's/.*=//'
-  sed -n 's/^## \(\/.*\)/\1/p' "$source/docs/file-formats.md"
   cat "$source/README.md" "$source"/docs/*.md | sed -n 's/^|\([^|]*\)|.*/\1/p' | tr '`' ' ' | grep -oE ' /[^ ,*]+' |
     tr -d ' '
 }
