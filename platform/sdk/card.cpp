@@ -1,4 +1,4 @@
-// Addressing an interface: now, and at every boot.
+// Addressing an interface, and noting down how.
 #include <arpa/inet.h>
 #include <sys/ioctl.h>
 

@@ -4,11 +4,9 @@
 #include <algorithm>
 #include <csignal>
 #include <cstring>
-#include <filesystem>
 #include <iterator>
 #include <sstream>
 
-#include "paths.h"
 #include "running.h"
 
 using testing::ElementsAre;
@@ -56,11 +54,7 @@ void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
 
 class AccessPoint : public ToolTest {
  protected:
-  AccessPoint() {
-    library::SavedAp(Settings());
-    std::filesystem::create_directory("/etc.defaults");
-    WriteText(kModelFacts, "support_pci_wifi=\"yes\"\n");
-  }
+  AccessPoint() { library::SavedAp(Settings()); }
 };
 
 TEST_F(AccessPoint, IsShownWithoutItsSecrets) {
@@ -146,7 +140,10 @@ TEST_F(AccessPoint, TakesAllSettingsByTheNamesThatPeopleHaveForThem) {
 }
 
 TEST_F(AccessPoint, HasNoGuestsWhereTheModelHasNone) {
-  WriteText(kModelFacts, "support_pci_wifi=\"no\"\n");
+  library::PLIBCFileCheckKeyValue = [](const char* szPath, const char* szKey, const char* szExpected, int) {
+    EXPECT_EQ(std::string(szPath) + " " + szKey + " " + szExpected, "/etc.defaults/meroinfo.conf support_pci_wifi yes");
+    return 0;
+  };
   const Ran ran = Tool({"ap", "set", "--guest", "yes", "--guest-ssid", "Guests"});
   EXPECT_EQ(ran.status, 1);
   EXPECT_THAT(ran.err, HasSubstr("this appliance has no guest network"));

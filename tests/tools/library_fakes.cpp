@@ -61,6 +61,7 @@ void Reset() {
   MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return TRUE; };
   MEROWirelessApConfigSecNameGet = [](char* szName, size_t) { return std::strcpy(szName, "ExampleStick"), TRUE; };
   MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return TRUE; };
+  PLIBCFileCheckKeyValue = [](const char*, const char*, const char*, int) { return 1; };
   PLIBCFileRemoveSection = [](const char*, const char*) { return 1; };
   InRange({});
   Known({});
@@ -159,11 +160,13 @@ struct Signature<R(Args...)> {
 #define PARAMETERS_1(name) ARGUMENT(name, 0) a
 #define PARAMETERS_2(name) PARAMETERS_1(name), ARGUMENT(name, 1) b
 #define PARAMETERS_3(name) PARAMETERS_2(name), ARGUMENT(name, 2) c
-#define PARAMETERS_5(name) PARAMETERS_3(name), ARGUMENT(name, 3) d, ARGUMENT(name, 4) e
+#define PARAMETERS_4(name) PARAMETERS_3(name), ARGUMENT(name, 3) d
+#define PARAMETERS_5(name) PARAMETERS_4(name), ARGUMENT(name, 4) e
 #define VALUES_0
 #define VALUES_1 a
 #define VALUES_2 a, b
 #define VALUES_3 a, b, c
+#define VALUES_4 a, b, c, d
 #define VALUES_5 a, b, c, d, e
 
 #define DEFINE_QUERY(name, count)                                                 \

@@ -25,7 +25,8 @@
   FAKE(MEROWirelessNetworkGet, 3)         \
   FAKE(MEROWirelessApConfigSecNameGet, 2) \
   FAKE(MEROWirelessGetAPConfig, 2)        \
-  FAKE(MEROWirelessTestAPMode, 0)
+  FAKE(MEROWirelessTestAPMode, 0)         \
+  FAKE(PLIBCFileCheckKeyValue, 4)
 
 #define LIBRARY_ACTIONS(FAKE)            \
   FAKE(MEROWirelessNetworkScan, 2)       \
