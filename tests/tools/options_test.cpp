@@ -1,10 +1,8 @@
-// The command line and its completions.
+// The command line.
 #include <algorithm>
-#include <cstdlib>
-#include <cstring>
 #include <sstream>
 
-#include "ap_settings.h"
+#include "commands.h"
 #include "running.h"
 
 using testing::HasSubstr;
@@ -60,10 +58,6 @@ TEST_F(CommandLine, ExplainsItselfOnRequest) {
   EXPECT_THAT(Tool({"ap", "set", "--help"}).out, HasSubstr("--channel VALUE"));
 }
 
-const char* const kCommands[] = {"scan",        "known",      "save",   "forget", "connect",
-                                 "autoconnect", "disconnect", "status", "watch",  "address",
-                                 "gateway",     "adhoc",      "ap",     "mode",   "radio"};
-
 // Columns, where every byte but the continuation of a character is one.
 std::size_t WidthOf(std::string_view line) {
   return std::ranges::count_if(line, [](char byte) { return (byte & 0xC0) != 0x80; });
@@ -77,43 +71,6 @@ TEST_F(CommandLine, HasHelpThatFitsATerminal) {
     words.emplace_back("--help");
     std::istringstream help(Tool(words).out);
     for (std::string line; std::getline(help, line);) EXPECT_LE(WidthOf(line), 80U) << line;
-  }
-}
-
-// What bash would offer for the last word of a line.
-std::string Offered(const std::string& line) {
-  const std::string script =
-      "source " MERO_COMPLETIONS "/merowireless.bash; COMP_WORDS=(" + line +
-      "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _merowireless; printf '%s ' \"${COMPREPLY[@]}\"";
-  WriteText("/tmp/complete", script);
-  FILE* pipe = ::popen("bash /tmp/complete 2>&1", "r");
-  char text[4096] = "";
-  const std::size_t size = std::fread(text, 1, sizeof text, pipe);
-  ::pclose(pipe);
-  return {text, size};
-}
-
-TEST_F(CommandLine, IsCompletedByBash) {
-  for (const char* szCommand : kCommands) {
-    EXPECT_THAT(Offered("merowireless ''"), HasSubstr(std::string(szCommand) + " "));
-  }
-  EXPECT_EQ(Offered("merowireless sc"), "scan ");
-  EXPECT_THAT(Offered("merowireless --json scan --r"), "--renew ");
-  EXPECT_EQ(Offered("merowireless mode ''"), "ap client ");
-  EXPECT_EQ(Offered("merowireless ap ''"), "show set enable disable status ");
-  for (const ApSetting& setting : ApSettings()) {
-    if (setting.szOption == nullptr) continue;
-    EXPECT_THAT(Offered("merowireless ap set --"), HasSubstr("--" + std::string(setting.szOption) + " "));
-  }
-  EXPECT_EQ(Offered("merowireless ap set --security w"), "wep wpa wpa2 ");
-}
-
-TEST_F(CommandLine, HasEveryCommandAndSettingInTheCompletionOfZsh) {
-  const std::string zsh = ReadText(MERO_COMPLETIONS "/_merowireless");
-  for (const char* szCommand : kCommands) EXPECT_THAT(zsh, HasSubstr("'" + std::string(szCommand) + ":"));
-  for (const ApSetting& setting : ApSettings()) {
-    if (setting.szOption == nullptr) continue;
-    EXPECT_THAT(zsh, HasSubstr("'--" + std::string(setting.szOption) + "["));
   }
 }
 

@@ -8,8 +8,10 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <chrono>
 #include <cstdlib>
+#include <cstring>
 #include <fstream>
 #include <iterator>
 
@@ -40,17 +42,30 @@ std::string TextOf(int fd) {
   return text;
 }
 
-[[noreturn]] void RunHere(const std::vector<std::string>& arguments, const Surroundings& surroundings) {
+void Enter(const Surroundings& surroundings) {
   for (const char* szName : {"NO_COLOR", "LC_CTYPE", "LANG"}) ::unsetenv(szName);
   ::setenv("LC_ALL", "C.UTF-8", 1);
   ::setenv("TERM", "xterm", 1);
   for (const auto& [name, value] : surroundings.environment) ::setenv(name.c_str(), value.c_str(), 1);
+}
 
+[[noreturn]] void RunHere(const std::vector<std::string>& arguments, const Surroundings& surroundings) {
+  Enter(surroundings);
   std::vector<const char*> argv{"merowireless"};
   for (const std::string& argument : arguments) argv.push_back(argument.c_str());
   const int status = RunProgram(static_cast<int>(argv.size()), argv.data());
   std::fflush(nullptr);
   ::_exit(status);
+}
+
+[[noreturn]] void RunCommandHere(const std::vector<std::string>& command, const Surroundings& surroundings) {
+  Enter(surroundings);
+  std::vector<char*> argv;
+  for (const std::string& word : command) argv.push_back(const_cast<char*>(word.c_str()));
+  argv.push_back(nullptr);
+  ::execvp(argv[0], argv.data());
+  std::fprintf(stderr, "cannot run %s: %s\n", argv[0], std::strerror(errno));
+  ::_exit(127);
 }
 
 pid_t Start(const std::vector<std::string>& arguments, const Surroundings& surroundings, int out, int err) {
@@ -73,21 +88,12 @@ int StatusOf(pid_t pid) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 
-}  // namespace
-
-Ran Tool(const std::vector<std::string>& arguments, const Surroundings& surroundings) {
-  const int out = Memory();
-  const int err = Memory();
-  const int status = StatusOf(Start(arguments, surroundings, out, err));
-  return {status, TextOf(out), TextOf(err)};
-}
-
-Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short columns, const Surroundings& surroundings,
-                   const Typing& typing) {
+// What the child shows on a terminal of so many columns, until it ends.
+Ran OnTerminal(const std::function<void()>& child, unsigned short columns, const Typing& typing) {
   winsize size{.ws_row = 24, .ws_col = columns, .ws_xpixel = 0, .ws_ypixel = 0};
   int terminal = -1;
   const pid_t pid = ::forkpty(&terminal, nullptr, nullptr, &size);
-  if (pid == 0) RunHere(arguments, surroundings);
+  if (pid == 0) child();
 
   Ran ran;
   bool typed = typing.prompt.empty();
@@ -100,6 +106,24 @@ Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short col
   ::close(terminal);
   ran.status = StatusOf(pid);
   return ran;
+}
+
+}  // namespace
+
+Ran Tool(const std::vector<std::string>& arguments, const Surroundings& surroundings) {
+  const int out = Memory();
+  const int err = Memory();
+  const int status = StatusOf(Start(arguments, surroundings, out, err));
+  return {status, TextOf(out), TextOf(err)};
+}
+
+Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short columns, const Surroundings& surroundings,
+                   const Typing& typing) {
+  return OnTerminal([&] { RunHere(arguments, surroundings); }, columns, typing);
+}
+
+Ran CommandOnTerminal(const std::vector<std::string>& command, const Surroundings& surroundings, const Typing& typing) {
+  return OnTerminal([&] { RunCommandHere(command, surroundings); }, 80, typing);
 }
 
 StartedTool::StartedTool(const std::vector<std::string>& arguments) : out_(Memory()), err_(Memory()) {

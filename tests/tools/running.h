@@ -34,6 +34,9 @@ struct Typing {
 Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short columns = 80,
                    const Surroundings& surroundings = {}, const Typing& typing = {});
 
+// The same with another program.
+Ran CommandOnTerminal(const std::vector<std::string>& command, const Surroundings& surroundings, const Typing& typing);
+
 // A run that is not waited for.
 class StartedTool {
  public:
