@@ -19,6 +19,9 @@ endfunction()
 # A directory of their own, since libiw has a wireless.h, too.
 install(FILES include/platform.h include/wireless.h DESTINATION ${MERO_INSTALL_HEADERS} COMPONENT development)
 
+# It says where things are by where it is itself: `cmake --install` may be given another prefix.
+cmake_path(RELATIVE_PATH CMAKE_INSTALL_PREFIX BASE_DIRECTORY ${CMAKE_INSTALL_FULL_LIBDIR}/pkgconfig
+  OUTPUT_VARIABLE MERO_PREFIX_FROM_PC)
 configure_file(cmake/libmerowireless-core.pc.in libmerowireless-core.pc @ONLY)
 install(FILES ${CMAKE_CURRENT_BINARY_DIR}/libmerowireless-core.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig
   COMPONENT development)

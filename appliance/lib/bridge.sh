@@ -54,8 +54,11 @@ join_bridge() { # INTERFACE BRIDGE
 	attempt "bring $1 up" ip link set dev "$1" up
 }
 
-set_address() { # INTERFACE ADDRESS/MASK
+# set_address INTERFACE ADDRESS/MASK: the only one. What has it already keeps the routes that go with it.
+set_address() {
 	end_lease "$1"
+	attempt "give $1 the address $2" ip address replace "$2" broadcast + dev "$1"
+	[ "$(ip -4 -oneline address show dev "$1" | wc -l)" -gt 1 ] || return 0
 	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
 	attempt "give $1 the address $2" ip address add "$2" broadcast + dev "$1"
 }

@@ -252,6 +252,32 @@ TEST_F(Kit, MakesTheBridgesThatComeUpAtBoot) {
   }
 }
 
+// An upgrade of the kit made the bridges again, and the way out of the house was gone.
+TEST_F(Kit, KeepsTheRoutesOfABridgeThatIsThereAlready) {
+  const std::string file = "/etc/sysconfig/network-scripts/ifcfg-br0";
+  const std::string text = "DEVICE=br0\nTYPE=Bridge\nBOOTPROTO=static\nNETMASK=255.255.255.0\nONBOOT=yes\nIPADDR=";
+  const std::string routes = "ip -4 route show dev br0 | sed 's/ *$//'";
+  const std::string addresses = "ip -brief -4 address show br0 | awk '{ $1 = $2 = \"\"; print $0 }'";
+  Write(file, text + "192.0.2.1\n");
+  ASSERT_EQ(RunInShell("/etc/rc.network boot").output, "");
+  ASSERT_EQ(RunInShell("ip route add default via 192.0.2.254").output, "");
+  const std::string before = RunInShell(routes).output;
+  ASSERT_THAT(before, StartsWith("default via 192.0.2.254"));
+
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
+  EXPECT_EQ(RunInShell(routes).output, before);
+
+  // Another address than the file's goes, whichever was there first.
+  for (const char* szOther : {"192.0.2.7/24", "192.0.2.1/16", "198.51.100.1/24"}) {
+    ASSERT_EQ(RunInShell(std::string("ip address add dev br0 ") + szOther).output, "");
+    EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
+    EXPECT_EQ(RunInShell(addresses).output, "  192.0.2.1/24\n") << szOther;
+  }
+  Write(file, text + "192.0.2.2\n");
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
+  EXPECT_EQ(RunInShell(addresses).output, "  192.0.2.2/24\n");
+}
+
 TEST_F(Kit, SaysWhyABridgeCannotBeMade) {
   const std::string scripts = "/etc/sysconfig/network-scripts/ifcfg-";
   const struct {
@@ -282,7 +308,30 @@ TEST_F(Kit, RefusesWrongWordsWithItsUsage) {
     EXPECT_EQ(ran.status, 2) << szWords;
     EXPECT_THAT(ran.output, StartsWith("usage: usb.wireless.function add")) << szWords;
   }
-  EXPECT_EQ(RunInShell("/etc/rc.network help").status, 0);
+}
+
+// Also to whoever may not run anything.
+TEST_F(Kit, TellsItsUsageWithoutAnythingElse) {
+  Write("/var/run/rc.network", "in the way of the directory");
+  for (const char* szWord : {"help", "-h", "--help"}) {
+    const Ran ran = RunInShell(std::string("/etc/rc.network ") + szWord);
+    EXPECT_EQ(ran.status, 0) << szWord;
+    EXPECT_THAT(ran.output, StartsWith("usage: rc.network start INTERFACE BRIDGE")) << szWord;
+  }
+  const Ran ran = RunInShell("/etc/rc.network boot");
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.output, HasSubstr("rc.network: cannot make /var/run/rc.network"));
+}
+
+TEST_F(Kit, SaysThatAnotherRunTakesTooLong) {
+  Install("flock", "exec /usr/bin/flock $(echo \"$@\" | sed 's/-w 60/-w 0.01/')\n");
+  Install("logger", "echo \"$@\" >>/tmp/logged\n");
+  const std::string locked = "PATH=/tmp/bin:$PATH; mkdir /var/run/rc.network; exec 9>/var/run/rc.network/lock; ";
+  const Ran late = RunInShell(locked + "/usr/bin/flock 9; /etc/rc.network boot 9>&-");
+  EXPECT_EQ(late.status, 1);
+  EXPECT_EQ(late.output, "rc.network: another run takes too long\n");
+  EXPECT_EQ(RunInShell("cat /tmp/logged").output, "-t rc.network -p daemon.err -- another run takes too long\n");
+  EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH; /etc/rc.network boot").status, 0);
 }
 
 TEST_F(Kit, SaysThatThereIsNoAdapter) {

@@ -67,11 +67,20 @@ members() {
 # As patterns, in which any word in capitals stands for what a program fills in.
 files() {
   (cd "$source" && find lib common platform tools -name '*.[ch]*' -exec grep -hoE '"[^"]*"' {} +) |
-    grep -oE '/(etc|etc\.defaults|usr/mero|var|tmp)/[^" \]+'
-  grep -rhoE '^[a-z_]+=/(etc|usr/mero|var|tmp)/[^ ]+' "$source/appliance" | sed 's/.*=//'
+    grep -oP '(?<!\w)/(etc|etc\.defaults|usr/mero|var|run|tmp|sbin)/[^" \\]+'
+  grep -rhoE '^[a-z_]+=/(etc|usr/mero|var|run|tmp|sbin)/[^ ]+' "$source/appliance" | sed 's/.*=//'
   cat "$source/README.md" "$source"/docs/*.md | sed -n 's/^|\([^|]*\)|.*/\1/p' | tr '`' ' ' | grep -oE ' /[^ ,*]+' |
     tr -d ' '
 }
+
+# What a component installs, from the build directory.
+installed() { # COMPONENT
+  DESTDIR=$work/$1 cmake --install "$argument" --component "$1" >"$work/log" || fail "$(cat "$work/log")"
+  (cd "$work/$1" && find . -not -type d | sed 's/^\.//')
+}
+
+# Besides the manual and other documents.
+installed_kit() { installed appliance | grep -v /share/; }
 
 as_pattern() { sed 's/[.*]/\\&/g; s/%\([0-9]*\$\)\{0,1\}s/[A-Z]+/g'; }
 
@@ -146,6 +155,12 @@ described_options() {
     }' "$manual/merowireless.1"
 }
 
+# In the lines that name them.
+described_paths() { grep -hE '(^|[. ])Pa ' "$manual"/*.[1358]; }
+
+# The types that a heading is about.
+headed_types() { cat "$manual"/*.3 | sed -n 's/^\.Vt \(enum\|struct\|union\) //p; s/^\.Pq Vt //p'; }
+
 described_script_commands() {
   sed -n 's/^\.It Cm \([a-z -]*[a-z]\).*/\1/p' "$manual/${argument##*/}.8" | grep -vx help
 }
@@ -169,36 +184,73 @@ expect_all() { # WHAT: each line of the file "lacking" is something that no page
   [ ! -s "$work/lacking" ] || fail "no page has the $1 $(tr '\n' ' ' <"$work/lacking")"
 }
 
-# expect_named THERE_IS: all that a function tells is a name of a page.
-expect_named() {
+# expect_among THERE_IS PAGES_HAVE: all that one function tells is what the other tells.
+expect_among() {
   $1 | sort -u >"$work/there"
   [ -s "$work/there" ] || fail "$1 tells nothing"
-  names 3 | cut -d ' ' -f 1 | sort | comm -23 "$work/there" - >"$work/lacking"
+  $2 | sort -u | comm -23 "$work/there" - >"$work/lacking"
   expect_all "$1"
 }
 
+page_names() { names 3 | cut -d ' ' -f 1; }
+
+# Those with the libraries' prefixes. Others, such as BOOL, are no names to claim in a manual that everybody shares.
+own() { grep -E '^(libmero|P?(MERO|PLIB|WIRELESS_))'; }
+
+own_types() { types | own; }
+
+described_types() { page_names && headed_types; }
+
 expect_functions() {
-  expect_named exported
+  expect_among exported page_names
   expect_same declared described_functions
+}
+
+expect_types() {
+  expect_among types described_types
+  expect_among own_types page_names
 }
 
 expect_files() {
   files | as_pattern | sort -u >"$work/files"
   [ -s "$work/files" ] || fail 'there is no file'
-  grep -hE '(^|[. ])Pa ' "$manual"/*.[1358] >"$work/paths"
+  described_paths >"$work/paths"
   while IFS= read -r file; do
     grep -qE -- "$file([^A-Za-z0-9_]|$)" "$work/paths" || echo "$file"
   done <"$work/files" >"$work/lacking"
   expect_all files
 }
 
-# Further names have a page that leads to the one that describes them; and all are something that there is.
+# Each file that is installed is one of those that the pages name, perhaps along with others: "DIRECTORY/*.sh".
+expect_installed() {
+  described_paths | grep -oE '/[^ ,]+' | sort -u >"$work/patterns"
+  installed_kit >"$work/there"
+  [ -s "$work/there" ] || fail 'nothing is installed'
+  while IFS= read -r file; do is_like_one_of "$file" "$work/patterns" || echo "$file"; done \
+    <"$work/there" >"$work/lacking"
+  expect_all 'installed files'
+}
+
+is_like_one_of() { # TEXT PATTERNS
+  while IFS= read -r pattern; do
+    # shellcheck disable=SC2254  # it is a pattern
+    case $1 in $pattern) return ;; esac
+  done <"$2"
+  return 1
+}
+
+# Each further name that bears the libraries' prefixes is installed as a page that leads to the one that describes it,
+# and no other is; and all are something that there is.
 expect_names() {
+  installed development | sed -n 's,.*/man3/,,p' | sort >"$work/installed"
+  { names 3 | cut -d ' ' -f 2 && page_names | own; } | sed 's/$/.3/' | sort -u | diff - "$work/installed"
+  pages=$(dirname "$(find "$work/development" -name libmerowireless-core.3)")
   names 3 | while read -r name page; do
-    [ "$name" = "$page" ] || echo ".so man3/$page.3" | diff - "$argument/$name.3"
+    [ "$name" = "$page" ] || ! [ -e "$pages/$name.3" ] || echo ".so man3/$page.3" | diff - "$pages/$name.3"
   done
   { exported && types && names 3 | cut -d ' ' -f 2 && echo libmerosdk; } | sort -u >"$work/there"
-  names 3 | cut -d ' ' -f 1 | sort | diff "$work/there" -
+  strange=$(page_names | sort -u | comm -13 "$work/there" -)
+  [ -z "$strange" ] || fail "there is no $strange"
 }
 
 # References to other packages' pages are few, and listed.
@@ -212,10 +264,11 @@ expect_references() {
 
 case $check in
   functions) expect_functions ;;
-  types) expect_named types ;;
+  types) expect_types ;;
   constants) expect_same constants described_constants ;;
   members) expect_same members described_members ;;
   files) expect_files ;;
+  installed) expect_installed ;;
   script) expect_same script_commands described_script_commands ;;
   commands) expect_same program_options described_options ;;
   names) expect_names ;;

@@ -75,6 +75,17 @@ enter_system() { # ARCHIVE DIRECTORY
   cp "$2"/*.deb "$root/tmp/packages/"
 }
 
+# Has the packages' scripts find systemd running, and writes down what they ask of it.
+pretend_systemd() {
+  local name
+  mkdir -p "$root/run/systemd/system"
+  for name in systemctl udevadm; do
+    printf '#!/bin/sh\necho "%s $*" >>/tmp/asked\ncase $* in *is-enabled*) echo enabled ;; esac\n' "$name" \
+      >"$root/usr/bin/$name"
+    chmod 755 "$root/usr/bin/$name"
+  done
+}
+
 # Every file, and every directory that is empty, with what can be seen of it; besides what apt and dpkg write down for
 # themselves.
 files() {
@@ -104,6 +115,7 @@ install_from() { # DIRECTORY [OPTION...]
   local directory=$1 packages
   shift
   packages=("$root/tmp/$directory"/*.deb)
+  rm -f "$root/tmp/asked"
   apt install "$@" "${packages[@]#"$root"}"
 }
 
@@ -146,6 +158,52 @@ builds_and_runs() { # PROGRAM COMMAND
   [[ $status -eq 1 ]]
 }
 
+# Whether systemd was asked for something in the last change, by a pattern.
+asked_for() { grep -qE -- "$1" "$root/tmp/asked"; }
+
+nothing_is_started_anew() { asked_for daemon-reload && ! asked_for ' (stop|restart|try-restart|kill) '; }
+
+has_changelogs() {
+  local package
+  for package in "${ours[@]}"; do
+    zgrep -q '^# Changelog' "$root/usr/share/doc/$package/changelog.gz" || return
+  done
+}
+
+# As `cmake --install` with another prefix would have them.
+is_found_elsewhere() {
+  local wanted=/tmp/elsewhere/usr/include/merowireless-core directory found
+  mkdir "$root/tmp/elsewhere"
+  inside dpkg --listfiles libmerowireless-core-dev | sed -n 's,^/\(.*/\(include\|pkgconfig\)/.*\.[a-z]*\)$,\1,p' |
+    tar --create --directory "$root" --files-from - | tar --extract --directory "$root/tmp/elsewhere"
+  directory=$(cd "$root" && echo tmp/elsewhere/usr/lib/*/pkgconfig)
+  found=$(inside env PKG_CONFIG_PATH="/$directory" pkg-config --variable=includedir libmerowireless-core)
+  [[ $(inside realpath "$found") == "$wanted" ]]
+}
+
+readonly autoconnect=/etc/systemd/system/mero-wireless@wlan0.service.wants/mero-wireless-autoconnect.service
+
+# As `systemctl enable` does.
+enable_autoconnect() {
+  mkdir "$root${autoconnect%/*}"
+  ln -s "/lib/systemd/system/${autoconnect##*/}" "$root$autoconnect"
+}
+
+autoconnect_is_enabled() { [[ -L $root$autoconnect ]]; }
+autoconnect_is_not_enabled() { ! autoconnect_is_enabled; }
+
+# Files of the library's own: a note, and what it writes for every connection.
+readonly note=/var/tmp/.wireless_current_connection connection=/usr/mero/etc/wpa_supplicant.conf
+
+write_own_files() { touch "$root$note" "$root$connection"; }
+
+note_stays_for_another_architecture() {
+  quietly inside env DPKG_MAINTSCRIPT_PACKAGE_REFCOUNT=2 \
+    sh -c '/var/lib/dpkg/info/libmerowireless-core1:*.postrm remove' && [[ -e $root$note ]]
+}
+
+note_is_gone() { [[ ! -e $root$note ]]; }
+
 write_settings() {
   local file
   for file in "${settings[@]}"; do echo "the user's $file" >"$root$file"; done
@@ -187,9 +245,14 @@ look_at_packages() { # ARCHIVE DIRECTORY
   enter_system "$1" "$2"
   make_upgrades
   mapfile -t ours < <(names)
+  pretend_systemd
   files >"$root/tmp/before"
 
   check 'the packages can be installed' install_from packages
+  check 'bridges are made at once' asked_for ' start mero-network.service'
+  check 'an adapter that is there already is told of' asked_for '^udevadm trigger --action=add .*wlan'
+  check 'no network is joined by itself unless that is asked for' autoconnect_is_not_enabled
+  check 'the changelog is there' has_changelogs
   check 'the libraries take less than 100 KiB together' libraries_are_small
   check 'a scan without an adapter says so in one sentence, and exits with 3' scan_says_that_there_is_no_adapter
   check 'the listing tool has its own form' iwlist_lists
@@ -200,21 +263,30 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'the example builds as C++ and runs' builds_and_runs scan-one "c++ -Wall -Wextra -Werror -x c++ $cc"
   check 'the example builds with CMake and runs' builds_and_runs build/scan-one 'cmake -B build && cmake --build build'
 
+  check 'pkg-config finds the headers where they are moved to' is_found_elsewhere
+
   write_settings
+  write_own_files
+  enable_autoconnect
   check 'the packages can be installed again' install_from packages --reinstall
   check 'settings are kept when packages are installed again' settings_are_kept
   check 'the packages can be upgraded' install_from upgrades
   check 'the upgrade has taken place' is_upgraded
+  check 'an upgrade leaves the network as it is' nothing_is_started_anew
+  check 'an upgrade leaves joining a network by itself enabled' autoconnect_is_enabled
   check 'settings are kept in an upgrade' settings_are_kept
   check 'the listing tool still passes on after an upgrade' iwlist_passes_on
 
+  check "the libraries' notes stay while they are there for another architecture" note_stays_for_another_architecture
   start_daemon
   check 'the packages can be removed' apt remove "${ours[@]}"
+  check "the libraries' notes go with them" note_is_gone
+  check 'units of adapters end when the kit is removed' asked_for 'systemctl stop mero-wireless@\*\.service'
   check 'settings are kept when packages are removed' settings_are_kept
   check 'access points end when the kit is removed' daemon_has_ended
   check 'the ordinary listing tool is back' iwlist_passes_on
   check 'until packages are purged, nothing but settings and notes of systemd is left' \
-    only_settings_are_new '^(etc|var/lib)/systemd/'
+    only_settings_are_new "^(etc|var/lib)/systemd/|^${connection#/}\$"
   check 'the packages can be purged' quietly inside dpkg --purge "${ours[@]}"
   check 'settings are kept when packages are purged' settings_are_kept
   check 'when packages are purged, nothing but settings is left' only_settings_are_new
