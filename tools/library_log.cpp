@@ -7,13 +7,17 @@
 #include <algorithm>
 #include <cstdarg>
 #include <cstdio>
+#include <deque>
 
+#include "terminal.h"
 #include "text.h"
 
 namespace library_log {
 namespace {
 
-std::vector<std::string> g_lines;
+constexpr std::size_t kMost = 1000;
+
+std::deque<std::string> g_lines;
 std::function<void(std::string_view)> g_take;
 bool g_shown = false;
 
@@ -30,17 +34,14 @@ void Report(int priority, const char* szFormat, va_list values) {
 
 }  // namespace
 
-const std::vector<std::string>& Lines() {
-  return g_lines;
-}
-
 bool Says(std::string_view text) {
   return std::ranges::any_of(g_lines, [&](const std::string& line) { return line.find(text) != line.npos; });
 }
 
 void Keep(std::string_view line) {
+  if (g_lines.size() == kMost) g_lines.pop_front();
   g_lines.emplace_back(line);
-  if (g_shown) std::fprintf(stderr, "library: %s\n", Harmless(line, false).c_str());
+  if (g_shown) Remark("library: " + Harmless(line, false));
 }
 
 void ShowLines() {
@@ -49,12 +50,6 @@ void ShowLines() {
 
 void SendTo(std::function<void(std::string_view)> take) {
   g_take = std::move(take);
-}
-
-void Reset() {
-  g_lines.clear();
-  g_take = nullptr;
-  g_shown = false;
 }
 
 }  // namespace library_log

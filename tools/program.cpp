@@ -1,12 +1,14 @@
 // From a command line to an exit status.
 #include "program.h"
 
+#include <fcntl.h>
 #include <unistd.h>
 
 #include <clocale>
 #include <cstdio>
 #include <exception>
 
+#include "descriptor.h"
 #include "library_log.h"
 #include "options.h"
 
@@ -16,18 +18,25 @@ int Status(Exit exit) {
   return static_cast<int>(exit);
 }
 
+// What is opened later must not take the place of a standard descriptor that is closed. Using one fails as before.
+void FillStandardDescriptors() {
+  for (int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+    if (::fcntl(fd, F_GETFD) < 0) Require(::open("/dev/null", fd == STDIN_FILENO ? O_WRONLY : O_RDONLY), "/dev/null");
+  }
+}
+
 int Explain(const Usage& usage) {
   if (usage.exit == Exit::kDone) {
     std::fputs(usage.text.c_str(), stdout);
   } else {
-    std::fprintf(stderr, "merowireless: %s; merowireless --help tells more\n", Harmless(usage.text, false).c_str());
+    Remark("merowireless: " + Harmless(usage.text, false) + "; merowireless --help tells more");
   }
   return Status(usage.exit);
 }
 
 int Report(const Output& output, const Failure& failure) {
   output.Failed(failure);
-  std::fprintf(stderr, "merowireless: %s: %s\n", failure.what(), failure.advice().c_str());
+  Remark(std::string("merowireless: ") + failure.what() + ": " + failure.advice());
   return Status(failure.exit());
 }
 
@@ -40,7 +49,8 @@ int RunCommand(const Options& options) {
   } catch (const Failure& failure) {
     return Report(program.output, failure);
   } catch (const Interrupted&) {
-    return Report(program.output, {Exit::kInterrupted, "interrupted", "nothing of it goes on"});
+    return Report(program.output,
+                  {Exit::kInterrupted, "interrupted, and nothing of the command goes on", "run it again"});
   } catch (const std::exception& failure) {
     return Report(program.output, {Exit::kFailed, failure.what(), "-v shows how far it came"});
   }
@@ -50,13 +60,14 @@ int RunCommand(const Options& options) {
 // What was written and did not arrive is no success.
 int Finish(int status) {
   if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return status;
-  std::fputs("merowireless: the output could not be written: look at where it goes\n", stderr);
+  Remark("merowireless: the output could not be written: look at where it goes");
   return status == Status(Exit::kDone) ? Status(Exit::kFailed) : status;
 }
 
 }  // namespace
 
 int RunProgram(int argc, const char* const* argv) {
+  FillStandardDescriptors();
   std::setlocale(LC_CTYPE, "");
   try {
     const Options options = ParseOptions(argc, argv);

@@ -17,7 +17,7 @@ Progress::~Progress() {
 
 void Progress::Update() {
   constexpr milliseconds kPatience{500};
-  if (!terminal_.isTerminal) return;
+  if (!terminal_.obeys) return;
   const auto elapsed = duration_cast<milliseconds>(std::chrono::steady_clock::now() - began_);
   if (elapsed < kPatience) return;
 

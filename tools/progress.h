@@ -7,7 +7,8 @@
 
 #include "terminal.h"
 
-// Shows `doing` and the time since on the standard error output, where that is a terminal, from half a second on.
+// Shows `doing` and the time since on the standard error output, where that is a terminal that can take the line back,
+// from half a second on.
 class Progress {
  public:
   Progress(const Terminal& terminal, std::string doing);

@@ -19,10 +19,21 @@ Failure Unusable(const std::string& what) {
   return {Exit::kSecretRefused, what, "give the secret as one line"};
 }
 
+// Waits for input. False when the program was stopped meanwhile and goes on.
+bool WaitForInput(int fd, const Signals& signals) {
+  pollfd waited[] = {{fd, POLLIN, 0}, {signals.fd(), POLLIN, 0}};
+  while (::poll(waited, std::size(waited), -1) < 0 && errno == EINTR) continue;
+  const int signal = signals.Next();
+  if (signal != 0 && signal != SIGCONT) throw Interrupted{};
+  return signal == 0;
+}
+
 std::string ReadAll(int fd, const std::string& from) {
+  const Signals signals;
   std::string text;
   char bytes[1024];
   while (true) {
+    WaitForInput(fd, signals);
     const ssize_t size = ::read(fd, bytes, sizeof bytes);
     if (size < 0 && errno == EINTR) continue;
     if (size < 0) throw Failure(Exit::kFailed, from + " cannot be read: " + std::strerror(errno), "check the file");
@@ -45,18 +56,21 @@ std::string ReadFile(const std::string& path) {
   return Checked(ReadAll(file.get(), path), path);
 }
 
-// Keeps what is typed from being shown, while it lives.
+// Keeps what is typed from being shown, from Begin() until it dies.
 class Silence {
  public:
   explicit Silence(int terminal) : terminal_(terminal), before_() {
     Require(::tcgetattr(terminal_, &before_), "tcgetattr");
-    termios silent = before_;
-    silent.c_lflag &= ~static_cast<tcflag_t>(ECHO);
-    Require(::tcsetattr(terminal_, TCSAFLUSH, &silent), "tcsetattr");
   }
   Silence(const Silence&) = delete;
   Silence& operator=(const Silence&) = delete;
   ~Silence() { ::tcsetattr(terminal_, TCSAFLUSH, &before_); }
+
+  void Begin() const {
+    termios silent = before_;
+    silent.c_lflag &= ~static_cast<tcflag_t>(ECHO);
+    Require(::tcsetattr(terminal_, TCSAFLUSH, &silent), "tcsetattr");
+  }
 
  private:
   int terminal_;
@@ -67,21 +81,21 @@ void Say(int terminal, std::string_view text) {
   Require(static_cast<int>(::write(terminal, text.data(), text.size())), "the terminal");
 }
 
-std::string ReadLine(int terminal, const Signals& signals) {
-  pollfd waited[] = {{terminal, POLLIN, 0}, {signals.fd(), POLLIN, 0}};
-  while (::poll(waited, std::size(waited), -1) < 0 && errno == EINTR) continue;
-  if (signals.HasCome()) throw Interrupted{};
-
+std::string ReadLine(int terminal) {
   char line[kLongest];
   const int size = Require(static_cast<int>(::read(terminal, line, sizeof line)), "the terminal");
   return {line, static_cast<std::size_t>(size)};
 }
 
 std::string Prompt(int terminal, const std::string& prompt) {
-  const Signals signals;
+  const Signals signals({SIGCONT});
   const Silence silence(terminal);
-  Say(terminal, prompt + ": ");
-  std::string line = ReadLine(terminal, signals);
+  // The shell in which a program is stopped makes the terminal show again what is typed.
+  do {
+    silence.Begin();
+    Say(terminal, prompt + ": ");
+  } while (!WaitForInput(terminal, signals));
+  std::string line = ReadLine(terminal);
   Say(terminal, "\n");
   return Checked(std::move(line), "what was typed");
 }

@@ -1,7 +1,6 @@
 // The signals by which somebody ends the program, while it waits for something.
 #include "signals.h"
 
-#include <poll.h>
 #include <sys/signalfd.h>
 
 namespace {
@@ -11,21 +10,22 @@ bool IsIgnored(int signal) {
   return ::sigaction(signal, nullptr, &action) == 0 && action.sa_handler == SIG_IGN;
 }
 
-sigset_t EndingSignals() {
-  sigset_t ending;
-  sigemptyset(&ending);
-  for (int signal : {SIGINT, SIGTERM, SIGHUP}) {
-    if (!IsIgnored(signal)) sigaddset(&ending, signal);
+sigset_t EndingSignalsAnd(std::initializer_list<int> others) {
+  sigset_t held;
+  sigemptyset(&held);
+  for (int signal : {SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
+    if (!IsIgnored(signal)) sigaddset(&held, signal);
   }
-  return ending;
+  for (int signal : others) sigaddset(&held, signal);
+  return held;
 }
 
 }  // namespace
 
-Signals::Signals() : before_() {
-  const sigset_t ending = EndingSignals();
-  fd_ = Descriptor(Require(::signalfd(-1, &ending, SFD_CLOEXEC | SFD_NONBLOCK), "signalfd"));
-  Require(::sigprocmask(SIG_BLOCK, &ending, &before_), "sigprocmask");
+Signals::Signals(std::initializer_list<int> others) : before_() {
+  const sigset_t held = EndingSignalsAnd(others);
+  fd_ = Descriptor(Require(::signalfd(-1, &held, SFD_CLOEXEC | SFD_NONBLOCK), "signalfd"));
+  Require(::sigprocmask(SIG_BLOCK, &held, &before_), "sigprocmask");
 }
 
 // What came meanwhile and was seen by nobody ends the program now.
@@ -33,9 +33,9 @@ Signals::~Signals() {
   RestoreMask();
 }
 
-bool Signals::HasCome() const {
+int Signals::Next() const {
   signalfd_siginfo info;
-  return ::read(fd_.get(), &info, sizeof info) == sizeof info;
+  return ::read(fd_.get(), &info, sizeof info) == sizeof info ? static_cast<int>(info.ssi_signo) : 0;
 }
 
 void Signals::RestoreMask() const {

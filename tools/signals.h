@@ -3,22 +3,24 @@
 #define MERO_TOOLS_SIGNALS_H
 
 #include <csignal>
+#include <initializer_list>
 
 #include "descriptor.h"
 
-// Holds the signals back from now on; they make fd() readable instead. One that the program was started to ignore
-// stays ignored.
+// Holds the signals back from now on, and others that are asked for; they make fd() readable instead. One that the
+// program was started to ignore stays ignored.
 class Signals {
  public:
-  Signals();
+  explicit Signals(std::initializer_list<int> others = {});
   Signals(const Signals&) = delete;
   Signals& operator=(const Signals&) = delete;
   ~Signals();
 
   int fd() const { return fd_.get(); }
 
-  // Whether one has come.
-  bool HasCome() const;
+  // The next one that has come, or 0.
+  int Next() const;
+  bool HasCome() const { return Next() != 0; }
 
   // Gives a child the mask that was there before.
   void RestoreMask() const;

@@ -5,6 +5,8 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <csignal>
+#include <cstdio>
 #include <cstdlib>
 #include <string_view>
 
@@ -25,10 +27,17 @@ std::size_t WidthOf(int fd) {
 
 Terminal TerminalOf(int fd) {
   const bool isTerminal = ::isatty(fd) == 1;
+  const bool obeys = isTerminal && Environment("TERM") != "dumb";
   return {
-      .isTerminal = isTerminal,
-      .colour = isTerminal && Environment("NO_COLOR").empty() && Environment("TERM") != "dumb",
+      .obeys = obeys,
+      .colour = obeys && Environment("NO_COLOR").empty(),
       .utf8 = std::string_view(::nl_langinfo(CODESET)) == "UTF-8",
       .width = isTerminal ? WidthOf(fd) : 0,
   };
+}
+
+void Remark(const std::string& line) {
+  const auto before = std::signal(SIGPIPE, SIG_IGN);
+  std::fprintf(stderr, "%s\n", line.c_str());
+  std::signal(SIGPIPE, before);
 }

@@ -5,9 +5,13 @@
 #include <poll.h>
 #include <sys/mman.h>
 #include <sys/prctl.h>
-#include <sys/syscall.h>
 #include <sys/wait.h>
 
+extern "C" {
+#include <sys/pidfd.h>  // says nothing of the language of its functions
+}
+
+#include <algorithm>
 #include <chrono>
 #include <csignal>
 #include <cstdint>
@@ -22,6 +26,7 @@
 #include "library_log.h"
 #include "progress.h"
 #include "signals.h"
+#include "text.h"
 
 namespace {
 
@@ -81,7 +86,28 @@ class Frames {
 
 // ---- The worker ----
 
-// Commands inherit the worker's standard descriptors. Daemons may keep them, so nothing here can run full or break.
+// What the worker's commands print on their standard error output, in memory: whoever writes there neither waits nor
+// breaks. Daemons may keep the descriptor, so it takes nothing more when this holder ends.
+class Errors {
+ public:
+  Errors() : fd_(Require(::memfd_create("errors", MFD_CLOEXEC | MFD_ALLOW_SEALING), "memfd_create")) {}
+  Errors(const Errors&) = delete;
+  Errors& operator=(const Errors&) = delete;
+  ~Errors() { ::fcntl(fd_.get(), F_ADD_SEALS, F_SEAL_GROW); }
+
+  int fd() const { return fd_.get(); }
+
+  // Leaves the offset alone, which is the writers'.
+  void Show() const {
+    std::ifstream text("/proc/self/fd/" + std::to_string(fd_.get()));
+    for (std::string line; std::getline(text, line);) Remark(Harmless(line, false));
+  }
+
+ private:
+  Descriptor fd_;
+};
+
+// Commands inherit the worker's standard descriptors.
 void Redirect(int errors) {
   const int nowhere = Require(::open("/dev/null", O_RDWR | O_CLOEXEC), "/dev/null");
   Require(::dup2(nowhere, STDIN_FILENO), "dup2");
@@ -105,24 +131,27 @@ void Redirect(int errors) {
 
 // ---- Its end ----
 
-// Readable when the child has ended.
-Descriptor ProcessOf(pid_t pid) {
-  return Descriptor(Require(static_cast<int>(::syscall(SYS_pidfd_open, pid, 0)), "pidfd_open"));
-}
-
 // Waits until a child has ended, for so long at most.
 bool EndsWithin(pid_t pid, milliseconds time) {
-  const Descriptor process = ProcessOf(pid);
+  const Descriptor process(::pidfd_open(pid, 0));  // without one the time passes, and the child is taken to live
   pollfd ended{process.get(), POLLIN, 0};
   if (::poll(&ended, 1, static_cast<int>(time.count())) == 0) return false;
   return ::waitpid(pid, nullptr, 0) == pid;
 }
 
-// Daemons that the worker started are this process's children by now.
-std::vector<pid_t> Orphans() {
+using Pids = std::vector<pid_t>;
+
+Pids Children() {
   std::ifstream children("/proc/thread-self/children");
-  std::vector<pid_t> pids;
+  Pids pids;
   for (pid_t pid = 0; children >> pid;) pids.push_back(pid);
+  return pids;
+}
+
+// Daemons that the worker started are this process's children by now, beside those that it had before.
+Pids OrphansBeside(const Pids& others) {
+  Pids pids = Children();
+  std::erase_if(pids, [&](pid_t pid) { return std::ranges::find(others, pid) != others.end(); });
   return pids;
 }
 
@@ -133,20 +162,12 @@ void End(pid_t pid, pid_t target) {
   ::waitpid(pid, nullptr, 0);
 }
 
-void EndEverything(pid_t worker) {
+void EndEverything(pid_t worker, const Pids& others) {
   End(worker, -worker);
   ::kill(-worker, SIGKILL);  // what is left of its group had its time
   // One that ends may leave children of its own.
-  for (std::vector<pid_t> orphans = Orphans(); !orphans.empty(); orphans = Orphans()) {
+  for (Pids orphans = OrphansBeside(others); !orphans.empty(); orphans = OrphansBeside(others)) {
     for (pid_t pid : orphans) End(pid, pid);
-  }
-}
-
-void ShowErrors(int errors) {
-  char bytes[4096];
-  Require(static_cast<int>(::lseek(errors, 0, SEEK_SET)), "lseek");
-  for (ssize_t size; (size = ::read(errors, bytes, sizeof bytes)) > 0;) {
-    std::fwrite(bytes, 1, static_cast<std::size_t>(size), stderr);
   }
 }
 
@@ -156,31 +177,41 @@ bool Exists(const char* szPath) {
 
 // ---- Both together ----
 
+// A call that does not come to its end, for whatever reason, ends with its Worker, and is undone.
 class Worker {
  public:
   Worker(const Task& task, const std::function<std::string()>& call)
-      : task_(task), hadMarker_(Exists(task.szMarker)), progress_(task.errors, task.doing) {
-    errors_ = Descriptor(Require(::memfd_create("errors", MFD_CLOEXEC), "memfd_create"));
+      : task_(task), hadMarker_(Exists(task.szMarker)), others_(Children()), progress_(task.errors, task.doing) {
     int ends[2];
     Require(::pipe2(ends, O_CLOEXEC), "pipe");
     results_ = Descriptor(ends[0]);
-    Descriptor writer(ends[1]);
+    const Descriptor writer(ends[1]);
 
     std::fflush(nullptr);
     Require(::prctl(PR_SET_CHILD_SUBREAPER, 1), "prctl");
+    // What fails from here on must do so in Result(): there is no destructor yet.
     pid_ = Require(::fork(), "fork");
-    if (pid_ == 0) Work(writer.get(), errors_.get(), signals_, call);
-    process_ = ProcessOf(pid_);
+    if (pid_ == 0) {
+      results_.Close();  // writing is to fail when this process is gone
+      Work(writer.get(), errors_.fd(), signals_, call);
+    }
     ::setpgid(pid_, pid_);  // here too: whoever is first, the group exists before it is ended
+  }
+  Worker(const Worker&) = delete;
+  Worker& operator=(const Worker&) = delete;
+
+  ~Worker() {
+    progress_.Clear();
+    if (pid_ > 0) Undo();
+    if (task_.verbose) errors_.Show();
   }
 
   std::string Result() {
+    process_ = Descriptor(Require(::pidfd_open(pid_, 0), "pidfd_open"));
     while (Wait()) Take();
     Take();
-    ::waitpid(pid_, nullptr, 0);  // at once: it has ended
+    ::waitpid(std::exchange(pid_, -1), nullptr, 0);  // at once: it has ended
     if (task_.listener != nullptr) task_.listener->Receive();
-    progress_.Clear();
-    if (task_.verbose) ShowErrors(errors_.get());
     if (result_) return *result_;
     throw Failure(Exit::kFailed, "the library broke off", "run the command again with -v to see how far it came");
   }
@@ -199,7 +230,7 @@ class Worker {
     const int ready = ::poll(waited, std::size(waited), static_cast<int>(kTick.count()));
     progress_.Update();
     if (ready <= 0) return true;
-    if (signals.revents != 0 && signals_.HasCome()) Interrupt();
+    if (signals.revents != 0 && signals_.HasCome()) throw Interrupted{};
     if (events.revents != 0) task_.listener->Receive();
     if (results.revents == 0) return process.revents == 0;
     return frames_.Read(results_.get()) || process.revents == 0;
@@ -216,21 +247,21 @@ class Worker {
     }
   }
 
-  [[noreturn]] void Interrupt() {
-    EndEverything(pid_);
+  void Undo() const {
+    EndEverything(pid_, others_);
     if (!hadMarker_ && Exists(task_.szMarker)) ::unlink(task_.szMarker);
     task_.undo();
-    throw Interrupted{};
   }
 
   const Task& task_;
   bool hadMarker_;
+  Pids others_;
   Signals signals_;
   Progress progress_;
+  Errors errors_;
   Descriptor results_;
-  Descriptor errors_;
-  pid_t pid_ = -1;
-  Descriptor process_;
+  pid_t pid_ = -1;      // until it has ended
+  Descriptor process_;  // readable when it has
   Frames frames_;
   std::optional<std::string> result_;
 };

@@ -17,10 +17,11 @@ struct Task {
   std::string doing;                       // "joining Home"
   const char* szMarker = nullptr;          // the file that exists while the library is at it
   SupplicantListener* listener = nullptr;  // told what happens meanwhile
-  std::function<void()> undo = [] {};      // run when the task was interrupted, after its processes have ended
+  std::function<void()> undo = [] {};      // run when the task was cut off, after its processes have ended
 };
 
-// Gives what `call` gave. Interrupted when the user did not want to wait: then nothing of the call goes on.
+// Gives what `call` gave. Interrupted when the user did not want to wait: then nothing of the call goes on, nor after
+// any other failure to wait for it.
 std::string RunBytes(const Task& task, const std::function<std::string()>& call);
 
 template <class Result>

@@ -1,10 +1,13 @@
 // The program as it is installed, with the real library and its files.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <sys/stat.h>
+#include <poll.h>
+#include <pty.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <cstdio>
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -37,6 +40,47 @@ std::string ReadText(const std::string& path) {
   return {std::istreambuf_iterator<char>(file), {}};
 }
 
+// A shell with job control on a terminal.
+class Shell {
+ public:
+  Shell() {
+    if (::forkpty(&terminal_, nullptr, nullptr, nullptr) > 0) return;
+    ::setenv("LC_ALL", "C.UTF-8", 1);
+    ::setenv("PS1", "ready> ", 1);
+    ::execl("/bin/bash", "bash", "--norc", "--noprofile", "-i", nullptr);
+    ::_exit(EXIT_FAILURE);
+  }
+  Shell(const Shell&) = delete;
+  Shell& operator=(const Shell&) = delete;
+  ~Shell() { ::close(terminal_); }
+
+  void Type(const std::string& text) const {
+    ASSERT_EQ(::write(terminal_, text.data(), text.size()), static_cast<ssize_t>(text.size()));
+  }
+
+  // Whether a text is shown next, or after other things; what is shown behind it is next then.
+  bool Shows(const std::string& text) {
+    constexpr int kPatience = 20'000;
+    char bytes[4096];
+    while (shown_.find(text, seen_) == shown_.npos) {
+      pollfd readable{terminal_, POLLIN, 0};
+      if (::poll(&readable, 1, kPatience) <= 0) return false;
+      const ssize_t size = ::read(terminal_, bytes, sizeof bytes);
+      if (size <= 0) return false;
+      shown_.append(bytes, static_cast<std::size_t>(size));
+    }
+    seen_ = shown_.find(text, seen_) + text.size();
+    return true;
+  }
+
+  const std::string& shown() const { return shown_; }
+
+ private:
+  int terminal_ = -1;
+  std::string shown_;
+  std::size_t seen_ = 0;
+};
+
 void AnnounceAdapter() {
   std::ofstream("/tmp/wireless.info") << "PRODUCT=\"Example Stick\"\n";
 }
@@ -49,6 +93,20 @@ TEST(InstalledProgram, SavesANetworkThatItThenKnows) {
               AllOf(HasSubstr("[00:11:22:33:44:55]"), HasSubstr("\tKEY=open sesame\n"), HasSubstr("\tIPADDR=DHCP\n")));
   EXPECT_THAT(Tool("known").out, AllOf(HasSubstr("\nMy Café  WPA2 TKIP+AES  DHCP"), Not(HasSubstr("sesame"))));
   EXPECT_THAT(Tool("known --porcelain --show-secrets").out, HasSubstr("\topen sesame\n"));
+}
+
+TEST(InstalledProgram, DoesNotShowASecretThatIsTypedAfterItWasStopped) {
+  Shell shell;
+  ASSERT_TRUE(shell.Shows("ready> "));
+  shell.Type(MERO_TOOL " save Home --bssid 00:11:22:33:44:55 --security wpa2\n");
+  ASSERT_TRUE(shell.Shows("secret of Home: ")) << shell.shown();
+  shell.Type("\x1a");
+  ASSERT_TRUE(shell.Shows("Stopped") && shell.Shows("ready> ")) << shell.shown();
+  shell.Type("fg\n");
+  ASSERT_TRUE(shell.Shows("secret of Home: ")) << shell.shown();
+  shell.Type("open sesame\n");
+  EXPECT_TRUE(shell.Shows("saved Home")) << shell.shown();
+  EXPECT_THAT(shell.shown(), Not(HasSubstr("sesame")));
 }
 
 TEST(InstalledProgram, SwitchesTheRadio) {

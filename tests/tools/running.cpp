@@ -1,6 +1,7 @@
 // The program under test, run in a process of its own.
 #include "running.h"
 
+#include <fcntl.h>
 #include <poll.h>
 #include <pty.h>
 #include <sys/mman.h>
@@ -14,8 +15,8 @@
 #include <cstring>
 #include <fstream>
 #include <iterator>
+#include <utility>
 
-#include "library_log.h"
 #include "program.h"
 
 namespace {
@@ -47,6 +48,7 @@ void Enter(const Surroundings& surroundings) {
   ::setenv("LC_ALL", "C.UTF-8", 1);
   ::setenv("TERM", "xterm", 1);
   for (const auto& [name, value] : surroundings.environment) ::setenv(name.c_str(), value.c_str(), 1);
+  surroundings.before();
 }
 
 [[noreturn]] void RunHere(const std::vector<std::string>& arguments, const Surroundings& surroundings) {
@@ -126,8 +128,9 @@ Ran CommandOnTerminal(const std::vector<std::string>& command, const Surrounding
   return OnTerminal([&] { RunCommandHere(command, surroundings); }, 80, typing);
 }
 
-StartedTool::StartedTool(const std::vector<std::string>& arguments) : out_(Memory()), err_(Memory()) {
-  pid_ = Start(arguments, {}, out_, err_);
+StartedTool::StartedTool(const std::vector<std::string>& arguments, const Surroundings& surroundings)
+    : out_(Memory()), err_(Memory()) {
+  pid_ = Start(arguments, surroundings, out_, err_);
 }
 
 StartedTool::~StartedTool() {
@@ -144,6 +147,20 @@ Ran StartedTool::Wait() {
   const int status = StatusOf(pid_);
   pid_ = -1;
   return {status, TextOf(out_), TextOf(err_)};
+}
+
+Lifeline::Lifeline() {
+  if (::pipe2(ends_, O_CLOEXEC) < 0) std::abort();
+}
+
+Lifeline::~Lifeline() {
+  for (int end : ends_) ::close(end);
+}
+
+bool Lifeline::IsFree() {
+  ::close(std::exchange(ends_[1], -1));
+  pollfd held{ends_[0], POLLIN, 0};
+  return ::poll(&held, 1, 0) > 0;
 }
 
 bool Soon(const std::function<bool()>& happens) {

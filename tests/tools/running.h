@@ -16,6 +16,7 @@
 struct Surroundings {
   std::string input = {};                               // on the standard input
   std::map<std::string, std::string> environment = {};  // beside LC_ALL=C.UTF-8
+  std::function<void()> before = [] {};                 // done in the program's process, before it begins
 };
 
 struct Ran {
@@ -40,7 +41,7 @@ Ran CommandOnTerminal(const std::vector<std::string>& command, const Surrounding
 // A run that is not waited for.
 class StartedTool {
  public:
-  explicit StartedTool(const std::vector<std::string>& arguments);
+  explicit StartedTool(const std::vector<std::string>& arguments, const Surroundings& surroundings = {});
   StartedTool(const StartedTool&) = delete;
   StartedTool& operator=(const StartedTool&) = delete;
   ~StartedTool();
@@ -53,6 +54,21 @@ class StartedTool {
   pid_t pid_;
   int out_;
   int err_;
+};
+
+// Held by every process that is started while it lives, until that ends.
+class Lifeline {
+ public:
+  Lifeline();
+  Lifeline(const Lifeline&) = delete;
+  Lifeline& operator=(const Lifeline&) = delete;
+  ~Lifeline();
+
+  // Whether all of them have ended; those that are started after the first question do not count.
+  bool IsFree();
+
+ private:
+  int ends_[2];
 };
 
 // Whether something becomes true within seconds.

@@ -1,4 +1,8 @@
 // Where secrets come from, and where they do not go.
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <csignal>
 #include <cstring>
 
 #include "running.h"
@@ -45,9 +49,29 @@ TEST_F(Secrets, OfTheAccessPointAreAskedForWhenThereIsNone) {
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "open sesame"));
 }
 
-TEST_F(Secrets, CanBeRefusedByCtrlCAtThePrompt) {
-  const Ran ran = ToolOnTerminal({"save", "Home"}, 80, {}, {.prompt = "secret of Home: ", .text = "\x03"});
+TEST_F(Secrets, CanBeRefusedByCtrlCAndCtrlBackslashAtThePrompt) {
+  for (const char* key : {"\x03", "\x1c"}) {
+    const Ran ran = ToolOnTerminal({"save", "Home"}, 80, {}, {.prompt = "secret of Home: ", .text = key});
+    EXPECT_EQ(ran.status, 130);
+    EXPECT_THAT(library::Calls(), IsEmpty());
+  }
+}
+
+TEST_F(Secrets, CanBeRefusedWhileTheyComeFromTheStandardInput) {
+  int ends[2];
+  ASSERT_EQ(::pipe(ends), 0);
+  ASSERT_EQ(::write(ends[1], "open", 4), 4);
+  StartedTool tool({"save", "Home", "--key-stdin", "--json"}, {.before = [&] { ::dup2(ends[0], STDIN_FILENO); }});
+  ASSERT_TRUE(Soon([&] {
+    int left = -1;
+    return ::ioctl(ends[0], FIONREAD, &left) == 0 && left == 0;
+  }));
+  ::kill(tool.pid(), SIGINT);
+  const Ran ran = tool.Wait();
   EXPECT_EQ(ran.status, 130);
+  EXPECT_EQ(ran.out, R"({"result":"failed","code":130,"error":"interrupted, and nothing of the command goes on",)"
+                     R"("advice":"run it again"})"
+                     "\n");
   EXPECT_THAT(library::Calls(), IsEmpty());
 }
 

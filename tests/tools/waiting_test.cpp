@@ -1,16 +1,17 @@
 // What the program does while the library takes its time.
 #include <fcntl.h>
-#include <sys/stat.h>
-#include <sys/un.h>
-#include <sys/wait.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
-#include <chrono>
+#include <cerrno>
 #include <csignal>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <functional>
 
+#include "library_log.h"
 #include "running.h"
 
 using library::Network;
@@ -23,6 +24,9 @@ namespace {
 
 constexpr char kMarker[] = "/var/tmp/.wireless_connecting";
 constexpr char kDaemonPid[] = "/tmp/daemon.pid";
+constexpr char kGo[] = "/tmp/go";
+
+bool g_refusesProcessDescriptors = false;
 
 void Touch(const char* szPath) {
   ::close(::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
@@ -32,13 +36,17 @@ bool IsRunning(pid_t pid) {
   return ::kill(pid, 0) == 0;
 }
 
+void WaitForEver() {
+  while (true) ::pause();
+}
+
 // As the supplicant: leaves its caller's group and session behind.
-void StartDaemon() {
+void StartDaemon(const std::function<void()>& act = WaitForEver) {
   if (::fork() == 0) {
     ::setsid();
     if (::fork() == 0) {
       WriteText(kDaemonPid, std::to_string(::getpid()));
-      while (true) ::pause();
+      act();
     }
     ::_exit(0);
   }
@@ -60,7 +68,7 @@ class Waiting : public ToolTest {
     library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
       Touch(kMarker);
       StartDaemon();
-      while (true) ::pause();
+      WaitForEver();
       return 0;
     };
   }
@@ -74,7 +82,7 @@ class Waiting : public ToolTest {
 
 TEST_F(Waiting, CanBeEndedWithNothingLeftBehind) {
   JoinForever();
-  for (int signal : {SIGINT, SIGTERM, SIGHUP}) {
+  for (int signal : {SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
     std::filesystem::remove(kDaemonPid);
     StartedTool tool({"connect", "Home"});
     const pid_t daemon = Daemon();
@@ -95,7 +103,7 @@ TEST_F(Waiting, ForAnAddressEndsTheJoinTooWhenItIsEnded) {
   library::Known({home});
   library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) {
     StartDaemon();
-    while (true) ::pause();
+    WaitForEver();
     return 0;
   };
   StartedTool tool({"connect", "Home"});
@@ -104,6 +112,78 @@ TEST_F(Waiting, ForAnAddressEndsTheJoinTooWhenItIsEnded) {
   EXPECT_EQ(tool.Wait().status, 130);
   EXPECT_FALSE(IsRunning(daemon));
   EXPECT_EQ(library::Calls().back(), "MEROWirelessNetworkDisconnect");
+}
+
+TEST_F(Waiting, ThatIsEndedLeavesAloneWhatWasThereBefore) {
+  JoinForever();
+  StartedTool tool({"connect", "Home"}, {.before = [] {
+                     const pid_t inherited = ::fork();
+                     if (inherited == 0) WaitForEver();
+                     WriteText(kGo, std::to_string(inherited));
+                   }});
+  Daemon();
+  ::kill(tool.pid(), SIGINT);
+  EXPECT_EQ(tool.Wait().status, 130);
+  const pid_t inherited = std::stoi(ReadText(kGo));
+  EXPECT_TRUE(IsRunning(inherited));
+  ::kill(inherited, SIGKILL);
+}
+
+TEST_F(Waiting, ThatCannotBeginLeavesNothingBehind) {
+  JoinForever();
+  Lifeline lifeline;
+  const Ran ran = Tool({"connect", "Home"}, {.before = [] { g_refusesProcessDescriptors = true; }});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("pidfd_open: Operation not permitted"));
+  EXPECT_TRUE(lifeline.IsFree());
+  EXPECT_FALSE(std::filesystem::exists(kMarker));
+  EXPECT_EQ(library::Calls().back(), "MEROWirelessNetworkDisconnect");
+}
+
+TEST_F(Waiting, GoesOnWhenNobodyReadsTheReportsAnyMore) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    library::Report("first");
+    while (!std::filesystem::exists(kGo)) ::usleep(1000);
+    library::Report("second");
+    return 0;
+  };
+  int ends[2];
+  ASSERT_EQ(::pipe(ends), 0);
+  StartedTool tool({"connect", "Home", "-v"}, {.before = [&] {
+                     ::dup2(ends[1], STDERR_FILENO);
+                     for (int end : ends) ::close(end);
+                   }});
+  ::close(ends[1]);
+  char bytes[64];
+  EXPECT_GT(::read(ends[0], bytes, sizeof bytes), 0);
+  ::close(ends[0]);
+  Touch(kGo);
+  const Ran ran = tool.Wait();
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_THAT(ran.out, testing::StartsWith("connected to"));
+}
+
+TEST_F(Waiting, EndsWithTheProgram) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    Touch(kMarker);
+    ::alarm(60);  // should nothing else end it
+    while (true) library::Report("still at it");
+    return 0;
+  };
+  Lifeline lifeline;
+  StartedTool tool({"connect", "Home"});
+  ASSERT_TRUE(Soon([] { return std::filesystem::exists(kMarker); }));
+  ::kill(tool.pid(), SIGKILL);
+  tool.Wait();
+  EXPECT_TRUE(Soon([&] { return lifeline.IsFree(); }));
+}
+
+TEST_F(Waiting, ForChangesDoesNotTakeItsSocketForAnOutputThatIsClosed) {
+  const Ran ran = Tool({"watch", "--count", "1"}, {.before = [] {
+                         for (int fd : {STDIN_FILENO, STDOUT_FILENO}) ::close(fd);
+                       }});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("the output could not be written"));
 }
 
 TEST_F(Waiting, ForChangesIsEndedWithoutAComplaint) {
@@ -129,7 +209,7 @@ TEST_F(Waiting, EndsWhatDoesNotWantToEnd) {
   library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
     ::signal(SIGTERM, SIG_IGN);
     Touch(kMarker);
-    while (true) ::pause();
+    WaitForEver();
     return 0;
   };
   StartedTool tool({"connect", "Home"});
@@ -150,15 +230,41 @@ TEST_F(Waiting, LeavesTheSupplicantOfAJoinThatSucceeded) {
   ::kill(daemon, SIGKILL);
 }
 
+TEST_F(Waiting, RefusesWhatADaemonPrintsAfterIt) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    StartDaemon([] {
+      ::alarm(60);  // should nothing else end it
+      while (::write(STDERR_FILENO, "chatter\n", 8) > 0) ::usleep(1000);
+      WriteText(kGo, std::strerror(errno));
+    });
+    return 0;
+  };
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
+  EXPECT_TRUE(Soon([] { return ReadText(kGo) == std::strerror(EPERM); })) << ReadText(kGo);
+}
+
 TEST_F(Waiting, KeepsWhatCommandsPrintOutOfTheOutput) {
   library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
-    if (std::system("echo successfully initialized; echo complaint >&2") != 0) return -1;
+    if (std::system("echo successfully initialized; printf 'complaint\\033]0;x\n' >&2") != 0) return -1;
     return 0;
   };
   const Ran quiet = Tool({"connect", "Home", "--json"});
   EXPECT_THAT(quiet.out, AllOf(Not(HasSubstr("initialized")), testing::StartsWith("{")));
   EXPECT_EQ(quiet.err, "");
-  EXPECT_EQ(Tool({"connect", "Home", "-v"}).err, "complaint\n");
+  EXPECT_EQ(Tool({"connect", "Home", "-v"}).err, "complaint\\x1b]0;x\n");
+}
+
+TEST_F(Waiting, ThatIsEndedShowsWhatCommandsPrintedTillThen) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    if (std::system("echo complaint >&2") != 0) return -1;
+    Touch(kMarker);
+    WaitForEver();
+    return 0;
+  };
+  StartedTool tool({"connect", "Home", "-v"});
+  ASSERT_TRUE(Soon([] { return std::filesystem::exists(kMarker); }));
+  ::kill(tool.pid(), SIGINT);
+  EXPECT_THAT(tool.Wait().err, testing::StartsWith("complaint\nmerowireless: interrupted"));
 }
 
 TEST_F(Waiting, ShowsWhatTheLibraryReportsOnRequest) {
@@ -176,6 +282,12 @@ TEST_F(Waiting, ShowsHowLongItTakesOnATerminal) {
   const Ran ran = ToolOnTerminal({"connect", "Home"});
   EXPECT_THAT(ran.out, AllOf(HasSubstr("\rjoining Home  0.6 s\x1b[K"), HasSubstr("\r\x1b[Kconnected to")));
   EXPECT_EQ(Tool({"connect", "Home"}).err, "");
+}
+
+TEST_F(Waiting, ShowsNothingThatTheTerminalCouldNotTakeBack) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return ::usleep(900'000), 0; };
+  const Ran ran = ToolOnTerminal({"connect", "Home"}, 80, {.environment = {{"TERM", "dumb"}}});
+  EXPECT_THAT(ran.out, testing::StartsWith("connected to"));
 }
 
 TEST_F(Waiting, ShowsNothingOfWhatIsFast) {
@@ -202,4 +314,17 @@ TEST_F(Waiting, IsNotEndedByASignalThatWasToBeIgnored) {
   EXPECT_EQ(tool.Wait().status, 0);
 }
 
+TEST(LibraryLog, KeepsTheNewestLines) {
+  library_log::Keep("the oldest");
+  for (int i = 0; i < 10'000; ++i) library_log::Keep("a newer one");
+  EXPECT_FALSE(library_log::Says("the oldest"));
+  EXPECT_TRUE(library_log::Says("a newer one"));
+}
+
 }  // namespace
+
+// The program comes upon this one before libc's.
+extern "C" int pidfd_open(pid_t pid, unsigned int flags) {
+  if (g_refusesProcessDescriptors) return errno = EPERM, -1;
+  return static_cast<int>(::syscall(SYS_pidfd_open, pid, flags));
+}
