@@ -28,10 +28,25 @@ void SetBridgeDefault(ApConf& conf) {
   if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, "lbr0", "the bridge");
 }
 
-// The settings of the adapter's model; the defaults when none were saved.
+// Reads the settings of the adapter's model; false, with the defaults, when none were saved.
+bool ReadSaved(ApConf& conf) {
+  return MEROWirelessGetAPConfig(AdapterModel().c_str(), &conf) > 0;
+}
+
 ApConf ReadSettings() {
   ApConf conf{};
-  if (MEROWirelessGetAPConfig(AdapterModel().c_str(), &conf) <= 0) SetGuestDefaults(conf);
+  if (!ReadSaved(conf)) SetGuestDefaults(conf);
+  return conf;
+}
+
+// What may go on the air. The defaults may not: they are an open network, which nobody has asked for.
+ApConf SettingsToEnable() {
+  ApConf conf{};
+  if (!ReadSaved(conf)) {
+    throw Failure(Exit::kUsage, "no access point has been set up for this adapter",
+                  "`merowireless ap set` gives it a name and a protection");
+  }
+  RequireComplete(conf);
   return conf;
 }
 
@@ -155,9 +170,8 @@ void SetAp(const Program& program, const ApChanges& changes) {
 }
 
 void EnableAp(const Program& program) {
-  const ApConf conf = ReadSettings();
+  const ApConf conf = SettingsToEnable();
   RequireAdapter();
-  RequireComplete(conf);
   Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
   task.szMarker = kApMarker;
   task.undo = [&] {

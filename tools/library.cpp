@@ -71,6 +71,31 @@ bool IsNamed(const Network& network, const std::string& name, const std::optiona
   return name == network.szEssid || (address && std::ranges::equal(*address, network.bssid));
 }
 
+// How a search ended: 1 found, 0 not, below 0 failed.
+struct Answer {
+  int result;
+  Network network;
+};
+
+// Searches the last results of the adapter, or a first scan's.
+Answer LookUp(const std::string& name, const std::optional<Address>& address) {
+  Answer found{};
+  found.result = MEROWirelessNetworkGet(name.c_str(), WIRELESS_FILTER_ESSID, &found.network);
+  if (found.result == 0 && address) {
+    // Six bytes, which the library takes as a pointer to text.
+    const auto* octets = reinterpret_cast<const char*>(address->data());
+    found.result = MEROWirelessNetworkGet(octets, WIRELESS_FILTER_BSSID, &found.network);
+  }
+  return found;
+}
+
+// Those results may be older than the network.
+Answer LookUpAfresh(const std::string& name, const std::optional<Address>& address) {
+  Ring<Network> ring;
+  if (MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, ring.head()) < 0) return {-1, {}};
+  return LookUp(name, address);
+}
+
 }  // namespace
 
 std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan) {
@@ -94,21 +119,11 @@ std::vector<KnownNetwork> Known(Order order) {
 }
 
 Network FindInRange(const Program& program, const std::string& name) {
-  struct Answer {
-    int result;
-    Network network;
-  };
   const std::optional<Address> address = ParseAddress(name);
   const std::string shown = program.output.Name(name);
   const auto answer = Run<Answer>(program.Doing("looking for " + shown), [&] {
-    Answer found{};
-    found.result = MEROWirelessNetworkGet(name.c_str(), WIRELESS_FILTER_ESSID, &found.network);
-    if (found.result == 0 && address) {
-      // Six bytes, which the library takes as a pointer to text.
-      const auto* octets = reinterpret_cast<const char*>(address->data());
-      found.result = MEROWirelessNetworkGet(octets, WIRELESS_FILTER_BSSID, &found.network);
-    }
-    return found;
+    const Answer found = LookUp(name, address);
+    return found.result != 0 ? found : LookUpAfresh(name, address);
   });
   if (answer.result < 0) throw ScanFailed();
   if (answer.result == 0) {

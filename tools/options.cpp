@@ -109,9 +109,10 @@ void AddNetworkCommands(Commands& commands) {
             ->option_text("A.B.C.D");
         auto* security = command.add_option("--security", values.security, "how a network that hides is protected")
                              ->option_text("open|wep|wpa|wpa2|wpa-eap|wpa2-eap");
-        command.add_option("--bssid", values.address, "access point of a network that hides its name")
-            ->option_text("ADDRESS")
-            ->needs(security);
+        auto* bssid = command.add_option("--bssid", values.address, "access point of a network that hides its name")
+                          ->option_text("ADDRESS")
+                          ->needs(security);
+        security->needs(bssid);  // a network that does not hide tells how it is protected
       },
       Save);
 }

@@ -247,10 +247,16 @@ class Worker {
     }
   }
 
+  // What cannot be undone is told. Whoever interrupts this too has had enough.
   void Undo() const {
     EndEverything(pid_, others_);
     if (!hadMarker_ && Exists(task_.szMarker)) ::unlink(task_.szMarker);
-    task_.undo();
+    try {
+      task_.undo();
+    } catch (const std::exception& failure) {
+      Remark(std::string("merowireless: ") + failure.what());
+    } catch (const Interrupted&) {
+    }
   }
 
   const Task& task_;

@@ -196,6 +196,14 @@ TEST_F(AccessPoint, IsEnabledAndDisabledTogetherWithItsSwitch) {
                                             "MEROWirelessAPDisable", "MEROWirelessSetAPConfig", "off: "));
 }
 
+TEST_F(AccessPoint, IsNotEnabledAsNobodyHasSetIt) {
+  library::MEROWirelessGetAPConfig = [](const char*, PMERO_AP_CONF conf) { return *conf = Settings(), 0; };
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 2);
+  EXPECT_THAT(ran.err, HasSubstr("`merowireless ap set` gives it"));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
 TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
   const std::pair<const char*, const char*> reports[] = {
       {"Another ap construction is going", "is being set up already"},
@@ -231,6 +239,21 @@ TEST_F(AccessPoint, WhoseStartIsInterruptedIsTakenDownAndHasItsSwitchPutBack) {
   EXPECT_EQ(tool.Wait().status, 130);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable", "enabling",
                                             "MEROWirelessAPDisable", "MEROWirelessSetAPConfig", "off: "));
+}
+
+TEST_F(AccessPoint, WhoseStartCannotBeUndoneSaysSo) {
+  library::MEROWirelessAPEnable = [] {
+    library::Record("enabling");
+    while (true) ::pause();
+    return TRUE;
+  };
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF conf) { return conf->blEnable; };
+  StartedTool tool({"ap", "enable"});
+  ASSERT_TRUE(Soon([] { return std::ranges::count(library::Calls(), "enabling") > 0; }));
+  ::kill(tool.pid(), SIGINT);
+  const Ran ran = tool.Wait();
+  EXPECT_EQ(ran.status, 130);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the settings could not be saved\n"));
 }
 
 TEST_F(AccessPoint, WhoseChangeIsInterruptedHasItsSwitchAsItWas) {

@@ -1,4 +1,5 @@
 // scan, known, save and forget.
+#include <algorithm>
 #include <cstring>
 
 #include "running.h"
@@ -159,12 +160,38 @@ TEST_F(Networks, ThatHideAreSavedAsDescribed) {
   EXPECT_EQ(library::Calls().back(), "Hidden||DHCP|||1|2");
 }
 
+TEST_F(Networks, AreNotDescribedInPart) {
+  EXPECT_EQ(Tool({"save", "Home", "--security", "open"}).status, 2);
+  EXPECT_EQ(Tool({"save", "Home", "--bssid", "00:11:22:33:44:55"}).status, 2);
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
 TEST_F(Networks, ThatAreOutOfRangeAreNotSaved) {
   const Ran ran = Tool({"save", "Elsewhere"});
   EXPECT_EQ(ran.status, 4);
   EXPECT_EQ(ran.err,
             "merowireless: no network named Elsewhere is in range: `merowireless scan --renew` shows those that are\n");
-  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkScan"));
+}
+
+TEST_F(Networks, ThatAppearedSinceTheLastScanAreFound) {
+  library::MEROWirelessNetworkGet = [](const char*, WIRELESS_FILTER, WIRELESS_NETWORK* found) {
+    const auto calls = library::Calls();
+    if (std::ranges::find(calls, "renewed") == calls.end()) return 0;
+    return *found = Network("Newcomer"), 1;
+  };
+  library::MEROWirelessNetworkScan = [](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
+    head->q_forw = head->q_back = head;
+    return library::Record(scan == WIRELESS_SCAN_RENEW ? "renewed" : "read"), 0;
+  };
+  const Ran ran = Tool({"save", "Newcomer", "--key-file", kSecretPath});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(library::Calls().back(), "Newcomer|open sesame|DHCP|||5|2");
+}
+
+TEST_F(Networks, ThatCannotBeScannedForAreNotSaidToBeOutOfRange) {
+  library::MEROWirelessNetworkScan = [](WIRELESS_SCAN, WIRELESS_LIST*) { return -1; };
+  EXPECT_EQ(Tool({"save", "Elsewhere"}).status, 1);
 }
 
 TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirSecret) {

@@ -12,9 +12,12 @@ key=(essid=cafe auth=WPA2PSK encrypt=AES key='deux croissants')
 
 say '-- not yet: nothing is saved'
 fails_on nas mero-call ap-enable
-expect_line result=0
-expect_message nas 'Failed to get ap info of secname[mac80211_hwsim]'
-expect_message nas 'Failed to enable AP.'
+# The program finds that out by itself.
+if through_functions; then
+  expect_line result=0
+  expect_message nas 'Failed to get ap info of secname[mac80211_hwsim]'
+  expect_message nas 'Failed to enable AP.'
+fi
 expect_processes nas </dev/null
 
 say '-- to a third network and back'

@@ -33,7 +33,8 @@ say '-- the one that was saved last is joined; what is not in range, and of unkn
 save essid=cafe   bssid="$(address_of cafe)"   auth=WPA2PSK encrypt=AES  key='deux croissants' ip=DHCP
 save essid=square bssid="$(address_of square)" auth=OPEN    encrypt=NONE ip=10.3.0.5 mask=255.255.255.0
 save essid=office bssid="$(address_of office)" auth=WPA2PSK encrypt=AES  key='the old printer' ip=DHCP
-save essid=boat   bssid=02:11:22:33:44:55      auth=UNKNOWN encrypt=NONE ip=DHCP
+# The program saves no such thing.
+through_functions && save essid=boat bssid=02:11:22:33:44:55 auth=UNKNOWN encrypt=NONE ip=DHCP
 autoconnects office
 expect_address nas '10.2.0.1??/24'
 expect_reachable nas 10.2.0.1
@@ -42,12 +43,19 @@ DEVICE=wlan0
 BOOTPROTO=dhcp
 END
 
-say '-- who is connected gets disconnected'
-fails_on nas mero-call autoconnect
-expect_line result=-1
-expect_message nas 'Connection exists'
-expect_no_station office nas
-expect_nothing_left nas
+if through_functions; then
+  say '-- who is connected gets disconnected'
+  fails_on nas mero-call autoconnect
+  expect_line result=-1
+  expect_message nas 'Connection exists'
+  expect_no_station office nas
+  expect_nothing_left nas
+else
+  say '-- who is connected stays so'
+  autoconnects office
+  expect_reachable nas 10.2.0.1
+  leaves nas
+fi
 
 say '-- one that went off the air; the next is joined, at a fixed address'
 switch_off office

@@ -1,4 +1,5 @@
 # The recipes of docs/cookbook.md, each as it stands there, and what comes of them.
+# Plain only
 # Limit: 600 s
 # shellcheck shell=bash
 

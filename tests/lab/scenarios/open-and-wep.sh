@@ -37,5 +37,6 @@ joins_and_talks twentysix 10.5.0 auth=OPEN    encrypt=WEP key=001122334455667788
 
 say '-- a key of no form'
 refused nas essid=five bssid="$(address_of five)" auth=SHARED encrypt=WEP key=sixsix
-expect_message nas 'Wrong WEP Format.'
+# The program does not try it.
+through_functions && expect_message nas 'Wrong WEP Format.'
 expect_nothing_left nas

@@ -1,4 +1,5 @@
 # The management program: networks are found, joined and left by its commands, and what goes wrong is told apart.
+# Plain only
 # Limit: 600 s
 # shellcheck shell=bash
 
@@ -26,6 +27,13 @@ on nas merowireless scan --renew --porcelain
 expect_output <<END
 cafe	-47	6	WPA2PSK	AES	11b/g	$(address_of cafe)	
 END
+
+say '-- one that came after the last scan'
+access_point square ssid=square channel=1
+on nas merowireless connect square --no-address
+expect_station square nas
+on nas merowireless disconnect
+switch_off square
 
 say '-- the wrong passphrase'
 on nas merowireless save cafe --key-file /var/lib/wrong.key

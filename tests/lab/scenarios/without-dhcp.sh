@@ -8,8 +8,14 @@ square=(essid=square bssid="$(address_of square)" auth=OPEN encrypt=NONE)
 say '-- no lease'
 joins nas square "${square[@]}"
 began=$(uptime_seconds)
-on nas mero-call ifconfig wlan0 ip=DHCP
-expect_output <<<result=0
+# The program takes that for a failure.
+if through_functions; then
+  on nas mero-call ifconfig wlan0 ip=DHCP
+  expect_output <<<result=0
+else
+  fails_on nas mero-call ifconfig wlan0 ip=DHCP
+  expect_output <<<result=-1
+fi
 ended=$(uptime_seconds)
 ((${ended%.*} - ${began%.*} <= 18)) || fail "it was waited for too long: $began to $ended"
 expect_message nas 'Failed to get IP from DHCP'
@@ -21,8 +27,11 @@ expect_station square nas
 
 say '-- an address of no network'
 fails_on nas mero-call ifconfig wlan0 ip=dhcp mask=255.255.255.0
-expect_output <<<result=-1
-expect_message nas 'Failed to set network interface'
+# The program finds that out by itself.
+if through_functions; then
+  expect_output <<<result=-1
+  expect_message nas 'Failed to set network interface'
+fi
 expect_address nas ''
 leaves nas
 

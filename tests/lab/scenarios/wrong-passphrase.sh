@@ -4,7 +4,7 @@
 access_point cafe ssid=cafe channel=6 wpa=2 wpa_passphrase='deux croissants' rsn_pairwise=CCMP
 appliance nas
 
-cafe=(essid=cafe bssid="$(address_of cafe)" auth=WPA2PSK encrypt=AES)
+cafe=(essid=cafe auth=WPA2PSK encrypt=AES)
 
 say '-- the wrong passphrase'
 began=$(uptime_seconds)
@@ -16,25 +16,32 @@ expect_message nas 'Failed to connect network.'
 expect_no_station cafe nas
 expect_nothing_left nas
 
-say '-- the radio is switched off: nobody is told, and nothing is done'
+# does_nothing: connecting comes to nothing without a word in the log. The function takes that for a success.
+does_nothing() {
+  local log
+  log=$(<"$LOGS/nas.syslog")
+  if through_functions; then
+    on nas mero-call connect "${cafe[@]}" key='deux croissants'
+    expect_output <<<result=0
+  else
+    refused nas "${cafe[@]}" key='deux croissants'
+  fi
+  expect_no_station cafe nas
+  expect_same 'the system log of nas' "$log" "$(<"$LOGS/nas.syslog")"
+}
+
+say '-- the radio is switched off: nothing is done'
 inside nas tee /tmp/wireless.info >/dev/null <<<PRODUCT=WLAN-N
 inside nas tee /usr/mero/etc/wireless_ap.conf >/dev/null <<'END'
 [WLAN-N]
 unblock=no
 END
-log=$(<"$LOGS/nas.syslog")
-on nas mero-call connect "${cafe[@]}" key='deux croissants'
-expect_output <<<result=0
-expect_no_station cafe nas
-expect_same 'the system log of nas' "$log" "$(<"$LOGS/nas.syslog")"
+does_nothing
 inside nas rm /tmp/wireless.info
 expect_nothing_left nas
 
 say '-- nor when it is not known which adapter there is'
-on nas mero-call connect "${cafe[@]}" key='deux croissants'
-expect_output <<<result=0
-expect_no_station cafe nas
-expect_same 'the system log of nas' "$log" "$(<"$LOGS/nas.syslog")"
+does_nothing
 expect_nothing_left nas
 
 say '-- the radio is switched on again'
