@@ -242,11 +242,17 @@ void FallThrough(CLI::App& app) {
   }
 }
 
+bool LacksCommand(const CLI::App& app) {
+  const auto given = app.get_subcommands();
+  return given.empty() ? app.get_require_subcommand_min() > 0 : LacksCommand(*given.front());
+}
+
 // What is wrong. What was given is not repeated: it may be a secret at a wrong place.
-std::string Complaint(const CLI::ParseError& error) {
+std::string Complaint(const CLI::App& app, const CLI::ParseError& error) {
+  if (LacksCommand(app)) return app.remaining(true).empty() ? "a command is missing" : "there is no such command";
   if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr) return "there are more arguments than were expected";
   if (dynamic_cast<const CLI::ConversionError*>(&error) != nullptr) return "an option takes no value and was given one";
-  return error.what();
+  return Harmless(error.what(), false);
 }
 
 }  // namespace
@@ -275,9 +281,9 @@ Options ParseOptions(int argc, const char* const* argv) {
     std::ostringstream help;
     if (error.get_exit_code() == 0) {
       app.exit(error, help, help);
-      throw Usage{Exit::kDone, help.str()};
+      throw Help{help.str()};
     }
-    throw Usage{Exit::kUsage, Complaint(error)};
+    throw WrongUsage{jsonFlag->count() > 0 ? Form::kJson : Form::kHuman, Complaint(app, error)};
   }
   options.form = json ? Form::kJson : porcelain ? Form::kPorcelain : Form::kHuman;
   return options;

@@ -14,13 +14,18 @@ struct Options {
   std::function<void(const Program&)> command;
 };
 
-// Text to be shown instead of running a command, and the exit status after it.
-struct Usage {
-  Exit exit;
+// What is to be shown instead of running a command.
+struct Help {
   std::string text;
 };
 
-// Throws Usage for what is no command, and for requests for help.
+// What is wrong with a command line, and the form in which that is to be told.
+struct WrongUsage {
+  Form form;
+  std::string text;
+};
+
+// Throws these two.
 Options ParseOptions(int argc, const char* const* argv);
 
 #endif  // MERO_TOOLS_OPTIONS_H

@@ -25,15 +25,6 @@ void FillStandardDescriptors() {
   }
 }
 
-int Explain(const Usage& usage) {
-  if (usage.exit == Exit::kDone) {
-    std::fputs(usage.text.c_str(), stdout);
-  } else {
-    Remark("merowireless: " + Harmless(usage.text, false) + "; merowireless --help tells more");
-  }
-  return Status(usage.exit);
-}
-
 int Report(const Output& output, const Failure& failure) {
   output.Failed(failure);
   Remark(std::string("merowireless: ") + failure.what() + ": " + failure.advice());
@@ -73,7 +64,11 @@ int RunProgram(int argc, const char* const* argv) {
     const Options options = ParseOptions(argc, argv);
     if (options.verbose) library_log::ShowLines();
     return Finish(RunCommand(options));
-  } catch (const Usage& usage) {
-    return Finish(Explain(usage));
+  } catch (const Help& help) {
+    std::fputs(help.text.c_str(), stdout);
+    return Finish(Status(Exit::kDone));
+  } catch (const WrongUsage& wrong) {
+    const Output output(wrong.form, TerminalOf(STDOUT_FILENO));
+    return Finish(Report(output, Wrong(wrong.text, "`merowireless --help` tells more")));
   }
 }

@@ -26,7 +26,6 @@ TEST_F(CommandLine, ThatIsWrongIsExplainedInOneLine) {
       {"watch", "--count", " 1"},
       {"watch", "--count", "0x2"},
       {"radio", "sideways"},
-      {"scan", "--json", "--porcelain"},
   };
   for (const auto& arguments : wrong) {
     const Ran ran = Tool(arguments);
@@ -34,6 +33,21 @@ TEST_F(CommandLine, ThatIsWrongIsExplainedInOneLine) {
     EXPECT_EQ(ran.out, "");
     EXPECT_THAT(ran.err, MatchesRegex("merowireless: [^\n]+\n")) << testing::PrintToString(arguments);
   }
+}
+
+TEST_F(CommandLine, ThatNamesNoCommandIsToldSo) {
+  EXPECT_EQ(Tool({"bogus"}).err, "merowireless: there is no such command: `merowireless --help` tells more\n");
+  EXPECT_EQ(Tool({"ap", "bogus"}).err, "merowireless: there is no such command: `merowireless --help` tells more\n");
+  EXPECT_EQ(Tool({"ap"}).err, "merowireless: a command is missing: `merowireless --help` tells more\n");
+}
+
+TEST_F(CommandLine, ThatIsWrongIsExplainedToMachinesToo) {
+  const std::string document = R"({"result":"failed","code":2,"error":"there are more arguments than were expected",)"
+                               R"("advice":"`merowireless --help` tells more"})"
+                               "\n";
+  EXPECT_EQ(Tool({"--json", "scan", "--bogus"}).out, document);
+  EXPECT_EQ(Tool({"scan", "--bogus", "--json"}).out, document);
+  EXPECT_THAT(Tool({"scan", "--json", "--porcelain"}).out, HasSubstr("--json excludes --porcelain"));
 }
 
 TEST_F(CommandLine, ThatIsWrongIsNotRepeatedSinceItMayHoldASecret) {
