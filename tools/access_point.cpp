@@ -50,15 +50,13 @@ ApConf SettingsToEnable() {
   return conf;
 }
 
-void SaveSettings(ApConf conf) {
-  if (MEROWirelessSetAPConfig(&conf) == FALSE) {
-    throw Failed("the settings could not be saved", "is there room on the disk? -v shows more");
-  }
+Failure NotSaved() {
+  return Failed("the settings could not be saved", "is there room on the disk? -v shows more");
 }
 
 void SaveSwitch(ApConf conf, bool on) {
   conf.blEnable = on ? TRUE : FALSE;
-  SaveSettings(conf);
+  if (MEROWirelessSetAPConfig(&conf) == FALSE) throw NotSaved();
 }
 
 // The library saves settings only together with the switch on; where it was off, it is put back, whoever interrupts.
@@ -86,22 +84,41 @@ void ApplySettings(ApConf& conf, const ApChanges& changes) {
   }
 }
 
-// What was off before something came to nothing is off again.
-void PutSwitchBack(const ApConf& before) {
-  if (before.blEnable == FALSE) SaveSwitch(before, false);
+// Takes down what there is of an access point. Where there never was one, that is a failure for the library alone.
+void TakeDown(const Program& program) {
+  if (Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) != FALSE) return;
+  if (library_log::Says("ifcfg-wlan0] does not exist")) return;
+  throw Failed("the access point could not be taken down whole");
 }
 
-bool TakeDown(const Program& program) {
-  return Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) != FALSE;
+void Disable(const Program& program, const ApConf& conf) {
+  SaveSwitch(conf, false);
+  TakeDown(program);
+}
+
+// ---- Enabling ----
+
+enum class Start { kNotSaved, kFailed, kDone };
+
+// The library puts up what is switched on in the settings.
+Start TryToStart(ApConf conf) {
+  const bool wasOff = conf.blEnable == FALSE;
+  conf.blEnable = TRUE;
+  if (wasOff && MEROWirelessSetAPConfig(&conf) == FALSE) return Start::kNotSaved;
+  return MEROWirelessAPEnable() != FALSE ? Start::kDone : Start::kFailed;
+}
+
+bool IsAnothers() {
+  return library_log::Says("Another ap construction is going");
 }
 
 Failure EnableFailed() {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (library_log::Says("Another ap construction is going")) {
+  if (IsAnothers()) {
     return Failed("an access point is being set up already, or an attempt was cut off", "wait a moment and try again");
   }
   if (library_log::Says("Failed to restart /etc/rc.network")) {
-    return Failed("the network start script failed", "`merowireless ap disable` takes down what it has put up");
+    return Failed("the network start script failed, and the access point is disabled", "-v shows what it says");
   }
   return Failed("the access point could not be enabled");
 }
@@ -174,13 +191,11 @@ void EnableAp(const Program& program) {
   RequireAdapter();
   Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
   task.szMarker = kApMarker;
-  task.undo = [&] {
-    (void)TakeDown(program);  // has reported what it could not
-    PutSwitchBack(conf);
-  };
-  if (conf.blEnable == FALSE) SaveSwitch(conf, true);
-  if (Run<BOOL>(task, [] { return MEROWirelessAPEnable(); }) == FALSE) {
-    PutSwitchBack(conf);
+  task.undo = [&] { Disable(program, conf); };
+  const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
+  if (start == Start::kNotSaved) throw NotSaved();
+  if (start == Start::kFailed) {
+    if (!IsAnothers()) Undo(task);
     throw EnableFailed();
   }
   program.output.Done<ApStatus>("the access point " + program.output.Name(conf.hostapConf.szSSID) + " is enabled",
@@ -189,10 +204,7 @@ void EnableAp(const Program& program) {
 
 void DisableAp(const Program& program) {
   const ApConf conf = ReadSettings();
-  if (!TakeDown(program)) {
-    throw Failed("the access point could not be taken down whole");
-  }
-  SaveSwitch(conf, false);
+  Disable(program, conf);
   program.output.Done<ApStatus>("the access point is disabled", "access_point", kApStatusFields, ReadApStatus());
 }
 

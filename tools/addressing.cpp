@@ -2,10 +2,11 @@
 #include "addressing.h"
 
 #include <arpa/inet.h>
+#include <net/if.h>
 
-#include <cstdint>
+#include <cstdio>
 #include <fstream>
-#include <limits>
+#include <string_view>
 
 #include "library_log.h"
 #include "status.h"
@@ -31,16 +32,18 @@ void RequireGateway(const std::string& gateway) {
   if (!IsIpAddress(gateway)) throw Wrong("the gateway is no IPv4 address", "give an address such as 192.168.1.1");
 }
 
-// The kernel's table has addresses as they are in memory.
+// The kernel's table has addresses as they are in memory, and is headed by a line of titles.
 bool HasDefaultRoute(const std::string& gateway) {
   in_addr wanted{};
   ::inet_pton(AF_INET, gateway.c_str(), &wanted);
   std::ifstream routes("/proc/net/route");
-  for (std::string interface; routes >> interface; routes.ignore(std::numeric_limits<std::streamsize>::max(), '\n')) {
-    uint32_t destination = 0;
-    uint32_t via = 0;
-    if (routes >> std::hex >> destination >> via && destination == 0 && via == wanted.s_addr) return true;
-    routes.clear();  // the line of titles
+  for (std::string line; std::getline(routes, line);) {
+    char szInterface[IFNAMSIZ];
+    unsigned int destination, via, mask;
+    if (std::sscanf(line.c_str(), "%15s %x %x %*x %*d %*d %*d %x", szInterface, &destination, &via, &mask) != 4)
+      continue;
+    const bool isDefault = destination == 0 && mask == 0;
+    if (isDefault && via == wanted.s_addr && szInterface == std::string_view(MEROWirelessInterfaceGet())) return true;
   }
   return false;
 }

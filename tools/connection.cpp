@@ -18,9 +18,9 @@ namespace {
 
 // ---- Joining ----
 
-// Whatever an interrupted attempt has left. What cannot be ended was reported, and nobody is waiting for more.
+// Whatever an attempt has left that came to nothing.
 void LeaveNothing() {
-  (void)MEROWirelessNetworkDisconnect();
+  if (MEROWirelessNetworkDisconnect() < 0) throw Failed("the connection could not be ended whole");
 }
 
 Task Joining(const Program& program, const std::string& what, SupplicantListener& listener) {
@@ -217,6 +217,7 @@ void MakeCell(const Program& program, const CellToMake& wanted) {
   Task task = program.Doing("starting " + name);
   task.undo = LeaveNothing;
   if (Run<int>(task, [&] { return MEROWirelessAdhocCreate(&config); }) < 0 || !IsInCell(wanted.name)) {
+    Undo(task);
     throw Failed("the cell " + name + " could not be started",
                  "not every adapter can; -v shows what the library reports");
   }

@@ -41,13 +41,16 @@ void PutDocument(const Json& document) {
 
 // ---- Porcelain: one record a line, its fields between tabs ----
 
-// As printf's %b reads it. Other bytes than these do nothing to a terminal.
+// As the %b of printf reads it. Other bytes than these do nothing to a terminal.
 std::string Escaped(char byte) {
   if (byte == '\t') return "\\t";
   if (byte == '\n') return "\\n";
   if (byte == '\\') return "\\\\";
   const bool control = static_cast<unsigned char>(byte) < ' ' || byte == '\x7F';
-  return control ? "\\x" + Hex({&byte, 1}) : std::string(1, byte);
+  if (!control) return {byte};
+  char szOctal[sizeof "\\0033"];
+  std::snprintf(szOctal, sizeof szOctal, "\\0%03o", static_cast<unsigned int>(byte));
+  return szOctal;
 }
 
 std::string Escaped(std::string_view text) {

@@ -64,7 +64,10 @@ class Silence {
   }
   Silence(const Silence&) = delete;
   Silence& operator=(const Silence&) = delete;
-  ~Silence() { ::tcsetattr(terminal_, TCSAFLUSH, &before_); }
+  ~Silence() {
+    // In the background it is no longer this program's, and asking for it would stop the program.
+    if (::tcgetpgrp(terminal_) == ::getpgrp()) ::tcsetattr(terminal_, TCSAFLUSH, &before_);
+  }
 
   void Begin() const {
     termios silent = before_;

@@ -31,7 +31,7 @@ bool WaitForNews(const Descriptor& news, const Signals& signals) {
   constexpr int kPatience = 1000;
   pollfd waited[] = {{news.get(), POLLIN, 0}, {signals.fd(), POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
   if (::poll(waited, std::size(waited), kPatience) <= 0) return true;
-  if (signals.HasCome() || (waited[2].revents & POLLERR) != 0) return false;
+  if (signals.HasCome() || (waited[2].revents & (POLLERR | POLLHUP)) != 0) return false;
   char drained[8192];
   while (::recv(news.get(), drained, sizeof drained, 0) > 0) continue;
   return true;

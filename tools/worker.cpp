@@ -202,7 +202,7 @@ class Worker {
 
   ~Worker() {
     progress_.Clear();
-    if (pid_ > 0) Undo();
+    if (pid_ > 0) EndIt();
     if (task_.verbose) errors_.Show();
   }
 
@@ -210,10 +210,12 @@ class Worker {
     process_ = Descriptor(Require(::pidfd_open(pid_, 0), "pidfd_open"));
     while (Wait()) Take();
     Take();
-    ::waitpid(std::exchange(pid_, -1), nullptr, 0);  // at once: it has ended
     if (task_.listener != nullptr) task_.listener->Receive();
-    if (result_) return *result_;
-    throw Failure(Exit::kFailed, "the library broke off", "run the command again with -v to see how far it came");
+    if (!result_) {
+      throw Failure(Exit::kFailed, "the library broke off", "run the command again with -v to see how far it came");
+    }
+    ::waitpid(std::exchange(pid_, -1), nullptr, 0);  // at once: it has ended
+    return *result_;
   }
 
  private:
@@ -228,12 +230,20 @@ class Worker {
       waited[3].fd = task_.listener->fd();
     }
     const int ready = ::poll(waited, std::size(waited), static_cast<int>(kTick.count()));
+    Reap();
     progress_.Update();
     if (ready <= 0) return true;
     if (signals.revents != 0 && signals_.HasCome()) throw Interrupted{};
     if (events.revents != 0) task_.listener->Receive();
     if (results.revents == 0) return process.revents == 0;
     return frames_.Read(results_.get()) || process.revents == 0;
+  }
+
+  // Scripts that end a daemon wait until it is no process any more.
+  void Reap() const {
+    for (pid_t pid : OrphansBeside(others_)) {
+      if (pid != pid_) ::waitpid(pid, nullptr, WNOHANG);
+    }
   }
 
   void Take() {
@@ -247,16 +257,11 @@ class Worker {
     }
   }
 
-  // What cannot be undone is told. Whoever interrupts this too has had enough.
-  void Undo() const {
+  void EndIt() const {
     EndEverything(pid_, others_);
     if (!hadMarker_ && Exists(task_.szMarker)) ::unlink(task_.szMarker);
-    try {
-      task_.undo();
-    } catch (const std::exception& failure) {
-      Remark(std::string("merowireless: ") + failure.what());
-    } catch (const Interrupted&) {
-    }
+    Undo(task_);
+    while (signals_.HasCome()) continue;  // who interrupts this too interrupts none of what follows
   }
 
   const Task& task_;
@@ -273,6 +278,16 @@ class Worker {
 };
 
 }  // namespace
+
+void Undo(const Task& task) {
+  try {
+    task.undo();
+  } catch (const std::exception& failure) {
+    Remark(std::string("merowireless: ") + failure.what());
+  } catch (const Interrupted&) {
+    Remark("merowireless: interrupted again, and something may be left");
+  }
+}
 
 std::string RunBytes(const Task& task, const std::function<std::string()>& call) {
   return Worker(task, call).Result();

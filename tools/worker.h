@@ -17,11 +17,14 @@ struct Task {
   std::string doing;                       // "joining Home"
   const char* szMarker = nullptr;          // the file that exists while the library is at it
   SupplicantListener* listener = nullptr;  // told what happens meanwhile
-  std::function<void()> undo = [] {};      // run when the task was cut off, after its processes have ended
+  std::function<void()> undo = [] {};      // what to do when it comes to nothing
 };
 
-// Gives what `call` gave. Interrupted when the user did not want to wait: then nothing of the call goes on, nor after
-// any other failure to wait for it.
+// Undoes a task. What cannot be undone is told.
+void Undo(const Task& task);
+
+// Gives what `call` gave. Interrupted when the user did not want to wait: then nothing of the call goes on and it is
+// undone, as after any other failure to wait for it, and when it breaks off.
 std::string RunBytes(const Task& task, const std::function<std::string()>& call);
 
 template <class Result>

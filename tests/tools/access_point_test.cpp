@@ -193,7 +193,7 @@ TEST_F(AccessPoint, IsEnabledAndDisabledTogetherWithItsSwitch) {
   EXPECT_EQ(Tool({"ap", "enable"}).out, "the access point Office is enabled\n");
   EXPECT_EQ(Tool({"ap", "disable"}).out, "the access point is disabled\n");
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable",
-                                            "MEROWirelessAPDisable", "MEROWirelessSetAPConfig", "off: "));
+                                            "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
 }
 
 TEST_F(AccessPoint, IsNotEnabledAsNobodyHasSetIt) {
@@ -218,15 +218,40 @@ TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
   }
 }
 
-TEST_F(AccessPoint, ThatCannotBeEnabledHasItsSwitchPutBack) {
+TEST_F(AccessPoint, ThatCannotBeEnabledIsDisabled) {
   library::MEROWirelessAPEnable = [] { return FALSE; };
+  library::MEROWirelessAPDisable = [] { return FALSE; };
   RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
-  EXPECT_EQ(Tool({"ap", "enable"}).status, 1);
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point could not be taken down whole\n"));
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point could not be enabled: "));
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable",
-                                            "MEROWirelessSetAPConfig", "off: "));
+                                            "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
 }
 
-TEST_F(AccessPoint, WhoseStartIsInterruptedIsTakenDownAndHasItsSwitchPutBack) {
+TEST_F(AccessPoint, ThatAnotherSetsUpIsLeftToIt) {
+  library::MEROWirelessAPEnable = [] { return library::Report("Another ap construction is going"), FALSE; };
+  EXPECT_EQ(Tool({"ap", "enable"}).status, 1);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable"));
+}
+
+TEST_F(AccessPoint, ThatCannotBeSavedIsNotTried) {
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return FALSE; };
+  EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("the settings could not be saved"));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig"));
+}
+
+TEST_F(AccessPoint, ThatThereNeverWasIsDisabled) {
+  library::MEROWirelessAPDisable = [] {
+    return library::Report("File[/etc/sysconfig/network-scripts/ifcfg-wlan0] does not exist."), FALSE;
+  };
+  EXPECT_EQ(Tool({"ap", "disable"}).out, "the access point is disabled\n");
+  library::MEROWirelessAPDisable = [] { return library::Report("Failed to restart /etc/rc.network"), FALSE; };
+  EXPECT_EQ(Tool({"ap", "disable"}).status, 1);
+}
+
+TEST_F(AccessPoint, WhoseStartIsInterruptedIsDisabled) {
   library::MEROWirelessAPEnable = [] {
     library::Record("enabling");
     while (true) ::pause();
@@ -238,7 +263,7 @@ TEST_F(AccessPoint, WhoseStartIsInterruptedIsTakenDownAndHasItsSwitchPutBack) {
   ::kill(tool.pid(), SIGINT);
   EXPECT_EQ(tool.Wait().status, 130);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable", "enabling",
-                                            "MEROWirelessAPDisable", "MEROWirelessSetAPConfig", "off: "));
+                                            "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
 }
 
 TEST_F(AccessPoint, WhoseStartCannotBeUndoneSaysSo) {

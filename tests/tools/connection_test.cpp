@@ -1,5 +1,6 @@
 // connect, autoconnect, disconnect, adhoc, watch, radio and mode.
 #include <fcntl.h>
+#include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -7,7 +8,6 @@
 #include <cstring>
 #include <filesystem>
 
-#include "program.h"
 #include "running.h"
 
 using library::Network;
@@ -215,27 +215,43 @@ TEST_F(Connection, OfEqualsThatTheDriverDoesNotMakeIsAFailure) {
     const Ran ran = Tool({"adhoc", "cell"});
     EXPECT_EQ(ran.status, 1);
     EXPECT_THAT(ran.err, HasSubstr("the cell cell could not be started"));
+    EXPECT_EQ(library::Calls().back(), "MEROWirelessNetworkDisconnect") << "nothing of it is left";
   }
   EXPECT_EQ(Tool({"adhoc", ""}).status, 2);
 }
 
+// Nobody reads what is written to these.
+int FullDisk() {
+  return ::open("/dev/full", O_WRONLY);
+}
+
+int BrokenPipe() {
+  int ends[2];
+  EXPECT_EQ(::pipe(ends), 0);
+  ::close(ends[0]);
+  return ends[1];
+}
+
+int BrokenSocket() {
+  int ends[2];
+  EXPECT_EQ(::socketpair(AF_UNIX, SOCK_STREAM, 0, ends), 0);
+  ::close(ends[0]);
+  return ends[1];
+}
+
 TEST_F(Connection, ThatIsWatchedIsNoLongerWhenNobodyReads) {
-  for (const bool full : {true, false}) {
-    int ends[2];
-    ASSERT_EQ(::pipe(ends), 0);
-    const pid_t pid = ::fork();
-    if (pid == 0) {
+  for (int (*open)() : {FullDisk, BrokenPipe, BrokenSocket}) {
+    const auto writeThere = [open] {
       ::signal(SIGPIPE, SIG_IGN);
-      ::dup2(full ? ::open("/dev/full", O_WRONLY) : ends[1], STDOUT_FILENO);
-      for (int end : ends) ::close(end);
-      const char* argv[] = {"merowireless", "watch"};
-      ::_exit(RunProgram(2, argv));
-    }
-    char byte;
-    ::close(ends[1]);
-    EXPECT_GE(::read(ends[0], &byte, 1), 0);
-    ::close(ends[0]);
-    EXPECT_TRUE(Soon([&] { return ::waitpid(pid, nullptr, WNOHANG) == pid; })) << (full ? "full disk" : "broken pipe");
+      ::dup2(open(), STDOUT_FILENO);
+    };
+    StartedTool tool({"watch"}, {.before = writeThere});
+    const auto hasEnded = [&] {
+      siginfo_t ended{};
+      return ::waitid(P_PID, static_cast<id_t>(tool.pid()), &ended, WEXITED | WNOHANG | WNOWAIT) == 0 &&
+             ended.si_pid != 0;
+    };
+    EXPECT_TRUE(Soon(hasEnded));
   }
 }
 

@@ -57,8 +57,8 @@ void InACell() {
 }
 
 void WithAGateway() {
-  EXPECT_EQ(std::system("ip link add wire0 type veth && ip address add 10.0.0.8/24 dev wire0 &&"
-                        "ip link set wire0 up && ip route add default via 10.0.0.1"),
+  EXPECT_EQ(std::system("ip link add wlan0 type veth && ip address add 10.0.0.8/24 dev wlan0 &&"
+                        "ip link set wlan0 up && ip route add default via 10.0.0.1"),
             0);
 }
 
@@ -93,7 +93,6 @@ const Command kCommands[] = {
     {Connected, {"status"}},
     {Connected, {"watch", "--count", "1"}},
     {Connected, {"address", "DHCP"}},
-    {WithAGateway, {"gateway", "10.0.0.1"}},
     {InACell, {"adhoc", "Bench"}},
     {OnTheAir, {"ap", "show"}},
     {OnTheAir, {"ap", "set", "--channel", "11"}},
@@ -104,6 +103,7 @@ const Command kCommands[] = {
     {Connected, {"mode", "ap"}},
     {Connected, {"radio"}},
     {Connected, {"radio", "off"}},
+    {WithAGateway, {"gateway", "10.0.0.1"}},  // the last one: its interface stays
 };
 
 std::vector<std::string> With(std::vector<std::string> words, const char* szOption) {

@@ -52,7 +52,8 @@ TEST_F(Output, OfAScanIsARecordALineForScripts) {
 
 TEST_F(Output, KeepsNamesFromBreakingALineForScripts) {
   library::InRange({Network("a\tb\nc\\d\x1b[2J\r\x7f\xc3\xa9")});
-  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::StartsWith("a\\tb\\nc\\\\d\\x1b[2J\\x0d\\x7f\xc3\xa9\t74\t"));
+  EXPECT_THAT(Tool({"scan", "--porcelain"}).out,
+              testing::StartsWith("a\\tb\\nc\\\\d\\0033[2J\\0015\\0177\xc3\xa9\t74\t"));
 }
 
 TEST_F(Output, ShowsPeopleControlCharactersOfNamesWithoutTheirEffect) {

@@ -17,6 +17,7 @@
 using library::Network;
 using testing::AllOf;
 using testing::Contains;
+using testing::ContainsRegex;
 using testing::HasSubstr;
 using testing::Not;
 
@@ -280,7 +281,7 @@ TEST_F(Waiting, ShowsWhatTheLibraryReportsOnRequest) {
 TEST_F(Waiting, ShowsHowLongItTakesOnATerminal) {
   library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return ::usleep(900'000), 0; };
   const Ran ran = ToolOnTerminal({"connect", "Home"});
-  EXPECT_THAT(ran.out, AllOf(HasSubstr("\rjoining Home  0.6 s\x1b[K"), HasSubstr("\r\x1b[Kconnected to")));
+  EXPECT_THAT(ran.out, AllOf(ContainsRegex("\rjoining Home  0[.][5-9] s\x1b\\[K"), HasSubstr("\r\x1b[Kconnected to")));
   EXPECT_EQ(Tool({"connect", "Home"}).err, "");
 }
 
@@ -295,10 +296,51 @@ TEST_F(Waiting, ShowsNothingOfWhatIsFast) {
 }
 
 TEST_F(Waiting, NoticesACallThatBreaksOff) {
-  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return ::raise(SIGKILL), 0; };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    Touch(kMarker);
+    StartDaemon();
+    Daemon();
+    return ::raise(SIGKILL), 0;
+  };
   const Ran ran = Tool({"connect", "Home"});
   EXPECT_EQ(ran.status, 1);
   EXPECT_THAT(ran.err, HasSubstr("the library broke off"));
+  EXPECT_FALSE(std::filesystem::exists(kMarker));
+  EXPECT_FALSE(IsRunning(Daemon())) << "the supplicant goes on";
+  EXPECT_EQ(library::Calls().back(), "MEROWirelessNetworkDisconnect");
+}
+
+TEST_F(Waiting, ThatCannotBeUndoneSaysSo) {
+  JoinForever();
+  library::MEROWirelessNetworkDisconnect = [] { return -1; };
+  StartedTool tool({"connect", "Home"});
+  Daemon();
+  ::kill(tool.pid(), SIGINT);
+  const Ran ran = tool.Wait();
+  EXPECT_EQ(ran.status, 130);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the connection could not be ended whole\n"));
+}
+
+TEST_F(Waiting, ThatIsInterruptedTwiceIsToldToMachinesAllTheSame) {
+  JoinForever();
+  library::MEROWirelessNetworkDisconnect = [] { return ::raise(SIGTERM), 0; };
+  StartedTool tool({"connect", "Home", "--json"});
+  Daemon();
+  ::kill(tool.pid(), SIGTERM);
+  const Ran ran = tool.Wait();
+  EXPECT_EQ(ran.status, 130);
+  EXPECT_THAT(ran.out, HasSubstr(R"("code":130)"));
+}
+
+// Scripts that end a daemon wait until it is no process any more.
+TEST_F(Waiting, LeavesNoDaemonThatHasEndedAsAProcess) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    StartDaemon();
+    const pid_t daemon = Daemon();
+    ::kill(daemon, SIGKILL);
+    return Soon([&] { return !IsRunning(daemon); }) ? 0 : -1;
+  };
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
 }
 
 TEST_F(Waiting, IsNotEndedByASignalThatWasToBeIgnored) {
