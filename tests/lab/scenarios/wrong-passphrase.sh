@@ -5,6 +5,8 @@ access_point cafe ssid=cafe channel=6 wpa=2 wpa_passphrase='deux croissants' rsn
 appliance nas
 
 cafe=(essid=cafe auth=WPA2PSK encrypt=AES)
+# The program would look for the address, which it cannot while the radio is off.
+if through_functions; then cafe+=(bssid="$(address_of cafe)"); fi
 
 say '-- the wrong passphrase'
 began=$(uptime_seconds)
