@@ -16,29 +16,6 @@ using testing::Not;
 
 namespace {
 
-MERO_AP_CONF Settings() {
-  MERO_AP_CONF conf{};
-  std::strcpy(conf.szSecName, "ExampleStick");
-  MERO_HOSTAP_CONF& main = conf.hostapConf;
-  std::strcpy(main.szSSID, "Office");
-  std::strcpy(main.szBridge, "lbr0");
-  main.hwMode = AP_MODE_80211G;
-  main.ieee80211n = 1;
-  main.wirelessWidth = AP_FREQ_ALL;
-  main.channel = 6;
-  main.maxStation = 256;
-  main.wmm = 1;
-  main.encryption = AP_ENCRYPT_WPA_PSK;
-  main.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
-  main.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
-  std::strcpy(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
-  std::strcpy(main.guestNet.szSSID, "Guests");
-  main.guestNet.maxStation = 10;
-  conf.txpower = 10;
-  conf.guestNetAccessRule.blLanBlock = TRUE;
-  return conf;
-}
-
 std::vector<std::string> Words(const std::string& text) {
   std::istringstream stream(text);
   return {std::istream_iterator<std::string>(stream), {}};
@@ -54,7 +31,7 @@ void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
 
 class AccessPoint : public ToolTest {
  protected:
-  AccessPoint() { library::SavedAp(Settings()); }
+  AccessPoint() { library::SavedAp(library::Office()); }
 };
 
 TEST_F(AccessPoint, IsShownWithoutItsSecrets) {
@@ -101,7 +78,7 @@ TEST_F(AccessPoint, WithoutSettingsKeepsItsGuestsFromWhatIsNotTheirs) {
 }
 
 TEST_F(AccessPoint, ThatIsEnabledIsSavedOnce) {
-  MERO_AP_CONF conf = Settings();
+  MERO_AP_CONF conf = library::Office();
   conf.blEnable = TRUE;
   library::SavedAp(conf);
   EXPECT_EQ(Tool({"ap", "set", "--ssid", "New"}).status, 0);
@@ -197,7 +174,7 @@ TEST_F(AccessPoint, IsEnabledAndDisabledTogetherWithItsSwitch) {
 }
 
 TEST_F(AccessPoint, IsNotEnabledAsNobodyHasSetIt) {
-  library::MEROWirelessGetAPConfig = [](const char*, PMERO_AP_CONF conf) { return *conf = Settings(), 0; };
+  library::MEROWirelessGetAPConfig = [](const char*, PMERO_AP_CONF conf) { return *conf = library::Office(), 0; };
   const Ran ran = Tool({"ap", "enable"});
   EXPECT_EQ(ran.status, 2);
   EXPECT_THAT(ran.err, HasSubstr("`merowireless ap set` gives it"));

@@ -22,30 +22,6 @@ WIRELESS_NETWORK_CONFIG Home() {
   return config;
 }
 
-MERO_AP_CONF Office() {
-  MERO_AP_CONF conf{};
-  std::strcpy(conf.szSecName, "ExampleStick");
-  conf.blEnable = TRUE;
-  conf.txpower = 10;
-  MERO_HOSTAP_CONF& main = conf.hostapConf;
-  std::strcpy(main.szSSID, "Office");
-  std::strcpy(main.szBridge, "lbr0");
-  main.hwMode = AP_MODE_80211G;
-  main.ieee80211n = 1;
-  main.wirelessWidth = AP_FREQ_ALL;
-  main.channel = 6;
-  main.maxStation = 256;
-  main.wmm = 1;
-  main.encryption = AP_ENCRYPT_WPA_PSK;
-  main.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
-  main.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
-  std::strcpy(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
-  std::strcpy(main.guestNet.szSSID, "Guests");
-  main.guestNet.maxStation = 10;
-  conf.guestNetAccessRule.blLanBlock = TRUE;
-  return conf;
-}
-
 void Connected() {
   library::InRange({Network("Home"), Network("square", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE)});
   library::Known({Home()});
@@ -63,13 +39,13 @@ void WithAGateway() {
 }
 
 void OffTheAir() {
-  MERO_AP_CONF conf = Office();
-  conf.blEnable = FALSE;
-  library::SavedAp(conf);
+  library::SavedAp(library::Office());
 }
 
 void OnTheAir() {
-  library::SavedAp(Office());
+  MERO_AP_CONF conf = library::Office();
+  conf.blEnable = TRUE;
+  library::SavedAp(conf);
   library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
     return info->opmode = WIRELESS_OPMODE_MASTER, 0;
   };

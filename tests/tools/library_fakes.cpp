@@ -93,6 +93,29 @@ WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth, WIRELESS_ENC
   return network;
 }
 
+MERO_AP_CONF Office() {
+  MERO_AP_CONF conf{};
+  SetText(conf.szSecName, "ExampleStick");
+  MERO_HOSTAP_CONF& main = conf.hostapConf;
+  SetText(main.szSSID, "Office");
+  SetText(main.szBridge, "lbr0");
+  main.hwMode = AP_MODE_80211G;
+  main.ieee80211n = 1;
+  main.wirelessWidth = AP_FREQ_ALL;
+  main.channel = 6;
+  main.maxStation = 256;
+  main.wmm = 1;
+  main.encryption = AP_ENCRYPT_WPA_PSK;
+  main.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
+  main.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
+  SetText(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
+  SetText(main.guestNet.szSSID, "Guests");
+  main.guestNet.maxStation = 10;
+  conf.txpower = 10;
+  conf.guestNetAccessRule.blLanBlock = TRUE;
+  return conf;
+}
+
 void InRange(std::vector<WIRELESS_NETWORK> networks) {
   MEROWirelessNetworkScan = [networks](WIRELESS_SCAN, WIRELESS_LIST* head) { return Fill(head, networks), 0; };
   MEROWirelessNetworkGet = [networks](const char* szValue, WIRELESS_FILTER filter, WIRELESS_NETWORK* found) {

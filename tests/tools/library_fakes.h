@@ -61,6 +61,9 @@ std::vector<std::string> Calls();
 WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth = WIRELESS_AUTH_WPA2PSK,
                          WIRELESS_ENCRYPT encrypt = WIRELESS_ENCRYPT_AES);
 
+// The settings of an access point, which is switched off.
+MERO_AP_CONF Office();
+
 void InRange(std::vector<WIRELESS_NETWORK> networks);
 void Known(std::vector<WIRELESS_NETWORK_CONFIG> configs);
 void Connected(std::string_view name);
