@@ -220,38 +220,36 @@ TEST_F(Connection, OfEqualsThatTheDriverDoesNotMakeIsAFailure) {
   EXPECT_EQ(Tool({"adhoc", ""}).status, 2);
 }
 
-// Nobody reads what is written to these.
-int FullDisk() {
-  return ::open("/dev/full", O_WRONLY);
+bool EndsSoon(const StartedTool& tool) {
+  return Soon([&] {
+    siginfo_t ended{};
+    return ::waitid(P_PID, static_cast<id_t>(tool.pid()), &ended, WEXITED | WNOHANG | WNOWAIT) == 0 &&
+           ended.si_pid != 0;
+  });
 }
 
-int BrokenPipe() {
-  int ends[2];
-  EXPECT_EQ(::pipe(ends), 0);
-  ::close(ends[0]);
-  return ends[1];
+TEST_F(Connection, ThatIsWatchedIsNoLongerWhenItCannotBeShown) {
+  const auto writeToFullDisk = [] { ::dup2(::open("/dev/full", O_WRONLY), STDOUT_FILENO); };
+  EXPECT_TRUE(EndsSoon(StartedTool({"watch"}, {.before = writeToFullDisk})));
 }
 
-int BrokenSocket() {
-  int ends[2];
-  EXPECT_EQ(::socketpair(AF_UNIX, SOCK_STREAM, 0, ends), 0);
-  ::close(ends[0]);
-  return ends[1];
-}
-
-TEST_F(Connection, ThatIsWatchedIsNoLongerWhenNobodyReads) {
-  for (int (*open)() : {FullDisk, BrokenPipe, BrokenSocket}) {
-    const auto writeThere = [open] {
+TEST_F(Connection, ThatIsWatchedIsNoLongerWhenNobodyReadsOn) {
+  int pipe[2];
+  int sockets[2];
+  ASSERT_EQ(::pipe(pipe), 0);
+  ASSERT_EQ(::socketpair(AF_UNIX, SOCK_STREAM, 0, sockets), 0);
+  for (const auto& [reader, writer] : {std::pair(pipe[0], pipe[1]), std::pair(sockets[0], sockets[1])}) {
+    const auto writeThere = [reader = reader, writer = writer] {
       ::signal(SIGPIPE, SIG_IGN);
-      ::dup2(open(), STDOUT_FILENO);
+      ::dup2(writer, STDOUT_FILENO);
+      for (int end : {reader, writer}) ::close(end);
     };
-    StartedTool tool({"watch"}, {.before = writeThere});
-    const auto hasEnded = [&] {
-      siginfo_t ended{};
-      return ::waitid(P_PID, static_cast<id_t>(tool.pid()), &ended, WEXITED | WNOHANG | WNOWAIT) == 0 &&
-             ended.si_pid != 0;
-    };
-    EXPECT_TRUE(Soon(hasEnded));
+    const StartedTool tool({"watch"}, {.before = writeThere});
+    ::close(writer);
+    char shown[4096];
+    EXPECT_GT(::read(reader, shown, sizeof shown), 0) << "and nothing is left, which would be an error of its own";
+    ::close(reader);
+    EXPECT_TRUE(EndsSoon(tool));
   }
 }
 
