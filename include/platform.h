@@ -96,7 +96,8 @@ const char* PLIBCSzHashGetValue(const PLIBSZHASH* pshHash, const char* szKey);
  * Sets a key, keeping copies of both texts. A key that is present keeps its place in the order.
  *
  * @param ppshHash  the address of the caller's hash pointer, since a hash may move when it grows.
- * @return 1; -1 when memory ran out, with the hash as it was.
+ * @return 1; -1 when memory ran out, with the pairs as they were. The hash remembers that it lacks a pair, and writing
+ *         it into a section fails from then on: callers need not look at the result.
  */
 int PLIBCSzHashSetValue(PPLIBSZHASH* ppshHash, const char* szKey, const char* szValue);
 
@@ -209,7 +210,7 @@ int PLIBCFileGetSection(const char* szPath, const char* szSection, PPLIBSZHASH* 
 /**
  * Appends a section that holds the pairs of a hash, in its order. One that exists is set instead.
  *
- * @return 1; -1 on failure.
+ * @return 1; -1 on failure, also when a pair of the hash found no memory (ERR_OUT_OF_MEMORY).
  */
 int PLIBCFileAddSection(const char* szPath, const char* szSection, const PLIBSZHASH* pshHash, const char* szFormat);
 
@@ -218,7 +219,7 @@ int PLIBCFileAddSection(const char* szPath, const char* szSection, const PLIBSZH
  * absent is added.
  *
  * @param szNewName  the section's new name; null keeps the name.
- * @return 1; -1 on failure.
+ * @return 1; -1 on failure, also when a pair of the hash found no memory (ERR_OUT_OF_MEMORY).
  */
 int PLIBCFileSetSection(const char* szPath, const char* szSection, const char* szNewName, const PLIBSZHASH* pshHash,
                         const char* szFormat);

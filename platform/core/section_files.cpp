@@ -118,6 +118,10 @@ bool AppendWithout(Bytes& content, std::string_view text, std::string_view name)
 }
 
 int WriteSection(const char* szPath, const char* szSection, const char* szNewName, const NewPairs& pairs) {
+  if (pairs.hash->lacksPair) {
+    LOG("%s is not written: a pair of [%s] found no memory", szPath, szSection);
+    return PLIBCErrSet(ERR_OUT_OF_MEMORY), -1;
+  }
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
     return ComposeSection(text, szSection, szNewName, pairs, content);
   });

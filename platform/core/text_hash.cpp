@@ -82,16 +82,21 @@ bool Add(PLIBSZHASH& hash, std::string_view key, std::string_view value) {
   return true;
 }
 
+bool Replace(HashEntry& entry, std::string_view value) {
+  char* szValue = CopyOf(value);
+  if (szValue == nullptr) return false;
+  std::free(entry.szValue);
+  entry.szValue = szValue;
+  return true;
+}
+
 }  // namespace
 
 bool SetInHash(PLIBSZHASH& hash, std::string_view key, std::string_view value) {
   HashEntry* entry = Find(hash, key);
-  if (entry == nullptr) return Add(hash, key, value);
-  char* szValue = CopyOf(value);
-  if (szValue == nullptr) return false;
-  std::free(entry->szValue);
-  entry->szValue = szValue;
-  return true;
+  const bool set = entry != nullptr ? Replace(*entry, value) : Add(hash, key, value);
+  if (!set) hash.lacksPair = true;
+  return set;
 }
 
 PPLIBSZHASH PLIBCSzHashAlloc(int cbSize) {

@@ -21,9 +21,10 @@ struct PLIBSZHASH {
   uint32_t nEntries;
   HashEntry* first;
   HashEntry* last;
+  bool lacksPair;  // a pair that was to be set found no memory; callers may not have looked
 };
 
-// As PLIBCSzHashSetValue(), for texts that are not terminated. False when memory ran out.
+// As PLIBCSzHashSetValue(), for texts that are not terminated. False when memory ran out, which the hash remembers.
 [[nodiscard]] bool SetInHash(PLIBSZHASH& hash, std::string_view key, std::string_view value);
 
 #endif  // MERO_PLATFORM_TEXT_HASH_H
