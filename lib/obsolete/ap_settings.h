@@ -1,10 +1,12 @@
 // The keys of the access-point settings, stated once for the unit that reads them and the one that writes them. The
-// rows stand in the order in which they are written.
+// rows stand in the order in which they are written; each says at which turn it is read.
 #ifndef MERO_LIB_AP_SETTINGS_H
 #define MERO_LIB_AP_SETTINGS_H
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdio>
+#include <iterator>
 
 #include "wireless.h"
 
@@ -39,38 +41,66 @@ static_assert(sizeof kAlwaysOn == sizeof(MERO_WIFI_SCHED_CONF::szWifiSched));
 #define AP_FIELD(member) SETTING_FIELD(MERO_AP_CONF, member)
 #define SECRET_FIELD(member) SETTING_FIELD(MERO_HOSTAP_ENCRYPT_INFO, member)
 
-inline constexpr Setting kApSettings[] = {
-    {"enable", SettingKind::kSwitch, FALSE, AP_FIELD(blEnable)},
-    {"unblock", SettingKind::kSwitch, TRUE, AP_FIELD(blWifiUnblock)},
-    {"txpower", SettingKind::kInteger, 10, AP_FIELD(txpower)},
-    {"ssid", SettingKind::kText, 0, AP_FIELD(hostapConf.szSSID), ""},
-    {"bridge", SettingKind::kText, 0, AP_FIELD(hostapConf.szBridge), ""},
-    {"wifi_sched", SettingKind::kText, 0, AP_FIELD(wifiSchedConf.szWifiSched), kAlwaysOn},
-    {"wifi_sched_enabled", SettingKind::kInteger, 0, AP_FIELD(wifiSchedConf.wifiSchedEnabled)},
-    {"ignore_broadcast_ssid", SettingKind::kInteger, 0, AP_FIELD(hostapConf.hideSSID)},
-    {"hw_mode", SettingKind::kInteger, AP_MODE_80211G, AP_FIELD(hostapConf.hwMode)},
-    {"channel", SettingKind::kInteger, 0, AP_FIELD(hostapConf.channel)},
-    {"max_num_sta", SettingKind::kInteger, 256, AP_FIELD(hostapConf.maxStation)},
-    {"ieee80211n", SettingKind::kInteger, 1, AP_FIELD(hostapConf.ieee80211n)},
-    {"ieee80211n_wireless_width", SettingKind::kInteger, AP_FREQ_ALL, AP_FIELD(hostapConf.wirelessWidth)},
-    {"wmm_enabled", SettingKind::kInteger, 1, AP_FIELD(hostapConf.wmm)},
-    {"encryption", SettingKind::kInteger, AP_ENCRYPT_OPEN, AP_FIELD(hostapConf.encryption)},
-    {nullptr, SettingKind::kMainSecrets, 0, 0, 0},
-    {"guest_net_enable", SettingKind::kInteger, FALSE, AP_FIELD(hostapConf.guestNet.blEnable)},
-    {"bssid", SettingKind::kTextOnlyWritten, 0, AP_FIELD(hostapConf.guestNet.szBSSID)},
-    {"guest_net_ssid", SettingKind::kText, 0, AP_FIELD(hostapConf.guestNet.szSSID), "HarborstoreGuest"},
-    {"guest_net_ignore_broadcast_ssid", SettingKind::kInteger, 0, AP_FIELD(hostapConf.guestNet.hideSSID)},
-    {"guest_net_max_num_sta", SettingKind::kInteger, 256, AP_FIELD(hostapConf.guestNet.maxStation)},
-    {"ap_isolate", SettingKind::kInteger, TRUE, AP_FIELD(hostapConf.guestNet.blAPIsolate)},
-    {"guest_net_encryption", SettingKind::kInteger, AP_ENCRYPT_OPEN, AP_FIELD(hostapConf.guestNet.encryption)},
-    {nullptr, SettingKind::kGuestSecrets, 0, 0, 0},
-    {"guest_net_lan_block", SettingKind::kInteger, TRUE, AP_FIELD(guestNetAccessRule.blLanBlock)},
-    {"guest_net_access_ds", SettingKind::kInteger, FALSE, AP_FIELD(guestNetAccessRule.blAccessDS)},
-    {"guest_net_internet_block", SettingKind::kInteger, FALSE, AP_FIELD(guestNetAccessRule.blInternetBlock)},
-    {"guest_net_allow_http", SettingKind::kInteger, TRUE, AP_FIELD(guestNetAccessRule.blAllowHttp)},
-    {"guest_net_sched", SettingKind::kText, 0, AP_FIELD(guestNetSchedConf.szWifiSched), kAlwaysOn},
-    {"guest_net_sched_enable", SettingKind::kInteger, 0, AP_FIELD(guestNetSchedConf.wifiSchedEnabled)},
+struct ApSetting {
+  int turn;  // at which it is read; 0 for what is only written
+  Setting setting;
 };
+
+inline constexpr ApSetting kApSettings[] = {
+    {1, {"enable", SettingKind::kSwitch, FALSE, AP_FIELD(blEnable)}},
+    {2, {"unblock", SettingKind::kSwitch, TRUE, AP_FIELD(blWifiUnblock)}},
+    {3, {"txpower", SettingKind::kInteger, 10, AP_FIELD(txpower)}},
+    {4, {"ssid", SettingKind::kText, 0, AP_FIELD(hostapConf.szSSID), ""}},
+    {5, {"bridge", SettingKind::kText, 0, AP_FIELD(hostapConf.szBridge), ""}},
+    {6, {"wifi_sched", SettingKind::kText, 0, AP_FIELD(wifiSchedConf.szWifiSched), kAlwaysOn}},
+    {7, {"wifi_sched_enabled", SettingKind::kInteger, 0, AP_FIELD(wifiSchedConf.wifiSchedEnabled)}},
+    {8, {"ignore_broadcast_ssid", SettingKind::kInteger, 0, AP_FIELD(hostapConf.hideSSID)}},
+    {9, {"hw_mode", SettingKind::kInteger, AP_MODE_80211G, AP_FIELD(hostapConf.hwMode)}},
+    {10, {"channel", SettingKind::kInteger, 0, AP_FIELD(hostapConf.channel)}},
+    {14, {"max_num_sta", SettingKind::kInteger, 256, AP_FIELD(hostapConf.maxStation)}},
+    {11, {"ieee80211n", SettingKind::kInteger, 1, AP_FIELD(hostapConf.ieee80211n)}},
+    {12, {"ieee80211n_wireless_width", SettingKind::kInteger, AP_FREQ_ALL, AP_FIELD(hostapConf.wirelessWidth)}},
+    {15, {"wmm_enabled", SettingKind::kInteger, 1, AP_FIELD(hostapConf.wmm)}},
+    {13, {"encryption", SettingKind::kInteger, AP_ENCRYPT_OPEN, AP_FIELD(hostapConf.encryption)}},
+    {16, {nullptr, SettingKind::kMainSecrets, 0, 0, 0}},
+    {17, {"guest_net_enable", SettingKind::kInteger, FALSE, AP_FIELD(hostapConf.guestNet.blEnable)}},
+    {0, {"bssid", SettingKind::kTextOnlyWritten, 0, AP_FIELD(hostapConf.guestNet.szBSSID)}},
+    {18, {"guest_net_ssid", SettingKind::kText, 0, AP_FIELD(hostapConf.guestNet.szSSID), "HarborstoreGuest"}},
+    {19, {"guest_net_ignore_broadcast_ssid", SettingKind::kInteger, 0, AP_FIELD(hostapConf.guestNet.hideSSID)}},
+    {20, {"guest_net_max_num_sta", SettingKind::kInteger, 256, AP_FIELD(hostapConf.guestNet.maxStation)}},
+    {21, {"ap_isolate", SettingKind::kInteger, TRUE, AP_FIELD(hostapConf.guestNet.blAPIsolate)}},
+    {22, {"guest_net_encryption", SettingKind::kInteger, AP_ENCRYPT_OPEN, AP_FIELD(hostapConf.guestNet.encryption)}},
+    {29, {nullptr, SettingKind::kGuestSecrets, 0, 0, 0}},
+    {23, {"guest_net_lan_block", SettingKind::kInteger, TRUE, AP_FIELD(guestNetAccessRule.blLanBlock)}},
+    {24, {"guest_net_access_ds", SettingKind::kInteger, FALSE, AP_FIELD(guestNetAccessRule.blAccessDS)}},
+    {25, {"guest_net_internet_block", SettingKind::kInteger, FALSE, AP_FIELD(guestNetAccessRule.blInternetBlock)}},
+    {26, {"guest_net_allow_http", SettingKind::kInteger, TRUE, AP_FIELD(guestNetAccessRule.blAllowHttp)}},
+    {27, {"guest_net_sched", SettingKind::kText, 0, AP_FIELD(guestNetSchedConf.szWifiSched), kAlwaysOn}},
+    {28, {"guest_net_sched_enable", SettingKind::kInteger, 0, AP_FIELD(guestNetSchedConf.wifiSchedEnabled)}},
+};
+
+// How many rows are read at a turn.
+constexpr auto RowsAtTurn(int turn) {
+  return std::count_if(std::begin(kApSettings), std::end(kApSettings),
+                       [=](const ApSetting& row) { return row.turn == turn; });
+}
+
+// How many turns there are: they count from 1 on, with one row each.
+consteval int CountTurns() {
+  int turns = 0;
+  while (RowsAtTurn(turns + 1) == 1) ++turns;
+  return turns;
+}
+static_assert(CountTurns() + RowsAtTurn(0) == std::size(kApSettings), "each turn is one row's");
+
+// Calls `visit(setting)` for each row that is read, turn by turn.
+template <class Visit>
+void ForEachRead(Visit visit) {
+  for (int turn = 1; turn <= CountTurns(); ++turn) {
+    const auto isNext = [=](const ApSetting& row) { return row.turn == turn; };
+    visit(std::find_if(std::begin(kApSettings), std::end(kApSettings), isNext)->setting);
+  }
+}
 
 // What an encryption needs, with the fields of the union's member that belongs to it.
 struct SecretSetting {
@@ -95,16 +125,15 @@ inline constexpr SecretSetting kSecretSettings[] = {
 #undef SECRET_FIELD
 #undef SETTING_FIELD
 
-// Calls `visit(szKey, setting)` for each key that an encryption brings, until one call gives false; whether none did.
+// Calls `visit(szKey, setting)` for each key that an encryption brings.
 template <class Visit>
-bool ForEachSecret(MERO_AP_ENCRYPT encryption, BOOL blGuestNet, Visit visit) {
+void ForEachSecret(MERO_AP_ENCRYPT encryption, BOOL blGuestNet, Visit visit) {
   for (const auto& [needed, setting] : kSecretSettings) {
     if (needed != encryption) continue;
     char szKey[64];
     std::snprintf(szKey, sizeof szKey, "%s%s", blGuestNet != FALSE ? kGuestPrefix : "", setting.szKey);
-    if (!visit(szKey, setting)) return false;
+    visit(szKey, setting);
   }
-  return true;
 }
 
 #endif  // MERO_LIB_AP_SETTINGS_H

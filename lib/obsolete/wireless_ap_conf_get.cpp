@@ -72,17 +72,15 @@ BOOL getEncryptionConf(PPLIBSZHASH pshHash, MERO_AP_ENCRYPT encryption, PMERO_HO
   if (blGuestNet != FALSE && encryption == AP_ENCRYPT_WPA_EAP) {
     return LOG("Guest Network does not have EAP encryption"), FALSE;
   }
-  ForEachSecret(encryption, blGuestNet, [&](const char* szKey, const Setting& setting) {
-    Take(pshHash, szKey, setting, pEncryptInfo);
-    return true;
-  });
+  ForEachSecret(encryption, blGuestNet,
+                [&](const char* szKey, const Setting& setting) { Take(pshHash, szKey, setting, pEncryptInfo); });
   return TRUE;
 }
 
 void TakeAll(PPLIBSZHASH pshHash, PMERO_AP_CONF pConf) {
   MERO_HOSTAP_CONF& main = pConf->hostapConf;
   MERO_HOSTAP_GUEST_NET& guest = main.guestNet;
-  for (const Setting& setting : kApSettings) {
+  ForEachRead([&](const Setting& setting) {
     if (setting.kind == SettingKind::kMainSecrets) {
       (void)getEncryptionConf(pshHash, main.encryption, &main.encryptInfo, FALSE);
     } else if (setting.kind == SettingKind::kGuestSecrets) {
@@ -90,7 +88,7 @@ void TakeAll(PPLIBSZHASH pshHash, PMERO_AP_CONF pConf) {
     } else {
       Take(pshHash, setting.szKey, setting, pConf);
     }
-  }
+  });
 }
 
 }  // namespace

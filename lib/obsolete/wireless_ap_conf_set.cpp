@@ -37,30 +37,26 @@ const char* TextOfSwitch(int value) {
   return value != FALSE ? "yes" : "no";
 }
 
-// Puts the setting of a key, from its field of a record, into the hash; false when memory ran out.
-bool Put(PPLIBSZHASH* ppshHash, const char* szKey, const Setting& setting, const void* record) {
+// Puts the setting of a key, from its field of a record, into the hash. A pair that finds no memory there makes the
+// hash one that cannot be written.
+void Put(PPLIBSZHASH* ppshHash, const char* szKey, const Setting& setting, const void* record) {
   const char* field = static_cast<const char*>(record) + setting.offset;
   int value = 0;
   char szInteger[1024];
-  const char* szValue = field;
   switch (setting.kind) {
     case SettingKind::kSwitch:
       std::memcpy(&value, field, sizeof value);
-      szValue = TextOfSwitch(value);
-      break;
+      return (void)PLIBCSzHashSetValue(ppshHash, szKey, TextOfSwitch(value));
     case SettingKind::kInteger:
       std::memcpy(&value, field, sizeof value);
-      szValue = ConvertIntegerToString(value, szInteger, sizeof szInteger);
-      break;
+      return (void)PLIBCSzHashSetValue(ppshHash, szKey, ConvertIntegerToString(value, szInteger, sizeof szInteger));
     case SettingKind::kText:
     case SettingKind::kTextOnlyWritten:
-      break;
+      return (void)PLIBCSzHashSetValue(ppshHash, szKey, field);
     case SettingKind::kMainSecrets:
     case SettingKind::kGuestSecrets:
-      return true;
+      return;
   }
-  if (PLIBCSzHashSetValue(ppshHash, szKey, szValue) >= 0) return true;
-  return LOG("Failed to alloc memory"), false;
 }
 
 BOOL setEncryptionConf(PPLIBSZHASH* ppshHash, const MERO_AP_ENCRYPT encryption,
@@ -69,25 +65,32 @@ BOOL setEncryptionConf(PPLIBSZHASH* ppshHash, const MERO_AP_ENCRYPT encryption,
   if (blGuestNet != FALSE && encryption == AP_ENCRYPT_WPA_EAP) {
     return LOG("Guest Network does not have EAP encryption"), FALSE;
   }
-  const bool put = ForEachSecret(encryption, blGuestNet, [&](const char* szKey, const Setting& setting) {
-    return Put(ppshHash, szKey, setting, pEncryptInfo);
-  });
-  return put ? TRUE : FALSE;
+  ForEachSecret(encryption, blGuestNet,
+                [&](const char* szKey, const Setting& setting) { Put(ppshHash, szKey, setting, pEncryptInfo); });
+  return TRUE;
 }
 
-bool PutAll(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
+void PutSwitches(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
+  for (const auto& [turn, setting] : kApSettings) {
+    if (setting.kind == SettingKind::kSwitch) Put(ppshHash, setting.szKey, setting, pConf);
+  }
+}
+
+// Puts what an access point is that is switched on; false when one of its encryptions is refused.
+bool PutTheRest(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
   MERO_HOSTAP_CONF& main = pConf->hostapConf;
   MERO_HOSTAP_GUEST_NET& guest = main.guestNet;
-  for (const Setting& setting : kApSettings) {
-    bool done = false;
+  for (const auto& [turn, setting] : kApSettings) {
+    if (setting.kind == SettingKind::kSwitch) continue;
+    BOOL blDone = TRUE;
     if (setting.kind == SettingKind::kMainSecrets) {
-      done = setEncryptionConf(ppshHash, main.encryption, &main.encryptInfo, FALSE) != FALSE;
+      blDone = setEncryptionConf(ppshHash, main.encryption, &main.encryptInfo, FALSE);
     } else if (setting.kind == SettingKind::kGuestSecrets) {
-      done = setEncryptionConf(ppshHash, guest.encryption, &guest.encryptInfo, TRUE) != FALSE;
+      blDone = setEncryptionConf(ppshHash, guest.encryption, &guest.encryptInfo, TRUE);
     } else {
-      done = Put(ppshHash, setting.szKey, setting, pConf);
+      Put(ppshHash, setting.szKey, setting, pConf);
     }
-    if (!done) return false;
+    if (blDone == FALSE) return false;
   }
   return true;
 }
@@ -132,7 +135,8 @@ BOOL MEROWirelessSetAPConfig(const PMERO_AP_CONF pConf) {
 
   const std::optional<bool> exists = FindSection(pConf->szSecName);
   if (!exists) return FALSE;
+  PutSwitches(hash.address(), pConf);
   if (pConf->blEnable == FALSE) return SaveDisabled(pConf->szSecName);
-  if (!PutAll(hash.address(), pConf)) return FALSE;
+  if (!PutTheRest(hash.address(), pConf)) return FALSE;
   return SaveSection(pConf->szSecName, hash.get(), *exists);
 }

@@ -30,8 +30,9 @@ int ReadSaved(const char* szSection, Hash& hash) {
   return exists;
 }
 
-// Puts the network into the hash, in the order in which it is to stand in the file; false when memory ran out.
-bool Fill(Hash& hash, const WIRELESS_NETWORK_CONFIG& config, const char* szBssid) {
+// Puts the network into the hash, in the order in which it is to stand in the file. A pair that finds no memory there
+// makes the hash one that cannot be written.
+void Fill(Hash& hash, const WIRELESS_NETWORK_CONFIG& config, const char* szBssid) {
   char szTime[1024] = {};
   std::snprintf(szTime, sizeof szTime, "%lld", static_cast<long long>(SaturatedTime(std::time(nullptr))));
 
@@ -51,10 +52,7 @@ bool Fill(Hash& hash, const WIRELESS_NETWORK_CONFIG& config, const char* szBssid
       {kKeyAuth, MEROWirelessAuthStringGet(network.auth)},
       {kKeyEncrypt, MEROWirelessEncryptStringGet(network.encrypt, 0)},
   };
-  for (const auto& pair : pairs) {
-    if (PLIBCSzHashSetValue(hash.address(), pair.szKey, pair.szValue) < 0) return false;
-  }
-  return true;
+  for (const auto& pair : pairs) (void)PLIBCSzHashSetValue(hash.address(), pair.szKey, pair.szValue);
 }
 
 int Add(const char* szSection, const Hash& hash) {
@@ -84,6 +82,6 @@ int MEROWirelessConfSet(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   const int exists = ReadSaved(szSection, hash);
   if (exists < 0) return -1;
 
-  if (!Fill(hash, *pNetCfg, szBssid)) return LOG_LINE(33, "Failed to alloc memory"), -1;
+  Fill(hash, *pNetCfg, szBssid);
   return exists > 0 ? Replace(szSection, hash) : Add(szSection, hash);
 }

@@ -89,6 +89,51 @@ TEST_F(ApSettings, AreReadOnceAndTheHashIsReleased) {
   }
 }
 
+// Keys came in the order in which they are written.
+TEST_F(ApSettings, AreTakenInTheirOwnOrder) {
+  const auto keys = [](const std::vector<std::string>& names) {
+    std::vector<std::string> calls;
+    for (const std::string& name : names) calls.push_back("PLIBCSzHashGetValue(&, " + name + ")");
+    return calls;
+  };
+  ReadLines("\tenable=yes\n\tencryption=3\n\tguest_net_encryption=2\n");
+  EXPECT_EQ(fake::EffectsOf({"PLIBCSzHashGetValue"}), keys({"enable",
+                                                            "unblock",
+                                                            "txpower",
+                                                            "ssid",
+                                                            "bridge",
+                                                            "wifi_sched",
+                                                            "wifi_sched_enabled",
+                                                            "ignore_broadcast_ssid",
+                                                            "hw_mode",
+                                                            "channel",
+                                                            "ieee80211n",
+                                                            "ieee80211n_wireless_width",
+                                                            "encryption",
+                                                            "max_num_sta",
+                                                            "wmm_enabled",
+                                                            "wpa",
+                                                            "wpa_encrypt_type",
+                                                            "auth_server_addr",
+                                                            "auth_server_port",
+                                                            "auth_server_shared_secret",
+                                                            "guest_net_enable",
+                                                            "guest_net_ssid",
+                                                            "guest_net_ignore_broadcast_ssid",
+                                                            "guest_net_max_num_sta",
+                                                            "ap_isolate",
+                                                            "guest_net_encryption",
+                                                            "guest_net_lan_block",
+                                                            "guest_net_access_ds",
+                                                            "guest_net_internet_block",
+                                                            "guest_net_allow_http",
+                                                            "guest_net_sched",
+                                                            "guest_net_sched_enable",
+                                                            "guest_net_wpa_passphrase",
+                                                            "guest_net_wpa",
+                                                            "guest_net_wpa_encrypt_type"}));
+}
+
 TEST_F(ApSettings, AreTheDefaultsAndNothingIsReadWithoutAFile) {
   EXPECT_EQ(Read(), 0);
   EXPECT_THAT(Differences(conf_, DefaultSettings()), IsEmpty());

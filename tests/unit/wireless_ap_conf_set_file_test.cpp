@@ -1,5 +1,6 @@
 // What saving the access-point settings leaves in the file, and what a read makes of it.
 #include <sys/stat.h>
+#include <algorithm>
 
 #include <climits>
 #include <cstdio>
@@ -368,13 +369,19 @@ TEST_F(SavedApSettings, AreNotSavedToWhatIsNoFile) {
             "wireless_ap_conf_set:# Failed to set key[enable] of sec[" + kModel + "] in file[" + kSettings + "].");
 }
 
+// What another says of a pair that is not written anyway is no failure of the save.
+bool HasReportedFailure() {
+  return std::ranges::any_of(fake::Messages(),
+                             [](const std::string& message) { return message.starts_with("wireless_ap_conf_set:"); });
+}
+
 // Without memory the save fails and the file stays, or the save did not need that memory.
 void ExpectWholeOrUntouched(MERO_AP_CONF conf, const std::string& before, const std::string& saved, int nLeast) {
   int failures = 0;
   WriteText(kSettings, before);
   const auto save = [&] { return MEROWirelessSetAPConfig(&conf); };
   memory::FailEach(save, [&](int n, BOOL result) {
-    EXPECT_EQ(result, fake::Messages().empty() ? TRUE : FALSE) << n;
+    EXPECT_EQ(result, HasReportedFailure() ? FALSE : TRUE) << n;
     EXPECT_EQ(ReadText(kSettings), result == TRUE ? saved : before) << n;
     EXPECT_EQ(memory::Held(), 0u) << n;
     failures += result == TRUE ? 0 : 1;
@@ -396,7 +403,7 @@ TEST_F(SavedApSettings, AreWholeOrUntouchedWheneverMemoryRunsOut) {
 TEST_F(SavedApSettings, AreWholeOrEmptyWhenMemoryRunsOutOnTheFirstSave) {
   memory::FailEach([this] { return MEROWirelessSetAPConfig(&conf_); },
                    [&](int n, BOOL result) {
-                     EXPECT_EQ(result, fake::Messages().empty() ? TRUE : FALSE) << n;
+                     EXPECT_EQ(result, HasReportedFailure() ? FALSE : TRUE) << n;
                      EXPECT_EQ(ReadText(kSettings), result == TRUE ? office_ : "") << n;
                      EXPECT_EQ(memory::Held(), 0u) << n;
                      std::filesystem::remove(kSettings);

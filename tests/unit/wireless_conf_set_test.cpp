@@ -165,22 +165,13 @@ TEST_F(Save, FailsWhenTheSectionCannotBeReplaced) {
   EXPECT_THAT(fake::Messages(), ElementsAre(message + ", errno=0xBEEF", message + ", errno=0x0"));
 }
 
-TEST_F(Save, FailsWhenAnyPairFindsNoMemoryAndWritesNothing) {
-  for (int n = 1; n <= 10; ++n) {
-    fake::Begin();
-    fake::PLIBCFileExist.Returns(1);
-    fake::PLIBCFileGetSection.Returns(1);
-    fake::PLIBCSzHashSetValue.FailsAt(n, -1);
-    EXPECT_EQ(Run(), -1) << n;
-    EXPECT_THAT(fake::Messages(), ElementsAre("wireless_conf_set:33 Failed to alloc memory")) << n;
-    EXPECT_EQ(fake::PLIBCSzHashFree.calls(), 1) << n;
-    EXPECT_EQ(fake::PLIBCFileSetSection.calls() + fake::PLIBCFileAddSection.calls(), 0) << n;
+// A platform may give no result of setting a pair at all.
+TEST_F(Save, DoesNotLookAtWhatSettingAPairGives) {
+  for (const int result : {0, -1, 7}) {
+    fake::PLIBCSzHashSetValue.Returns(result);
+    EXPECT_EQ(Run(), 0) << result;
+    EXPECT_THAT(fake::Messages(), IsEmpty()) << result;
   }
-}
-
-TEST_F(Save, TakesAnAnswerOfZeroForAPairForSuccess) {
-  fake::PLIBCSzHashSetValue.Returns(0);
-  EXPECT_EQ(Run(), 0);
 }
 
 // A hash moves when it grows, and a platform may hand out another one.
