@@ -58,8 +58,10 @@ void SortBySaveTime(WIRELESS_LIST& head) {
     ++end;
   }
   std::qsort(places.get(), static_cast<size_t>(end - places.get()), sizeof(Place), Compare);
-  ResetRing(head);
-  for (const Place* place = places.get(); place != end; ++place) Append(head, *place->node);
+  for (const Place* place = places.get(); place != end; ++place) {
+    ::remque(place->node);
+    Append(head, *place->node);
+  }
 }
 
 }  // namespace

@@ -12,6 +12,33 @@ namespace {
 
 using testing::ElementsAre;
 
+std::vector<std::string> g_links;  // what was called to link and unlink
+
+void Note(const char* szFunction) {
+  const memory::Pause pause;
+  g_links.push_back(szFunction);
+}
+
+}  // namespace
+
+// In the place of libc's.
+extern "C" void insque(void* node, void* before) noexcept {
+  Note("insque");
+  auto* list = static_cast<WIRELESS_LIST*>(node);
+  list->q_back = static_cast<WIRELESS_LIST*>(before);
+  list->q_forw = list->q_back->q_forw;
+  list->q_back->q_forw = list->q_forw->q_back = list;
+}
+
+extern "C" void remque(void* node) noexcept {
+  Note("remque");
+  auto* list = static_cast<WIRELESS_LIST*>(node);
+  list->q_back->q_forw = list->q_forw;
+  list->q_forw->q_back = list->q_back;
+}
+
+namespace {
+
 class LastSaved : public UnitTest {
  protected:
   // The networks, each told by its place in the file, as the listing orders networks saved at these times.
@@ -66,6 +93,15 @@ TEST_F(LastSaved, IsFirstAmongAThousandAndEqualTimesKeepTheirOrder) {
     std::ranges::generate(times, [&] { return time(random); });
     EXPECT_EQ(Listed(times), Sorted(times)) << spread;
   }
+}
+
+// Sorting wrote the links of the head by itself.
+TEST_F(LastSaved, IsPutInItsPlaceByLinkingAndUnlinkingAlone) {
+  g_links.clear();
+  EXPECT_EQ(Listed({5, 9, 7}), Sorted({5, 9, 7}));
+  EXPECT_THAT(g_links, ElementsAre("insque", "insque", "insque",  // as they stand in the file
+                                   "remque", "insque", "remque", "insque", "remque", "insque", "remque", "remque",
+                                   "remque"));  // by the caller
 }
 
 TEST_F(LastSaved, IsFirstAmongThoseListedBeforeMemoryRanOut) {
