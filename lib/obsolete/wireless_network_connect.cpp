@@ -192,13 +192,13 @@ int NetworkConnect(const char* szIfName, const WIRELESS_NETWORK_CONFIG* pNetCfg)
   return 0;
 }
 
-bool MediaServiceUses(const char* szIfName) {
+bool MediaServiceUsesWireless() {
   return PLIBCFileCheckKeyValue(kSystemSettingsPath, "runmediaservice", "yes", 0) != 0 &&
-         PLIBCFileCheckKeyValue(kSystemSettingsPath, "network_mediaservice", szIfName, 0) != 0;
+         PLIBCFileCheckKeyValue(kSystemSettingsPath, "network_mediaservice", MEROWirelessInterfaceGet(), 0) != 0;
 }
 
 void PostProcessing() {
-  if (MediaServiceUses(MEROWirelessInterfaceGet())) (void)MEROMediaService(kMediaServiceRestart);  // has reported
+  if (MediaServiceUsesWireless()) (void)MEROMediaService(kMediaServiceRestart);  // has reported
   if (PLIBCFileExist(kResolverPath) != 0) {
     (void)Run(LongCommand("/bin/cp /etc/resolv.conf /etc/resolv.conf.wireless.bak"));  // has reported
   }

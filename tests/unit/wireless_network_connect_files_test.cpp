@@ -148,6 +148,16 @@ TEST_F(AfterJoining, TheMediaServiceIsAskedAboutInTheSystemsSettings) {
                   "PLIBCFileCheckKeyValue(/etc/meroinfo.conf, network_mediaservice, wlan0, 0)", "MEROMediaService(2)"));
 }
 
+// The interface's name was asked for in any case.
+TEST_F(AfterJoining, TheInterfaceIsAskedForOnlyWhenTheMediaServiceRuns) {
+  const Effects asks = {"MEROWirelessInterfaceGet()"};
+  EXPECT_EQ(Join(), 0);
+  EXPECT_EQ(fake::EffectsOf({"MEROWirelessInterfaceGet"}), asks);  // to join on it
+  WriteText(kSystemSettings, "runmediaservice=yes\n");
+  EXPECT_EQ(Join(), 0);
+  EXPECT_EQ(fake::EffectsOf({"MEROWirelessInterfaceGet"}), asks + asks + asks);
+}
+
 TEST_F(AfterJoining, AMediaServiceThatFailsIsNoFailureOfTheConnection) {
   WriteText(kSystemSettings, "runmediaservice=yes\nnetwork_mediaservice=wlan0\n");
   WriteText(kResolver, "");
