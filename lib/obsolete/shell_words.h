@@ -8,6 +8,8 @@
 #include <cstdlib>
 #include <string_view>
 
+#include "common/umask.h"
+
 // A value as one word of a command: as it is when all its characters are ordinary, else quoted, so that the shell
 // passes it on unchanged.
 class ShellWord {
@@ -51,10 +53,16 @@ class Command {
   const char* c_str() const { return szText_; }
 
   // Runs it and waits; negative when it could not be started. The exit status is for callers that look at it.
-  [[nodiscard]] int Run() const { return fits_ ? std::system(szText_) : Refuse(-1); }
+  [[nodiscard]] int Run() const {
+    const OrdinaryUmask umask;
+    return fits_ ? std::system(szText_) : Refuse(-1);
+  }
 
   // Starts it, to read its output; null when it could not be started.
-  [[nodiscard]] FILE* OpenPipe() const { return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr); }
+  [[nodiscard]] FILE* OpenPipe() const {
+    const OrdinaryUmask umask;
+    return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr);
+  }
 
  private:
   template <class Failure>

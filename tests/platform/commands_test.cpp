@@ -1,5 +1,6 @@
 // Running a program without a shell.
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <sys/time.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -97,6 +98,15 @@ TEST_F(Command, StartsWithAllSignalsAsIfNobodyHadTouchedThem) {
     EXPECT_EQ(std::stoull(mask, nullptr, 16) & ~0x1'8000'0000ull, 0u) << name << mask;
   }
   EXPECT_EQ(masks, 2);
+}
+
+TEST_F(Command, HasAnOrdinaryUmaskAndTheCallerKeepsItsOwn) {
+  for (const mode_t mask : {0000, 0077}) {
+    const mode_t before = ::umask(mask);
+    EXPECT_EQ(Shell("umask >/tmp/platform/output"), 0);
+    EXPECT_EQ(::umask(before), mask);
+    EXPECT_EQ(ReadFile(kOutput), "0022\n") << mask;
+  }
 }
 
 TEST_F(Command, IsWaitedForAlthoughSignalsComeMeanwhile) {
