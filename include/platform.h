@@ -314,8 +314,9 @@ const char* MEROWirelessAuthStringGet(WIRELESS_AUTH auth);
 /**
  * The text of an encryption.
  *
- * @param form  0: for files and people, such as "TKIPAES"; 1: the supplicant's list of ciphers, such as "TKIP CCMP".
- * @return a constant text; "UNKNOWN" for what is no encryption, and in form 1 an empty one for what is no WPA cipher.
+ * @param form  0: for files and people, such as "TKIPAES"; 1: the supplicant's list of those of TKIP and AES that the
+ *              value has, whatever else it has, such as "TKIP CCMP".
+ * @return a constant text; "UNKNOWN" for what is no encryption, and in form 1 an empty one for what has neither.
  */
 const char* MEROWirelessEncryptStringGet(WIRELESS_ENCRYPT encrypt, int form);
 

@@ -74,7 +74,8 @@ const char* MEROWirelessAuthStringGet(WIRELESS_AUTH auth) {
 }
 
 const char* MEROWirelessEncryptStringGet(WIRELESS_ENCRYPT encrypt, int form) {
-  return TextOf(form == 1 ? Literals(kSupplicantCiphers) : Literals(kEncryptTexts), encrypt);
+  constexpr int kCiphersOfWpa = WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES;
+  return form == 1 ? TextOf(kSupplicantCiphers, encrypt & kCiphersOfWpa) : TextOf(kEncryptTexts, encrypt);
 }
 
 const char* MEROWirelessOpmodeStringGet(WIRELESS_OPMODE opmode) {
