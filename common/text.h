@@ -20,6 +20,12 @@ void CopyText(char (&szTo)[kSize], std::string_view text) {
   CopyText(szTo, kSize, text);
 }
 
+// The text in a field of a record; all of the field when it has no end.
+template <size_t kSize>
+std::string_view TextIn(const char (&szField)[kSize]) {
+  return {szField, ::strnlen(szField, kSize)};
+}
+
 // A part of a text, from one offset up to another or to its end. What lies outside the text is no part of it; unlike
 // string_view::substr(), which would bring in the exceptions of the C++ library.
 constexpr std::string_view Slice(std::string_view text, size_t begin, size_t end = std::string_view::npos) {

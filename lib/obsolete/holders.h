@@ -3,8 +3,10 @@
 #define MERO_LIB_HOLDERS_H
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <memory>
@@ -92,16 +94,20 @@ class Pipe {
 // A file that is written from its beginning.
 class NewFile {
  public:
-  // Who may read a file that is created; one that exists keeps its mode.
+  // Who may read a file that is created, whatever the caller's umask; one that exists keeps its mode.
   enum Readers : mode_t { kSecret = 0600, kForAll = 0644 };
 
-  NewFile(const char* szPath, Readers readers) {
-    // Created apart from being opened, since fopen() would create it for all to read.
-    const int fd = ::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC, static_cast<mode_t>(readers));
+  // Who may put files into its directory. Where everybody may, what is there already is not written to.
+  enum Directory { kOurs, kShared };
+
+  NewFile(const char* szPath, Readers readers, Directory directory = kOurs) {
+    constexpr int kFlags = O_WRONLY | O_CREAT | O_CLOEXEC;
+    int fd = ::open(szPath, kFlags | O_EXCL, static_cast<mode_t>(readers));
+    if (fd >= 0) (void)::fchmod(fd, readers);  // of an open file of our own
+    if (fd < 0 && errno == EEXIST && directory == kOurs) fd = ::open(szPath, kFlags | O_TRUNC, readers);
     if (fd < 0) return;
-    ::close(fd);
-    pfFile_ = std::fopen(szPath, "w");
-    CloseOnExec(pfFile_);
+    pfFile_ = ::fdopen(fd, "w");
+    if (pfFile_ == nullptr) ::close(fd);
   }
   NewFile(const NewFile&) = delete;
   NewFile& operator=(const NewFile&) = delete;

@@ -2,7 +2,7 @@
 #ifndef MERO_LIB_WEP_KEY_H
 #define MERO_LIB_WEP_KEY_H
 
-#include <cstring>
+#include <string_view>
 
 enum class WepKeyForm {
   kText,    // 40 or 104 bits as 5 or 13 characters
@@ -10,8 +10,8 @@ enum class WepKeyForm {
   kWrong,
 };
 
-inline WepKeyForm FormOfWepKey(const char* szKey) {
-  switch (std::strlen(szKey)) {
+inline WepKeyForm FormOfWepKey(std::string_view key) {
+  switch (key.size()) {
     case 5:
     case 13:
       return WepKeyForm::kText;

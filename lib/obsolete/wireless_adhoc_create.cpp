@@ -33,9 +33,9 @@ bool Run(const ConfigCommand& command) {
   return LOG("Failed to execute '%s'", command.c_str()), false;
 }
 
-bool SetEssid(const char* szIfName, const char* szEssid) {
+bool SetEssid(const char* szIfName, std::string_view essid) {
   return Run(ConfigCommand("/sbin/iwconfig %s essid %s > /dev/null 2>&1", ShellWord(szIfName).c_str(),
-                           ShellWord(szEssid).c_str()));
+                           ShellWord(essid).c_str()));
 }
 
 bool SetKey(const char* szIfName, const WIRELESS_NETWORK_CONFIG& config) {
@@ -45,8 +45,8 @@ bool SetKey(const char* szIfName, const WIRELESS_NETWORK_CONFIG& config) {
     return Run(ConfigCommand("/sbin/iwconfig %s key off", ifName.c_str()));
   }
 
-  const ShellWord key(config.szKey);
-  switch (FormOfWepKey(config.szKey)) {
+  const ShellWord key(TextIn(config.szKey));
+  switch (FormOfWepKey(TextIn(config.szKey))) {
     case WepKeyForm::kText:
       return Run(ConfigCommand("/sbin/iwconfig %s key open s:%s > /dev/null 2>&1", ifName.c_str(), key.c_str()));
     case WepKeyForm::kDigits:
@@ -72,6 +72,6 @@ int MEROWirelessAdhocCreate(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   CopyText(szIfName, MEROWirelessInterfaceGet());
   const WIRELESS_NETWORK& network = pNetCfg->network;
   const bool created = IsSupported(szIfName, network) && SetMode(szIfName, network.opmode) &&
-                       SetEssid(szIfName, network.szEssid) && SetKey(szIfName, *pNetCfg) && BringUp(szIfName);
+                       SetEssid(szIfName, TextIn(network.szEssid)) && SetKey(szIfName, *pNetCfg) && BringUp(szIfName);
   return created ? 0 : -1;
 }

@@ -1,6 +1,4 @@
 // Joins a network: an ad-hoc cell directly, any other through the supplicant.
-#include <fcntl.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -9,6 +7,7 @@
 
 #include "common/connection_files.h"
 #include "common/log.h"
+#include "common/text.h"
 #include "holders.h"
 #include "platform.h"
 #include "shell_words.h"
@@ -36,28 +35,37 @@ BOOL CheckBssid(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   return known && pNetCfg->noneBssid == 0 ? TRUE : FALSE;
 }
 
-void WriteWepKey(FILE* pfConf, const char* szKey) {
-  switch (FormOfWepKey(szKey)) {
-    case WepKeyForm::kText:
-      std::fprintf(pfConf, "\twep_key0=\"%s\"\n", szKey);
-      break;
-    case WepKeyForm::kDigits:
-      std::fprintf(pfConf, "\twep_key0=%s\n", szKey);
-      break;
-    case WepKeyForm::kWrong:
-      LOG("Wrong WEP Format.");  // and the attempt goes on, without the key
-      break;
+// Writes the line of a value, by a format with "%.*s" in it. False after a report for a value that would end its line
+// and begin one of its own: values come from strangers.
+bool WriteValue(FILE* pfConf, const char* szFormat, std::string_view value) {
+  if (value.find('\n') != std::string_view::npos) {
+    return LOG("A name or secret with a line feed cannot be configured."), false;
   }
+  std::fprintf(pfConf, szFormat, static_cast<int>(value.size()), value.data());
+  return true;
 }
 
-void WriteWithoutWpa(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+bool WriteWepKey(FILE* pfConf, std::string_view key) {
+  switch (FormOfWepKey(key)) {
+    case WepKeyForm::kText:
+      return WriteValue(pfConf, "\twep_key0=\"%.*s\"\n", key);
+    case WepKeyForm::kDigits:
+      return WriteValue(pfConf, "\twep_key0=%.*s\n", key);
+    case WepKeyForm::kWrong:
+      break;
+  }
+  return LOG("Wrong WEP Format."), true;  // and the attempt goes on, without the key
+}
+
+bool WriteWithoutWpa(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   std::fprintf(pfConf, "\tkey_mgmt=NONE\n");
   if (config.network.encrypt == WIRELESS_ENCRYPT_WEP) {
-    WriteWepKey(pfConf, config.szKey);
+    if (!WriteWepKey(pfConf, TextIn(config.szKey))) return false;
     std::fprintf(pfConf, "\twep_tx_keyidx=0\n");
     std::fprintf(pfConf, "\tauth_alg=SHARED\n");
   }
   std::fprintf(pfConf, "}\n");
+  return true;
 }
 
 void WritePairwise(FILE* pfConf, WIRELESS_ENCRYPT encrypt) {
@@ -65,34 +73,36 @@ void WritePairwise(FILE* pfConf, WIRELESS_ENCRYPT encrypt) {
   std::fprintf(pfConf, "\tpairwise=%s\n", MEROWirelessEncryptStringGet(encrypt, 1));
 }
 
-void WriteWpaPsk(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+bool WriteWpaPsk(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   std::fprintf(pfConf, "\tkey_mgmt=WPA-PSK\n");
   WritePairwise(pfConf, config.network.encrypt);
-  std::fprintf(pfConf, "\tpsk=\"%s\"\n}\n", config.szKey);
+  return WriteValue(pfConf, "\tpsk=\"%.*s\"\n}\n", TextIn(config.szKey));
 }
 
-void WriteWpaEap(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
+bool WriteWpaEap(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   std::fprintf(pfConf, "\tkey_mgmt=WPA-EAP\n");
   std::fprintf(pfConf, "\teap=TTLS PEAP\n");
   WritePairwise(pfConf, config.network.encrypt);
-  std::fprintf(pfConf, "\tidentity=\"%s\"\n", config.szUser);
-  std::fprintf(pfConf, "\tpassword=\"%s\"\n", config.szKey);
+  if (!WriteValue(pfConf, "\tidentity=\"%.*s\"\n", TextIn(config.szUser))) return false;
+  if (!WriteValue(pfConf, "\tpassword=\"%.*s\"\n", TextIn(config.szKey))) return false;
   std::fprintf(pfConf, "}\n");
+  return true;
 }
 
-// Writes what the authentication asks for, and closes the block; false when there is no such authentication.
+// Writes what the authentication asks for, and closes the block; false after a report when there is no such
+// authentication, or a value cannot be written.
 bool WriteSecurity(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   switch (config.network.auth) {
     case WIRELESS_AUTH_OPEN:
     case WIRELESS_AUTH_SHARED:
     case WIRELESS_AUTH_WEPAUTO:
-      return WriteWithoutWpa(pfConf, config), true;
+      return WriteWithoutWpa(pfConf, config);
     case WIRELESS_AUTH_WPAPSK:
     case WIRELESS_AUTH_WPA2PSK:
-      return WriteWpaPsk(pfConf, config), true;
+      return WriteWpaPsk(pfConf, config);
     case WIRELESS_AUTH_WPAEAP:
     case WIRELESS_AUTH_WPA2EAP:
-      return WriteWpaEap(pfConf, config), true;
+      return WriteWpaEap(pfConf, config);
     case WIRELESS_AUTH_UNKNOWN:
     case WIRELESS_AUTH_WPANONE:
       break;
@@ -104,7 +114,7 @@ bool WriteNetwork(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   char szBssid[1024] = {};
   std::fprintf(pfConf, "ctrl_interface=/var/run/wpa_supplicant\n");
   std::fprintf(pfConf, "network={\n");
-  std::fprintf(pfConf, "\tssid=\"%s\"\n", config.network.szEssid);
+  if (!WriteValue(pfConf, "\tssid=\"%.*s\"\n", TextIn(config.network.szEssid))) return false;
   if (CheckBssid(&config) == TRUE) {
     std::fprintf(pfConf, "\tbssid=%s\n", MEROWirelessBssidStringGet(config.network.bssid, szBssid, sizeof szBssid));
   }
@@ -112,18 +122,8 @@ bool WriteNetwork(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   return WriteSecurity(pfConf, config);
 }
 
-// Whether a value would end its line in the configuration and begin one of its own. Values come from strangers.
-bool HoldsLineFeed(const WIRELESS_NETWORK_CONFIG& config) {
-  for (const char* szValue : {config.network.szEssid, config.szKey, config.szUser}) {
-    if (std::strchr(szValue, '\n') != nullptr) return true;
-  }
-  return false;
-}
-
 BOOL SetWpaSupplicantConfig(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   if (pNetCfg == nullptr) return LOG("Bad parameters"), FALSE;
-  if (HoldsLineFeed(*pNetCfg)) return LOG("A name or secret with a line feed cannot be configured."), FALSE;
-
   if (PLIBCFileExist(kSupplicantConfigPath) != 0) (void)PLIBCSysUnlink(kSupplicantConfigPath);  // written anew anyway
   NewFile conf(kSupplicantConfigPath, NewFile::kSecret);
   if (!conf) return LOG("Failed to open file[%s].", kSupplicantConfigPath), FALSE;
@@ -162,16 +162,23 @@ BOOL CheckConnComplete() {
   return FALSE;
 }
 
+// Records the connection for other programs; it is recorded once there is a file for it, since a connection that is up
+// is worth more than its record.
 BOOL RecordConnection(const WIRELESS_NETWORK* pNetwork) {
   if (pNetwork == nullptr) return FALSE;
   (void)PLIBCSysUnlink(kConnectionRecordPath);  // what was recorded holds no longer, whatever comes of this
-  NewFile record(kConnectionRecordPath, NewFile::kForAll);
+  NewFile record(kConnectionRecordPath, NewFile::kForAll, NewFile::kShared);
   if (!record) return FALSE;
 
   char szBssid[1024] = {};
-  std::fprintf(record.get(), "%s\n%d\n%d\n%d\n%s\n", pNetwork->szEssid, pNetwork->protocol, pNetwork->auth,
-               pNetwork->encrypt, MEROWirelessBssidStringGet(pNetwork->bssid, szBssid, sizeof szBssid));
-  return record.Close() ? TRUE : FALSE;
+  const std::string_view essid = TextIn(pNetwork->szEssid);
+  std::fprintf(record.get(), "%.*s\n%d\n%d\n%d\n%s\n", static_cast<int>(essid.size()), essid.data(), pNetwork->protocol,
+               pNetwork->auth, pNetwork->encrypt, MEROWirelessBssidStringGet(pNetwork->bssid, szBssid, sizeof szBssid));
+  if (!record.Close()) {
+    LOG("Failed to write file [%s]", kConnectionRecordPath);
+    (void)PLIBCSysUnlink(kConnectionRecordPath);  // nothing is better than a part of it
+  }
+  return TRUE;
 }
 
 // ---- The connection ----

@@ -21,7 +21,7 @@ struct Security {
 };
 
 const Security kSecurities[] = {
-    {{1, 2, 3}, {0, 1, 4, 8, 12, 6}, "\tkey_mgmt=NONE\n}\n"},
+    {{1, 2, 3}, {0, 1, 4, 8, 12, 6, 9, 15, 20}, "\tkey_mgmt=NONE\n}\n"},
     {{1, 2, 3},
      {2},
      "\tkey_mgmt=NONE\n"
@@ -31,10 +31,9 @@ const Security kSecurities[] = {
      "}\n"},
 
     {{4, 5}, {0, 1, 2}, "\tkey_mgmt=WPA-PSK\n\tpsk=\"0123456789\"\n}\n"},
-    {{4, 5}, {4}, "\tkey_mgmt=WPA-PSK\n\tpairwise=TKIP\n\tpsk=\"0123456789\"\n}\n"},
-    {{4, 5}, {8}, "\tkey_mgmt=WPA-PSK\n\tpairwise=CCMP\n\tpsk=\"0123456789\"\n}\n"},
-    {{4, 5}, {12}, "\tkey_mgmt=WPA-PSK\n\tpairwise=TKIP CCMP\n\tpsk=\"0123456789\"\n}\n"},
-    {{4, 5}, {6}, "\tkey_mgmt=WPA-PSK\n\tpairwise=\n\tpsk=\"0123456789\"\n}\n"},
+    {{4, 5}, {4, 6, 20}, "\tkey_mgmt=WPA-PSK\n\tpairwise=TKIP\n\tpsk=\"0123456789\"\n}\n"},
+    {{4, 5}, {8, 9}, "\tkey_mgmt=WPA-PSK\n\tpairwise=CCMP\n\tpsk=\"0123456789\"\n}\n"},
+    {{4, 5}, {12, 15}, "\tkey_mgmt=WPA-PSK\n\tpairwise=TKIP CCMP\n\tpsk=\"0123456789\"\n}\n"},
 
     {{7, 8},
      {0, 1, 2},
@@ -44,7 +43,7 @@ const Security kSecurities[] = {
      "\tpassword=\"0123456789\"\n"
      "}\n"},
     {{7, 8},
-     {4},
+     {4, 6, 20},
      "\tkey_mgmt=WPA-EAP\n"
      "\teap=TTLS PEAP\n"
      "\tpairwise=TKIP\n"
@@ -52,7 +51,7 @@ const Security kSecurities[] = {
      "\tpassword=\"0123456789\"\n"
      "}\n"},
     {{7, 8},
-     {8},
+     {8, 9},
      "\tkey_mgmt=WPA-EAP\n"
      "\teap=TTLS PEAP\n"
      "\tpairwise=CCMP\n"
@@ -60,23 +59,14 @@ const Security kSecurities[] = {
      "\tpassword=\"0123456789\"\n"
      "}\n"},
     {{7, 8},
-     {12},
+     {12, 15},
      "\tkey_mgmt=WPA-EAP\n"
      "\teap=TTLS PEAP\n"
      "\tpairwise=TKIP CCMP\n"
      "\tidentity=\"alice\"\n"
      "\tpassword=\"0123456789\"\n"
      "}\n"},
-    {{7, 8},
-     {6},
-     "\tkey_mgmt=WPA-EAP\n"
-     "\teap=TTLS PEAP\n"
-     "\tpairwise=\n"
-     "\tidentity=\"alice\"\n"
-     "\tpassword=\"0123456789\"\n"
-     "}\n"},
-
-    {{0, 6, 9, -1, 257}, {0, 1, 2, 4, 8, 12, 6}, "", false},
+    {{0, 6, 9, -1, 257}, {0, 1, 2, 4, 8, 12, 6, 9, 15, 20}, "", false},
 };
 
 class SupplicantConfig : public JoiningTest {
@@ -116,7 +106,7 @@ TEST_F(SupplicantConfig, IsExactlyWhatEachAuthenticationAndEncryptionNeeds) {
       }
     }
   }
-  EXPECT_EQ(nCases, 12 * 7 * 2);
+  EXPECT_EQ(nCases, 12 * 10 * 2);
 }
 
 TEST_F(SupplicantConfig, IsGivenUpForAnUnknownAuthenticationAndTheNetworkIsNotJoined) {
@@ -239,17 +229,33 @@ TEST_F(SupplicantConfig, HoldsNamesAndSecretsAsTheyAre) {
   }
 }
 
-TEST_F(SupplicantConfig, IsNotWrittenForANameOrASecretWithALineFeed) {
-  const std::vector<char*> texts = {config_.network.szEssid, config_.szKey, config_.szUser};
-  for (char* szText : texts) {
-    for (const char* szBroken : {"a\n", "\nb", "a\n}\nnetwork={\n\tpriority=9"}) {
+// What the file holds when a value was refused: what was written before it, and nothing of an older file.
+TEST_F(SupplicantConfig, IsGivenUpAtANameOrASecretWithALineFeed) {
+  const std::string name = kHead + std::string("\tssid=\"Home Net\"\n\tbssid=00:11:22:AA:BB:CC\n\tscan_ssid=1\n");
+  const struct {
+    int auth;
+    int encrypt;
+    char* szText;
+    std::string written;
+  } rows[] = {
+      {1, 1, config_.network.szEssid, kHead},
+      {5, 1, config_.szKey, name + "\tkey_mgmt=WPA-PSK\n"},
+      {8, 1, config_.szUser, name + "\tkey_mgmt=WPA-EAP\n\teap=TTLS PEAP\n"},
+      {8, 1, config_.szKey, name + "\tkey_mgmt=WPA-EAP\n\teap=TTLS PEAP\n\tidentity=\"alice\"\n"},
+      {2, 2, config_.szKey, name + "\tkey_mgmt=NONE\n"},
+  };
+  for (const auto& row : rows) {
+    for (const char* szBroken : {"aaaa\n", "\nbbbb", "a\n}\nnetwork={", "a\n}\nnetwork={\n\tpriority=9"}) {
+      const bool wepKey = row.encrypt == 2 && std::strlen(szBroken) != 5 && std::strlen(szBroken) != 26;
+      if (wepKey) continue;  // no key at all
       Begin();
-      const std::string before = szText;
-      std::strcpy(szText, szBroken);
+      SetSecurity(row.auth, row.encrypt);
+      const std::string before = row.szText;
+      std::strcpy(row.szText, szBroken);
       WriteText(kSupplicantConfig, "old");
       EXPECT_EQ(Join(), -1);
-      std::strcpy(szText, before.c_str());
-      EXPECT_EQ(ReadText(kSupplicantConfig), "old");
+      std::strcpy(row.szText, before.c_str());
+      EXPECT_EQ(ReadText(kSupplicantConfig), row.written);
       EXPECT_EQ(fake::system.calls(), 0);
       EXPECT_FALSE(Exists(kMarker));
       EXPECT_THAT(WithoutLines(fake::Messages()),
@@ -260,6 +266,44 @@ TEST_F(SupplicantConfig, IsNotWrittenForANameOrASecretWithALineFeed) {
   }
 }
 
+// A note in the user's name kept an open network from being joined.
+TEST_F(SupplicantConfig, DoesNotCareForALineFeedInWhatItDoesNotHold) {
+  const struct {
+    int auth;
+    int encrypt;
+    char* szText;
+  } rows[] = {
+      {1, 1, config_.szKey},  {1, 1, config_.szUser}, {2, 2, config_.szUser},
+      {5, 8, config_.szUser}, {2, 4, config_.szKey},  {2, 2, config_.szKey},  // of the wrong length, and left out
+  };
+  for (const auto& row : rows) {
+    Begin();
+    SetSecurity(row.auth, row.encrypt);
+    const std::string before = row.szText;
+    std::strcpy(row.szText, "a note\nof two lines");
+    EXPECT_THAT(ConfigAfterJoining(), testing::EndsWith("\n}\n"));
+    std::strcpy(row.szText, before.c_str());
+  }
+}
+
+// A field without an end was read on into the next one.
+TEST_F(SupplicantConfig, HoldsNothingFromBehindAFieldThatHasNoEnd) {
+  SetSecurity(WIRELESS_AUTH_WPA2PSK, WIRELESS_ENCRYPT_NONE);
+  std::memset(config_.network.szEssid, 'n', sizeof config_.network.szEssid);
+  std::memset(config_.szKey, 'k', sizeof config_.szKey);
+  std::strcpy(config_.szIp, "\n}\n");
+  config_.network.bssid[0] = '\n';
+  EXPECT_EQ(ConfigAfterJoining(), kHead + std::string("\tssid=\"") + std::string(33, 'n') +
+                                      "\"\n\tbssid=0A:11:22:AA:BB:CC\n\tscan_ssid=1\n\tkey_mgmt=WPA-PSK\n\tpsk=\"" +
+                                      std::string(257, 'k') + "\"\n}\n");
+  EXPECT_EQ(ReadText(kRecord), std::string(33, 'n') + "\n7\n5\n1\n0A:11:22:AA:BB:CC\n");
+
+  SetSecurity(WIRELESS_AUTH_WPA2EAP, WIRELESS_ENCRYPT_NONE);
+  std::memset(config_.szUser, 'u', sizeof config_.szUser);
+  EXPECT_THAT(ConfigAfterJoining(), testing::EndsWith("\tidentity=\"" + std::string(257, 'u') + "\"\n\tpassword=\"" +
+                                                      std::string(257, 'k') + "\"\n}\n"));
+}
+
 mode_t ModeOf(const std::string& path) {
   struct stat status {};
   EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
@@ -268,8 +312,12 @@ mode_t ModeOf(const std::string& path) {
 
 TEST_F(SupplicantConfig, CanBeReadByItsOwnerAloneAlsoWhenTheOldOneCouldBeReadByAll) {
   const mode_t before = umask(0);
-  EXPECT_EQ(Join(), 0);
-  EXPECT_EQ(ModeOf(kSupplicantConfig), 0600u);
+  for (const mode_t mask : {0000, 0077, 0777}) {
+    umask(mask);
+    EXPECT_EQ(Join(), 0);
+    EXPECT_EQ(ModeOf(kSupplicantConfig), 0600u) << mask;
+  }
+  umask(0);
 
   Begin();
   WriteText(kSupplicantConfig, "old");

@@ -1,5 +1,8 @@
 // What a connection leaves: its record, a media service that knows of it, and a copy of the resolver's settings.
+#include <sys/mount.h>
 #include <sys/stat.h>
+
+#include <functional>
 
 #include "hostile_texts.h"
 #include "joining.h"
@@ -52,13 +55,15 @@ TEST_F(ConnectionRecord, HoldsNamesAsTheyAre) {
   }
 }
 
-TEST_F(ConnectionRecord, CanBeReadByOtherPrograms) {
-  const mode_t before = umask(022);
-  EXPECT_EQ(Join(), 0);
-  umask(before);
-  struct stat status {};
-  ASSERT_EQ(stat(kRecord.c_str(), &status), 0);
-  EXPECT_EQ(status.st_mode & 07777, 0644u);
+TEST_F(ConnectionRecord, CanBeReadByOtherProgramsWhateverTheUmask) {
+  for (const mode_t mask : {0022, 0000, 0077}) {
+    const mode_t before = umask(mask);
+    EXPECT_EQ(Join(), 0);
+    umask(before);
+    struct stat status {};
+    ASSERT_EQ(stat(kRecord.c_str(), &status), 0);
+    EXPECT_EQ(status.st_mode & 07777, 0644u) << mask;
+  }
 }
 
 // Has the record's name in use again as soon as the old record is gone.
@@ -88,10 +93,34 @@ TEST_F(ConnectionRecord, IsGoneWhenTheNewOneCannotBeWrittenAndTheSupplicantStays
   EXPECT_FALSE(Exists(kMarker));
 }
 
-TEST_F(ConnectionRecord, ThatDoesNotReachTheDiskIsAFailure) {
-  OccupyWhenRemoved([] { std::filesystem::create_symlink("/dev/full", kRecord); });
-  EXPECT_EQ(Join(), -1);
-  EXPECT_THAT(WithoutLines(fake::Messages()), testing::ElementsAreArray(kCannotRecord));
+// Whoever is quick enough to put a link there has it written to what it points to.
+TEST_F(ConnectionRecord, IsNotWrittenToWhatIsThereAlready) {
+  WriteText("/var/tmp/elsewhere", "theirs");
+  for (const auto& occupy : std::vector<std::function<void()>>{
+           [] { std::filesystem::create_symlink("/var/tmp/elsewhere", kRecord); },
+           [] { std::filesystem::create_symlink("/var/tmp/missing", kRecord); },
+           [] { std::filesystem::create_hard_link("/var/tmp/elsewhere", kRecord); },
+           [] { ASSERT_EQ(::mkfifo(kRecord.c_str(), 0666), 0); },
+       }) {
+    Begin();
+    OccupyWhenRemoved(occupy);
+    EXPECT_EQ(Join(), -1);
+    EXPECT_THAT(WithoutLines(fake::Messages()), testing::ElementsAreArray(kCannotRecord));
+    EXPECT_EQ(ReadText("/var/tmp/elsewhere"), "theirs");
+    EXPECT_FALSE(Exists("/var/tmp/missing"));
+  }
+}
+
+// A full disk ended a connection that was up.
+TEST_F(ConnectionRecord, ThatDoesNotReachTheDiskIsReportedAndRemovedAndTheConnectionStays) {
+  ASSERT_EQ(::mount("small", "/var/tmp", "tmpfs", 0, "size=4k"), 0);
+  WriteText("/var/tmp/full", std::string(1 << 16, 'x'));
+  EXPECT_EQ(Join(), 0);
+  EXPECT_FALSE(Exists(kRecord));
+  EXPECT_THAT(fake::EffectsOf({"system"}), ElementsAre(RunOf(kStartsSupplicant)));
+  EXPECT_THAT(WithoutLines(fake::Messages()),
+              ElementsAre("wireless_network_connect:# Failed to write file [" + kRecord + "]"));
+  EXPECT_EQ(::umount("/var/tmp"), 0);
 }
 
 TEST_F(ConnectionRecord, StaysWhenTheNetworkIsNotJoined) {
@@ -184,6 +213,26 @@ TEST_F(AfterJoining, AResolverThatCannotBeSavedIsReportedAndNoFailureOfTheConnec
               ElementsAre("wireless_network_connect:# Failed to execute '" + kSavesResolver + "'"));
   EXPECT_TRUE(Exists(kRecord));
   EXPECT_FALSE(Exists(kMarker));
+}
+
+// The supplicant's pid file could be written to by anybody, and the copy of the resolver's settings be read by nobody.
+TEST_F(AfterJoining, CommandsHaveAnOrdinaryUmaskAndTheCallerKeepsItsOwn) {
+  WriteText(kResolver, "");
+  const auto current = [] {
+    const mode_t mask = umask(0);
+    umask(mask);
+    return mask;
+  };
+  for (const mode_t mask : {0000, 0077}) {
+    const mode_t before = umask(mask);
+    std::vector<mode_t> seen;
+    fake::system.Does([&](const char*) { return seen.push_back(current()), 0; });
+    fake::PipesAnswer([&](std::string_view) { return seen.push_back(current()), "wpa_state=COMPLETED\n"; });
+    EXPECT_EQ(Join(), 0);
+    EXPECT_THAT(seen, ElementsAre(0022u, 0022u, 0022u)) << mask;
+    EXPECT_EQ(current(), mask);
+    umask(before);
+  }
 }
 
 TEST_F(AfterJoining, NothingIsDoneForANetworkThatWasNotJoined) {
