@@ -5,6 +5,16 @@
 
 namespace {
 
+// Whether an adapter operated so can be in a network of somebody else's. Drivers refuse to tell the network of one that
+// cannot, as an access point, which is no failure: there is none.
+bool CanBeInNetwork(WIRELESS_OPMODE mode) {
+  return mode == WIRELESS_OPMODE_MANAGED || mode == WIRELESS_OPMODE_ADHOC || mode == WIRELESS_OPMODE_AUTO;
+}
+
+Result<std::optional<Bssid>> AccessPointIn(const Radio& radio, WIRELESS_OPMODE mode) {
+  return CanBeInNetwork(mode) ? radio.AccessPoint() : std::optional<Bssid>();
+}
+
 WIRELESS_STATUS StatusOfMode(WIRELESS_OPMODE mode) {
   switch (mode) {
     case WIRELESS_OPMODE_ADHOC:
@@ -12,7 +22,7 @@ WIRELESS_STATUS StatusOfMode(WIRELESS_OPMODE mode) {
     case WIRELESS_OPMODE_MANAGED:
       return WIRELESS_STATUS_CONNECTED_MANAGED;
     default:
-      return WIRELESS_STATUS_DISCONNECTED;  // an access point is nobody's client
+      return WIRELESS_STATUS_DISCONNECTED;
   }
 }
 
@@ -24,13 +34,23 @@ Result<WIRELESS_STATUS> StatusOf(const Radio& radio) {
   if (mode.error() == EOPNOTSUPP) return WIRELESS_STATUS_NOT_SUPPORTED;
   if (!mode.ok()) return mode.status();
   if (*mode == WIRELESS_OPMODE_MONITOR) return WIRELESS_STATUS_MONITOR;
-  Result<std::optional<Bssid>> accessPoint = radio.AccessPoint();
+  Result<std::optional<Bssid>> accessPoint = AccessPointIn(radio, *mode);
   if (!accessPoint.ok()) return accessPoint.status();
   return *accessPoint ? StatusOfMode(*mode) : WIRELESS_STATUS_DISCONNECTED;
 }
 
+Status TellEssid(const Radio& radio, char (&szEssid)[33]) {
+  Result<WIRELESS_OPMODE> mode = radio.Mode();
+  if (!mode.ok()) return mode.status();
+  if (CanBeInNetwork(*mode)) return radio.Essid(szEssid);
+  szEssid[0] = '\0';
+  return Status::Ok();
+}
+
 Result<ConnectionRecord> RecordOf(const Radio& radio) {
-  Result<std::optional<Bssid>> accessPoint = radio.AccessPoint();
+  Result<WIRELESS_OPMODE> mode = radio.Mode();
+  if (!mode.ok()) return mode.status();
+  Result<std::optional<Bssid>> accessPoint = AccessPointIn(radio, *mode);
   if (!accessPoint.ok()) return accessPoint.status();
   return *accessPoint ? RecordOfConnectionTo(**accessPoint) : ConnectionRecord{};
 }
@@ -46,7 +66,7 @@ Status Answer(Result<T> found, Member& member) {
 Status Ask(const Radio& radio, WIRELESS_REQUEST request, WIRELESS_INFO& info) {
   switch (request) {
     case REQUEST_ESSID:
-      return radio.Essid(info.szEssid);
+      return TellEssid(radio, info.szEssid);
     case REQUEST_MODE:
       return Answer(radio.Mode(), info.opmode);
     case REQUEST_STATUS:

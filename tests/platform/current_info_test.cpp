@@ -98,6 +98,21 @@ TEST_F(CurrentConnection, HasTheStatusThatTheDriverGives) {
   }
 }
 
+// Every question about an access point's own connection was reported as a failure.
+TEST_F(CurrentConnection, IsNoneForAnAccessPointAndThatIsNoFailure) {
+  ASSERT_EQ(PLIBNetIfUp("wlan3"), 1);
+  WriteFile(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
+  for (const unsigned mode : {+WIRELESS_OPMODE_MASTER, +WIRELESS_OPMODE_REPEATER, +WIRELESS_OPMODE_SECONDEARY, 7}) {
+    driver_.mode = mode;
+    EXPECT_EQ(Ask(REQUEST_STATUS).status, WIRELESS_STATUS_DISCONNECTED) << mode;
+    EXPECT_STREQ(Ask(REQUEST_ESSID).szEssid, "") << mode;
+    EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, WIRELESS_PROTO_UNKNOWN) << mode;
+    EXPECT_EQ(Ask(REQUEST_AUTH).auth, WIRELESS_AUTH_UNKNOWN) << mode;
+  }
+  driver_.mode = WIRELESS_OPMODE_MONITOR;
+  EXPECT_STREQ(Ask(REQUEST_ESSID).szEssid, "");
+}
+
 TEST_F(CurrentConnection, IsDownWhileTheInterfaceIs) {
   EXPECT_EQ(Ask(REQUEST_STATUS).status, WIRELESS_STATUS_DOWN);
 }

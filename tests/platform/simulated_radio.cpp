@@ -86,9 +86,11 @@ int SimulatedDriver::Answer(unsigned long request, void* argument) {
       told.push_back("mode " + std::to_string(mode));
       return 0;
     case SIOCGIWAP:
+      if (mode > IW_MODE_INFRA) return Fail(EOPNOTSUPP);  // as the kernel's own drivers do
       std::ranges::copy(accessPoint, wireless.u.ap_addr.sa_data);
       return 0;
     case SIOCGIWESSID:
+      if (mode > IW_MODE_INFRA) return Fail(EOPNOTSUPP);
       if (wireless.u.essid.length < name.size()) return Fail(E2BIG);
       std::memcpy(wireless.u.essid.pointer, name.data(), name.size());
       wireless.u.essid.length = static_cast<__u16>(name.size());
