@@ -271,7 +271,8 @@ const char* MEROWirelessInterfaceGet(void);
  * Asks about the current connection.
  *
  * The driver answers; only the protocol and the authentication come from the record of the last join
- * (/var/tmp/.wireless_current_connection), and are unknown when that names another access point than the driver.
+ * (/var/tmp/.wireless_current_connection), and are unknown when that names another access point than the driver. While
+ * the adapter is an access point there is no connection: no name, nothing known, WIRELESS_STATUS_DISCONNECTED.
  *
  * @param pInfo  receives the answer in the member that belongs to the request. For REQUEST_STATUS it is also set,
  *               to WIRELESS_STATUS_NO_ADAPTER or _DOWN, when there is nothing to ask.
@@ -384,8 +385,8 @@ typedef struct BRIDGE_INFO {
  * Lists the interfaces that the kernel has in a bridge at this moment.
  *
  * @param ppslList  the address of the caller's list pointer; names are appended, in order.
- * @return how many were appended; -1 when there is no such bridge (ERR_NO_DEVICE) or memory ran out, with the list as
- *         it was.
+ * @return how many were appended, 0 also for a bridge that the kernel does not have; -1 for a name that none can have
+ *         (ERR_NO_DEVICE) and when memory ran out, with the list as it was.
  */
 int PLIBNetBridgeSlaveEnum(const char* szBridge, PPLIBSZLIST* ppslList);
 

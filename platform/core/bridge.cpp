@@ -12,13 +12,14 @@ namespace {
 
 constexpr char kMembersFormat[] = "/sys/class/net/%s/brif";
 
-// The directory with an entry for each member. ENODEV when the kernel has no bridge of that name.
+// The directory with an entry for each member; ENOENT when the kernel has no bridge of that name, and ENODEV when it
+// cannot have one.
 Result<Directory> OpenMembers(const char* szBridge) {
   if (!IsInterfaceName(szBridge)) return Status::Failed(ENODEV);
   char szPath[sizeof kMembersFormat + IFNAMSIZ];
   std::snprintf(szPath, sizeof szPath, kMembersFormat, szBridge);
   Directory directory(::opendir(szPath));
-  if (!directory) return Status::Failed(errno == ENOENT ? ENODEV : errno);
+  if (!directory) return Status::Failed(errno);
   return directory;
 }
 
@@ -34,6 +35,7 @@ Status AppendNames(DIR* directory, PLIBSZLIST& list) {
 
 Status AppendMembers(const char* szBridge, PLIBSZLIST& list) {
   Result<Directory> directory = OpenMembers(szBridge);
+  if (directory.error() == ENOENT) return Status::Ok();  // a bridge that is not there has no members
   if (!directory.ok()) return directory.status();
 
   const int before = list.nItem;

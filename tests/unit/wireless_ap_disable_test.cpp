@@ -1,4 +1,6 @@
 // The course of disabling an access point, and what it does to the files.
+#include <sys/mount.h>
+
 #include <climits>
 #include <cstring>
 #include <filesystem>
@@ -328,6 +330,38 @@ TEST_F(DisablingAnAccessPoint, StopsTheServerOfARealBridgeAndKeepsItsSettings) {
   EXPECT_EQ(ReadText("/etc/dhcpd/dhcpd-lbr0-lbr0.conf"), server);
   EXPECT_EQ(ReadText("/etc/dhcpd/dhcpd-lbr0-lbr0.info"), "auto_time=\"0\"\nenable=\"no\"\n");
   shell("ip link delete wlan0 && ip link delete lbr0");
+}
+
+// After a change to client mode, or with the adapter pulled, the kernel has no such bridge, and it came up at every
+// boot.
+TEST_F(DisablingAnAccessPoint, KeepsABridgeFromBootThatTheKernelDoesNotHaveAnyMore) {
+  fake::PLIBNetBridgeSlaveEnum.Reset();
+  EXPECT_EQ(MEROWirelessAPDisable(), TRUE);
+  EXPECT_THAT(fake::Messages(), IsEmpty());
+  EXPECT_EQ(ReadText(kBridgeScript), "DEVICE=lbr0\nONBOOT=no\nPRIMARY=wlan0\nTYPE=Bridge\n");
+}
+
+// Where no file can be written at first, what one call could not do is left for the next.
+TEST_F(DisablingAnAccessPoint, RepairsWhatACallLeftThatCouldWriteNothing) {
+  fake::MERONetGetDhcpServerConf.Reset();
+  fake::MERONetSetDhcpServerConfigFiles.Reset();
+  fake::PLIBNetBridgeSlaveEnum.Reset();
+  MERO_DHCPD_CONF conf{};
+  std::strcpy(conf.szInterface, "lbr0");
+  std::strcpy(conf.szTag, "lbr0");
+  ASSERT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
+  ASSERT_EQ(::mount("/etc", "/etc", nullptr, MS_BIND, nullptr), 0);
+  ASSERT_EQ(::mount(nullptr, "/etc", nullptr, MS_BIND | MS_REMOUNT | MS_RDONLY, nullptr), 0);
+  EXPECT_EQ(MEROWirelessAPDisable(), FALSE);
+  EXPECT_EQ(fake::PLIBCExec.calls(), 0);
+  ASSERT_EQ(::umount("/etc"), 0);
+
+  EXPECT_EQ(MEROWirelessAPDisable(), TRUE);
+  EXPECT_EQ(Last(fake::EffectsOf({"PLIBCExec"})), "PLIBCExec(/etc/rc.network, restart, wlan0, lbr0, null)");
+  EXPECT_FALSE(std::filesystem::exists(kInfoFile));
+  EXPECT_EQ(ReadText(kInterfaceScript), kInterfaceText);
+  EXPECT_EQ(ReadText(kBridgeScript), "DEVICE=lbr0\nONBOOT=no\nPRIMARY=wlan0\nTYPE=Bridge\n");
+  EXPECT_EQ(ReadText("/etc/dhcpd/dhcpd-lbr0-lbr0.info"), "auto_time=\"0\"\nenable=\"no\"\n");
 }
 
 // ---- Memory ----
