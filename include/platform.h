@@ -185,9 +185,10 @@ int PLIBCFileRemoveKey(const char* szPath, const char* szKey);
 
 /*
  * Section files: a line with a name in square brackets opens a section, which reaches to the next such line; KEY=value
- * lines follow, each value exactly the bytes behind the "=". White space around names is no part of them. Section
- * names are compared without regard to ASCII case, keys exactly. Of a repeated section the first counts, of a repeated
- * key the last. These files hold secrets: one that is created gets mode 0600. `szFormat` is as above.
+ * lines follow, each value exactly the bytes behind the "=". Where the header's line ends in CR LF, those of its
+ * section may, too. White space around names is no part of them. Section names are compared without regard to ASCII
+ * case, keys exactly. Of a repeated section the first counts, of a repeated key the last. These files hold secrets: one
+ * that is created gets mode 0600. `szFormat` is as above.
  */
 
 /**

@@ -136,7 +136,7 @@ Status TakeSection(std::string_view text, const std::optional<SectionPlace>& pla
   if (!place) return Status::Failed(kNoSection);
   config = {};
   config.network.opmode = WIRELESS_OPMODE_UNKNOWN;
-  for (Lines lines(Slice(text, place->body, place->end)); lines.Next();) {
+  for (Lines lines = LinesOf(text, *place); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
     if (pair) Take(*pair, config);
   }

@@ -30,10 +30,10 @@ LinePlace PlaceOfPairs(std::string_view body) {
   return place.value_or(LinePlace{0, 0});
 }
 
-Status AppendPairs(Bytes& content, const NewPairs& pairs) {
+Status AppendPairs(Bytes& content, const NewPairs& pairs, LineEnds ends) {
   for (const HashEntry* entry = pairs.hash->first; entry != nullptr; entry = entry->next) {
     const Pair pair{entry->szKey, entry->szValue};
-    if (Status status = AppendPair(content, pairs.szFormat, pair, ValueForm::kPlain); !status.ok()) return status;
+    if (Status status = AppendPair(content, pairs.szFormat, pair, ValueForm::kPlain, ends); !status.ok()) return status;
   }
   return Status::Ok();
 }
@@ -55,7 +55,7 @@ Status ComposeNewHeader(std::string_view text, const char* szSection, Bytes& con
 
 Status ComposeAdded(std::string_view text, const char* szSection, const NewPairs& pairs, Bytes& content) {
   if (Status status = ComposeNewHeader(text, szSection, content); !status.ok()) return status;
-  return AppendPairs(content, pairs);
+  return AppendPairs(content, pairs, LineEnds::kLf);
 }
 
 // The text with the pairs of one section replaced, and its header when it gets a new name.
@@ -70,7 +70,8 @@ Status ComposeReplaced(std::string_view text, const SectionPlace& place, const c
   if (!header.ok()) return header;
   if (Status status = AppendText(content, Slice(body, 0, old.begin)); !status.ok()) return status;
   if (Status status = EndLine(content); !status.ok()) return status;
-  if (Status status = AppendPairs(content, pairs); !status.ok()) return status;
+  const LineEnds ends = szNewName != nullptr ? LineEnds::kLf : LineEndsOf(text, place);
+  if (Status status = AppendPairs(content, pairs, ends); !status.ok()) return status;
   if (Status status = AppendAllButPairs(content, Slice(body, old.begin)); !status.ok()) return status;
   return AppendText(content, Slice(text, place.end));
 }
@@ -101,7 +102,8 @@ Status ComposeValue(std::string_view text, const char* szSection, const Pair& pa
   const LinePlace place = PlaceOfKey(text, *section, pair.key);
   if (Status status = AppendText(content, Slice(text, 0, place.begin)); !status.ok()) return status;
   if (Status status = EndLine(content); !status.ok()) return status;
-  if (Status status = AppendPair(content, szFormat, pair, ValueForm::kPlain); !status.ok()) return status;
+  const LineEnds ends = LineEndsOf(text, *section);
+  if (Status status = AppendPair(content, szFormat, pair, ValueForm::kPlain, ends); !status.ok()) return status;
   return AppendText(content, Slice(text, place.end));
 }
 
@@ -160,7 +162,7 @@ int PLIBCFileGetSection(const char* szPath, const char* szSection, PPLIBSZHASH* 
 
   const std::optional<SectionPlace> place = FindSection(file->view(), szSection);
   if (!place) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
-  for (Lines lines(Slice(file->view(), place->body, place->end)); lines.Next();) {
+  for (Lines lines = LinesOf(file->view(), *place); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
     if (pair && !SetInHash(**ppshHash, pair->key, pair->value)) return FAIL(ENOMEM, "read", szPath), -1;
   }

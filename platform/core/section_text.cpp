@@ -20,7 +20,7 @@ bool IsOneLine(std::string_view text) {
 }
 
 // Expands the two "%s" of a line format; EINVAL when it has another number of them, or any other conversion.
-Status Expand(Bytes& to, std::string_view format, Pair pair) {
+Status Expand(Bytes& to, std::string_view format, Pair pair, LineEnds ends) {
   const std::string_view values[] = {pair.key, pair.value};
   size_t used = 0;
   while (!format.empty()) {
@@ -29,8 +29,11 @@ Status Expand(Bytes& to, std::string_view format, Pair pair) {
     format.remove_prefix(percent);
     if (format.empty()) break;
     if (Slice(format, 0, 2) != "%s" || used == std::size(values)) return Status::Failed(EINVAL);
-    if (!to.Append(values[used++])) return Status::Failed(ENOMEM);
+    const std::string_view value = values[used++];
+    if (!to.Append(value)) return Status::Failed(ENOMEM);
     format.remove_prefix(2);
+    const bool wouldBeCut = ends == LineEnds::kCrLf && value.ends_with('\r') && format == "\n";
+    if (wouldBeCut && !to.Append("\r")) return Status::Failed(ENOMEM);
   }
   return used == std::size(values) ? Status::Ok() : Status::Failed(EINVAL);
 }
@@ -51,6 +54,12 @@ std::optional<std::string_view> SectionOfLine(std::string_view line) {
   line = Trim(line);
   if (line.size() < 2 || line.front() != '[' || line.back() != ']') return std::nullopt;
   return Trim(Slice(line, 1, line.size() - 1));
+}
+
+LineEnds LineEndsOf(std::string_view text, const SectionPlace& place) {
+  std::string_view header = Slice(text, place.header, place.body);
+  if (header.ends_with('\n')) header.remove_suffix(1);
+  return header.ends_with('\r') ? LineEnds::kCrLf : LineEnds::kLf;
 }
 
 // Looks for brackets, which are rare, so that most lines are never looked at one by one.
@@ -97,12 +106,12 @@ std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, Va
   return place;
 }
 
-Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form) {
+Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, LineEnds ends) {
   const size_t begin = to.view().size();
-  if (Status status = Expand(to, szFormat, pair); !status.ok()) return status;
+  if (Status status = Expand(to, szFormat, pair, ends); !status.ok()) return status;
 
   const std::string_view written = Slice(to.view(), begin);
-  Lines line(written);
+  Lines line(written, ends);
   const bool one = IsOneLine(written) && line.Next();
   const std::optional<Pair> read = one ? PairOfLine(line.text(), form) : std::nullopt;
   const bool same = read && read->key == pair.key && read->value == pair.value;

@@ -15,10 +15,16 @@ inline size_t LineEnd(std::string_view text, size_t offset) {
   return feed == std::string_view::npos ? text.size() : feed + 1;
 }
 
+// What ends the lines of a text.
+enum class LineEnds {
+  kLf,    // a carriage return before the feed is a byte of the line
+  kCrLf,  // one before the feed, or at the end of the text, is not; lines without one are read all the same
+};
+
 // Walks a text line by line.
 class Lines {
  public:
-  explicit Lines(std::string_view text) : text_(text) {}
+  explicit Lines(std::string_view text, LineEnds ends = LineEnds::kLf) : text_(text), ends_(ends) {}
 
   // Moves on to the next line; false at the end.
   bool Next() {
@@ -31,9 +37,8 @@ class Lines {
   std::string_view whole() const { return Slice(text_, begin_, end_); }  // with its line end
   std::string_view text() const {                                        // without
     std::string_view line = whole();
-    if (!line.ends_with('\n')) return line;
-    line.remove_suffix(1);
-    if (line.ends_with('\r')) line.remove_suffix(1);
+    if (line.ends_with('\n')) line.remove_suffix(1);
+    if (ends_ == LineEnds::kCrLf && line.ends_with('\r')) line.remove_suffix(1);
     return line;
   }
   size_t begin() const { return begin_; }
@@ -41,6 +46,7 @@ class Lines {
 
  private:
   std::string_view text_;
+  LineEnds ends_;
   size_t begin_ = 0;
   size_t end_ = 0;
 };
@@ -68,6 +74,14 @@ struct SectionPlace {
   size_t body;
   size_t end;
 };
+
+// What ends the lines of a section: what ends its header.
+LineEnds LineEndsOf(std::string_view text, const SectionPlace& place);
+
+// The lines of a section's body.
+inline Lines LinesOf(std::string_view text, const SectionPlace& place) {
+  return Lines(Slice(text, place.body, place.end), LineEndsOf(text, place));
+}
 
 // Walks a text section by section.
 class Sections {
@@ -109,9 +123,10 @@ struct LinePlace {
 };
 std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, ValueForm form);
 
-// Appends the line of a pair in the format of the caller ("%s" twice). EINVAL when the format is another, or when the
-// line would not read back as that pair in that form.
-Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form);
+// Appends the line of a pair in the format of the caller ("%s" twice). Among lines that end in CR LF, a value that ends
+// in a carriage return gets one more, since that line's end takes one away. EINVAL when the format is another, or when
+// the line would not read back as that pair in that form.
+Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, LineEnds ends = LineEnds::kLf);
 
 // Appends a section's header; EINVAL when it would not read back as that name.
 Status AppendHeader(Bytes& to, std::string_view name);

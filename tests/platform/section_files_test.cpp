@@ -57,6 +57,32 @@ TEST_F(SectionFile, AppendsItsSectionsToAList) {
   EXPECT_THAT(list.items(), ElementsAre("b", "c", "b", "c"));
 }
 
+// A value that ended in a carriage return lost it, wherever it stood.
+TEST_F(SectionFile, HasLinesThatEndAsItsHeaderDoes) {
+  const struct {
+    std::string_view text;
+    const char* szValue;
+  } rows[] = {
+      {"[a]\r\nKEY=value\r\n", "value"},
+      {"[a]\r\nKEY=value\n", "value"},
+      {"[a]\r\nKEY=value\r\r\n", "value\r"},
+      {"[a]\r\nKEY=\r\n", ""},
+      {"[a]\r\nKEY=\r\r\n", "\r"},
+      {"[a]\r\nKEY=value", "value"},
+      {"[a]\r\nKEY=value\r", "value"},
+      {"[ a ] \r\nKEY=value\r\n", "value"},
+      {"[b]\r\nKEY=b\r\n[a]\nKEY=value\r\n", "value\r"},
+      {"[b]\nKEY=b\n[a]\r\nKEY=value\r\n", "value"},
+      {"[a]\nKEY=value\r\n[b]\r\n", "value\r"},
+  };
+  for (const auto& row : rows) {
+    WriteFile(kFile, row.text);
+    TextHash hash;
+    EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
+    EXPECT_EQ(hash["KEY"], row.szValue) << row.text;
+  }
+}
+
 TEST_F(SectionFile, GivesEachValueAsExactlyTheBytesBehindTheEqualsSign) {
   const struct {
     std::string_view line;
@@ -67,7 +93,9 @@ TEST_F(SectionFile, GivesEachValueAsExactlyTheBytesBehindTheEqualsSign) {
       {"\tKEY=value\n", "KEY", "value"},
       {" KEY \t=value\n", "KEY", "value"},
       {"KEY=value", "KEY", "value"},
-      {"KEY=value\r\n", "KEY", "value"},
+      {"KEY=value\r\n", "KEY", "value\r"},
+      {"KEY=\r\n", "KEY", "\r"},
+      {"KEY=\r", "KEY", "\r"},
       {"KEY= value \t\n", "KEY", " value \t"},
       {"KEY=\"value\"\n", "KEY", "\"value\""},
       {"KEY=a=b\n", "KEY", "a=b"},

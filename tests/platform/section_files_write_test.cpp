@@ -85,6 +85,8 @@ TEST_F(SectionFileThatIsWritten, HasThePairsOfOneSectionReplacedAndNoOtherByte) 
       {"HEAD=1\n[b]\nK=b\n [ A ] \r\nK=a\n[c]\nK=c", "HEAD=1\n[b]\nK=b\n [ A ] \r\n\tK=1\n\tL=2\n[c]\nK=c"},
       {"[a]\n# first\n\nK=x\n# between\nOLD=y\n\n; last\n\n[b]\n",
        "[a]\n# first\n\n\tK=1\n\tL=2\n# between\n\n; last\n\n[b]\n"},
+      {"[a]\r\n# first\r\nK=x\r\n# last\r\n[b]\r\n", "[a]\r\n# first\r\n\tK=1\n\tL=2\n# last\r\n[b]\r\n"},
+      {"[a]\r\nK=x", "[a]\r\n\tK=1\n\tL=2\n"},
       {"[a]\njunk\n[b]\n", "[a]\n\tK=1\n\tL=2\njunk\n[b]\n"},
       {"[a]\n#last", "[a]\n\tK=1\n\tL=2\n#last"},
       {"[a]\nK=x\n[a]\nK=second\n", "[a]\n\tK=1\n\tL=2\n[a]\nK=second\n"},
@@ -129,11 +131,19 @@ TEST_F(SectionFileThatIsWritten, HasOneKeyOfOneSectionSetAndNoOtherByte) {
 }
 
 TEST_F(SectionFileThatIsWritten, GivesBackEveryValueThatItTook) {
-  for (const char* szValue : {"", " ", "\t", "#", "[x]", "a=b", "\"q\"", "%s%n", "\xFF\xFE", "two words ", "\r x"}) {
-    SetValue("[a]\n", "KEY", szValue);
-    TextHash hash;
-    EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
-    EXPECT_EQ(hash["KEY"], szValue);
+  for (const char* szBefore : {"[a]\n", "[a]\r\n", "[a]\r", "[a]\r\nKEY=x", "[a]\r\nKEY=x\r\n[b]\n", "[b]\r\n"}) {
+    for (const char* szValue : {"", " ", "\t", "#", "[x]", "a=b", "\"q\"", "%s%n", "\xFF\xFE", "two words ", "\r x",
+                                "\r", "\r\r", "ends\r", "\rends\r\r"}) {
+      SetValue(szBefore, "KEY", szValue);
+      TextHash hash;
+      EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
+      EXPECT_EQ(hash["KEY"], szValue) << szBefore;
+      ASSERT_EQ(PLIBCFileSetSection(kFile, "a", nullptr, hash.get(), kFormat), 1);
+      ASSERT_EQ(PLIBCFileSetSection(kFile, "a", "a", hash.get(), kFormat), 1);
+      TextHash again;
+      EXPECT_EQ(PLIBCFileGetSection(kFile, "a", again.address()), 1);
+      EXPECT_EQ(again["KEY"], szValue) << szBefore;
+    }
   }
 }
 
@@ -150,8 +160,8 @@ TEST_F(SectionFileThatIsWritten, IsForTheOwnerAloneWhenItIsMade) {
 
 TEST_F(SectionFileThatIsWritten, StaysWhenAPairWouldNotReadBack) {
   const TextHash::Pairs pairs = {
-      {"KEY", "two\nlines"}, {"KEY", "line\n"}, {"KEY", "v\n[b]"}, {"KEY", "ends\r"}, {"", "v"},      {"A=B", "v"},
-      {"#KEY", "v"},         {";KEY", "v"},     {" KEY", "v"},     {"KEY ", "v"},     {"K\nEY", "v"}, {"[KEY", "v]"},
+      {"KEY", "two\nlines"}, {"KEY", "line\n"}, {"KEY", "v\n[b]"}, {"", "v"},      {"A=B", "v"},   {"#KEY", "v"},
+      {";KEY", "v"},         {" KEY", "v"},     {"KEY ", "v"},     {"K\nEY", "v"}, {"[KEY", "v]"},
   };
   for (const auto& [key, value] : pairs) {
     WriteFile(kFile, "[a]\n\tKEY=old\n");

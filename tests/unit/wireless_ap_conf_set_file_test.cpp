@@ -314,7 +314,7 @@ TEST_F(SavedApSettings, StayAsTheyAreWhenAnEncryptionIsRefused) {
 TEST_F(SavedApSettings, StayAsTheyAreWhenATextCouldNotBeReadBack) {
   const std::string from = "section: " + kModel + " from " + kSettings + ", errno=0x300";
   for (const TextKey& key : kTextKeys) {
-    for (const std::string text : {"\n", "two\nlines", "end\n", "\r", "return\r", "a\n[AR-9271]"}) {
+    for (const std::string text : {"\n", "two\nlines", "end\n", "a\n[AR-9271]"}) {
       fake::Begin();
       const bool isOfWep = std::strstr(key.szWith, "encryption=1") != nullptr;
       const bool isOfEap = std::strstr(key.szWith, "encryption=3") != nullptr;
@@ -465,7 +465,6 @@ class AnyRecord {
   std::string Text(size_t longest) {
     std::string text(Below(4) == 0 ? longest : Below(longest + 1), ' ');
     for (char& c : text) c = Byte();
-    if (text.ends_with('\r')) text.back() = ' ';
     return text;
   }
 
@@ -476,6 +475,8 @@ TEST_F(SavedApSettings, SurviveFieldByFieldWhateverTheBytes) {
   AnyRecord any(7);
   for (int i = 0; i < 300; ++i) {
     conf_ = any.Next();
+    // What is there already may come from a machine that ends its lines in CR LF.
+    if (i % 3 == 0) WriteText(kSettings, "[" + std::string(conf_.szSecName) + "]\r\n\tenable=no\r\n");
     ExpectSaved();
     MERO_AP_CONF expected = ReadBack(conf_);
     expected.blEnable = TRUE;

@@ -97,7 +97,7 @@ TEST_F(SavedFile, HoldsValuesAsTheyStandInTheRecord) {
     for (int byte = 1; byte < 256; ++byte) {
       if (byte != '\n' && byte != '\r') bytes += static_cast<char>(byte);
     }
-    return bytes;
+    return bytes + '\r';
   }();
   std::strcpy(config_.szKey, every.c_str());
   std::strcpy(config_.szIp, "");
