@@ -34,44 +34,57 @@ Json JsonOf(const Table& table, std::size_t row) {
   return record;
 }
 
+// A code of UTF-16, as JSON writes it out.
+std::string WrittenOut(char32_t code) {
+  char szCode[sizeof "\\u001b"];
+  std::snprintf(szCode, sizeof szCode, "\\u%04x", static_cast<unsigned int>(code & 0xFFFF));
+  return szCode;
+}
+
+// Only within strings can a document hold what is not shown.
+std::string InDocument(const Character& character) {
+  constexpr char32_t kPairs = 0x10000;
+  if (character.shown) return std::string(character.bytes);
+  if (character.code < kPairs) return WrittenOut(character.code);
+  const char32_t code = character.code - kPairs;
+  return WrittenOut(0xD800 + (code >> 10)) + WrittenOut(0xDC00 + (code & 0x3FF));
+}
+
 // Names are bytes: what is no UTF-8 in them is replaced, and stands in full in a field of its own.
-void PutDocument(const Json& document) {
-  Put(document.dump(-1, ' ', false, Json::error_handler_t::replace) + "\n");
+void PutDocument(const Json& document, bool utf8) {
+  Put(Rewritten(document.dump(-1, ' ', false, Json::error_handler_t::replace), utf8, InDocument) + "\n");
 }
 
 // ---- Porcelain: one record a line, its fields between tabs ----
 
-// As the %b of printf reads it. Other bytes than these do nothing to a terminal.
-std::string Escaped(char byte) {
-  if (byte == '\t') return "\\t";
-  if (byte == '\n') return "\\n";
-  if (byte == '\\') return "\\\\";
-  const bool control = static_cast<unsigned char>(byte) < ' ' || byte == '\x7F';
-  if (!control) return {byte};
-  char szOctal[sizeof "\\0033"];
-  std::snprintf(szOctal, sizeof szOctal, "\\0%03o", static_cast<unsigned int>(byte));
-  return szOctal;
+// As the %b of printf reads it.
+std::string InLine(const Character& character) {
+  if (character.bytes == "\t") return "\\t";
+  if (character.bytes == "\n") return "\\n";
+  if (character.bytes == "\\") return "\\\\";
+  if (character.shown) return std::string(character.bytes);
+  std::string octal;
+  for (char byte : character.bytes) {
+    char szByte[sizeof "\\0033"];
+    std::snprintf(szByte, sizeof szByte, "\\0%03o", static_cast<unsigned int>(static_cast<unsigned char>(byte)));
+    octal += szByte;
+  }
+  return octal;
 }
 
-std::string Escaped(std::string_view text) {
-  std::string escaped;
-  for (char byte : text) escaped += Escaped(byte);
-  return escaped;
-}
-
-std::string LineOf(const Value& value) {
+std::string LineOf(const Value& value, bool utf8) {
   return std::visit(Overloaded{[](std::nullptr_t) { return std::string(); },
                                [](bool held) { return std::string(held ? "yes" : "no"); },
                                [](std::int64_t held) { return std::to_string(held); },
-                               [](const std::string& held) { return Escaped(held); }},
+                               [=](const std::string& held) { return Rewritten(held, utf8, InLine); }},
                     value);
 }
 
-void PutLines(const Table& table) {
+void PutLines(const Table& table, bool utf8) {
   for (const auto& row : table.rows) {
     for (std::size_t i = 0; i < row.size(); ++i) {
       if (i > 0) Put("\t");
-      Put(LineOf(row[i].value));
+      Put(LineOf(row[i].value, utf8));
     }
     Put("\n");
   }
@@ -183,11 +196,11 @@ void Output::WritePairs(const Table& table) const {
 }
 
 void Output::WriteList(std::string_view name, Table table, std::string_view none) const {
-  if (form_ == Form::kPorcelain) return PutLines(table);
+  if (form_ == Form::kPorcelain) return PutLines(table, MachinesSeeUtf8());
   if (form_ == Form::kJson) {
     Json records = Json::array();
     for (std::size_t row = 0; row < table.rows.size(); ++row) records.push_back(JsonOf(table, row));
-    return PutDocument({{"result", "ok"}, {std::string(name), records}});
+    return PutDocument({{"result", "ok"}, {std::string(name), records}}, MachinesSeeUtf8());
   }
   if (table.rows.empty()) return Done(std::string(none));
   LeaveWhatIsShown(table);
@@ -195,15 +208,16 @@ void Output::WriteList(std::string_view name, Table table, std::string_view none
 }
 
 void Output::WriteOne(std::string_view name, Table table) const {
-  if (form_ == Form::kPorcelain) return PutLines(table);
-  if (form_ == Form::kJson) return PutDocument({{"result", "ok"}, {std::string(name), JsonOf(table, 0)}});
+  if (form_ == Form::kPorcelain) return PutLines(table, MachinesSeeUtf8());
+  if (form_ == Form::kJson)
+    return PutDocument({{"result", "ok"}, {std::string(name), JsonOf(table, 0)}}, MachinesSeeUtf8());
   LeaveWhatIsShown(table);
   WritePairs(table);
 }
 
 void Output::Done(const std::string& sentence) const {
   if (form_ == Form::kHuman) ::Put(sentence + "\n");
-  if (form_ == Form::kJson) PutDocument({{"result", "ok"}});
+  if (form_ == Form::kJson) PutDocument({{"result", "ok"}}, MachinesSeeUtf8());
 }
 
 void Output::Failed(const Failure& failure) const {
@@ -211,5 +225,6 @@ void Output::Failed(const Failure& failure) const {
   PutDocument({{"result", "failed"},
                {"code", static_cast<int>(failure.exit())},
                {"error", failure.what()},
-               {"advice", failure.advice()}});
+               {"advice", failure.advice()}},
+              MachinesSeeUtf8());
 }

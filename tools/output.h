@@ -118,6 +118,9 @@ class Output {
     return table;
   }
 
+  // What machines read does not depend on the locale. A terminal may take the bytes of UTF-8 for other characters.
+  bool MachinesSeeUtf8() const { return terminal_.width == 0 || terminal_.utf8; }
+
   Shown Show(const Value& value) const;
   void WriteList(std::string_view name, Table table, std::string_view none) const;
   void WriteOne(std::string_view name, Table table) const;

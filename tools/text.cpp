@@ -12,7 +12,7 @@
 namespace {
 
 // The character that a text begins with; size 1 and not valid where it begins with none.
-struct Character {
+struct Start {
   char32_t code;
   std::size_t size;
   bool valid;
@@ -20,11 +20,11 @@ struct Character {
 
 constexpr char32_t kLeast[] = {0, 0, 0x80, 0x800, 0x10000};
 
-Character FirstOf(std::string_view text) {
+Start FirstOf(std::string_view text) {
   const auto lead = static_cast<unsigned char>(text.front());
   if (lead < 0x80) return {lead, 1, true};
   const std::size_t size = lead >= 0xF0 ? 4 : lead >= 0xE0 ? 3 : 2;
-  const Character invalid{lead, 1, false};
+  const Start invalid{lead, 1, false};
   if (lead < 0xC2 || lead > 0xF4 || text.size() < size) return invalid;
 
   auto code = static_cast<char32_t>(lead & (0x7F >> size));
@@ -33,7 +33,7 @@ Character FirstOf(std::string_view text) {
     code = code << 6 | static_cast<char32_t>(byte & 0x3F);
   }
   const bool surrogate = code >= 0xD800 && code <= 0xDFFF;
-  return code < kLeast[size] || code > 0x10FFFF || surrogate ? invalid : Character{code, size, true};
+  return code < kLeast[size] || code > 0x10FFFF || surrogate ? invalid : Start{code, size, true};
 }
 
 struct Range {
@@ -48,13 +48,13 @@ constexpr Range kUnseen[] = {
     {0xE000, 0xF8FF}, {0xFE00, 0xFE0F}, {0xFEFF, 0xFEFF}, {0xFFF0, 0xFFFB}, {0xE0000, 0x10FFFF},
 };
 
-bool IsShown(const Character& character, bool utf8) {
+bool IsShown(const Start& character, bool utf8) {
   if (!character.valid || (!utf8 && character.code > 0x7E)) return false;
   return std::ranges::none_of(
       kUnseen, [&](const Range& range) { return character.code >= range.first && character.code <= range.last; });
 }
 
-std::size_t WidthOf(const Character& character) {
+std::size_t WidthOf(const Start& character) {
   if (character.code < 0x80) return 1;
   const int width = ::wcwidth(static_cast<wchar_t>(character.code));
   return width < 0 ? 1 : static_cast<std::size_t>(width);
@@ -62,29 +62,32 @@ std::size_t WidthOf(const Character& character) {
 
 }  // namespace
 
-std::string Harmless(std::string_view bytes, bool utf8) {
-  std::string shown;
-  while (!bytes.empty()) {
-    const Character character = FirstOf(bytes);
-    const std::string_view own = bytes.substr(0, character.size);
-    // A backslash is doubled, so that nothing on the air looks like what is written out here.
-    if (own == "\\") {
-      shown += "\\\\";
-    } else if (IsShown(character, utf8)) {
-      shown += own;
-    } else {
-      for (char byte : own) shown += "\\x" + Hex({&byte, 1});
-    }
-    bytes.remove_prefix(character.size);
+std::string Rewritten(std::string_view text, bool utf8, std::string (*write)(const Character&)) {
+  std::string rewritten;
+  while (!text.empty()) {
+    const Start first = FirstOf(text);
+    rewritten += write({text.substr(0, first.size), first.code, IsShown(first, utf8)});
+    text.remove_prefix(first.size);
   }
-  return shown;
+  return rewritten;
+}
+
+std::string Harmless(std::string_view bytes, bool utf8) {
+  return Rewritten(bytes, utf8, [](const Character& character) {
+    // A backslash is doubled, so that nothing on the air looks like what is written out here.
+    if (character.bytes == "\\") return std::string("\\\\");
+    if (character.shown) return std::string(character.bytes);
+    std::string written;
+    for (char byte : character.bytes) written += "\\x" + Hex({&byte, 1});
+    return written;
+  });
 }
 
 std::size_t WidthOf(std::string_view text, bool utf8) {
   if (!utf8) return text.size();
   std::size_t width = 0;
   while (!text.empty()) {
-    const Character character = FirstOf(text);
+    const Start character = FirstOf(text);
     width += WidthOf(character);
     text.remove_prefix(character.size);
   }
@@ -97,7 +100,7 @@ std::string CutToWidth(std::string_view text, std::size_t width, bool utf8) {
   std::string cut;
   std::size_t room = width > 0 ? width - 1 : 0;
   while (!text.empty()) {
-    const Character character = FirstOf(text);
+    const Start character = FirstOf(text);
     const std::size_t needed = utf8 ? WidthOf(character) : 1;
     if (needed > room) break;
     room -= needed;
@@ -109,7 +112,7 @@ std::string CutToWidth(std::string_view text, std::size_t width, bool utf8) {
 
 bool IsUtf8(std::string_view bytes) {
   while (!bytes.empty()) {
-    const Character character = FirstOf(bytes);
+    const Start character = FirstOf(bytes);
     if (!character.valid) return false;
     bytes.remove_prefix(character.size);
   }

@@ -8,6 +8,16 @@
 #include <string>
 #include <string_view>
 
+// A character of a text, or a byte that belongs to none.
+struct Character {
+  std::string_view bytes;
+  char32_t code;
+  bool shown;  // neither commands a terminal, nor hides, nor reorders what stands around it
+};
+
+// `text` with each character as `write` writes it. Without `utf8` none is shown that is not ASCII.
+std::string Rewritten(std::string_view text, bool utf8, std::string (*write)(const Character&));
+
 // `bytes` with everything written out as \xNN that is no printable text, so that it can neither command a terminal nor
 // reorder what stands around it. Without `utf8` that is all but ASCII.
 std::string Harmless(std::string_view bytes, bool utf8);

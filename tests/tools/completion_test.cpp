@@ -153,8 +153,9 @@ class CompletionOfNames : public Completion {
  protected:
   CompletionOfNames() {
     std::vector<WIRELESS_NETWORK_CONFIG> configs;
-    for (const char* szName : {"Home", "Cafe Deluxe", "co:lon one", "me@home", "pay $me", "Hey!You", "back\\slash",
-                               "it's \"it\"", "Guests'", "tab\tbed", "-dash", "a=b", "Größe"}) {
+    for (const char* szName :
+         {"Home", "Cafe Deluxe", "co:lon one", "me@home", "pay $me", "Hey!You", "back\\slash", "it's \"it\"", "Guests'",
+          "tab\tbed", "-dash", "a=b", "Größe", "back\\0slash", "mark\u202Eed"}) {
       configs.emplace_back().network = library::Network(szName);
     }
     library::Known(configs);
@@ -169,7 +170,8 @@ TEST_P(CompletionOfNames, WritesThemAsOneArgument) {
       {"forget Cafe\\ D\tx", "<forget><Cafe Deluxe><x>"},
       {"forget pay\tx", "<forget><pay $me><x>"},
       {"forget Hey\tx", "<forget><Hey!You><x>"},
-      {"forget back\tx", "<forget><back\\slash><x>"},
+      {"forget back\\\\s\tx", "<forget><back\\slash><x>"},
+      {"forget back\\\\0\tx", "<forget><back\\0slash><x>"},
       {"forget it\tx", "<forget><it's \"it\"><x>"},
       {"forget Gr\tx", "<forget><Größe><x>"},
   });
@@ -193,7 +195,7 @@ TEST_P(CompletionOfNames, GoesOnInOpenedQuotes) {
       {"forget 'Cafe D\tx", "<forget><Cafe Deluxe><x>"},
       {"forget \"co:\tx", "<forget><co:lon one><x>"},
       {"forget \"pay\tx", "<forget><pay $me><x>"},
-      {"forget \"back\tx", "<forget><back\\slash><x>"},
+      {"forget \"back\\\\s\tx", "<forget><back\\slash><x>"},
       {"forget \"it\tx", "<forget><it's \"it\"><x>"},
       {"forget 'it\tx", "<forget><it's \"it\"><x>"},
       {"forget 'Guests\tx", "<forget><Guests'><x>"},
@@ -207,6 +209,11 @@ TEST_P(CompletionOfNames, LeavesOutThoseThatWouldBeOptions) {
 
 TEST_P(CompletionOfNames, OffersNoneInTheWayThatPorcelainWritesIt) {
   EXPECT_THAT(Given(std::string("forget ") + kAll), AllOf(HasSubstr("<Home>"), Not(HasSubstr("tab\\tbed"))));
+}
+
+// A mark of direction was put into the line, as if it could be seen.
+TEST_P(CompletionOfNames, HidesNothingInTheLine) {
+  EXPECT_THAT(Given(std::string("forget ") + kAll), AllOf(HasSubstr("<Home>"), Not(HasSubstr("\u202E"))));
 }
 
 std::string NameOf(const testing::TestParamInfo<Shell>& of) {

@@ -3,9 +3,11 @@
 #include <unistd.h>
 
 #include <cstdio>
+#include <nlohmann/json.hpp>
 
 #include "program.h"
 #include "running.h"
+#include "text.h"
 
 using library::Network;
 using testing::HasSubstr;
@@ -59,6 +61,100 @@ TEST_F(Output, KeepsNamesFromBreakingALineForScripts) {
 TEST_F(Output, ShowsPeopleControlCharactersOfNamesWithoutTheirEffect) {
   library::InRange({Network("\x1b[2Jgone\r\u202Exyz\xff")});
   EXPECT_THAT(Tool({"scan"}).out, HasSubstr("\n\\x1b[2Jgone\\x0d\\xe2\\x80\\xaexyz\\xff  "));
+}
+
+// Everything that a terminal may act on: all bytes by themselves, the controls of both kinds as characters, and what
+// hides or reorders others.
+std::vector<std::string> EveryHostileName() {
+  std::vector<std::string> names;
+  for (int byte = 1; byte <= 0xFF; ++byte) names.push_back({'a', static_cast<char>(byte), 'z'});
+  for (int byte = 0x80; byte <= 0x9F; ++byte) names.push_back({'a', '\xC2', static_cast<char>(byte), 'z'});
+  for (const char* szName : {"a\u00ADz", "a\u061Cz", "a\u200Bz", "a\u202Ez", "a\u2028z", "a\u2066z", "a\uFEFFz",
+                             "a\uE000z", "a\U000E0001z", "a\U0010FFFFz"}) {
+    names.emplace_back(szName);
+  }
+  return names;
+}
+
+std::vector<WIRELESS_NETWORK> Named(const std::vector<std::string>& names) {
+  std::vector<WIRELESS_NETWORK> networks;
+  for (const std::string& name : names) networks.push_back(Network(name.c_str()));
+  return networks;
+}
+
+// DEL, the controls from U+0080 to U+009F, the bytes that they have beyond UTF-8, and marks of direction passed through
+// the forms for machines.
+TEST_F(Output, CommandsNoTerminalInAnyForm) {
+  const std::vector<std::string> names = EveryHostileName();
+  library::InRange(Named(names));
+  for (const char* szForm : {"--verbose", "--json", "--porcelain"}) {
+    std::string out = Tool({"scan", szForm}).out;
+    EXPECT_GE(out.size(), names.size() * std::strlen("a?z"));
+    std::erase_if(out, [](char byte) { return byte == '\n' || byte == '\t'; });
+    Rewritten(out, true, [](const Character& character) {
+      EXPECT_TRUE(character.shown) << Hex(character.bytes);
+      return std::string();
+    });
+  }
+}
+
+TEST_F(Output, WritesOutInJsonWhatIsNotShown) {
+  library::InRange(
+      {Network("\x1b[2J\x7f\xc2\x9b"
+               "1m\xe2\x80\xae\xf3\xa0\x80\x81\x9b\xc3\xa9")});
+  EXPECT_THAT(Tool({"scan", "--json"}).out,
+              HasSubstr("\"name\":\"\\u001b[2J\\u007f\\u009b1m\\u202e\\udb40\\udc01\xef\xbf\xbd\xc3\xa9\","));
+}
+
+TEST_F(Output, GivesEveryNameAsItIsInJson) {
+  const std::vector<std::string> names = EveryHostileName();
+  library::InRange(Named(names));
+  const auto networks = nlohmann::json::parse(Tool({"scan", "--json"}).out)["networks"];
+  ASSERT_EQ(networks.size(), names.size());
+  for (std::size_t i = 0; i < names.size(); ++i) {
+    if (IsUtf8(names[i])) {
+      EXPECT_EQ(networks[i]["name"], names[i]);
+      EXPECT_EQ(networks[i]["name_hex"], nullptr);
+    } else {
+      EXPECT_EQ(networks[i]["name_hex"], Hex(names[i]));
+    }
+  }
+}
+
+TEST_F(Output, WritesOutForScriptsWhatIsNotShown) {
+  library::InRange(
+      {Network("\x1b[2J\x7f\xc2\x9b"
+               "1m\xe2\x80\xae\xf3\xa0\x80\x81\x9b\xc3\xa9")});
+  EXPECT_THAT(
+      Tool({"scan", "--porcelain"}).out,
+      testing::StartsWith("\\0033[2J\\0177\\0302\\02331m\\0342\\0200\\0256\\0363\\0240\\0200\\0201\\0233\xc3\xa9\t"));
+}
+
+TEST_F(Output, GivesScriptsEveryNameAsItIsThroughPrintf) {
+  std::string names;
+  for (const std::string& name : EveryHostileName()) names += name + ".";
+  library::InRange(Named(EveryHostileName()));
+  WriteText("/tmp/lines", Tool({"scan", "--porcelain"}).out);
+  FILE* pipe = ::popen("cut -f 1 /tmp/lines | while IFS= read -r name; do printf '%b.' \"$name\"; done", "r");
+  std::string read;
+  for (int c; (c = std::fgetc(pipe)) != EOF;) read += static_cast<char>(c);
+  ::pclose(pipe);
+  EXPECT_EQ(read, names);
+}
+
+// In it the second byte of this letter is a control.
+TEST_F(Output, OfAllFormsIsAsciiOnATerminalThatIsNot) {
+  library::InRange({Network("\u00DB")});
+  const Surroundings surroundings{.environment = {{"LC_ALL", "C"}, {"NO_COLOR", "1"}}};
+  EXPECT_THAT(ToolOnTerminal({"scan"}, 80, surroundings).out, HasSubstr("\n\\xc3\\x9b "));
+  EXPECT_THAT(ToolOnTerminal({"scan", "--json"}, 80, surroundings).out, HasSubstr(R"("name":"\u00db")"));
+  EXPECT_THAT(ToolOnTerminal({"scan", "--porcelain"}, 80, surroundings).out, testing::StartsWith("\\0303\\0233\t"));
+}
+
+TEST_F(Output, ForMachinesDoesNotDependOnTheLocale) {
+  for (const char* szForm : {"--json", "--porcelain"}) {
+    EXPECT_EQ(Tool({"scan", szForm}, {.environment = {{"LC_ALL", "C"}}}).out, Tool({"scan", szForm}).out);
+  }
 }
 
 TEST_F(Output, GivesAllBytesOfANameThatIsNoTextInJson) {

@@ -1,11 +1,13 @@
 # Completion of merowireless for bash.
 
 # The names of the known networks, quoted; those in range would take a scan. Left out are those that would be options,
-# and those with characters that cannot be typed, which are quoted as $'...'.
+# and those with characters that cannot be typed: the program writes them out, or they are quoted as $'...'.
 _merowireless_names() {
   local line name
   while IFS= read -r line; do
-    printf -v name %b "${line%%$'\t'*}"
+    name=${line%%$'\t'*}
+    [[ ${name//\\\\/} != *\\0* ]] || continue
+    printf -v name %b "$name"
     printf -v name %q "$name"
     [[ $name == [-\$\']* ]] || printf '%s\n' "$name"
   done < <(merowireless --porcelain known 2>/dev/null </dev/null)
