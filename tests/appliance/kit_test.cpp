@@ -2,7 +2,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 
 #include <cstdio>
 #include <filesystem>
@@ -10,38 +9,14 @@
 #include <string>
 #include <vector>
 
+#include "shell.h"
+
 namespace fs = std::filesystem;
 
 namespace {
 
 using testing::HasSubstr;
 using testing::StartsWith;
-
-struct Ran {
-  int status;
-  std::string output;  // of both kinds
-};
-
-Ran RunInShell(const std::string& command) {
-  FILE* pipe = ::popen(("{ " + command + "\n} 2>&1").c_str(), "r");
-  Ran ran = {-1, ""};
-  for (int c; (c = std::fgetc(pipe)) != EOF;) ran.output += static_cast<char>(c);
-  const int status = ::pclose(pipe);
-  ran.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  return ran;
-}
-
-void Write(const std::string& path, const std::string& text) {
-  fs::create_directories(fs::path(path).parent_path());
-  std::ofstream(path) << text;
-}
-
-// A program that stands before the machine's own of that name.
-void Install(const std::string& name, const std::string& script) {
-  const std::string path = "/tmp/bin/" + name;
-  Write(path, "#!/bin/sh\n" + script);
-  ::chmod(path.c_str(), 0755);
-}
 
 // Has the parts do something, as the scripts would.
 Ran RunInParts(const std::string& command) {
