@@ -74,7 +74,7 @@ enter_system() { # ARCHIVE DIRECTORY
   tar --extract --file "$1" --directory "$root"
   mount -t proc proc "$root/proc"
   mount -t sysfs -o ro sys "$root/sys"
-  mkdir "$root/tmp/packages" "$root/tmp/upgrades"
+  mkdir "$root/tmp/packages" "$root/tmp/upgrades" "$root/tmp/failing"
   cp "$2"/*.deb "$root/tmp/packages/"
 }
 
@@ -101,13 +101,17 @@ files() {
 
 names() { (cd "$root/tmp/packages" && printf '%s\n' *.deb | sed 's/_.*//'); }
 
-# The same packages, of a later version.
+# The same packages, of a later version; and the kit of one that cannot be installed.
 make_upgrades() {
   local package work=$root/tmp/work
   for package in "$root"/tmp/packages/*.deb; do
     dpkg-deb --raw-extract "$package" "$work"
     sed -Ei 's/^(Version: .*)/\1+later/; s/(\(= [^)]*)\)/\1+later)/' "$work/DEBIAN/control"
     dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/upgrades/${package##*/}" >/dev/null
+    if [[ $package == */merowireless-appliance_* ]]; then
+      sed -i '1a exit 1' "$work/DEBIAN/preinst"
+      dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/failing/${package##*/}" >/dev/null
+    fi
     rm -r "$work"
   done
 }
@@ -232,6 +236,71 @@ start_daemon() {
 
 daemon_has_ended() { [[ ! -e $root/proc/$daemon ]]; }
 
+# ---- What somebody has put in the way ---------------------------------------------------------------------------
+
+# Where anyone may put things, and what is busy to whoever removes it.
+readonly in_the_way=(/tmp/wireless.info /var/tmp/.wireless_connecting "$note") busy=/var/tmp/.wireless_ap_connecting
+
+put_things_in_the_way() {
+  mkdir -p "$root${in_the_way[0]}" "$root/run/rc.network"
+  echo "somebody's" >"$root${in_the_way[0]}/thesis"
+  echo "somebody's" >"$root/var/tmp/diary"
+  ln -sf diary "$root${in_the_way[1]}"
+  rm -f "$root${in_the_way[2]}"
+  mkfifo "$root${in_the_way[2]}"
+  touch "$root$busy"
+  mount --bind /dev/null "$root$busy"
+  echo 'rubbish; exit' >"$root/run/rc.network/hostapd-wlan0.pid"
+}
+
+# It comes as a link, which leads elsewhere from here.
+break_start_script() {
+  rm "$root/etc/rc.network"
+  printf '#!/bin/sh\nfi\n' >"$root/etc/rc.network"
+  chmod 755 "$root/etc/rc.network"
+}
+
+take_them_away() {
+  umount "$root$busy"
+  rm -r "$root${in_the_way[0]}"
+}
+
+things_are_kept() {
+  [[ $(<"$root${in_the_way[0]}/thesis") == "somebody's" && $(<"$root/var/tmp/diary") == "somebody's" ]]
+}
+
+failing_upgrade_is_undone() {
+  ! inside sh -c 'dpkg --install /tmp/failing/*.deb' >/dev/null 2>&1 && is_installed && ! is_upgraded
+}
+
+is_installed() {
+  # shellcheck disable=SC2016  # the field is dpkg's
+  [[ $(inside dpkg-query --show --showformat '${db:Status-Status}' merowireless-appliance) == installed ]]
+}
+
+# A script of the version that is there may fail: the later one's is run in its place.
+upgrades_from_broken_scripts() {
+  local script
+  for script in prerm postrm; do
+    sed -i '1a exit 1' "$root/var/lib/dpkg/info/merowireless-appliance.$script"
+  done
+  install_from upgrades && is_upgraded && is_installed
+}
+
+removal_tells() { # TEXT...
+  local said text
+  said=$(inside apt-get --yes -o Dpkg::Use-Pty=0 remove "${ours[@]}" 2>&1) || {
+    printf '%s\n' "$said" >&2
+    return 1
+  }
+  for text; do
+    [[ $said == *"$text"* ]] || {
+      printf 'nothing tells: %s\n%s\n' "$text" "$said" >&2
+      return 1
+    }
+  done
+}
+
 # Files that there are now and were not, or the reverse, or that are others: the settings, and what a pattern names.
 only_settings_are_new() { # [PATTERN]
   diff <(printf '%s\n' "${settings[@]#/}" | sort) \
@@ -289,6 +358,22 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'the packages can be purged' quietly inside dpkg --purge "${ours[@]}"
   check 'settings are kept when packages are purged' settings_are_kept
   check 'when packages are purged, nothing but settings is left' only_settings_are_new
+
+  check 'the packages can be installed after all' install_from packages
+  put_things_in_the_way
+  check 'an upgrade that fails is undone, whatever lies about' failing_upgrade_is_undone
+  check 'the packages can be upgraded from broken ones, whatever lies about' upgrades_from_broken_scripts
+  check 'the listing tool passes on after all that' iwlist_passes_on
+  break_start_script
+  check 'the packages can be removed, whatever lies about, and tell of what stays' removal_tells \
+    "rm: cannot remove '${in_the_way[0]}'" "rm: cannot remove '$busy'" 'the access point on wlan0 may still run'
+  check 'what somebody has put in the way is kept' things_are_kept
+  check 'the ordinary listing tool is back after all' iwlist_passes_on
+  check 'the packages can be purged, whatever lies about' quietly inside dpkg --purge "${ours[@]}"
+  take_them_away
+  check 'the packages can be purged once more' quietly inside dpkg --purge "${ours[@]}"
+  rm "$root$busy" "$root/var/tmp/diary"
+  check 'nothing but settings is left after all' only_settings_are_new
 
   [[ $failures -eq 0 ]]
 }

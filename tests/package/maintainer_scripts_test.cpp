@@ -1,0 +1,201 @@
+// The scripts that dpkg runs when packages come and go, among things that somebody has put in their way.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+
+#include <filesystem>
+#include <string>
+#include <vector>
+
+#include "shell.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::Not;
+
+constexpr char kAdapter[] = "/tmp/wireless.info";
+constexpr char kState[] = "/run/rc.network";
+constexpr char kStart[] = "/etc/rc.network";
+constexpr char kConnection[] = "/usr/mero/etc/wpa_supplicant.conf";
+
+// What stands in directories that anyone may write, and what the scripts remove.
+const std::vector<std::string> kPublic = {"/var/tmp/.wireless_connecting", "/var/tmp/.wireless_current_connection",
+                                          "/var/tmp/.wireless_ap_connecting", kAdapter};
+
+Ran Script(const std::string& name, const std::string& arguments) {
+  return RunInShell("PATH=/tmp/bin:$PATH sh " PACKAGE_SCRIPTS "/" + name + " " + arguments);
+}
+
+// What dpkg has of the scripts when the packages are removed, in its order.
+Ran Remove(const std::string& how = "remove") {
+  Ran all = {0, ""};
+  const std::vector<std::string> scripts =
+      how == "remove"
+          ? std::vector<std::string>{"merowireless-appliance.prerm remove", "merowireless-appliance.postrm remove",
+                                     "libmerowireless-core1.postrm remove"}
+          : std::vector<std::string>{"merowireless-appliance.postrm purge", "libmerowireless-core1.postrm purge"};
+  for (const std::string& script : scripts) {
+    const Ran ran = Script(script.substr(0, script.find(' ')), script.substr(script.find(' ')));
+    EXPECT_EQ(ran.status, 0) << script << "\n" << ran.output;
+    all.output += ran.output;
+  }
+  return all;
+}
+
+bool IsThere(const std::string& path) {
+  return fs::symlink_status(path).type() != fs::file_type::not_found;
+}
+
+class PackageScripts : public testing::Test {
+ protected:
+  PackageScripts() {
+    Install("dpkg-divert", "echo \"$*\" >>/tmp/diverted\n");
+    Install("udevadm", "echo \"$*\" >>/tmp/asked\n");
+    Install("deb-systemd-invoke", "echo \"$*\" >>/tmp/asked\n");
+    // Nobody waits two minutes here.
+    Install("timeout", "shift 3\nexec /usr/bin/timeout -s KILL 1 \"$@\"\n");
+    SetStartScript("echo \"$*\" >>/tmp/started\n");
+    for (const std::string& path : kPublic) fs::remove_all(path);
+    fs::remove_all(kState);
+  }
+
+  static void SetStartScript(const std::string& script) {
+    fs::remove(kStart);
+    Write(kStart, "#!/bin/sh\n" + script);
+    ::chmod(kStart, 0755);
+  }
+
+  static std::string Told(const std::string& path) { return RunInShell("cat " + path).output; }
+};
+
+TEST_F(PackageScripts, LeaveNothingOfWhatRan) {
+  for (const std::string& path : kPublic) Write(path, "");
+  Write(std::string(kState) + "/lock", "");
+  Write(kConnection, "");
+  EXPECT_EQ(Remove().output, "");
+  for (const std::string& path : kPublic) EXPECT_FALSE(IsThere(path)) << path;
+  EXPECT_FALSE(IsThere(kState));
+  EXPECT_TRUE(IsThere(kConnection));
+  EXPECT_EQ(Remove("purge").output, "");
+  EXPECT_FALSE(IsThere(kConnection));
+}
+
+// A directory at one of these paths, which anyone may make there, kept the package from being removed.
+TEST_F(PackageScripts, RemoveWhateverStandsThereInstead) {
+  const struct {
+    const char* szText;
+    void (*make)(const char* szPath);
+  } rows[] = {
+      {"an empty directory", [](const char* szPath) { ::mkdir(szPath, 0700); }},
+      {"a link to a file", [](const char* szPath) { fs::create_symlink("/etc/mine", szPath); }},
+      {"a link to a directory", [](const char* szPath) { fs::create_symlink("/etc/ours", szPath); }},
+      {"a link to nothing", [](const char* szPath) { fs::create_symlink("/etc/nothing", szPath); }},
+      {"a fifo", [](const char* szPath) { ::mkfifo(szPath, 0600); }},
+  };
+  Write("/etc/mine", "mine\n");
+  Write("/etc/ours/ours", "ours\n");
+  for (const auto& row : rows) {
+    for (const std::string& path : kPublic) row.make(path.c_str());
+    row.make(kState);
+    EXPECT_EQ(Remove().output, "") << row.szText;
+    for (const std::string& path : kPublic) EXPECT_FALSE(IsThere(path)) << path << ": " << row.szText;
+    EXPECT_FALSE(IsThere(kState)) << row.szText;
+    EXPECT_EQ(Told("/etc/mine") + Told("/etc/ours/ours"), "mine\nours\n") << row.szText;
+  }
+}
+
+TEST_F(PackageScripts, LeaveADirectoryOfSomebodysThings) {
+  for (const std::string& path : kPublic) Write(path + "/thesis.txt", "mine\n");
+  const Ran ran = Remove();
+  for (const std::string& path : kPublic) {
+    EXPECT_EQ(Told(path + "/thesis.txt"), "mine\n");
+    EXPECT_THAT(ran.output, HasSubstr("rm: cannot remove '" + path + "'"));
+  }
+  EXPECT_THAT(Told("/tmp/diverted"), HasSubstr("--remove"));
+}
+
+TEST_F(PackageScripts, TellWhatCannotBeRemoved) {
+  std::vector<std::string> paths = kPublic;
+  paths.emplace_back(std::string(kState) + "/lock");
+  paths.emplace_back(kConnection);
+  for (const std::string& path : paths) {
+    Write(path, "");
+    ASSERT_EQ(::mount("/dev/null", path.c_str(), nullptr, MS_BIND, nullptr), 0);  // busy, to whoever removes it
+  }
+  const std::string told = Remove().output + Remove("purge").output;
+  for (const std::string& path : paths) {
+    EXPECT_THAT(told, HasSubstr("rm: cannot remove '" + path + "'"));
+    ::umount(path.c_str());
+  }
+  EXPECT_EQ(Remove("purge").output, "");  // once more
+  for (const std::string& path : paths) EXPECT_FALSE(IsThere(path)) << path;
+}
+
+TEST_F(PackageScripts, TellThatTheListingToolCannotBePutBack) {
+  Install("dpkg-divert", "echo 'dpkg-divert: error: rename involves overwriting' >&2\nexit 2\n");
+  Write(kAdapter, "");
+  EXPECT_THAT(Remove().output, AllOf(HasSubstr("rename involves overwriting"), HasSubstr("/sbin/iwlist.distrib")));
+  EXPECT_FALSE(IsThere(kAdapter));
+}
+
+TEST_F(PackageScripts, EndTheAccessPointsThatRun) {
+  Write(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+  Write(std::string(kState) + "/hostapd-wlan1.pid", "rubbish; rm -rf /\n");
+  EXPECT_EQ(Remove().output, "");
+  EXPECT_EQ(Told("/tmp/started"), "restart wlan0 \nrestart wlan1 \n");
+}
+
+TEST_F(PackageScripts, GoOnWithoutAStartScriptThatWorks) {
+  const char* const broken[] = {"exit 1\n", "fi\n", "kill -9 $$\n", "exec sleep 60\n", "cat >/dev/null; exit 1\n"};
+  for (const char* szScript : broken) {
+    SetStartScript(szScript);
+    Write(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+    EXPECT_THAT(Remove().output, HasSubstr("the access point on wlan0 may still run")) << szScript;
+    EXPECT_FALSE(IsThere(kState)) << szScript;
+  }
+  fs::remove(kStart);
+  Write(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+  EXPECT_THAT(Remove().output, HasSubstr("the access point on wlan0 may still run"));
+}
+
+TEST_F(PackageScripts, RemoveNothingInAnUpgradeNorWhenOneFails) {
+  std::vector<std::string> paths = kPublic;
+  paths.emplace_back(std::string(kState) + "/hostapd-wlan0.pid");
+  for (const std::string& path : paths) Write(path, "");
+  const std::vector<std::pair<std::string, std::string>> steps = {
+      {"prerm", "upgrade 2"},         {"prerm", "failed-upgrade 1 2"},   {"preinst", "upgrade 1 2"},
+      {"postrm", "upgrade 2"},        {"postrm", "failed-upgrade 1 2"},  {"postrm", "abort-upgrade 1 2"},
+      {"preinst", "abort-upgrade 2"}, {"postinst", "abort-upgrade 2"},   {"prerm", "deconfigure in-favour x 1"},
+      {"postinst", "abort-remove"},   {"postinst", "abort-deconfigure"}, {"postinst", "configure 1"},
+  };
+  for (const auto& [script, arguments] : steps) {
+    EXPECT_EQ(Script("merowireless-appliance." + script, arguments).status, 0) << script << " " << arguments;
+  }
+  for (const char* szArguments : {"upgrade 2", "failed-upgrade 1 2", "abort-upgrade 1 2"}) {
+    EXPECT_EQ(Script("libmerowireless-core1.postrm", szArguments).status, 0) << szArguments;
+  }
+  for (const std::string& path : paths) EXPECT_TRUE(IsThere(path)) << path;
+  EXPECT_EQ(Told("/tmp/started 2>/dev/null"), "");
+  EXPECT_THAT(Told("/tmp/diverted"), Not(HasSubstr("--remove")));
+}
+
+// The units of adapters had been ended by then, and nothing started them.
+TEST_F(PackageScripts, TellOfAdaptersAgainWhenARemovalIsBrokenOff) {
+  fs::create_directories("/run/systemd/system");
+  EXPECT_EQ(Script("merowireless-appliance.postinst", "abort-remove").status, 0);
+  EXPECT_THAT(Told("/tmp/asked"), HasSubstr("trigger --action=add"));
+}
+
+TEST_F(PackageScripts, UndoAnInstallationThatFails) {
+  Write(std::string(kAdapter) + "/thesis.txt", "mine\n");
+  EXPECT_EQ(Script("merowireless-appliance.preinst", "install").status, 0);
+  EXPECT_EQ(Script("merowireless-appliance.postrm", "abort-install").status, 0);
+  EXPECT_THAT(Told("/tmp/diverted"), AllOf(HasSubstr("--add"), HasSubstr("--remove")));
+}
+
+}  // namespace
