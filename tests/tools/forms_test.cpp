@@ -1,7 +1,11 @@
 // Every command in each of the three forms, byte by byte.
+#include <sys/stat.h>
+
 #include <algorithm>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <set>
 #include <sstream>
 
 #include "running.h"
@@ -111,6 +115,32 @@ TEST_F(Forms, OfEveryCommandAreAsTheyAlwaysWere) {
     screens += Screen(words) + Screen(With(words, "--json")) + Screen(With(words, "--porcelain"));
   }
   EXPECT_EQ(screens, ReadText(MERO_SCREENS));
+}
+
+// Everything that has been made on this machine.
+std::set<std::string> AllFiles() {
+  namespace fs = std::filesystem;
+  std::set<std::string> files;
+  for (const char* szTop : {"/mnt/etc", "/mnt/run", "/mnt/tmp", "/mnt/usr", "/mnt/var"}) {
+    for (const auto& entry : fs::recursive_directory_iterator(szTop)) files.insert(entry.path());
+  }
+  return files;
+}
+
+// What is created is the library's, and has the modes that the library gives it.
+TEST_F(Forms, CreateNoFileWhateverTheUmask) {
+  const std::set<std::string> before = AllFiles();
+  for (const mode_t mask : {0000, 0077}) {
+    for (const auto& [world, words] : kCommands) {
+      library::Reset();
+      world();
+      EXPECT_EQ(Tool(words, {.before = [mask] { ::umask(mask); }}).status, 0) << Joined(words);
+      std::vector<std::string> created;
+      std::ranges::set_difference(AllFiles(), before, std::back_inserter(created));
+      EXPECT_THAT(created, testing::IsEmpty()) << Joined(words);
+    }
+    EXPECT_EQ(std::system("ip link delete wlan0"), 0);  // the last world's
+  }
 }
 
 // The commands that a help text lists, each behind `prefix`.

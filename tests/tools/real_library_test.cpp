@@ -11,6 +11,8 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <set>
+#include <sstream>
 #include <string>
 
 using testing::AllOf;
@@ -131,6 +133,42 @@ TEST(InstalledProgram, KeepsTheAccessPointsSettings) {
   EXPECT_THAT(Tool("ap show --json --show-secrets").out,
               AllOf(HasSubstr(R"("enabled":false,"ssid":"Office","security":"wpa2","cipher":"aes")"),
                     HasSubstr(R"("hidden":true)"), HasSubstr(R"("secret":"open sesame")")));
+}
+
+// The files and directories that have been written or made on this machine, each behind its mode, or alone.
+std::string Written(const std::string& form) {
+  FILE* pipe = ::popen(("cd /mnt && find etc run tmp usr var -printf '" + form + "\\n' | sort -k 2").c_str(), "r");
+  std::string written;
+  for (int c; (c = std::fgetc(pipe)) != EOF;) written += static_cast<char>(c);
+  ::pclose(pipe);
+  return written;
+}
+
+// What the program writes, which is removed afterwards.
+std::string WrittenWithUmask(const std::string& mask) {
+  std::istringstream before(Written("/%p"));
+  const std::set<std::string> kept{std::istream_iterator<std::string>(before), {}};
+  const std::string tool = "umask " + mask + "; LC_ALL=C.UTF-8 " MERO_TOOL " ";
+  for (const char* szArguments :
+       {"save Home --bssid 00:11:22:33:44:55 --security wpa2 --key-file /tmp/secret",
+        "ap set --ssid Office --security wpa2 --key-file /tmp/secret", "radio off", "disconnect", "forget Home"}) {
+    EXPECT_EQ(std::system((tool + szArguments + " >/dev/null").c_str()), 0) << szArguments;
+  }
+  const std::string written = Written("%m %p");
+  std::istringstream after(Written("/%p"));
+  for (std::string path; after >> path;) {
+    if (!kept.contains(path)) std::filesystem::remove_all(path);
+  }
+  return written;
+}
+
+TEST(InstalledProgram, WritesTheSameModesWhateverTheUmask) {
+  AnnounceAdapter();
+  ASSERT_EQ(std::system("printf 'open sesame\n' >/tmp/secret"), 0);
+  const std::string written = WrittenWithUmask("000");
+  EXPECT_EQ(WrittenWithUmask("077"), written);
+  EXPECT_THAT(written,
+              AllOf(HasSubstr("600 usr/mero/etc/wireless.conf\n"), HasSubstr("600 usr/mero/etc/wireless_ap.conf\n")));
 }
 
 TEST(InstalledProgram, SaysThatThereIsNoAdapterAndWhatTheLibraryReported) {
