@@ -460,6 +460,11 @@ int MEROWirelessNetworkConnect(const WIRELESS_NETWORK_CONFIG* pNetCfg);
  * not set: that is MEROWirelessDefaultGatewaySet(). A network that is not found in the air may hide its name, and is
  * tried all the same if its authentication and encryption are known.
  *
+ * A network is found by its access point's address alone, and takes on all that the scan tells of it: name,
+ * authentication and encryption, whatever was saved. So whoever puts up an access point with the address of a known one
+ * has it joined in the way that he chooses, open for instance, or has the secret used in that way. SECURITY.md tells
+ * what becomes of it. MEROWirelessNetworkConnect() keeps to the record that it is given.
+ *
  * @return 0 when connected and addressed; -1 otherwise, with nothing left connected: also a connection that exists
  *         already is ended, and the result is -1. Where MEROWirelessNetworkConnect() gives 0 because the radio may not
  *         be used, so does this: nothing is joined, and the interface is addressed as for the first network tried.
