@@ -180,6 +180,16 @@ TEST(InstalledProgram, SaysThatThereIsNoAdapterAndWhatTheLibraryReported) {
   EXPECT_EQ(Tool("autoconnect").status, 3);
 }
 
+TEST(InstalledProgram, TakesAnEmptyFileOfTheAdapterForNone) {
+  std::ofstream("/tmp/wireless.info").close();
+  for (const char* szArguments : {"ap show", "ap status", "ap disable", "radio on"}) {
+    const Ran ran = Tool(szArguments);
+    EXPECT_EQ(ran.status, 3) << szArguments;
+    EXPECT_THAT(ran.out, StartsWith("merowireless: no adapter is plugged in")) << szArguments;
+  }
+  EXPECT_EQ(Tool("radio --porcelain").out, "on\t\n");
+}
+
 TEST(InstalledProgram, DisconnectsWhatIsNotConnected) {
   EXPECT_EQ(Tool("disconnect").out, "disconnected\n");
 }
