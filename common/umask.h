@@ -4,17 +4,22 @@
 
 #include <sys/stat.h>
 
-// While it lives, what this process and the programs that it starts create can be written to by its owner alone, and be
-// read by all who the creator lets.
-class OrdinaryUmask {
+// The umask of this process, and of the programs that it starts, for as long as the holder lives.
+class Umask {
  public:
-  OrdinaryUmask() : before_(::umask(S_IWGRP | S_IWOTH)) {}
-  OrdinaryUmask(const OrdinaryUmask&) = delete;
-  OrdinaryUmask& operator=(const OrdinaryUmask&) = delete;
-  ~OrdinaryUmask() { ::umask(before_); }
+  explicit Umask(mode_t mask) : before_(::umask(mask)) {}
+  Umask(const Umask&) = delete;
+  Umask& operator=(const Umask&) = delete;
+  ~Umask() { ::umask(before_); }
 
  private:
   mode_t before_;
 };
+
+// What programs have that nobody wants anything particular of: only the owner may write.
+inline constexpr mode_t kOrdinaryUmask = S_IWGRP | S_IWOTH;
+
+// A file gets the very mode that it is created with.
+inline constexpr mode_t kNoUmask = 0;
 
 #endif  // MERO_COMMON_UMASK_H

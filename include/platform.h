@@ -14,10 +14,15 @@
  *  4. A file is replaced as a whole: the new content is written beside it, flushed to disk and renamed over it, so
  *     that a reader, a crash and a full disk find the old content or the new. Mode and owner stay; a symbolic link is
  *     followed, not replaced. From reading to renaming the file is locked against other writers. An operation
- *     leaves every byte alone that it is not about: comments, blank lines, other keys and sections, their order.
- *  5. Operations block for the disk, for another writer's lock and for commands that they run, and for the network
- *     only where it says so.
- *  6. Not thread-safe. Descriptors are close-on-exec.
+ *     leaves every byte alone that it is not about: comments, blank lines, other keys and sections, their order. The
+ *     caller's umask has no say in the mode of what is created.
+ *  5. Operations block for the disk, for another writer's lock (20 s at most, a failure then) and for commands that
+ *     they run, and for the network only where it says so.
+ *  6. In a directory that anyone may write, such as /tmp, no link is followed, and what somebody else has put there is
+ *     neither read (ERR_PERMISSION) nor written to, and is taken for missing: a file is root's or the caller's own, a
+ *     plain one, with one name. Operations that make or remove a file remove what is in its place; a directory they
+ *     move aside, to NAME.foreign-NUMBER.
+ *  7. Not thread-safe. Descriptors are close-on-exec.
  *
  * The header is usable from C99 and from C++11 on.
  */
@@ -253,7 +258,7 @@ int PLIBCFileRemoveSection(const char* szPath, const char* szSection);
  */
 int PLIBCExec(const char* szPath, const char* szArg1, const char* szArg2, const char* szArg3, const char* szArg4);
 
-/** Removes a file. @return 0, also when there was none; -1 on failure. */
+/** Removes a file; see 6 above. @return 0, also when there was none; -1 on failure. */
 int PLIBCSysUnlink(const char* szPath);
 
 /** Removes a file or an empty directory. @return 0, also when there was none; -1 on failure. */

@@ -54,13 +54,13 @@ class Command {
 
   // Runs it and waits; negative when it could not be started. The exit status is for callers that look at it.
   [[nodiscard]] int Run() const {
-    const OrdinaryUmask umask;
+    const Umask umask(kOrdinaryUmask);
     return fits_ ? std::system(szText_) : Refuse(-1);
   }
 
   // Starts it, to read its output; null when it could not be started.
   [[nodiscard]] FILE* OpenPipe() const {
-    const OrdinaryUmask umask;
+    const Umask umask(kOrdinaryUmask);
     return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr);
   }
 

@@ -1,6 +1,11 @@
 // The error codes of errnos.
 #include "platform/base/error.h"
 
+#include <cstring>
+
+#include "platform/base/file_edit.h"
+#include "platform/base/shared_directory.h"
+
 namespace {
 
 struct CodeOfErrno {
@@ -17,7 +22,20 @@ constexpr CodeOfErrno kCodes[] = {
     {EFBIG, ERR_TOO_LARGE},        {ERANGE, ERR_TOO_LARGE},
     {ENAMETOOLONG, ERR_TOO_LARGE}, {ENODEV, ERR_NO_DEVICE},
     {ENXIO, ERR_NO_DEVICE},        {ENOEXEC, ERR_COMMAND_FAILED},
+    {kForeign, ERR_PERMISSION},
 };
+
+// The reason of an error; that of an errno as libc has it.
+const char* ReasonOf(int error) {
+  switch (error) {
+    case kForeign:
+      return "it is somebody else's, in a directory that anyone may write";
+    case kLockKept:
+      return "another process keeps its lock";
+    default:
+      return std::strerror(error);
+  }
+}
 
 }  // namespace
 
@@ -30,8 +48,7 @@ int CodeOfError(int error) {
 
 void ReportFailure(SourcePlace place, int error, const char* szVerb, const char* szSubject) {
   PLIBCErrSet(CodeOfError(error));
-  errno = error;  // for %m
-  LOG_AS(place.szUnit, place.line, "Failed to %s %s: %m", szVerb, szSubject);
+  LOG_AS(place.szUnit, place.line, "Failed to %s %s: %s", szVerb, szSubject, ReasonOf(error));
 }
 
 void ReportNull(SourcePlace place) {

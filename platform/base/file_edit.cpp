@@ -8,34 +8,72 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 
+#include "common/text.h"
+#include "common/umask.h"
 #include "platform/base/file_read.h"
+#include "platform/base/shared_directory.h"
 
 namespace {
 
-Status Lock(int fd) {
-  while (::flock(fd, LOCK_EX) < 0) {
-    if (errno != EINTR) return Status::Failed(errno);
+constexpr int kReading = O_RDONLY | O_CLOEXEC | O_NONBLOCK;
+
+// A file beside that of a path, by a format that takes its directory and its name.
+class Beside {
+ public:
+  Beside(const char* szFormat, const char* szPath) {
+    const char* szName = std::strrchr(szPath, '/') + 1;
+    const int size =
+        std::snprintf(szBeside_, sizeof szBeside_, szFormat, static_cast<int>(szName - szPath), szPath, szName);
+    fits_ = size >= 0 && static_cast<size_t>(size) < sizeof szBeside_;
   }
-  return Status::Ok();
+
+  bool fits() const { return fits_; }
+  const char* c_str() const { return szBeside_; }
+
+ private:
+  char szBeside_[PATH_MAX];
+  bool fits_;
+};
+
+// Takes the new content. Only the holder of the lock writes it, so that the name can be fixed, and what a writer left
+// that was killed is not left for long.
+constexpr char kNewFormat[] = "%.*s.%s.new";
+
+// Stands for the lock: a file of its own, since anyone who may read a file may lock it, and keep it locked.
+constexpr char kLockFormat[] = "%.*s.%s.lock";
+
+// Locks a file by asking again and again, since to wait for a lock has no end.
+Status LockSoon(int fd) {
+  constexpr int kTries = 4000;
+  constexpr timespec kNap = {0, 5'000'000};
+  for (int i = 0; i < kTries; ++i) {
+    if (::flock(fd, LOCK_EX | LOCK_NB) == 0) return Status::Ok();
+    if (errno != EWOULDBLOCK && errno != EINTR) return Status::Failed(errno);
+    (void)::nanosleep(&kNap, nullptr);  // a signal only makes it shorter
+  }
+  return Status::Failed(kLockKept);
 }
 
-// Whether `path` still names the open file: while the lock was waited for, another may have been put in its place.
+// Whether `path` still names the open file: while a lock was waited for, another may have been put in its place.
 Result<bool> Names(const char* szPath, int fd) {
   struct stat named;
   struct stat open;
   if (::fstat(fd, &open) < 0) return Status::Failed(errno);
-  if (::stat(szPath, &named) < 0) return errno == ENOENT ? Result<bool>(false) : Status::Failed(errno);
+  if (::lstat(szPath, &named) < 0) return errno == ENOENT ? Result<bool>(false) : Status::Failed(errno);
   return named.st_dev == open.st_dev && named.st_ino == open.st_ino;
 }
 
-// The file beside `path` that takes the new content. Only the holder of the lock writes it, so that the name can be
-// fixed, and what a writer left that was killed is not left for long.
-Status PathBeside(const char* szPath, char (&szBeside)[PATH_MAX]) {
-  const char* szName = std::strrchr(szPath, '/') + 1;
-  const int size =
-      std::snprintf(szBeside, sizeof szBeside, "%.*s.%s.new", static_cast<int>(szName - szPath), szPath, szName);
-  return size < PATH_MAX ? Status::Ok() : Status::Failed(ENAMETOOLONG);
+// Opens the file of a lock, or makes it. What others have put in its place, where anyone may, goes.
+Result<Descriptor> OpenLock(const char* szLock) {
+  if (IsForeign(szLock)) {
+    if (Status status = RemoveOrMoveAside(szLock); !status.ok()) return status;
+  }
+  Descriptor lock(::open(szLock, O_RDWR | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0600));
+  if (!lock.valid()) return Status::Failed(errno);
+  if (IsForeign(szLock)) return Status::Failed(kForeign);
+  return lock;
 }
 
 Status WriteAll(int fd, std::string_view content) {
@@ -80,31 +118,74 @@ Status FlushDirectory(const char* szPath) {
 
 }  // namespace
 
+// Holds the lock of the file once this succeeds.
+Status FileEdit::Lock() {
+  const Beside path(kLockFormat, szPath_);
+  if (!path.fits()) return Status::Failed(ENAMETOOLONG);
+  while (true) {
+    Result<Descriptor> lock = OpenLock(path.c_str());
+    if (!lock.ok()) return lock.status();
+    if (Status status = LockSoon(lock->get()); !status.ok()) return status;
+    // Its last holder has removed it, and others may hold the next one.
+    Result<bool> current = Names(path.c_str(), lock->get());
+    if (!current.ok()) return current.status();
+    if (!*current) continue;
+    lock_ = std::move(*lock);
+    return Status::Ok();
+  }
+}
+
+Status FileEdit::Read() {
+  Result<Descriptor> file = OpenOurs(szPath_, kReading);
+  if (!file.ok()) return file.status();
+  file_ = std::move(*file);
+  Result<Bytes> text = ReadWhole(file_.get());
+  if (text.ok()) text_ = std::move(*text);
+  return text.status();
+}
+
+// Where a path really leads to, whether or not there is a file. In a directory that anyone may write no link is
+// followed, not even one that is put there now.
+Status Resolve(const char* szPath, char (&szReal)[PATH_MAX]) {
+  if (!IsShared(szPath)) return ::realpath(szPath, szReal) != nullptr ? Status::Ok() : Status::Failed(errno);
+  char szDirectory[PATH_MAX] = ".";
+  const char* szSlash = std::strrchr(szPath, '/');
+  if (szSlash != nullptr) CopyText(szDirectory, {szPath, static_cast<size_t>(szSlash - szPath) + 1});
+  if (::realpath(szDirectory, szReal) == nullptr) return Status::Failed(errno);
+  const size_t size = std::strlen(szReal);
+  std::snprintf(szReal + size, sizeof szReal - size, "/%s", szSlash != nullptr ? szSlash + 1 : szPath);
+  return Status::Of(::faccessat(AT_FDCWD, szReal, F_OK, AT_SYMLINK_NOFOLLOW));
+}
+
+// Makes a file that is missing; where a link leads to none, there.
+Status Make(const char* szPath, mode_t mode) {
+  const Umask umask(kNoUmask);
+  const int exclusively = IsShared(szPath) ? O_EXCL : 0;
+  const Descriptor file(::open(szPath, kReading | O_CREAT | exclusively, mode));
+  return file.valid() || errno == EEXIST ? Status::Ok() : Status::Failed(errno);
+}
+
 Result<FileEdit> FileEdit::Open(const char* szPath, mode_t mode) {
-  constexpr int kFlags = O_RDONLY | O_CLOEXEC | O_NONBLOCK;
   FileEdit edit;
   while (true) {
-    edit.created_ = false;
-    edit.lock_ = Descriptor(::open(szPath, kFlags));
-    if (!edit.lock_.valid() && errno == ENOENT && mode != 0) {
+    const Status found = Resolve(szPath, edit.szPath_);
+    if (!found.ok() && (found.error() != ENOENT || mode == 0)) return found;
+    if (!found.ok()) {
+      if (Status status = Make(szPath, mode); !status.ok()) return status;
       edit.created_ = true;
-      edit.lock_ = Descriptor(::open(szPath, kFlags | O_CREAT, mode));
+      continue;
     }
-    if (!edit.lock_.valid()) return Status::Failed(errno);
-    if (Status status = Lock(edit.lock_.get()); !status.ok()) return status;
-    if (::realpath(szPath, edit.szPath_) == nullptr) {
-      if (errno == ENOENT) continue;
-      return Status::Failed(errno);
-    }
-    Result<bool> current = Names(edit.szPath_, edit.lock_.get());
-    if (!current.ok()) return current.status();
-    if (*current) break;
+    if (Status status = edit.Lock(); !status.ok()) return status;
+    const Status status = edit.Read();
+    if (status.ok()) return edit;
+    if (status.error() != ENOENT) return status;
+    edit = FileEdit();  // a rival has removed it meanwhile
   }
+}
 
-  Result<Bytes> text = ReadWhole(edit.lock_.get());
-  if (!text.ok()) return text.status();
-  edit.text_ = std::move(*text);
-  return edit;
+FileEdit::~FileEdit() {
+  // While it is held: who waits for it will notice. One that stays is the next one's.
+  if (lock_.valid()) (void)::unlink(Beside(kLockFormat, szPath_).c_str());
 }
 
 void FileEdit::Abandon() {
@@ -113,14 +194,14 @@ void FileEdit::Abandon() {
 }
 
 Status FileEdit::Commit(std::string_view content) {
-  char szBeside[PATH_MAX];
-  if (Status status = PathBeside(szPath_, szBeside); !status.ok()) return status;
-  if (::unlink(szBeside) < 0 && errno != ENOENT) return Status::Failed(errno);
+  const Beside beside(kNewFormat, szPath_);
+  if (!beside.fits()) return Status::Failed(ENAMETOOLONG);
+  if (Status status = RemoveOrMoveAside(beside.c_str()); !status.ok() && status.error() != ENOENT) return status;
 
-  Status status = WriteBeside(szBeside, content, lock_.get());
-  if (status.ok()) status = Status::Of(::rename(szBeside, szPath_));
+  Status status = WriteBeside(beside.c_str(), content, file_.get());
+  if (status.ok()) status = Status::Of(::rename(beside.c_str(), szPath_));
   if (!status.ok()) {
-    (void)::unlink(szBeside);  // may never have come into being
+    (void)::unlink(beside.c_str());  // may never have come into being
     return status;
   }
   return FlushDirectory(szPath_);

@@ -11,12 +11,18 @@
 #include "platform/base/descriptor.h"
 #include "platform/base/result.h"
 
+// Another process has kept the lock of a file for as long as is waited. An error of our own: no errno says so.
+inline constexpr int kLockKept = -2;
+
 class FileEdit {
  public:
   FileEdit() = default;
+  FileEdit(FileEdit&&) = default;
+  FileEdit& operator=(FileEdit&&) = default;
+  ~FileEdit();
 
-  // Locks a file, following symbolic links, and reads it. One that is missing is created with mode `mode`, or is
-  // ENOENT when `mode` is 0. Blocks while another process edits the file.
+  // Locks a file, following symbolic links, and reads it. One that is missing is created with mode `mode`, whatever the
+  // umask, or is ENOENT when `mode` is 0. Blocks for up to 20 s while another process edits the file; kLockKept then.
   static Result<FileEdit> Open(const char* szPath, mode_t mode);
 
   // What the file holds.
@@ -29,7 +35,11 @@ class FileEdit {
   Status Commit(std::string_view content);
 
  private:
-  Descriptor lock_;  // the file itself, locked; closing it gives the lock up, after the new file is in place
+  Status Lock();
+  Status Read();
+
+  Descriptor lock_;  // the file beside it that stands for the lock
+  Descriptor file_;
   Bytes text_;
   bool created_ = false;
   char szPath_[PATH_MAX] = {};  // where the file really is

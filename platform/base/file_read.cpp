@@ -5,7 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "platform/base/descriptor.h"
+#include "platform/base/shared_directory.h"
 
 namespace {
 
@@ -38,7 +38,7 @@ Result<Bytes> ReadWhole(int fd) {
 
 Result<Bytes> ReadFile(const char* szPath) {
   // Without O_NONBLOCK, a pipe in the place of a file would block until somebody writes to it.
-  const Descriptor file(::open(szPath, O_RDONLY | O_CLOEXEC | O_NONBLOCK));
-  if (!file.valid()) return Status::Failed(errno);
-  return ReadWhole(file.get());
+  Result<Descriptor> file = OpenOurs(szPath, O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+  if (!file.ok()) return file.status();
+  return ReadWhole(file->get());
 }

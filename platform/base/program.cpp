@@ -68,7 +68,7 @@ Result<pid_t> Spawn(const char* const* argv, Standard standard) {
   if (const int error = attributes.ResetSignals(); error != 0) return Status::Failed(error);
   FileActions actions;
   if (const int error = actions.Set(standard); error != 0) return Status::Failed(error);
-  const OrdinaryUmask umask;
+  const Umask umask(kOrdinaryUmask);
   pid_t pid = -1;
   const int error =
       ::posix_spawn(&pid, argv[0], actions.get(), attributes.get(), const_cast<char* const*>(argv), environ);

@@ -4,11 +4,31 @@
 
 #include <cstdio>
 
+#include "common/umask.h"
 #include "platform/base/descriptor.h"
 #include "platform/base/error.h"
+#include "platform/base/shared_directory.h"
+
+namespace {
+
+// In a directory that anyone may write, what others have put in the file's place goes, and no link is followed that is
+// put there meanwhile.
+Status Create(const char* szPath) {
+  if (IsForeign(szPath)) {
+    if (Status status = RemoveOrMoveAside(szPath); !status.ok()) return status;
+  }
+  const Umask umask(kNoUmask);
+  const int exclusively = IsShared(szPath) ? O_EXCL : 0;
+  Descriptor file(::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK | exclusively, 0600));
+  if (file.valid()) return file.Close();
+  return errno == EEXIST && !IsForeign(szPath) ? Status::Ok() : Status::Failed(errno);
+}
+
+}  // namespace
 
 int PLIBCFileExist(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), 0;
+  if (IsForeign(szPath)) return LOG("%s is taken for missing: somebody else has put it there", szPath), 0;
   if (::access(szPath, F_OK) == 0) return 1;
   // What cannot be looked at may well be there: who takes it for missing would write over it.
   return errno == ENOENT || errno == ENOTDIR || errno == ELOOP || errno == ENAMETOOLONG ? 0 : 1;
@@ -17,15 +37,14 @@ int PLIBCFileExist(const char* szPath) {
 int PLIBCFileTouch(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
   if (PLIBCFileExist(szPath) != 0) return 0;
-  Descriptor file(::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0600));
-  if (!file.valid()) return FAIL(errno, "create", szPath), -1;
-  if (Status status = file.Close(); !status.ok()) return FAIL(status.error(), "create", szPath), -1;
+  if (Status status = Create(szPath); !status.ok()) return FAIL(status.error(), "create", szPath), -1;
   return 0;
 }
 
 int PLIBCSysUnlink(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
-  if (::unlink(szPath) < 0 && errno != ENOENT) return FAIL(errno, "remove", szPath), -1;
+  const Status status = RemoveOrMoveAside(szPath);
+  if (!status.ok() && status.error() != ENOENT) return FAIL(status.error(), "remove", szPath), -1;
   return 0;
 }
 

@@ -38,7 +38,8 @@ TEST_F(ARival, ThatPutsALinkInTheWayOfAChangeHasNothingWrittenThroughIt) {
 
 TEST_F(ARival, ThatMakesAFileHasItsKeysKept) {
   WriteFile(kFile, "RIVAL=kept\n");
-  const Outcome outcome = RunBeforeRival("open", [] { return PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"); });
+  const Outcome outcome =
+      RunBeforeRival("readlink", [] { return PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"); });
   EXPECT_TRUE(outcome.reached);
   EXPECT_EQ(outcome.result, 1);
   EXPECT_EQ(ReadFile(kFile), "RIVAL=kept\nKEY=new\n");

@@ -47,6 +47,18 @@ const std::array<Change, 5> kChanges = {{
      "[a]\nKEY=old\n", "[a]\nKEY=new\n"},
 }};
 
+int g_naps = -1;  // how many were taken; negative when they are slept
+
+}  // namespace
+
+// In the place of libc's, so that waiting in vain takes no time.
+extern "C" int nanosleep(const timespec* pNap, timespec* pRest) {
+  if (g_naps >= 0) return ++g_naps, 0;
+  return ::clock_nanosleep(CLOCK_REALTIME, 0, pNap, pRest);
+}
+
+namespace {
+
 class AFileThatIsChanged : public PlatformTest {};
 
 TEST_F(AFileThatIsChanged, IsReplacedAsAWholeSoThatReadersNeverSeeAPart) {
@@ -145,62 +157,115 @@ TEST_F(AFileThatIsChanged, LeavesNoDescriptorOpen) {
   }
 }
 
-// Whether a process waits for a lock on a file.
-bool WaitsForLock(pid_t pid) {
-  std::ifstream locks("/proc/locks");
-  for (std::string line; std::getline(locks, line);) {
-    const bool waits = line.find("-> FLOCK") != std::string::npos;
-    if (waits && line.find(" " + std::to_string(pid) + " ") != std::string::npos) return true;
+constexpr char kLock[] = "/tmp/platform/.file.lock";
+
+// Another's lock on the file, for as long as the holder lives.
+class Rival {
+ public:
+  Rival() : lock_(::open(kLock, O_RDWR | O_CREAT | O_CLOEXEC, 0600)) { EXPECT_EQ(::flock(lock_, LOCK_EX), 0); }
+  Rival(const Rival&) = delete;
+  Rival& operator=(const Rival&) = delete;
+  ~Rival() { GiveUp(); }
+
+  // As a writer does when it is done. A process that was forked holds it open, too.
+  void GiveUp() {
+    if (lock_ < 0) return;
+    EXPECT_EQ(::unlink(kLock), 0);
+    EXPECT_EQ(::flock(lock_, LOCK_UN), 0);
+    ::close(lock_);
+    lock_ = -1;
+  }
+
+ private:
+  int lock_;
+};
+
+// Whether a process has opened the lock, and so asks for it.
+bool AsksForLock(pid_t pid) {
+  std::error_code error;
+  for (const auto& entry : fs::directory_iterator("/proc/" + std::to_string(pid) + "/fd", error)) {
+    if (fs::read_symlink(entry.path(), error).string().starts_with(kLock)) return true;
   }
   return false;
 }
 
-testing::AssertionResult ComesToWaitForLock(pid_t pid) {
-  using std::chrono_literals::operator""ms;
-  for (int i = 0; i < 2000; ++i) {
-    if (WaitsForLock(pid)) return testing::AssertionSuccess();
-    std::this_thread::sleep_for(5ms);
+// A process that gives "KEY" the value "new", and has come to ask for the lock.
+class Writer {
+ public:
+  Writer() : pid_(::fork()) {
+    if (pid_ == 0) ::_exit(PLIBCFileSetKeyValue(kPath, "KEY", "new", "%s=%s\n") == 1 ? 0 : 1);
+    using std::chrono_literals::operator""ms;
+    bool asks = false;
+    for (int i = 0; i < 2000 && !asks; ++i) {
+      asks = AsksForLock(pid_);
+      if (!asks) std::this_thread::sleep_for(5ms);
+    }
+    EXPECT_TRUE(asks) << "process " << pid_ << " does not ask for the lock";
   }
-  return testing::AssertionFailure() << "process " << pid << " does not wait for the lock";
-}
+
+  bool Succeeds() const {
+    int state = -1;
+    EXPECT_EQ(::waitpid(pid_, &state, 0), pid_);
+    return state == 0;
+  }
+
+ private:
+  static constexpr char kPath[] = "/tmp/platform/file";
+
+  pid_t pid_;
+};
 
 // A rival that replaces the file while another waits for it must not have its change undone.
 TEST_F(AFileThatIsChanged, WaitsForAnotherWriterAndKeepsWhatThatWrote) {
   WriteFile(kFile, "KEY=old\nRIVAL=old\n");
-  const int lock = ::open(kFile, O_RDONLY | O_CLOEXEC);
-  ASSERT_EQ(::flock(lock, LOCK_EX), 0);
-
-  const pid_t writer = ::fork();
-  if (writer == 0) ::_exit(PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n") == 1 ? 0 : 1);
-  ASSERT_TRUE(ComesToWaitForLock(writer));
+  Rival rival;
+  const Writer writer;
   EXPECT_EQ(ReadFile(kFile), "KEY=old\nRIVAL=old\n");
   WriteFile("/tmp/platform/rival", "KEY=old\nRIVAL=new\n");
   fs::rename("/tmp/platform/rival", kFile);
-  ASSERT_EQ(::flock(lock, LOCK_UN), 0);  // the child holds it open, too
-  ASSERT_EQ(::close(lock), 0);
-
-  int state = -1;
-  ASSERT_EQ(::waitpid(writer, &state, 0), writer);
-  EXPECT_EQ(state, 0);
+  rival.GiveUp();
+  EXPECT_TRUE(writer.Succeeds());
   EXPECT_EQ(ReadFile(kFile), "KEY=new\nRIVAL=new\n");
 }
 
 TEST_F(AFileThatIsChanged, IsMadeAnewWhenARivalRemovesItMeanwhile) {
   WriteFile(kFile, "A=1\n");
-  const int lock = ::open(kFile, O_RDONLY | O_CLOEXEC);
-  ASSERT_EQ(::flock(lock, LOCK_EX), 0);
-
-  const pid_t writer = ::fork();
-  if (writer == 0) ::_exit(PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n") == 1 ? 0 : 1);
-  ASSERT_TRUE(ComesToWaitForLock(writer));
+  Rival rival;
+  const Writer writer;
   fs::remove(kFile);
-  ASSERT_EQ(::flock(lock, LOCK_UN), 0);  // the child holds it open, too
-  ASSERT_EQ(::close(lock), 0);
-
-  int state = -1;
-  ASSERT_EQ(::waitpid(writer, &state, 0), writer);
-  EXPECT_EQ(state, 0);
+  rival.GiveUp();
+  EXPECT_TRUE(writer.Succeeds());
   EXPECT_EQ(ReadFile(kFile), "KEY=new\n");
+}
+
+TEST_F(AFileThatIsChanged, IsReportedAfterAWhileWhenARivalKeepsItsLock) {
+  for (const Change& change : kChanges) {
+    WriteFile(kFile, change.szBefore);
+    Rival rival;
+    g_naps = 0;
+    EXPECT_FALSE(change.make(kFile)) << change.szName;
+    EXPECT_EQ(g_naps, 4000) << change.szName;  // of 5 ms
+    const std::vector<LogLine> log = TakeLog();
+    ASSERT_EQ(log.size(), 1u);
+    EXPECT_THAT(log[0].text, testing::EndsWith(" /tmp/platform/file: another process keeps its lock"));
+    EXPECT_EQ(ReadFile(kFile), change.szBefore) << change.szName;
+    g_naps = -1;
+  }
+}
+
+TEST_F(AFileThatIsChanged, GetsItsModeWhateverTheUmask) {
+  for (const mode_t mask : {0000, 0077, 0777}) {
+    const mode_t before = ::umask(mask);
+    for (const Change& change : kChanges) {
+      PLIBCSysUnlink(kFile);
+      if (!change.make(kFile)) continue;  // there was no key to remove
+      const bool hasSections = ReadFile(kFile).starts_with('[');
+      EXPECT_EQ(ModeOf(kFile), hasSections ? 0600u : 0644u) << change.szName;
+      ASSERT_TRUE(change.make(kFile)) << change.szName;
+      EXPECT_EQ(ModeOf(kFile), hasSections ? 0600u : 0644u) << change.szName;
+    }
+    ::umask(before);
+  }
 }
 
 }  // namespace

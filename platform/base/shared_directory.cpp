@@ -1,0 +1,66 @@
+// Files in directories that anyone may write.
+#include "platform/base/shared_directory.h"
+
+#include <fcntl.h>
+#include <sys/random.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <climits>
+#include <cstdio>
+#include <cstring>
+
+#include "common/text.h"
+
+namespace {
+
+// A second name may be one that somebody else has given to a file of ours.
+bool IsOurs(const struct stat& info) {
+  return (info.st_uid == 0 || info.st_uid == ::geteuid()) && S_ISREG(info.st_mode) && info.st_nlink == 1;
+}
+
+Status MoveAside(const char* szPath) {
+  constexpr int kTries = 8;
+  for (int i = 0; i < kTries; ++i) {
+    unsigned number = 0;
+    if (::getrandom(&number, sizeof number, 0) < 0) return Status::Failed(errno);
+    char szAside[PATH_MAX];
+    const int size = std::snprintf(szAside, sizeof szAside, "%s.foreign-%08x", szPath, number);
+    if (size >= PATH_MAX) return Status::Failed(ENAMETOOLONG);
+    if (::renameat2(AT_FDCWD, szPath, AT_FDCWD, szAside, RENAME_NOREPLACE) == 0) return Status::Ok();
+    if (errno != EEXIST) break;
+  }
+  return Status::Failed(errno);
+}
+
+}  // namespace
+
+bool IsShared(const char* szPath) {
+  char szDirectory[PATH_MAX] = ".";
+  const char* szSlash = std::strrchr(szPath, '/');
+  if (szSlash != nullptr) CopyText(szDirectory, {szPath, static_cast<size_t>(szSlash - szPath) + 1});
+  struct stat info;
+  return ::stat(szDirectory, &info) < 0 || (info.st_mode & S_IWOTH) != 0;  // who cannot know is careful
+}
+
+Result<Descriptor> OpenOurs(const char* szPath, int flags) {
+  const bool shared = IsShared(szPath);
+  Descriptor file(::open(szPath, shared ? flags | O_NOFOLLOW : flags));
+  if (!file.valid()) return Status::Failed(shared && errno == ELOOP ? kForeign : errno);
+  struct stat info;
+  if (!shared) return file;
+  if (::fstat(file.get(), &info) < 0) return Status::Failed(errno);
+  if (!IsOurs(info)) return Status::Failed(kForeign);
+  return file;
+}
+
+bool IsForeign(const char* szPath) {
+  struct stat info;
+  return IsShared(szPath) && ::lstat(szPath, &info) == 0 && !IsOurs(info);
+}
+
+Status RemoveOrMoveAside(const char* szPath) {
+  if (::unlink(szPath) == 0) return Status::Ok();
+  const int error = errno;
+  return error == EISDIR && IsForeign(szPath) ? MoveAside(szPath) : Status::Failed(error);
+}

@@ -1,0 +1,77 @@
+// What somebody else with an account can do to the files that the library has in directories that anyone may write.
+#include "local_user.h"
+
+#include <sys/stat.h>
+
+#include "joining.h"
+
+namespace {
+
+const std::string kVictim = "/var/tmp/victim";
+
+class ALocalUser : public JoiningTest {
+ protected:
+  ALocalUser() {
+    for (const char* szDirectory : {"/tmp", "/var/tmp"}) ::chmod(szDirectory, 01777);
+    WriteText(kVictim, "as was");
+  }
+
+  void SetUp() override {
+    if (!HasLocalUsers()) GTEST_SKIP() << "not the machine's root";
+  }
+
+  // Puts each obstacle in the place of a file in turn, and looks at what comes of it.
+  template <class Look>
+  static void ObstructEachWay(const std::string& path, Look look) {
+    int nObstacles = 0;
+    for (const Obstacle& obstacle : Obstacles(kVictim)) {
+      Begin();
+      SCOPED_TRACE(obstacle.name);
+      ASSERT_TRUE(RunAsLocalUser([&] { return obstacle.put(path); }));
+      look();
+      EXPECT_EQ(ReadText(kVictim), "as was");
+      EXPECT_FALSE(Exists(kVictim + ".missing"));
+      ++nObstacles;
+    }
+    EXPECT_EQ(nObstacles, 7);
+  }
+};
+
+// A directory in the marker's place refused every connection, for ever.
+TEST_F(ALocalUser, KeepsNobodyFromConnectingByAMarker) {
+  ObstructEachWay(kMarker, [this] {
+    EXPECT_EQ(Join(), 0);
+    EXPECT_FALSE(Exists(kMarker));
+    EXPECT_EQ(ReadText(kRecord), "Home Net\n7\n5\n8\n00:11:22:AA:BB:CC\n");
+  });
+}
+
+TEST_F(ALocalUser, HasNoConnectionRecordedInAFileOfTheirs) {
+  ObstructEachWay(kRecord, [this] {
+    EXPECT_EQ(Join(), 0);
+    struct stat info;
+    ASSERT_EQ(::lstat(kRecord.c_str(), &info), 0);
+    EXPECT_TRUE(S_ISREG(info.st_mode) && info.st_uid == ::geteuid() && info.st_nlink == 1);
+    EXPECT_EQ(ReadText(kRecord), "Home Net\n7\n5\n8\n00:11:22:AA:BB:CC\n");
+  });
+}
+
+TEST_F(ALocalUser, DoesNotMakeBelieveThatAnAccessPointIsBeingSetUp) {
+  ObstructEachWay("/var/tmp/.wireless_ap_connecting", [] {
+    EXPECT_EQ(MEROWirelessTestAPMode(), FALSE);
+    std::filesystem::remove_all("/var/tmp/.wireless_ap_connecting");
+  });
+}
+
+// Whoever named the adapter chose the settings that it was switched on, and blocked, by.
+TEST_F(ALocalUser, DoesNotNameTheAdapter) {
+  ObstructEachWay(kAdapterInfo, [] {
+    char szName[64] = "";
+    EXPECT_EQ(MEROWirelessApConfigSecNameGet(szName, sizeof szName), FALSE);
+    EXPECT_STREQ(szName, "");
+    WriteText(kApSettings, "[theirs]\n\tunblock=yes\n");
+    EXPECT_EQ(MEROWirelessCheckBlock(), -1);
+  });
+}
+
+}  // namespace
