@@ -46,7 +46,7 @@ can_be_access_point() { # INTERFACE
 
 # access_point_is INTERFACE yes|no: whether an access point has been set up there, and is to run or not.
 access_point_is() {
-	[ "$(value_of enable "/etc/hostapd/hostapd-$1.info")" = "$2" ]
+	ask check "/etc/hostapd/hostapd-$1.info" enable "$2"
 }
 
 set_access_point() { # INTERFACE yes|no

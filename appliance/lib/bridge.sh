@@ -7,15 +7,15 @@ script_value() { # KEY INTERFACE
 }
 
 is_bridge() { # NAME
-	[ "$(script_value TYPE "$1" | tr '[:upper:]' '[:lower:]')" = bridge ]
+	ask bridge "$1" nat
 }
 
 is_nat() { # BRIDGE
-	[ "$(script_value NAT "$1")" = yes ]
+	says_yes bridge "$1" nat
 }
 
 comes_up_at_boot() { # BRIDGE
-	[ "$(script_value ONBOOT "$1")" = yes ]
+	says_yes bridge "$1" at-boot
 }
 
 is_there() { # INTERFACE
@@ -25,14 +25,19 @@ is_there() { # INTERFACE
 # make_bridge BRIDGE: the bridge with its first member, which is wired, and its address. A wireless member comes in when
 # its access point starts.
 make_bridge() {
-	is_bridge "$1" || fail "$scripts/ifcfg-$1 describes no bridge"
-	create_bridge "$1" "$(script_value HWADDR "$1")"
-	primary=$(script_value PRIMARY "$1")
+	ask bridge "$1" hardware-address member static address mask || fail "$scripts/ifcfg-$1 describes no bridge"
+	{
+		IFS= read -r hardware
+		IFS= read -r primary
+		IFS= read -r static
+		IFS= read -r address
+		IFS= read -r mask
+	} <<-END
+		$answer
+	END
+	create_bridge "$1" "$hardware"
 	if [ -n "$primary" ] && ! is_wireless "$primary"; then join_bridge "$primary" "$1"; fi
-	case $(script_value BOOTPROTO "$1") in
-	static) set_address "$1" "$(script_value IPADDR "$1")/$(script_value NETMASK "$1")" ;;
-	*) lease_address "$1" ;;
-	esac
+	if [ "$static" = yes ]; then set_address "$1" "$address/$mask"; else lease_address "$1"; fi
 }
 
 create_bridge() { # BRIDGE HARDWARE-ADDRESS, which may be empty

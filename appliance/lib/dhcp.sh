@@ -5,7 +5,7 @@
 # serve_addresses BRIDGE: starts the server, or ends it, as its files say.
 serve_addresses() {
 	end_dnsmasq "$1"
-	[ "$(value_of enable "/etc/dhcpd/dhcpd-$1-$1.info")" = yes ] || return 0
+	is_enabled "/etc/dhcpd/dhcpd-$1-$1.info" || return 0
 	is_there "$1" || return 0
 	start_dnsmasq "$1" "/etc/dhcpd/dhcpd-$1-$1.conf"
 }

@@ -2,51 +2,55 @@
 # shellcheck shell=sh
 # shellcheck disable=SC2034  # the other parts use them
 
+settings_reader=/usr/mero/sbin/mero-settings
 scripts=/etc/sysconfig/network-scripts
-settings=/usr/mero/etc/wireless_ap.conf
 adapter_info=/tmp/wireless.info
 state=/var/run/rc.network
 
+# ask REQUEST...: what settings hold, in $answer, as the library reads them. False when something is missing, or not as
+# checked. Settings that cannot be read end the script: an empty answer is neither on nor off.
+ask() {
+	answer=$("$settings_reader" "$@")
+	case $? in
+	0) ;;
+	1) return 1 ;;
+	*) fail "cannot read settings: $*" ;;
+	esac
+}
+
+# says_yes REQUEST...: the same for something that is yes or no; false when it is missing.
+says_yes() {
+	ask "$@" || return 1
+	case $answer in
+	yes) ;;
+	no) return 1 ;;
+	*) fail "neither yes nor no, but '$answer': $*" ;;
+	esac
+}
+
 # value_of KEY FILE: what a key/value file holds for a key, without quotes; empty when there is neither.
 value_of() {
-	[ -f "$2" ] || return 0
-	sed -n "
-		/^[[:space:]]*$1[[:space:]]*=/{
-			s/^[^=]*=[[:space:]]*//
-			s/[[:space:]]*\$//
-			s/^\"\(.*\)\"\$/\1/
-			s/^'\(.*\)'\$/\1/
-			h
-		}
-		\${
-			g
-			p
-		}" "$2"
+	if ask file "$2" "$1"; then printf '%s' "$answer"; fi
 }
 
-# setting KEY DEFAULT: a setting of the adapter that is plugged in.
+# is_enabled FILE: whether a key/value file switches on what it is about.
+is_enabled() {
+	ask check "$1" enable yes
+}
+
+# setting KEY: of the access point, for the adapter that is plugged in.
 setting() {
-	found=$(SECTION=$(value_of PRODUCT "$adapter_info") KEY=$1 awk '
-		function trimmed(text) { gsub(/^[ \t]+|[ \t\r]+$/, "", text); return text }
-		BEGIN { section = tolower(trimmed(ENVIRON["SECTION"])); key = ENVIRON["KEY"] }
-		/^[ \t]*\[.*\][ \t\r]*$/ {
-			header = trimmed($0)
-			inside = !seen && tolower(trimmed(substr(header, 2, length(header) - 2))) == section
-			seen = seen || inside
-			next
-		}
-		inside && (equals = index($0, "=")) && trimmed(substr($0, 1, equals - 1)) == key {
-			value = substr($0, equals + 1)
-			found = 1
-		}
-		END { if (found) print "=" value }' "$settings" 2>/dev/null)
-	if [ -n "$found" ]; then printf '%s' "${found#=}"; else printf '%s' "$2"; fi
+	ask access-point "$1" || fail "cannot read the setting $1"
+	printf '%s' "$answer"
 }
 
-# is_on KEY DEFAULT: whether a setting is a number other than 0.
+# is_on KEY: whether such a setting is a number other than 0.
 is_on() {
-	number=$(setting "$1" "$2")
-	[ "$number" != 0 ] && [ -n "$number" ]
+	ask access-point "$1" || fail "cannot read the setting $1"
+	case $answer in
+	0) return 1 ;;
+	'' | *[!0-9-]*) fail "the setting $1 is '$answer', which is no number" ;;
+	esac
 }
 
 # put FILE: replaces a file by what it reads. Nobody sees a half of it, and nobody but root the whole.

@@ -10,7 +10,8 @@ set_firewall() { # INTERFACE BRIDGE
 		clear_firewall
 		return
 	fi
-	said=$(rules "$1" "$2" | nft -f - 2>&1) || fail "cannot set the rules between networks: $said"
+	text=$(rules "$1" "$2") || exit 1
+	said=$(printf '%s\n' "$text" | nft -f - 2>&1) || fail "cannot set the rules between networks: $said"
 	forward
 }
 
@@ -63,6 +64,8 @@ subnet_of() {
 # Guests get addresses and names, and an answer to a ping. What else of the appliance, of the networks around it, and of
 # those beyond they reach is set.
 guest_rules() {
+	lan=$(verdict guest_net_lan_block) || exit 1
+	internet=$(verdict guest_net_internet_block) || exit 1
 	cat <<-END
 		set local-networks {
 			type ipv4_addr; flags interval; auto-merge
@@ -76,8 +79,8 @@ guest_rules() {
 			tcp dport 53 accept
 			icmp type echo-request ip daddr $guest_address accept
 	END
-	if is_on guest_net_access_ds 0; then echo 'meta nfproto ipv4 accept'; fi
-	if is_on guest_net_allow_http 1; then echo 'meta nfproto ipv4 tcp dport { 80, 443 } accept'; fi
+	if is_on guest_net_access_ds; then echo 'meta nfproto ipv4 accept'; fi
+	if is_on guest_net_allow_http; then echo 'meta nfproto ipv4 tcp dport { 80, 443 } accept'; fi
 	cat <<-END
 			reject
 		}
@@ -86,8 +89,8 @@ guest_rules() {
 			iifname != "$guest_bridge" accept
 			ct state established,related accept
 			meta nfproto ipv6 reject
-			ip daddr @local-networks $(verdict guest_net_lan_block 1)
-			$(verdict guest_net_internet_block 0)
+			ip daddr @local-networks $lan
+			$internet
 		}
 	END
 }
@@ -100,6 +103,6 @@ local_networks() {
 	} | paste -s -d ,
 }
 
-verdict() { # KEY DEFAULT
-	if is_on "$1" "$2"; then echo reject; else echo accept; fi
+verdict() { # KEY
+	if is_on "$1"; then echo reject; else echo accept; fi
 }

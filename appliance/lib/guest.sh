@@ -10,7 +10,7 @@ guest_range=10.1.15.2,10.1.15.254,255.255.255.0,86400
 
 # guest_is_on INTERFACE: whether there is a guest network, and it is on the air at this hour.
 guest_is_on() {
-	[ "$(value_of enable "/etc/hostapd/hostapd-$1-guest.info")" = yes ] &&
+	is_enabled "/etc/hostapd/hostapd-$1-guest.info" &&
 		[ -f "/etc/hostapd/hostapd-$1-guest.conf" ] &&
 		! is_off_now guest_net_sched_enable guest_net_sched
 }

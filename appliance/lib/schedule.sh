@@ -5,10 +5,11 @@
 # is_off_now SWITCH-KEY SCHEDULE-KEY: whether a schedule is followed, and has its network off the air. It has a digit for
 # each hour of a week, from Sunday's first on: 0 for off.
 is_off_now() {
-	is_on "$1" 0 || return 1
+	is_on "$1" || return 1
+	hours=$(setting "$2") || exit 1
 	hour=$(date +%H)
 	digit=$(($(date +%w) * 24 + ${hour#0} + 1))
-	[ "$(setting "$2" '' | cut -c "$digit")" = 0 ]
+	[ "$(printf '%s' "$hours" | cut -c "$digit")" = 0 ]
 }
 
 # An interface that is down is off the air; the daemon puts its network back when it comes up.

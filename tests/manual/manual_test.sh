@@ -262,6 +262,13 @@ expect_references() {
   expect_all 'references to'
 }
 
+# Of a program, whose usage is not in a script to be read.
+expect_program() {
+  "$argument" --help >"$work/${argument##*/}"
+  argument=$work/${argument##*/}
+  expect_same script_commands described_script_commands
+}
+
 case $check in
   functions) expect_functions ;;
   types) expect_types ;;
@@ -270,6 +277,7 @@ case $check in
   files) expect_files ;;
   installed) expect_installed ;;
   script) expect_same script_commands described_script_commands ;;
+  program) expect_program ;;
   commands) expect_same program_options described_options ;;
   names) expect_names ;;
   references) expect_references ;;

@@ -147,6 +147,10 @@ iwlist_lists() {
   [[ $(inside iwlist wlan0 scanning mero 2>&1) == 'iwlist: '* ]]
 }
 
+settings_are_told() {
+  [[ $(inside /usr/mero/sbin/mero-settings access-point guest_net_lan_block) == 1 ]]
+}
+
 completes_in_bash() {
   quietly inside bash -c '. /usr/share/bash-completion/completions/merowireless && complete -p merowireless'
 }
@@ -325,6 +329,7 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'a scan without an adapter says so in one sentence, and exits with 3' scan_says_that_there_is_no_adapter
   check 'the listing tool has its own form' iwlist_lists
   check 'the listing tool passes the others on' iwlist_passes_on
+  check 'the kit tells what settings hold' settings_are_told
   check 'bash completes the program' completes_in_bash
 
   check 'the example builds with pkg-config and runs' builds_and_runs scan-one "cc -Wall -Wextra -Werror $cc"
