@@ -14,25 +14,36 @@ adapter() {
 
 # PRODUCT names the adapter's section in the access point's settings.
 note_adapter() { # INTERFACE
+	section=$(section_of "$1") || exit 1
 	put "$adapter_info" <<-END
 		INTERFACE="$1"
-		PRODUCT="$(product_of "$1" | tr -d '[:cntrl:]"[]')"
+		PRODUCT="$section"
 	END
 	attempt "let programs read $adapter_info" chmod 644 "$adapter_info"
 }
 
 # A USB adapter has a name, mostly; others are known by their numbers, or by what drives them.
-product_of() { # INTERFACE
+section_of() { # INTERFACE
 	device=$(readlink -f "/sys/class/net/$1/device")
 	for file in "$device/../product" "$device/product"; do
-		[ ! -s "$file" ] || { cat "$file" && return; }
+		if [ -s "$file" ] && ask section-name <"$file"; then
+			printf '%s' "$answer"
+			return
+		fi
 	done
-	if [ -s "$device/../idVendor" ]; then
-		printf '%s:%s\n' "$(cat "$device/../idVendor")" "$(cat "$device/../idProduct")"
-	elif [ -s "$device/vendor" ]; then
-		printf '%s:%s\n' "$(sed s/^0x// "$device/vendor")" "$(sed s/^0x// "$device/device")"
+	ask section-name <<-END || fail "the adapter $1 has neither a name nor numbers"
+		$(numbers_of "$device")
+	END
+	printf '%s' "$answer"
+}
+
+numbers_of() { # DEVICE
+	if [ -s "$1/../idVendor" ]; then
+		printf '%s:%s\n' "$(cat "$1/../idVendor")" "$(cat "$1/../idProduct")"
+	elif [ -s "$1/vendor" ]; then
+		printf '%s:%s\n' "$(sed s/^0x// "$1/vendor")" "$(sed s/^0x// "$1/device")"
 	else
-		basename "$(readlink -f "$device/driver")"
+		basename "$(readlink -f "$1/driver")"
 	fi
 }
 

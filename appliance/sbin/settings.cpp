@@ -12,6 +12,7 @@
 #include <string>
 #include <string_view>
 
+#include "common/text.h"
 #include "lib/obsolete/ap_settings.h"
 #include "lib/obsolete/paths.h"
 #include "platform.h"
@@ -24,6 +25,7 @@ constexpr char kUsage[] =
        mero-settings bridge BRIDGE VALUE...    nat, at-boot, static, address, mask, member, hardware-address
        mero-settings file FILE KEY...          values in a key/value file
        mero-settings check FILE KEY VALUE      whether a key/value file holds a key with exactly that value
+       mero-settings section-name              the settings' section for the adapter's name on standard input
 
 Tells a line for each thing asked for; several requests can follow each other, with -- between them. What the settings
 of the access point lack has its default; secrets are not told. What else is missing is an empty line.
@@ -191,16 +193,47 @@ void TellBridge(Answers& answers, Words words) {
   }
 }
 
+// ---- The name of a section ---------------------------------------------------------------------------------------
+
+// Whether a byte can stand in the header of a section, and between the quotes of a key/value line.
+bool CanBeInName(char c) {
+  constexpr std::string_view kNotInName = "\"[]\x7f";
+  return static_cast<unsigned char>(c) >= ' ' && kNotInName.find(c) == std::string_view::npos;
+}
+
+// What fits of a text into so many bytes, without a part of a UTF-8 character at its end.
+std::string_view Cut(std::string_view text, size_t most) {
+  if (text.size() <= most) return text;
+  constexpr size_t kMostContinued = 3;
+  const auto is_continued = [text](size_t at) { return (static_cast<unsigned char>(text[at]) & 0xC0) == 0x80; };
+  size_t end = most;
+  while (end > most - kMostContinued && is_continued(end)) --end;
+  return Slice(text, 0, end);
+}
+
+// The name of the section for an adapter of that name: one that the settings' record and both files give back as it is.
+std::string SectionName(std::string_view product) {
+  std::string name;
+  std::copy_if(product.begin(), product.end(), std::back_inserter(name), CanBeInName);
+  return std::string(TrimEnd(Cut(Trim(name), sizeof MERO_AP_CONF::szSecName - 1)));
+}
+
+void TellSectionName(Answers& answers, Words words) {
+  if (!words.empty()) throw WrongUsage("section-name takes no more words");
+  char text[64 * 1024];
+  const std::string name = SectionName({text, std::fread(text, 1, sizeof text, stdin)});
+  if (std::ferror(stdin) != 0) throw std::runtime_error("cannot read the adapter's name");
+  name.empty() ? answers.AddMissing() : answers.Add(name);
+}
+
 // ---- Requests ----------------------------------------------------------------------------------------------------
 
 constexpr struct {
   std::string_view name;
   void (*tell)(Answers&, Words);
 } kRequests[] = {
-    {"access-point", TellAccessPoint},
-    {"bridge", TellBridge},
-    {"file", TellFile},
-    {"check", TellCheck},
+    {"access-point", TellAccessPoint}, {"bridge", TellBridge}, {"file", TellFile}, {"check", TellCheck},
+    {"section-name", TellSectionName},
 };
 
 void TellRequest(Answers& answers, Words words) {
