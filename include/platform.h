@@ -471,11 +471,13 @@ int MERONetIsSameSubnet(const char* szAddress, const char* szReference, const ch
 const char* MERONetNtoa(struct in_addr address);
 
 /**
- * Applies an address to an interface at once, and notes it in the interface's network-script file. Who applies that at
- * boot is the appliance's own affair: the kit does so for bridges only.
+ * Applies an address to an interface at once, as the only one that it has, and notes it in the interface's
+ * network-script file. An address that it has already stays, and so do the routes that go with it. Who applies what is
+ * noted at boot is the appliance's own affair: the kit does so for bridges only.
  *
  * @param flags  0.
- * @return 0; -1 when the address or the mask is none (the interface stays as it was), or the interface cannot be set.
+ * @return 0; -1 when the address or the mask is none (the interface stays as it was), or the interface cannot be set
+ *         (it has the addresses that it had).
  */
 int MERONetSetCard1(const NETINFO* pNetInfo, int flags);
 

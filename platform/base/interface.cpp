@@ -1,12 +1,13 @@
-// Network interfaces, asked and told through ioctls.
+// Network interfaces, asked and told through ioctls; their addresses, through the kernel's routing socket.
 #include "platform/base/interface.h"
 
+#include <linux/rtnetlink.h>
 #include <netinet/in.h>
 #include <sys/ioctl.h>
 #include <sys/socket.h>
 
 #include <algorithm>
-#include <optional>
+#include <bit>
 
 #include "platform/base/bytes.h"
 
@@ -35,45 +36,136 @@ Status SetInterfaceUp(const char* szIfName, bool up) {
 
 namespace {
 
-// All IPv4 addresses of the machine, each with its label: the interface's name, and maybe more behind a colon.
-Result<Bytes> AllAddresses(const Descriptor& control) {
-  Bytes addresses;
-  ifconf request{};
-  do {
-    if (!addresses.Reserve(2 * addresses.capacity() + 16 * sizeof(ifreq))) return Status::Failed(ENOMEM);
-    request.ifc_len = static_cast<int>(addresses.capacity());
-    request.ifc_buf = addresses.data();
-    if (::ioctl(control.get(), SIOCGIFCONF, &request) < 0) return Status::Failed(errno);
-  } while (static_cast<size_t>(request.ifc_len) + sizeof(ifreq) > addresses.capacity());  // there may be more
-  addresses.Grow(static_cast<size_t>(request.ifc_len));
-  return addresses;
+// The IPv4 addresses of one interface, as the kernel's routing socket tells of them, and is told.
+class Addresses {
+ public:
+  // Asks for those that the interface has. One that is not there has none.
+  Status List(const char* szIfName) {
+    index_ = ::if_nametoindex(szIfName);
+    kernel_ = Descriptor(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_ROUTE));
+    if (!kernel_.valid()) return Status::Failed(errno);
+    struct {
+      nlmsghdr header;
+      ifaddrmsg about;
+    } request = {{sizeof request, RTM_GETADDR, NLM_F_REQUEST | NLM_F_DUMP, 0, 0}, {AF_INET, 0, 0, 0, 0}};
+    if (::send(kernel_.get(), &request, sizeof request, 0) < 0) return Status::Failed(errno);
+    while (true) {
+      alignas(nlmsghdr) char part[8192];  // the kernel gives no more at a time
+      auto left = static_cast<int>(::recv(kernel_.get(), part, sizeof part, 0));
+      if (left < 0) return Status::Failed(errno);
+      for (auto* message = reinterpret_cast<nlmsghdr*>(part); NLMSG_OK(message, left);
+           message = NLMSG_NEXT(message, left)) {
+        const void* content = NLMSG_DATA(message);
+        // Both the end and a failure begin with an errno.
+        if (message->nlmsg_type != RTM_NEWADDR) return Status::Failed(-*static_cast<const int*>(content));
+        if (static_cast<const ifaddrmsg*>(content)->ifa_index != index_) continue;
+        if (!found_.Append({reinterpret_cast<char*>(message), message->nlmsg_len})) return Status::Failed(ENOMEM);
+      }
+    }
+  }
+
+  unsigned index() const { return index_; }
+
+  // Calls `visit(message)` for each that was found, up to the first time that it fails.
+  template <class Visit>
+  Status ForEach(Visit visit) {
+    auto left = static_cast<int>(found_.view().size());
+    Status status = Status::Ok();
+    for (auto* message = reinterpret_cast<nlmsghdr*>(found_.data()); status.ok() && NLMSG_OK(message, left);
+         message = NLMSG_NEXT(message, left)) {
+      status = visit(*message);
+    }
+    return status;
+  }
+
+  // Has the address of a message added.
+  Status Add(nlmsghdr& message) { return Tell(message, RTM_NEWADDR, NLM_F_CREATE | NLM_F_REPLACE); }
+
+  // Has it removed. The kernel removes others along with it, or not; one that is gone already is none to remove.
+  Status Remove(nlmsghdr& message) {
+    const Status status = Tell(message, RTM_DELADDR, 0);
+    return status.error() == EADDRNOTAVAIL ? Status::Ok() : status;
+  }
+
+ private:
+  Status Tell(nlmsghdr& message, uint16_t type, uint16_t flags) {
+    message.nlmsg_type = type;
+    message.nlmsg_flags = static_cast<uint16_t>(NLM_F_REQUEST | NLM_F_ACK | flags);
+    struct {
+      nlmsghdr header;
+      nlmsgerr result;
+    } answer;
+    if (::send(kernel_.get(), &message, message.nlmsg_len, 0) < 0) return Status::Failed(errno);
+    if (::recv(kernel_.get(), &answer, sizeof answer, 0) < 0) return Status::Failed(errno);
+    return Status::Failed(-answer.result.error);
+  }
+
+  Descriptor kernel_;
+  Bytes found_;  // the kernel's own messages: with one an address can be given back with all that it had
+  unsigned index_ = 0;
+};
+
+struct AddressPart {
+  rtattr header;
+  in_addr_t value;
+};
+
+// A message about an address of an interface. A broadcast address of 0 is none.
+struct AddressMessage {
+  nlmsghdr header;
+  ifaddrmsg about;
+  AddressPart local;
+  AddressPart subnet;  // by which the kernel tells one address with two masks apart
+  AddressPart broadcast;
+};
+
+AddressPart Part(unsigned short type, uint32_t address) {
+  return {{RTA_LENGTH(sizeof address), type}, htonl(address)};
 }
 
-// One of the addresses of an interface; none when it has none.
-Result<std::optional<ifreq>> AddressOf(const Descriptor& control, std::string_view ifName) {
-  Result<Bytes> addresses = AllAddresses(control);
-  if (!addresses.ok()) return addresses.status();
-  for (std::string_view rest = addresses->view(); rest.size() >= sizeof(ifreq); rest.remove_prefix(sizeof(ifreq))) {
-    ifreq address;
-    std::memcpy(&address, rest.data(), sizeof address);
-    const std::string_view label(address.ifr_name, ::strnlen(address.ifr_name, sizeof address.ifr_name));
-    if (Slice(label, 0, label.find(':')) == ifName) return std::optional<ifreq>(address);
+// Whether a message that the kernel has sent is about just that address, under the interface's own name.
+bool Same(const nlmsghdr& found, const AddressMessage& wanted, const char* szIfName) {
+  const auto& about = *static_cast<const ifaddrmsg*>(NLMSG_DATA(&found));
+  in_addr_t values[IFA_BROADCAST + 1] = {};
+  auto left = static_cast<int>(IFA_PAYLOAD(&found));
+  for (auto* part = IFA_RTA(&about); RTA_OK(part, left); part = RTA_NEXT(part, left)) {
+    const void* value = RTA_DATA(part);
+    if (part->rta_type == IFA_LABEL && std::strcmp(static_cast<const char*>(value), szIfName) != 0) return false;
+    if (part->rta_type <= IFA_BROADCAST) std::memcpy(&values[part->rta_type], value, sizeof values[0]);
   }
-  return std::optional<ifreq>();
+  return about.ifa_prefixlen == wanted.about.ifa_prefixlen && values[IFA_ADDRESS] == wanted.subnet.value &&
+         values[IFA_LOCAL] == wanted.local.value && values[IFA_BROADCAST] == wanted.broadcast.value;
 }
 
 }  // namespace
 
 Status RemoveAddresses(const char* szIfName) {
-  Result<Descriptor> control = OpenControl();
-  if (!control.ok()) return control.status();
-  // One by one: when one goes, the kernel removes others with it, or puts another in its place.
-  while (true) {
-    Result<std::optional<ifreq>> found = AddressOf(*control, szIfName);
-    if (!found.ok()) return found.status();
-    if (!*found) return Status::Ok();
-    ifreq& address = **found;
-    reinterpret_cast<sockaddr_in&>(address.ifr_addr).sin_addr.s_addr = INADDR_ANY;
-    if (::ioctl(control->get(), SIOCSIFADDR, &address) < 0) return Status::Failed(errno);
+  Addresses addresses;
+  if (Status status = addresses.List(szIfName); !status.ok()) return status;
+  return addresses.ForEach([&](nlmsghdr& found) { return addresses.Remove(found); });
+}
+
+Status SetOnlyAddress(const char* szIfName, uint32_t address, uint32_t mask) {
+  Addresses addresses;
+  if (Status status = addresses.List(szIfName); !status.ok()) return status;
+
+  AddressMessage wanted{};
+  wanted.header.nlmsg_len = sizeof wanted;
+  wanted.about.ifa_family = AF_INET;
+  wanted.about.ifa_prefixlen = static_cast<uint8_t>(std::popcount(mask));
+  wanted.about.ifa_index = addresses.index();
+  wanted.local = Part(IFA_LOCAL, address);
+  wanted.subnet = Part(IFA_ADDRESS, address);
+  wanted.broadcast = Part(IFA_BROADCAST, ~mask > 1 ? address | ~mask : 0);  // one or two addresses have none
+
+  // First what can be refused. It comes again behind the others, which may have taken it with them.
+  if (Status status = addresses.Add(wanted.header); !status.ok()) return status;
+  Status status = addresses.ForEach(
+      [&](nlmsghdr& found) { return Same(found, wanted, szIfName) ? Status::Ok() : addresses.Remove(found); });
+  if (status.ok()) status = addresses.Add(wanted.header);
+  if (!status.ok()) {
+    (void)addresses.Remove(wanted.header);
+    (void)addresses.ForEach([&](nlmsghdr& found) { return (void)addresses.Add(found), Status::Ok(); });
   }
+  return status;
 }

@@ -1,9 +1,10 @@
-// Network interfaces, asked and told through ioctls.
+// Network interfaces.
 #ifndef MERO_PLATFORM_INTERFACE_H
 #define MERO_PLATFORM_INTERFACE_H
 
 #include <net/if.h>
 
+#include <cstdint>
 #include <string_view>
 
 #include "common/text.h"
@@ -22,6 +23,10 @@ Status SetInterfaceUp(const char* szIfName, bool up);
 
 // Removes every IPv4 address of an interface.
 Status RemoveAddresses(const char* szIfName);
+
+// Gives an interface one IPv4 address, in host order, with the usual broadcast address, and removes all others. If it
+// has that address, that stays, and so do the routes that go with it. After a failure it has the addresses that it had.
+Status SetOnlyAddress(const char* szIfName, uint32_t address, uint32_t mask);
 
 // A request of the kernel's (`struct ifreq`, `struct iwreq`) that names its interface. ENODEV when the name is longer
 // than any interface's, so that a name that was cut never reaches another interface.

@@ -1,6 +1,5 @@
 // Addressing an interface, and noting down how.
-#include <arpa/inet.h>
-#include <sys/ioctl.h>
+#include <netinet/in.h>
 
 #include <optional>
 
@@ -28,23 +27,9 @@ std::optional<Subnet> SubnetOf(const NETINFO& netInfo) {
   return Subnet{*address, *mask};
 }
 
-Status Set(const Descriptor& control, const char* szIfName, unsigned long what, Ipv4 value) {
-  Result<ifreq> request = RequestFor<ifreq>(szIfName);
-  if (!request.ok()) return request.status();
-  auto& address = reinterpret_cast<sockaddr_in&>(request->ifr_addr);
-  address.sin_family = AF_INET;
-  address.sin_addr.s_addr = htonl(value);
-  return Status::Of(::ioctl(control.get(), what, &*request));
-}
-
 Status Apply(const char* szIfName, const Subnet& subnet) {
-  Result<Descriptor> control = OpenControl();
-  if (!control.ok()) return control.status();
-  if (Status status = Set(*control, szIfName, SIOCSIFADDR, subnet.address); !status.ok()) return status;
-  if (Status status = Set(*control, szIfName, SIOCSIFNETMASK, subnet.mask); !status.ok()) return status;
-  const Ipv4 broadcast = subnet.address | ~subnet.mask;
-  if (Status status = Set(*control, szIfName, SIOCSIFBRDADDR, broadcast); !status.ok()) return status;
-  return SetInterfaceUp(szIfName, true);
+  if (Status status = SetInterfaceUp(szIfName, true); !status.ok()) return status;
+  return SetOnlyAddress(szIfName, subnet.address, subnet.mask);
 }
 
 bool WriteStatic(const NETINFO& netInfo) {
