@@ -422,7 +422,7 @@ int MERONetSetBridgeConfig(const NETINFO* pNetInfo, const BRIDGE_INFO* pBridgeIn
 typedef struct MERO_DHCPD_CONF {
   BOOL blEnable; /**< the server serves; on writing, the switch beside the record says so */
   int autoTime;
-  int leaseTime;         /**< seconds; 0 leaves it to the server */
+  int leaseTime;         /**< seconds; 0 leaves it to the server, and -1 is a lease without end */
   char szRangeStart[20]; /**< the first address given out */
   char szRangeEnd[20];   /**< the last */
   char szInterface[16];
@@ -437,7 +437,8 @@ typedef struct MERO_DHCPD_CONF {
 
 /**
  * Reads the configuration that is kept for an interface and a tag: /etc/dhcpd/dhcpd-INTERFACE-TAG.conf, and beside it
- * the .info file with the switch.
+ * the .info file with the switch. The .conf is read as dnsmasq reads it: without comments and quotes; what the record
+ * has no field for is passed over.
  *
  * @return 1 read; 0 when there is none (also for names that can have none), or when it cannot be read.
  */
@@ -445,13 +446,15 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
 
 /**
  * Writes the server's files: the .conf, which dnsmasq reads, then the .info file. Their directory is made when it is
- * missing. The network start script starts the server.
+ * missing. Where the files read as the record already, only the switch is set: a record that was read can be given
+ * back, whatever else the .conf says. The network start script starts the server.
  *
  * @param pConf   reads back the same, field by field; only blEnable is what the switch was. Neither szInterface nor
  *                szTag is empty or holds a '/'.
  * @param enable  1: the server serves; 0: it does not, and all else is kept.
- * @return 1; 0 on failure. A text with a control character, '"', '\\' or '#', and any but the domain and the lease file
- *         with a ',', is refused with ERR_BAD_PARAMETERS before anything is written.
+ * @return 1; 0 on failure. What has to be written is refused with ERR_BAD_PARAMETERS before anything is: a text with a
+ *         control character, '"', '\\' or '#'; any but the domain and the lease file with a ','; a first address that
+ *         begins as a tag does, and a netmask that is a lease time.
  *
  * dnsmasq takes a range that has both its ends, and a mask before a lease time; no second name server without a first;
  * and lines of up to 1,024 bytes.

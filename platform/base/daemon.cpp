@@ -8,13 +8,13 @@ extern "C" {
 #include <sys/pidfd.h>  // says nothing of the language of its functions
 }
 
-#include <charconv>
 #include <csignal>
 #include <cstdio>
 
 #include "common/text.h"
 #include "platform/base/descriptor.h"
 #include "platform/base/file_read.h"
+#include "platform/base/number.h"
 
 namespace {
 
@@ -23,9 +23,8 @@ constexpr int kPatience = 2000;  // milliseconds
 // The pid that a file holds; 0 when it holds none.
 pid_t PidIn(std::string_view text) {
   text = Trim(text);
-  pid_t pid = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), pid);
-  return error == std::errc() && end == text.data() + text.size() && pid > 0 ? pid : 0;
+  const pid_t pid = TakeNumber(text).value_or(0);
+  return text.empty() && pid > 0 ? pid : 0;
 }
 
 // Whether a process runs a program, by the name that the kernel knows it by. A pid file may be left from a process

@@ -1,4 +1,4 @@
-// A directory that is read, closed in one place.
+// Directories: made, and one that is read, closed in one place.
 #ifndef MERO_PLATFORM_DIRECTORY_H
 #define MERO_PLATFORM_DIRECTORY_H
 
@@ -6,9 +6,14 @@
 
 #include <memory>
 
+#include "platform/base/result.h"
+
 struct CloseDirectory {
   void operator()(DIR* directory) const { ::closedir(directory); }
 };
 using Directory = std::unique_ptr<DIR, CloseDirectory>;
+
+// Makes a directory of mode 0755, whatever the caller's umask is. One that is there already stays as it is.
+Status MakeDirectory(const char* szPath);
 
 #endif  // MERO_PLATFORM_DIRECTORY_H

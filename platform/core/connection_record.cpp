@@ -1,13 +1,13 @@
 // The record of the last join.
 #include "platform/core/connection_record.h"
 
-#include <charconv>
 #include <optional>
 #include <string_view>
 
 #include "common/connection_files.h"
 #include "common/text.h"
 #include "platform/base/file_read.h"
+#include "platform/base/number.h"
 
 namespace {
 
@@ -23,10 +23,8 @@ std::string_view TakeLastLine(std::string_view& text) {
 
 // A number from 0 to `greatest`; 0, which is unknown throughout, for anything else.
 int NumberUpTo(int greatest, std::string_view text) {
-  int number = 0;
-  const char* end = text.data() + text.size();
-  const bool whole = std::from_chars(text.data(), end, number).ptr == end;
-  return whole && number >= 0 && number <= greatest ? number : 0;
+  const int number = TakeNumber(text).value_or(0);
+  return text.empty() && number >= 0 && number <= greatest ? number : 0;
 }
 
 }  // namespace

@@ -1,17 +1,17 @@
 // The files of a DHCP server: the configuration that dnsmasq reads, and beside it what dnsmasq has no word for.
-#include <sys/stat.h>
-
 #include <algorithm>
-#include <charconv>
 #include <cstdio>
 #include <cstring>
 #include <iterator>
+#include <optional>
 
 #include "common/text.h"
+#include "platform/base/directory.h"
 #include "platform/base/error.h"
 #include "platform/base/file_edit.h"
 #include "platform/base/file_read.h"
 #include "platform/base/interface.h"
+#include "platform/base/number.h"
 
 namespace {
 
@@ -23,21 +23,26 @@ constexpr char kLineFormat[] = "%s=\"%s\"\n";
 constexpr char kEnableKey[] = "enable";
 constexpr char kAutoTimeKey[] = "auto_time";
 
+constexpr char kInfiniteTime[] = "infinite";
+constexpr int kInfinite = -1;
+
 constexpr char kHeading[] = "# Written from the DHCP server's record, and read back into it.\n";
 constexpr char kEnding[] = "dhcp-authoritative\n";
 
-enum class Kind {
+enum class Kind : uint8_t {
   kWord,     // may stand in a list
+  kTagged,   // a word, and before it there may be tags, which the record has no field for
+  kMask,     // a word that may be left out before a lease time
+  kSeconds,  // a lease time; 0 is left out, and before it there may be a broadcast address
   kText,     // reaches to the line's end
-  kSeconds,  // a number; 0 is left out
 };
 
 // A field of the record, as a part of a line.
 struct Part {
   const char* szName;  // what a report calls it; null behind the line's last part
   Kind kind;
-  size_t offset;
-  size_t size;
+  uint16_t offset;
+  uint16_t size;
 };
 
 // A line: its beginning, then its parts with commas between them. The empty ones at its end are left out, and a line
@@ -53,9 +58,9 @@ struct ConfLine {
 constexpr ConfLine kLines[] = {
     {"interface=", {{"interface", Kind::kWord, FIELD(szInterface)}}},
     {"dhcp-range=",
-     {{"first address", Kind::kWord, FIELD(szRangeStart)},
+     {{"first address", Kind::kTagged, FIELD(szRangeStart)},
       {"last address", Kind::kWord, FIELD(szRangeEnd)},
-      {"netmask", Kind::kWord, FIELD(szSubnet)},
+      {"netmask", Kind::kMask, FIELD(szSubnet)},
       {"lease time", Kind::kSeconds, FIELD(leaseTime)}}},
     {"dhcp-option=option:router,", {{"router", Kind::kWord, FIELD(szRouter)}}},
     {"dhcp-option=option:dns-server,",
@@ -108,14 +113,36 @@ bool IsOrdinary(char c) {
   return static_cast<unsigned char>(c) >= ' ' && c != '\x7f' && c != '"' && c != '\\' && c != '#';
 }
 
+bool IsTagWord(std::string_view word) {
+  return word.starts_with("set:") || word.starts_with("tag:");
+}
+
+// The seconds of a lease time, as the server reads it; none when it is anything else.
+std::optional<int> SecondsOf(std::string_view text) {
+  constexpr std::string_view kUnits = "smhdw";
+  constexpr int kSecondsOfUnit[] = {1, 60, 60 * 60, 24 * 60 * 60, 7 * 24 * 60 * 60};
+  if (text == kInfiniteTime) return kInfinite;
+  std::optional<int> number = TakeNumber(text);
+  const size_t unit = text.empty() ? 0 : kUnits.find(ToLower(text.front()));
+  if (!number || text.size() > 1 || unit == std::string_view::npos) return std::nullopt;
+  return __builtin_mul_overflow(*number, kSecondsOfUnit[unit], &*number) ? std::nullopt : number;
+}
+
 bool CanWrite(std::string_view text, const Part& part) {
   if (text.size() == part.size) return false;  // it does not end
-  if (part.kind == Kind::kWord && text.find(',') != std::string_view::npos) return false;
+  if (part.kind != Kind::kText && text.find(',') != std::string_view::npos) return false;
+  if (part.kind == Kind::kTagged && IsTagWord(text)) return false;
+  if (part.kind == Kind::kMask && SecondsOf(text)) return false;
   return std::all_of(text.begin(), text.end(), IsOrdinary);
 }
 
 bool IsTag(std::string_view tag) {
   return !tag.empty() && tag.size() < sizeof(MERO_DHCPD_CONF::szTag) && tag.find('/') == std::string_view::npos;
+}
+
+// Whether the record names its files.
+bool HasNames(const MERO_DHCPD_CONF& conf) {
+  return IsInterfaceName(TextIn(conf, kLines[0].parts[0])) && IsTag(TextIn(conf, kTag));
 }
 
 bool CheckPart(const MERO_DHCPD_CONF& conf, const Part& part) {
@@ -146,9 +173,15 @@ class PartText {
     if (part.kind != Kind::kSeconds) return;
     int seconds;
     std::memcpy(&seconds, FieldOf(conf, part), sizeof seconds);
-    const int size = seconds != 0 ? std::snprintf(szSeconds_, sizeof szSeconds_, "%ds", seconds) : 0;
-    text_ = {szSeconds_, static_cast<size_t>(size)};
+    if (seconds == kInfinite) {
+      text_ = kInfiniteTime;
+    } else if (seconds != 0) {
+      text_ = {szSeconds_, static_cast<size_t>(std::snprintf(szSeconds_, sizeof szSeconds_, "%ds", seconds))};
+    }
   }
+  // Blanks at the ends count in quotes only.
+  std::string_view quote() const { return text_.front() == ' ' || text_.back() == ' ' ? "\"" : ""; }
+
   PartText(const PartText&) = delete;
   PartText& operator=(const PartText&) = delete;
 
@@ -170,7 +203,7 @@ bool AppendLine(Bytes& content, const ConfLine& line, const MERO_DHCPD_CONF& con
       if (!begun) good = good && content.Append(line.szPrefix);
       begun = true;
       for (; separators > 0; --separators) good = good && content.Append(",");
-      good = good && content.Append(text.view());
+      good = good && content.Append(text.quote()) && content.Append(text.view()) && content.Append(text.quote());
     }
     ++separators;
   });
@@ -185,61 +218,130 @@ bool Compose(Bytes& content, const MERO_DHCPD_CONF& conf) {
 }
 
 Status WriteConf(const char* szPath, const MERO_DHCPD_CONF& conf) {
-  if (::mkdir(kDirectory, 0755) < 0 && errno != EEXIST) return Status::Failed(errno);
+  if (Status status = MakeDirectory(kDirectory); !status.ok()) return status;
   return EditFile(szPath, 0644, [&](std::string_view, Bytes& content) {
     return Compose(content, conf) ? Status::Ok() : Status::Failed(ENOMEM);
   });
 }
 
-// Whether both keys were set; the switch comes last, so that it never runs ahead of the rest.
-bool WriteInfo(const char* szPath, const MERO_DHCPD_CONF& conf, bool enable) {
+bool WriteSwitch(const MERO_DHCPD_CONF& conf, bool enable) {
+  const ServerFile path(kInfoFormat, conf.szInterface, conf.szTag);
+  return PLIBCFileSetKeyValue(path.c_str(), kEnableKey, enable ? "yes" : "no", kLineFormat) > 0;
+}
+
+bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
+  const ServerFile path(kInfoFormat, conf.szInterface, conf.szTag);
   char szAutoTime[16];
   std::snprintf(szAutoTime, sizeof szAutoTime, "%d", conf.autoTime);
-  return PLIBCFileSetKeyValue(szPath, kAutoTimeKey, szAutoTime, kLineFormat) > 0 &&
-         PLIBCFileSetKeyValue(szPath, kEnableKey, enable ? "yes" : "no", kLineFormat) > 0;
+  return PLIBCFileSetKeyValue(path.c_str(), kAutoTimeKey, szAutoTime, kLineFormat) > 0;
+}
+
+// The switch comes last, so that it never runs ahead of the rest.
+bool WriteFiles(const MERO_DHCPD_CONF& conf, bool enable) {
+  const ServerFile path(kConfFormat, conf.szInterface, conf.szTag);
+  if (Status status = WriteConf(path.c_str(), conf); !status.ok()) {
+    return FAIL(status.error(), "write", path.c_str()), false;
+  }
+  return WriteAutoTime(conf) && WriteSwitch(conf, enable);
 }
 
 // ---- Reading ----
 
-// The number that a text begins with, if `unit` is all that follows; else 0.
-int NumberOf(std::string_view text, std::string_view unit) {
-  int number = 0;
-  const char* const end = text.data() + text.size();
-  const auto [rest, error] = std::from_chars(text.data(), end, number);
-  const bool whole = error == std::errc() && std::string_view(rest, static_cast<size_t>(end - rest)) == unit;
-  return whole ? number : 0;
+// The number that a text is; 0 when it is none.
+int NumberOf(std::string_view text) {
+  const int number = TakeNumber(text).value_or(0);
+  return text.empty() ? number : 0;
 }
 
-void ReadPart(std::string_view text, const Part& part, MERO_DHCPD_CONF& conf) {
+// A line without its comment, which a '#' at its beginning or behind white space begins, outside of quotes.
+std::string_view WithoutComment(std::string_view line) {
+  bool quoted = false;
+  for (size_t i = 0; i < line.size(); ++i) {
+    if (line[i] == '"') quoted = !quoted;
+    if (line[i] == '\\' && quoted) ++i;
+    if (!quoted && line[i] == '#' && (i == 0 || IsSpace(line[i - 1]))) return Slice(line, 0, i);
+  }
+  return line;
+}
+
+// Takes the beginning of a line, around whose signs there may be blanks; false when the line begins otherwise.
+bool TakePrefix(std::string_view& rest, std::string_view prefix) {
+  for (const char c : prefix) {
+    if (c == '=' || c == ',') rest = Trim(rest);
+    if (rest.empty() || rest.front() != c) return false;
+    rest.remove_prefix(1);
+    if (c == '=') rest = Trim(rest);
+  }
+  return true;
+}
+
+// Takes a word of a list, or a text that reaches to the line's end: without quotes, and without blanks around it.
+void TakeValue(std::string_view& rest, bool isText, char* szValue, size_t cbValue) {
+  rest = Trim(rest);
+  size_t used = 0;
+  size_t size = 0;
+  size_t sizeWithoutBlanks = 0;
+  bool quoted = false;
+  for (; used < rest.size(); ++used) {
+    char c = rest[used];
+    if (c == ',' && !quoted && !isText) break;
+    if (c == '"') {
+      quoted = !quoted;
+      continue;
+    }
+    if (quoted && c == '\\' && used + 1 < rest.size()) c = rest[++used];
+    if (size + 1 < cbValue) szValue[size++] = c;
+    if (quoted || !IsSpace(c)) sizeWithoutBlanks = size;
+  }
+  szValue[sizeWithoutBlanks] = '\0';
+  rest = Slice(rest, used + 1);
+}
+
+void ReadPart(std::string_view& rest, const Part& part, MERO_DHCPD_CONF& conf) {
   char* const szField = FieldOf(conf, part);
-  if (part.kind != Kind::kSeconds) return CopyText(szField, part.size, text);
-  const int seconds = NumberOf(text, "s");
-  std::memcpy(szField, &seconds, sizeof seconds);
-}
-
-// Takes from `rest` what belongs to a part.
-std::string_view NextPart(std::string_view& rest, const Part& part) {
-  const size_t size = part.kind == Kind::kText ? rest.size() : std::min(rest.find(','), rest.size());
-  const std::string_view text = Slice(rest, 0, size);
-  rest = Slice(rest, size + 1);
-  return text;
+  if (part.kind == Kind::kSeconds) {
+    char szTime[20];
+    std::optional<int> seconds;
+    do {
+      TakeValue(rest, false, szTime, sizeof szTime);
+      seconds = SecondsOf(szTime);
+    } while (!seconds && !rest.empty());
+    const int known = seconds.value_or(0);
+    std::memcpy(szField, &known, sizeof known);
+    return;
+  }
+  const std::string_view before = rest;
+  do {
+    TakeValue(rest, part.kind == Kind::kText, szField, part.size);
+  } while (part.kind == Kind::kTagged && IsTagWord(szField));
+  if (part.kind == Kind::kMask && SecondsOf(szField)) {
+    szField[0] = '\0';
+    rest = before;
+  }
 }
 
 void ReadLine(std::string_view text, MERO_DHCPD_CONF& conf) {
   for (const ConfLine& line : kLines) {
-    const std::string_view prefix = line.szPrefix;
-    if (Slice(text, 0, prefix.size()) != prefix) continue;
-    std::string_view rest = Slice(text, prefix.size());
-    ForEachPart(line, [&](const Part& part) { ReadPart(NextPart(rest, part), part, conf); });
+    std::string_view rest = Trim(WithoutComment(text));
+    if (!TakePrefix(rest, line.szPrefix)) continue;
+    ForEachPart(line, [&](const Part& part) { ReadPart(rest, part, conf); });
   }
 }
 
-void ReadConf(std::string_view text, MERO_DHCPD_CONF& conf) {
+void ReadText(std::string_view text, MERO_DHCPD_CONF& conf) {
   while (!text.empty()) {
     const size_t feed = text.find('\n');
     ReadLine(Slice(text, 0, feed), conf);
     text = feed == std::string_view::npos ? std::string_view() : Slice(text, feed + 1);
   }
+}
+
+Status ReadConf(const char* szPath, std::string_view ifName, MERO_DHCPD_CONF& conf) {
+  Result<Bytes> file = ReadFile(szPath);
+  if (!file.ok()) return file.status();
+  ReadText(file->view(), conf);
+  CopyText(conf.szInterface, ifName);
+  return Status::Ok();
 }
 
 // False when there is an information file that cannot be read.
@@ -249,8 +351,27 @@ bool ReadInfo(const char* szPath, MERO_DHCPD_CONF& conf) {
   if (PLIBCFileGetKeyValue(szPath, kEnableKey, szEnable, sizeof szEnable, 0) < 0) return false;
   if (PLIBCFileGetKeyValue(szPath, kAutoTimeKey, szAutoTime, sizeof szAutoTime, 0) < 0) return false;
   conf.blEnable = std::strcmp(szEnable, "yes") == 0 ? TRUE : FALSE;
-  conf.autoTime = NumberOf(szAutoTime, "");
+  conf.autoTime = NumberOf(szAutoTime);
   return true;
+}
+
+// ---- Giving back ----
+
+bool Same(const MERO_DHCPD_CONF& a, const MERO_DHCPD_CONF& b) {
+  bool same = a.leaseTime == b.leaseTime && a.autoTime == b.autoTime;
+  for (const ConfLine& line : kLines) {
+    ForEachPart(line, [&](const Part& part) {
+      same = same && (part.kind == Kind::kSeconds || TextIn(a, part) == TextIn(b, part));
+    });
+  }
+  return same;
+}
+
+// Whether the files of a record, as they are, read as the record.
+bool IsWritten(const MERO_DHCPD_CONF& conf) {
+  MERO_DHCPD_CONF written{};
+  return ReadConf(ServerFile(kConfFormat, conf.szInterface, conf.szTag).c_str(), conf.szInterface, written).ok() &&
+         ReadInfo(ServerFile(kInfoFormat, conf.szInterface, conf.szTag).c_str(), written) && Same(written, conf);
 }
 
 }  // namespace
@@ -260,14 +381,11 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
   if (!IsInterfaceName(szIfName) || !IsTag(szTag)) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
 
   const ServerFile path(kConfFormat, szIfName, szTag);
-  Result<Bytes> file = ReadFile(path.c_str());
-  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!file.ok()) return FAIL(file.error(), "read", path.c_str()), 0;
-
   MERO_DHCPD_CONF conf{};
-  ReadConf(file->view(), conf);
+  const Status status = ReadConf(path.c_str(), szIfName, conf);
+  if (status.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
+  if (!status.ok()) return FAIL(status.error(), "read", path.c_str()), 0;
   if (!ReadInfo(ServerFile(kInfoFormat, szIfName, szTag).c_str(), conf)) return 0;
-  CopyText(conf.szInterface, szIfName);
   CopyText(conf.szTag, szTag);
   *pConf = conf;
   return 1;
@@ -275,12 +393,8 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
 
 int MERONetSetDhcpServerConfigFiles(const MERO_DHCPD_CONF* pConf, int enable) {
   if (pConf == nullptr) return REFUSE_NULL(), 0;
+  // What a file says that the record has no field for stays, as long as nothing else changes.
+  if (HasNames(*pConf) && IsWritten(*pConf)) return WriteSwitch(*pConf, enable != 0) ? 1 : 0;
   if (!Check(*pConf)) return PLIBCErrSet(ERR_BAD_PARAMETERS), 0;
-
-  const ServerFile path(kConfFormat, pConf->szInterface, pConf->szTag);
-  if (Status status = WriteConf(path.c_str(), *pConf); !status.ok()) {
-    return FAIL(status.error(), "write", path.c_str()), 0;
-  }
-  const ServerFile info(kInfoFormat, pConf->szInterface, pConf->szTag);
-  return WriteInfo(info.c_str(), *pConf, enable != 0) ? 1 : 0;
+  return WriteFiles(*pConf, enable != 0) ? 1 : 0;
 }

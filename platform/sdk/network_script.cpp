@@ -1,10 +1,9 @@
 // The network-script file of an interface or a bridge.
 #include "platform/sdk/network_script.h"
 
-#include <sys/stat.h>
-
 #include <cstdio>
 
+#include "platform/base/directory.h"
 #include "platform/base/error.h"
 
 namespace {
@@ -16,7 +15,9 @@ constexpr char kLineFormat[] = "%s=%s\n";
 // A stock machine has no such directories.
 bool MakeDirectories() {
   for (const char* szDirectory : kDirectories) {
-    if (::mkdir(szDirectory, 0755) < 0 && errno != EEXIST) return FAIL(errno, "make", szDirectory), false;
+    if (Status status = MakeDirectory(szDirectory); !status.ok()) {
+      return FAIL(status.error(), "make", szDirectory), false;
+    }
   }
   return true;
 }

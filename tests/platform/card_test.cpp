@@ -2,6 +2,7 @@
 #include <dlfcn.h>
 #include <linux/netlink.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
 
 #include <cerrno>
 #include <filesystem>
@@ -125,6 +126,17 @@ TEST_F(ACard, IsBroughtUpAndNotedDown) {
   EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), 0);
   EXPECT_EQ(interface_.flags() & 1u, 1u);
   EXPECT_EQ(ReadFile(kScript), "DEVICE=net0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
+}
+
+TEST_F(ACard, IsNotedDownInDirectoriesOfTheSameModeWhateverTheUmask) {
+  for (const mode_t mask : {0, 077}) {
+    std::filesystem::remove_all("/etc/sysconfig");
+    ::umask(mask);
+    EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), 0);
+    ::umask(022);
+    EXPECT_EQ(ModeOf("/etc/sysconfig"), 0755u) << mask;
+    EXPECT_EQ(ModeOf("/etc/sysconfig/network-scripts"), 0755u) << mask;
+  }
 }
 
 TEST_F(ACard, StaysAsItIsWhenTheAddressIsNone) {

@@ -1,5 +1,6 @@
 // The DHCP server's files: written, read back, and taken by a real server.
 #include <signal.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -240,6 +241,97 @@ TEST_F(DhcpServerFiles, KeepAllElseWhenTheServerIsSwitchedOff) {
   EXPECT_EQ(ReadFile(kInfo), "auto_time=\"30\"\nenable=\"no\"\n");
 }
 
+// Disabling an access point failed for ever: what was read of its bridge's server was refused on the way back.
+TEST_F(DhcpServerFiles, AreLeftAloneButForTheSwitchWhenTheRecordIsGivenBackAsItWasRead) {
+  const std::string range = "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0,";
+  const std::string texts[] = {
+      range + "12h\n",
+      range + "45m",
+      range + "1d\n",
+      range + "infinite\n",
+      range + "300\n",
+      range + "12h # half a day\n",
+      "interface=lbr0 # the lower bridge\r\n" + range + "12h\r\n",
+      "domain=home#1\n" + range + "12h\n",
+      "domain=\"home\"\n" + range + "12h\n",
+      "dhcp-leasefile=\"/tmp/\\\"a\\\", b\"\n" + range + "12h\n",
+      "dhcp-leasefile=/tmp/a\\b\n" + range + "12h\n",
+      range + "12h\ndhcp-option=option:dns-server,10.1.14.1,10.1.14.3,10.1.14.4\n",
+      "dhcp-range=set:red,10.1.14.2,10.1.14.254,12h\ndhcp-option=tag:red,option:ntp-server,10.1.14.9\n",
+      "dhcp-range=10.1.14.2,10.1.14.254\n\n# ours\nport=0\ndhcp-host=02:00:00:00:00:01,10.1.14.7\n",
+  };
+  fs::create_directory("/etc/dhcpd");
+  for (const std::string& text : texts) {
+    WriteFile(kConf, text, 0640);
+    WriteFile(kInfo, "# of the appliance\nauto_time=soon\nenable=\"yes\"\n");
+    Shell(std::string("dnsmasq --test --conf-file=") + kConf + " 2>&1");
+    const auto conf = Find();
+    ASSERT_TRUE(conf.has_value());
+    EXPECT_STREQ(conf->szRangeStart, "10.1.14.2") << text;  // or enabling would have written its own
+    EXPECT_STREQ(conf->szRangeEnd, "10.1.14.254") << text;
+    EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&*conf, 0), 1) << text;
+    EXPECT_EQ(ReadFile(kConf), text);
+    EXPECT_EQ(ReadFile(kInfo), "# of the appliance\nauto_time=soon\nenable=\"no\"\n");
+    EXPECT_EQ(ModeOf(kConf), 0640u);
+  }
+}
+
+TEST_F(DhcpServerFiles, AreWrittenWhenTheRecordIsAnother) {
+  const std::function<void(MERO_DHCPD_CONF&)> changes[] = {
+      [](MERO_DHCPD_CONF& conf) { conf.leaseTime = 60; },
+      [](MERO_DHCPD_CONF& conf) { conf.autoTime = 60; },
+      [](MERO_DHCPD_CONF& conf) { CopyText(conf.szRangeEnd, "10.1.14.9"); },
+      [](MERO_DHCPD_CONF& conf) { CopyText(conf.szLeaseFile, "/tmp/leases"); },
+      [](MERO_DHCPD_CONF& conf) { conf.szSDns[0] = '\0'; },
+  };
+  fs::create_directory("/etc/dhcpd");
+  for (const auto& change : changes) {
+    MERO_DHCPD_CONF conf = FullServer();
+    ASSERT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
+    WriteFile(kConf, ReadFile(kConf) + "# by hand\n");
+    change(conf);
+    EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
+    ExpectSame(Find(), conf);
+    EXPECT_THAT(ReadFile(kConf), testing::Not(testing::HasSubstr("# by hand")));
+  }
+}
+
+TEST_F(DhcpServerFiles, HoldALeaseTimeWithoutEnd) {
+  MERO_DHCPD_CONF conf = Server();
+  conf.leaseTime = -1;
+  ExpectTakenByTheServer(conf);
+  EXPECT_THAT(ReadFile(kConf), testing::HasSubstr("255.255.255.0,infinite\n"));
+  ExpectWrittenAndReadBack(conf);
+}
+
+TEST_F(DhcpServerFiles, HoldBlanksAtTheEndsOfATextInQuotes) {
+  MERO_DHCPD_CONF conf = Server();
+  CopyText(conf.szLeaseFile, " /tmp/leases ");
+  ExpectTakenByTheServer(conf);
+  EXPECT_THAT(ReadFile(kConf), testing::HasSubstr("dhcp-leasefile=\" /tmp/leases \"\n"));
+  ExpectWrittenAndReadBack(conf);
+}
+
+TEST_F(DhcpServerFiles, AreRefusedForAWordThatTheServerWouldTakeForAnother) {
+  MERO_DHCPD_CONF conf = Server();
+  CopyText(conf.szRangeStart, "set:red");
+  ExpectRefused(conf, "A DHCP server's first address cannot be 'set:red'");
+  conf = Server();
+  CopyText(conf.szSubnet, "12h");
+  ExpectRefused(conf, "A DHCP server's netmask cannot be '12h'");
+}
+
+TEST_F(DhcpServerFiles, LieInADirectoryOfTheSameModeWhateverTheUmask) {
+  for (const mode_t mask : {0, 077}) {
+    fs::remove_all("/etc/dhcpd");
+    const MERO_DHCPD_CONF conf = Server();
+    ::umask(mask);
+    EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
+    ::umask(022);
+    EXPECT_EQ(ModeOf("/etc/dhcpd"), 0755u) << mask;
+  }
+}
+
 TEST_F(DhcpServerFiles, AreAPairForEachInterfaceAndTag) {
   MERO_DHCPD_CONF conf = Server();
   CopyText(conf.szRouter, "1.1.1.1");
@@ -275,14 +367,67 @@ TEST_F(DhcpServerFiles, AreReadAsFarAsTheyAreUnderstood) {
   conf.blEnable = FALSE;
   conf.autoTime = 0;
   ExpectSame(Find(), conf);
-  for (const char* szLease : {"", "12h", "s", "86400", "86400s ", "99999999999s", "infinite"}) {
-    WriteFile(kConf, "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0," + std::string(szLease) + "\n");
-    EXPECT_EQ(Find()->leaseTime, 0) << szLease;
+  const std::pair<const char*, int> times[] = {
+      {"", 0},
+      {"45", 45},
+      {"45s", 45},
+      {"45m", 2700},
+      {"12h", 43200},
+      {"12H", 43200},
+      {"1d", 86400},
+      {"1w", 604800},
+      {"45s ", 45},
+      {"infinite", -1},
+      {"s", 0},
+      {"99999999999s", 0},
+      {"99999999w", 0},
+      {"12hours", 0},
+      {"12x", 0},
+      {"INFINITE", 0},
+      {"10.1.14.255,", 0},
+      {"10.1.14.255", 0},
+      {"10.1.14.255,12h", 43200},
+  };
+  for (const auto& [szTime, seconds] : times) {
+    WriteFile(kConf, "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0," + std::string(szTime) + "\n");
+    EXPECT_EQ(Find()->leaseTime, seconds) << szTime;
     EXPECT_STREQ(Find()->szSubnet, "255.255.255.0");
   }
   WriteFile(kInfo, "enable=YES\nauto_time=soon\n");
   EXPECT_EQ(Find()->blEnable, FALSE);
   EXPECT_EQ(Find()->autoTime, 0);
+}
+
+// What the server takes for the same configuration as ours, and what the record then holds.
+TEST_F(DhcpServerFiles, AreReadAsTheServerReadsThem) {
+  MERO_DHCPD_CONF conf = FullServer();
+  conf.blEnable = FALSE;
+  conf.autoTime = 0;
+  CopyText(conf.szLeaseFile, "/tmp/\"a\", b # c");
+  const char* const lines[] = {
+      "interface=lbr0 # the lower one",
+      "dhcp-range = 10.1.14.2 ,10.1.14.254,\t255.255.255.0, 1d\r",
+      "dhcp-range=set:red,10.1.14.2,10.1.14.254,255.255.255.0,10.1.14.255,24h",
+      "dhcp-range=tag:blue,set:red,10.1.14.2,10.1.14.254,255.255.255.0,1440m #",
+      " dhcp-option=option:router , 10.1.14.1\r",
+      "dhcp-option=option:dns-server,10.1.14.1,10.1.14.3,10.1.14.4 # three",
+      "domain = \"home.example\" # \"",
+      "dhcp-leasefile=\"/tmp/\\\"a\\\", b # c\"",
+  };
+  fs::create_directory("/etc/dhcpd");
+  for (const char* szRange : {lines[1], lines[2], lines[3]}) {
+    std::string text = "# dhcp-range=1.1.1.1,2.2.2.2\n";
+    for (const char* szLine : {lines[0], szRange, lines[4], lines[5], lines[6], lines[7]}) {
+      text += std::string(szLine) + "\n";
+    }
+    WriteFile(kConf, text);
+    Shell(std::string("dnsmasq --test --conf-file=") + kConf + " 2>&1");
+    ExpectSame(Find(), conf);
+  }
+  WriteFile(kConf, "dhcp-range=10.1.14.2,10.1.14.254,12h\n");
+  Shell(std::string("dnsmasq --test --conf-file=") + kConf + " 2>&1");
+  EXPECT_STREQ(Find()->szSubnet, "");
+  EXPECT_EQ(Find()->leaseTime, 43200);
 }
 
 TEST_F(DhcpServerFiles, AreReadWithTextsCutToTheFields) {
