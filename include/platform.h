@@ -306,8 +306,8 @@ int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg)
 int MEROWirelessOpmodeSet(WIRELESS_OPMODE opmode);
 
 /**
- * Ends whatever connection the client interface has: the supplicant, the DHCP client, an ad-hoc cell, its addresses,
- * and the record of the last join.
+ * Ends whatever connection the client interface has: the supplicant, the DHCP client with the route and the name
+ * servers that it has leased, an ad-hoc cell, its addresses, and the record of the last join.
  *
  * @return 0, also when there was none; -1 when something could not be ended.
  *
@@ -476,7 +476,8 @@ const char* MERONetNtoa(struct in_addr address);
 /**
  * Applies an address to an interface at once, as the only one that it has, and notes it in the interface's
  * network-script file. An address that it has already stays, and so do the routes that go with it. Who applies what is
- * noted at boot is the appliance's own affair: the kit does so for bridges only.
+ * noted at boot is the appliance's own affair: the kit does so for bridges only. A static address ends the interface's
+ * DHCP client, and gives back what that has leased.
  *
  * @param flags  0.
  * @return 0; -1 when the address or the mask is none (the interface stays as it was), or the interface cannot be set
@@ -485,11 +486,16 @@ const char* MERONetNtoa(struct in_addr address);
 int MERONetSetCard1(const NETINFO* pNetInfo, int flags);
 
 /**
- * Leases an address by DHCP for the interface that the record names, and keeps the lease renewed after it returns.
+ * Leases an address by DHCP for the interface that the record names, in place of those that it has, and keeps the lease
+ * renewed after it returns. Where no server has answered in time it goes on asking all the same, and a late answer
+ * addresses the interface. MEROWirelessNetworkDisconnect(), a static address and the next lease end that.
  *
  * @param pNetInfo  names the interface; receives its hardware address, the address leased and its mask.
  * @param seconds   how long to wait for a server, at most; less than 4 counts as 4.
- * @return 0; -1 when no server answered, or the interface cannot be brought up.
+ * @return 0; -1 when no server has answered yet, or the interface cannot be brought up.
+ *
+ * /usr/mero/sbin/udhcpc.lease applies what is leased: the default route stands behind those of others, and the name
+ * servers behind those that /etc/resolv.conf names otherwise. Both are given back when the client ends.
  *
  * Blocks for as long at most, and before that up to 2 s for a DHCP client that runs to end; one that does not is
  * killed.

@@ -483,7 +483,7 @@ int MEROWirelessAutoConnect(void);
  * @param szIfName  the interface, up to 15 characters.
  * @param config    the saved network; only szIp and szMask are used.
  * @return 0; -1 when szIfName is null or the interface could not be set. A DHCP server that does not answer is
- *         reported, and is not by itself a failure.
+ *         reported, and is not by itself a failure: it is asked on until the network is left or another address is set.
  *
  * Blocks up to 16 s for DHCP, and before that up to 2 s for a DHCP client that runs to end. Writes the interface's file
  * in /etc/sysconfig/network-scripts.

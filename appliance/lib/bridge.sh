@@ -75,8 +75,11 @@ lease_address() { # INTERFACE
 		-s /usr/mero/sbin/udhcpc.lease
 }
 
-end_lease() { # INTERFACE
+# end_lease INTERFACE: ends the client, and gives back what one has leased, also one that ended by itself.
+end_lease() {
 	end_daemon busybox "$(lease_pid "$1")"
+	[ ! -x /usr/mero/sbin/udhcpc.lease ] || /usr/mero/sbin/udhcpc.lease left "$1" ||
+		warn "what $1 had leased is not all given back"
 }
 
 lease_pid() { # INTERFACE

@@ -66,6 +66,11 @@ Status End(pid_t pid, const char* szProgram) {
 
 }  // namespace
 
+bool IsDaemonThere(const char* szPidPath, const char* szProgram) {
+  Result<Bytes> file = ReadFile(szPidPath);
+  return file.ok() && Runs(PidIn(file->view()), szProgram);
+}
+
 Status EndDaemon(const char* szPidPath, const char* szProgram) {
   Result<Bytes> file = ReadFile(szPidPath);
   if (file.error() == ENOENT) return Status::Ok();

@@ -8,4 +8,7 @@
 // Success also when there is none. Blocks up to 2 s for it to end by itself; then it is killed.
 Status EndDaemon(const char* szPidPath, const char* szProgram);
 
+// Whether the process whose pid is in a file is the program.
+bool IsDaemonThere(const char* szPidPath, const char* szProgram);
+
 #endif  // MERO_PLATFORM_DAEMON_H

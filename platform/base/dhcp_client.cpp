@@ -4,11 +4,17 @@
 #include <cstdio>
 
 #include "platform/base/daemon.h"
+#include "platform/base/program.h"
 
 DhcpClientFile::DhcpClientFile(const char* szFormat, const char* szIfName) {
   std::snprintf(szPath_, sizeof szPath_, szFormat, szIfName);
 }
 
 Status EndDhcpClient(const char* szIfName) {
-  return EndDaemon(DhcpClientFile(kDhcpClientPidFormat, szIfName).c_str(), "busybox");
+  Status status = EndDaemon(DhcpClientFile(kDhcpClientPidFormat, szIfName).c_str(), kDhcpClientProgram);
+  if (!status.ok()) return status;
+  const char* const argv[] = {kLeaseScript, "left", szIfName, nullptr};
+  Result<int> exitStatus = RunProgram(argv, Standard::kNull);
+  if (exitStatus.ok() && *exitStatus != 0) return Status::Failed(ENOEXEC);  // it has told why
+  return exitStatus.error() == ENOENT ? Status::Ok() : exitStatus.status();
 }

@@ -1,4 +1,4 @@
-// The DHCP client of an interface: busybox's, which stays behind to renew the lease.
+// The DHCP client of an interface: busybox's, which stays behind to renew the lease, or to go on asking for one.
 #ifndef MERO_PLATFORM_DHCP_CLIENT_H
 #define MERO_PLATFORM_DHCP_CLIENT_H
 
@@ -7,6 +7,8 @@
 #include "platform/base/result.h"
 
 inline constexpr char kDhcpClientPath[] = "/bin/busybox";
+inline constexpr char kDhcpClientProgram[] = "busybox";
+inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";  // applies what the client leases, gives it back
 
 // A file of an interface's client, by a format that takes the interface's name.
 class DhcpClientFile {
@@ -21,7 +23,8 @@ class DhcpClientFile {
 
 inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
 
-// Ends the client of an interface, if it has one.
+// Ends the client of an interface, if it has one, and gives back what a client has leased for it, also one that ended
+// by itself. Without the script nothing was ever applied.
 Status EndDhcpClient(const char* szIfName);
 
 #endif  // MERO_PLATFORM_DHCP_CLIENT_H

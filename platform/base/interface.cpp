@@ -36,6 +36,11 @@ Status SetInterfaceUp(const char* szIfName, bool up) {
 
 namespace {
 
+constexpr struct {
+  nlmsghdr header;
+  ifaddrmsg about;
+} kListAll = {{sizeof kListAll, RTM_GETADDR, NLM_F_REQUEST | NLM_F_DUMP, 0, 0}, {AF_INET, 0, 0, 0, 0}};
+
 // The IPv4 addresses of one interface, as the kernel's routing socket tells of them, and is told.
 class Addresses {
  public:
@@ -44,11 +49,7 @@ class Addresses {
     index_ = ::if_nametoindex(szIfName);
     kernel_ = Descriptor(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_ROUTE));
     if (!kernel_.valid()) return Status::Failed(errno);
-    struct {
-      nlmsghdr header;
-      ifaddrmsg about;
-    } request = {{sizeof request, RTM_GETADDR, NLM_F_REQUEST | NLM_F_DUMP, 0, 0}, {AF_INET, 0, 0, 0, 0}};
-    if (::send(kernel_.get(), &request, sizeof request, 0) < 0) return Status::Failed(errno);
+    if (::send(kernel_.get(), &kListAll, sizeof kListAll, 0) < 0) return Status::Failed(errno);
     while (true) {
       alignas(nlmsghdr) char part[8192];  // the kernel gives no more at a time
       auto left = static_cast<int>(::recv(kernel_.get(), part, sizeof part, 0));
@@ -152,7 +153,7 @@ Status SetOnlyAddress(const char* szIfName, uint32_t address, uint32_t mask) {
   AddressMessage wanted{};
   wanted.header.nlmsg_len = sizeof wanted;
   wanted.about.ifa_family = AF_INET;
-  wanted.about.ifa_prefixlen = static_cast<uint8_t>(std::popcount(mask));
+  wanted.about.ifa_prefixlen = static_cast<uint8_t>(std::countl_one(mask));
   wanted.about.ifa_index = addresses.index();
   wanted.local = Part(IFA_LOCAL, address);
   wanted.subnet = Part(IFA_ADDRESS, address);

@@ -4,14 +4,13 @@
 #include <cstddef>
 
 std::optional<int> TakeNumber(std::string_view& text) {
-  const bool negative = !text.empty() && text.front() == '-';
-  const size_t first = negative ? 1 : 0;
-  size_t end = first;
+  const int sign = text.starts_with('-') ? -1 : 1;
+  size_t end = sign < 0 ? 1 : 0;
+  const size_t first = end;
   int number = 0;
   for (; end < text.size() && text[end] >= '0' && text[end] <= '9'; ++end) {
-    const int digit = text[end] - '0';
     if (__builtin_mul_overflow(number, 10, &number)) return std::nullopt;
-    if (__builtin_add_overflow(number, negative ? -digit : digit, &number)) return std::nullopt;
+    if (__builtin_add_overflow(number, sign * (text[end] - '0'), &number)) return std::nullopt;
   }
   if (end == first) return std::nullopt;
   text.remove_prefix(end);

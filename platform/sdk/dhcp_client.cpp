@@ -2,22 +2,23 @@
 #include "platform/base/dhcp_client.h"
 
 #include <arpa/inet.h>
+#include <poll.h>
 #include <sys/ioctl.h>
 
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
 
+#include "platform/base/daemon.h"
 #include "platform/base/error.h"
 #include "platform/base/interface.h"
 #include "platform/base/program.h"
 
 namespace {
 
-constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";  // applies what the client leases
-constexpr int kTries = 4;                                       // and a wait of the same length behind each
+constexpr int kTries = 4;  // and a wait of the same length behind each
 
-// Runs the client until it has a lease, and stays behind to renew it, or gives up. ETIMEDOUT when no server answered.
+// Runs the client until it has a lease, or was not answered in time; it stays behind to renew it, or to go on asking.
 Status Lease(const char* szIfName, int seconds) {
   const DhcpClientFile pidFile(kDhcpClientPidFormat, szIfName);
   char szTries[16];
@@ -25,11 +26,16 @@ Status Lease(const char* szIfName, int seconds) {
   std::snprintf(szTries, sizeof szTries, "%d", kTries);
   std::snprintf(szWait, sizeof szWait, "%d", std::max(seconds / kTries, 1));
 
-  const char* const argv[] = {kDhcpClientPath, "udhcpc", "-n",    "-S", "-i",   szIfName, "-p", pidFile.c_str(), "-s",
+  const char* const argv[] = {kDhcpClientPath, "udhcpc", "-b",    "-S", "-i",   szIfName, "-p", pidFile.c_str(), "-s",
                               kLeaseScript,    "-t",     szTries, "-T", szWait, nullptr};
   Result<int> exitStatus = RunProgram(argv, Standard::kNull);
   if (!exitStatus.ok()) return exitStatus.status();
-  return *exitStatus == 0 ? Status::Ok() : Status::Failed(ETIMEDOUT);
+  if (*exitStatus != 0) return Status::Failed(ENOEXEC);
+  // It notes the pid of what stays behind only then, and who has no pid cannot be ended.
+  for (int tries = 100; tries > 0 && !IsDaemonThere(pidFile.c_str(), kDhcpClientProgram); --tries) {
+    (void)::poll(nullptr, 0, 10);
+  }
+  return Status::Ok();
 }
 
 Result<ifreq> Ask(const Descriptor& control, const char* szIfName, unsigned long what) {
@@ -44,13 +50,14 @@ void WriteAddress(const ifreq& request, char (&szAddress)[kSize]) {
   ::inet_ntop(AF_INET, &address.sin_addr, szAddress, kSize);
 }
 
-// Fills the record with what the interface has.
+// Fills the record with what the interface has. ETIMEDOUT when it has no address: no server has answered.
 Status Describe(NETINFO& netInfo) {
   Result<Descriptor> control = OpenControl();
   if (!control.ok()) return control.status();
   Result<ifreq> hardware = Ask(*control, netInfo.szInterface, SIOCGIFHWADDR);
   if (!hardware.ok()) return hardware.status();
   Result<ifreq> address = Ask(*control, netInfo.szInterface, SIOCGIFADDR);
+  if (address.error() == EADDRNOTAVAIL) return Status::Failed(ETIMEDOUT);
   if (!address.ok()) return address.status();
   Result<ifreq> mask = Ask(*control, netInfo.szInterface, SIOCGIFNETMASK);
   if (!mask.ok()) return mask.status();
@@ -64,6 +71,7 @@ Status Describe(NETINFO& netInfo) {
 Status LeaseAnew(NETINFO& netInfo, int seconds) {
   if (Status status = EndDhcpClient(netInfo.szInterface); !status.ok()) return status;
   if (Status status = SetInterfaceUp(netInfo.szInterface, true); !status.ok()) return status;
+  if (Status status = RemoveAddresses(netInfo.szInterface); !status.ok()) return status;
   if (Status status = Lease(netInfo.szInterface, seconds); !status.ok()) return status;
   return Describe(netInfo);
 }

@@ -1,8 +1,5 @@
 // The DHCP server's files: written, read back, and taken by a real server.
-#include <signal.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <cstring>
 #include <filesystem>
@@ -584,28 +581,6 @@ TEST_F(DhcpServerFiles, AreTakenByTheServer) {
   }
 }
 
-// A program that runs until the holder ends.
-class Daemon {
- public:
-  explicit Daemon(const std::vector<const char*>& argv) : pid_(::fork()) {
-    if (pid_ != 0) return;
-    std::vector<char*> arguments;
-    for (const char* szArgument : argv) arguments.push_back(const_cast<char*>(szArgument));
-    arguments.push_back(nullptr);
-    ::execv(arguments[0], arguments.data());
-    ::_exit(127);
-  }
-  Daemon(const Daemon&) = delete;
-  Daemon& operator=(const Daemon&) = delete;
-  ~Daemon() {
-    ::kill(pid_, SIGTERM);
-    ::waitpid(pid_, nullptr, 0);
-  }
-
- private:
-  pid_t pid_;
-};
-
 TEST_F(DhcpServerFiles, MakeARealServerLeaseWhatTheySay) {
   MERO_DHCPD_CONF conf = Server();
   CopyText(conf.szInterface, "serve0");
@@ -622,8 +597,9 @@ TEST_F(DhcpServerFiles, MakeARealServerLeaseWhatTheySay) {
       "ip link add serve0 type veth peer name ask0 && ip address add 10.1.14.1/24 dev serve0 &&"
       " ip link set serve0 up && ip link set ask0 up");
   {
-    const Daemon server({"/usr/sbin/dnsmasq", "--conf-file=/etc/dhcpd/dhcpd-serve0-serve0.conf", "--keep-in-foreground",
-                         "--port=0", "--user=root", "--pid-file=/tmp/platform/pid", "--no-ping"});
+    const RunningProgram server({"/usr/sbin/dnsmasq", "--conf-file=/etc/dhcpd/dhcpd-serve0-serve0.conf",
+                                 "--keep-in-foreground", "--port=0", "--user=root", "--pid-file=/tmp/platform/pid",
+                                 "--no-ping"});
     WriteFile("/tmp/platform/lease",
               "#!/bin/sh\n[ \"$1\" != bound ] || echo \"$ip $subnet $router $dns $domain $lease\""
               " > /tmp/platform/leased\n",

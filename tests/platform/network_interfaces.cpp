@@ -4,8 +4,10 @@
 #include <net/if.h>
 #include <sys/ioctl.h>
 #include <sys/socket.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <cstdio>
 #include <utility>
 
@@ -37,4 +39,18 @@ unsigned NetworkInterface::flags() const {
 
 std::string NetworkInterface::addresses() const {
   return Shell("ip -4 -o address show dev " + name_ + " | while read -r _ _ _ a _; do printf '%s ' \"$a\"; done");
+}
+
+RunningProgram::RunningProgram(const std::vector<const char*>& argv) : pid_(::fork()) {
+  if (pid_ != 0) return;
+  std::vector<char*> arguments;
+  for (const char* szArgument : argv) arguments.push_back(const_cast<char*>(szArgument));
+  arguments.push_back(nullptr);
+  ::execv(arguments[0], arguments.data());
+  ::_exit(127);
+}
+
+RunningProgram::~RunningProgram() {
+  ::kill(pid_, SIGTERM);
+  ::waitpid(pid_, nullptr, 0);
 }

@@ -1,10 +1,12 @@
-// Network interfaces that a test makes, and what it sees of them.
+// Network interfaces that a test makes, what it sees of them, and programs that it runs beside them.
 #ifndef MERO_TESTS_PLATFORM_NETWORK_INTERFACES_H
 #define MERO_TESTS_PLATFORM_NETWORK_INTERFACES_H
 
 #include <gtest/gtest.h>
+#include <sys/types.h>
 
 #include <string>
+#include <vector>
 
 // An Ethernet interface that is connected to nobody, for as long as the holder lives.
 class NetworkInterface {
@@ -25,5 +27,17 @@ class NetworkInterface {
 
 // Runs a command of the shell, which must succeed, and gives its output.
 std::string Shell(const std::string& command);
+
+// A program that runs until the holder ends.
+class RunningProgram {
+ public:
+  explicit RunningProgram(const std::vector<const char*>& argv);
+  RunningProgram(const RunningProgram&) = delete;
+  RunningProgram& operator=(const RunningProgram&) = delete;
+  ~RunningProgram();
+
+ private:
+  pid_t pid_;
+};
 
 #endif  // MERO_TESTS_PLATFORM_NETWORK_INTERFACES_H

@@ -14,7 +14,7 @@ office=(essid=office bssid="$(address_of office)" protocol=11b/g auth=WPAPSK enc
 lounge=(essid=lounge bssid="$(address_of lounge)" protocol=11a auth=WPA2PSK encrypt=TKIP+AES key='any old key')
 supplicant='/usr/sbin/wpa_supplicant -Dwext -iwlan0 -c/usr/mero/etc/wpa_supplicant.conf -B'
 supplicant+=' -P/var/run/wpa_supplicant.pid'
-dhcp_client='/bin/busybox udhcpc -n -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 4 -T 4'
+dhcp_client='/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 4 -T 4'
 
 # Whoever serves media wants to know of a new network.
 inside nas tee /etc/meroinfo.conf >/dev/null <<'END'
@@ -59,7 +59,12 @@ expect_processes nas <<END
 $dhcp_client
 $supplicant
 END
-expect_file nas /etc/resolv.conf <<<'nameserver 10.1.0.1'
+expect_file nas /etc/resolv.conf <<'END'
+nameserver 192.0.2.1
+# By the DHCP client of wlan0, until it leaves the network:
+nameserver 10.1.0.1
+# (end of what the DHCP client of wlan0 has added)
+END
 expect_file nas /etc/sysconfig/network-scripts/ifcfg-wlan0 <<'END'
 DEVICE=wlan0
 BOOTPROTO=dhcp
@@ -78,6 +83,7 @@ on nas mero-call ifconfig wlan0 ip=10.2.0.5 mask=255.255.255.0
 expect_output <<<result=0
 expect_address nas 10.2.0.5/24
 expect_processes nas <<<"$supplicant"
+expect_file nas /etc/resolv.conf <<<'nameserver 192.0.2.1'
 on nas mero-call gateway 10.2.0.1
 expect_output <<<result=0
 expect_default_route nas 10.2.0.1

@@ -1,4 +1,5 @@
-# A network without DHCP is joined all the same; an attempt beside another is refused; a broken connection comes back.
+# A network without DHCP is joined all the same, and asked on for an address; an attempt beside another is refused; a
+# broken connection comes back.
 # shellcheck shell=bash
 
 access_point square ssid=square channel=1
@@ -20,6 +21,7 @@ ended=$(uptime_seconds)
 ((${ended%.*} - ${began%.*} <= 18)) || fail "it was waited for too long: $began to $ended"
 expect_message nas 'Failed to get IP from DHCP'
 expect_processes nas <<END
+/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 4 -T 4
 /usr/sbin/wpa_supplicant -Dwext -iwlan0 -c/usr/mero/etc/wpa_supplicant.conf -B -P/var/run/wpa_supplicant.pid
 END
 expect_address nas ''

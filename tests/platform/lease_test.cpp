@@ -1,0 +1,539 @@
+// Leasing an address: the script that applies a lease and gives it back, and the client that runs it.
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstdio>
+#include <deque>
+#include <filesystem>
+#include <string>
+#include <vector>
+
+#include "common/text.h"
+#include "tests/platform/network_interfaces.h"
+#include "tests/platform/platform_test.h"
+#include "tests/platform/simulated_radio.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+
+constexpr char kScript[] = "/usr/mero/sbin/udhcpc.lease";
+constexpr char kResolver[] = "/etc/resolv.conf";
+constexpr char kLogged[] = "/tmp/platform/logged";
+
+using Lease = std::vector<std::string>;  // NAME=VALUE, each
+
+class ALease : public PlatformTest {
+ protected:
+  void SetUp() override {
+    PlatformTest::SetUp();
+    fs::create_directories("/usr/mero/sbin");
+    fs::copy_file(APPLIANCE_KIT "/sbin/udhcpc.lease", kScript, fs::copy_options::overwrite_existing);
+    WriteFile("/tmp/platform/logger", "#!/bin/sh\necho \"$@\" >>/tmp/platform/logged\n", 0755);
+    WriteFile(kLogged, "");
+    fs::remove(kResolver);
+    Shell("ip link set net0 up && ip link set eth5 up");
+  }
+
+  // Runs the script; its exit status.
+  static int Run(const std::vector<const char*>& words, const Lease& lease = {}, mode_t mask = 022) {
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+      ::umask(mask);
+      ::clearenv();
+      ::setenv("PATH", "/tmp/platform:/usr/sbin:/usr/bin:/sbin:/bin", 1);
+      for (const std::string& value : lease) ::putenv(const_cast<char*>(value.c_str()));
+      std::vector<char*> argv = {const_cast<char*>(kScript)};
+      for (const char* szWord : words) argv.push_back(const_cast<char*>(szWord));
+      argv.push_back(nullptr);
+      (void)!::freopen("/dev/null", "w", stderr);
+      ::execv(kScript, argv.data());
+      ::_exit(127);
+    }
+    int state = 0;
+    EXPECT_EQ(::waitpid(pid, &state, 0), pid);
+    return WIFEXITED(state) ? WEXITSTATUS(state) : -1;
+  }
+
+  // A lease of net0 with an address in 10.1.0.0/24, and what else is said.
+  static Lease Usual(const Lease& more = {}) {
+    Lease lease = {"interface=net0", "ip=10.1.0.7", "subnet=255.255.255.0"};
+    lease.insert(lease.end(), more.begin(), more.end());
+    return lease;
+  }
+
+  static int Bound(const Lease& more = {}) { return Run({"bound"}, Usual(more)); }
+
+  static std::string IndexOf(const std::string& name) {
+    const std::string line = Shell("ip -o link show dev " + name);
+    return line.substr(0, line.find(':'));
+  }
+
+  static std::string MetricOf(const std::string& name, int base = 200) {
+    return std::to_string(base + std::stoi(IndexOf(name)));
+  }
+
+  // Nobody is at the other end of the cables, which is told too.
+  static std::string DefaultRoutes() { return Shell("ip -4 route show default | sed 's/ linkdown//; s/ *$//'"); }
+
+  // The block of an interface in the resolver's file.
+  static std::string Block(const std::string& lines, const std::string& name = "net0") {
+    return "# By the DHCP client of " + name + ", until it leaves the network:\n" + lines +
+           "# (end of what the DHCP client of " + name + " has added)\n";
+  }
+
+  static void ExpectLogged(const std::string& text) {
+    EXPECT_THAT(ReadFile(kLogged), HasSubstr("-t udhcpc.lease -p daemon.err -- " + text));
+    WriteFile(kLogged, "");
+  }
+
+  static void ExpectNothingLogged() { EXPECT_EQ(ReadFile(kLogged), ""); }
+
+  const NetworkInterface interface_{"net0"};
+  const NetworkInterface wired_{"eth5"};
+};
+
+TEST_F(ALease, IsAppliedAndGivenBack) {
+  WriteFile(kResolver, "nameserver 192.0.2.1\n", 0644);
+  EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2 10.1.0.3", "domain=home.example", "broadcast=10.1.0.255"}), 0);
+  EXPECT_EQ(interface_.addresses(), "10.1.0.7/24 ");
+  EXPECT_EQ(DefaultRoutes(), "default via 10.1.0.1 dev net0 metric " + MetricOf("net0") + "\n");
+  EXPECT_EQ(ReadFile(kResolver),
+            "nameserver 192.0.2.1\n" + Block("search home.example\nnameserver 10.1.0.2\nnameserver 10.1.0.3\n"));
+
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(DefaultRoutes(), "");
+  EXPECT_EQ(ReadFile(kResolver), "nameserver 192.0.2.1\n");
+  EXPECT_EQ(interface_.addresses(), "10.1.0.7/24 ");
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, IsGivenBackWithTheAddressesWhenTheClientBeginsAnew) {
+  EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2"}), 0);
+  EXPECT_EQ(Run({"deconfig"}, {"interface=net0"}), 0);
+  EXPECT_EQ(interface_.addresses(), "");
+  EXPECT_EQ(DefaultRoutes(), "");
+  EXPECT_EQ(ReadFile(kResolver), "");
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, ChangesNothingWhenAServerDoesNotAnswer) {
+  EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2"}), 0);
+  const std::string before = ReadFile(kResolver) + DefaultRoutes();
+  EXPECT_EQ(Run({"leasefail"}, {"interface=net0"}), 0);
+  EXPECT_EQ(Run({"nak"}, {"interface=net0"}), 0);
+  EXPECT_EQ(ReadFile(kResolver) + DefaultRoutes(), before);
+}
+
+// Joining a network took the way out of the house away from the wire, and the name servers with it.
+TEST_F(ALease, ReplacesNoRouteOfAnotherInterface) {
+  Shell(
+      "ip address add 192.0.2.9/24 dev eth5 && ip route add default via 192.0.2.1 dev eth5 &&"
+      " ip route add default via 192.0.2.2 dev eth5 metric 5000");
+  const std::string wired = "default via 192.0.2.1 dev eth5\n";
+  const std::string last = "default via 192.0.2.2 dev eth5 metric 5000\n";
+  const std::string metric = " dev net0 metric " + MetricOf("net0") + "\n";
+  EXPECT_EQ(Bound({"router=10.1.0.1"}), 0);
+  EXPECT_EQ(DefaultRoutes(), wired + "default via 10.1.0.1" + metric + last);
+  EXPECT_EQ(Run({"renew"}, Usual({"router=10.1.0.2 10.1.0.3"})), 0);
+  EXPECT_EQ(DefaultRoutes(), wired + "default via 10.1.0.2" + metric + last);
+  EXPECT_EQ(Run({"renew"}, Usual()), 0);
+  EXPECT_EQ(DefaultRoutes(), wired + last);
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(DefaultRoutes(), wired + last);
+}
+
+TEST_F(ALease, TakesItsOwnRouteAloneFromAnotherLease) {
+  EXPECT_EQ(Bound({"router=10.1.0.1"}), 0);
+  EXPECT_EQ(Run({"bound"}, {"interface=eth5", "ip=10.2.0.7", "subnet=255.255.255.0", "router=10.2.0.1"}), 0);
+  const std::string other = "default via 10.2.0.1 dev eth5 metric " + MetricOf("eth5") + "\n";
+  EXPECT_THAT(DefaultRoutes(), HasSubstr(other));
+  EXPECT_THAT(DefaultRoutes(), HasSubstr("default via 10.1.0.1 dev net0"));
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(DefaultRoutes(), other);
+}
+
+TEST_F(ALease, OfAWirelessInterfaceRoutesBehindThatOfAWire) {
+  for (const char* szMark : {"phy80211", "wireless"}) {
+    const std::string index = IndexOf("net0");
+    const ShownInterfaces shown({{"net0", szMark}, {"eth5", ""}});
+    WriteFile("/sys/class/net/net0/ifindex", index + "\n");
+    EXPECT_EQ(Bound({"router=10.1.0.1"}), 0);
+    EXPECT_EQ(DefaultRoutes(), "default via 10.1.0.1 dev net0 metric " + MetricOf("net0", 3000) + "\n");
+    EXPECT_EQ(Run({"left", "net0"}), 0);
+    EXPECT_EQ(DefaultRoutes(), "");
+  }
+}
+
+TEST_F(ALease, RoutesThroughARouterOutsideTheSubnet) {
+  EXPECT_EQ(Bound({"router=10.9.0.1"}), 0);
+  EXPECT_EQ(DefaultRoutes(), "default via 10.9.0.1 dev net0 metric " + MetricOf("net0") + " onlink\n");
+  EXPECT_EQ(Run({"bound"}, {"interface=net0", "ip=10.1.0.7", "subnet=255.255.255.255", "router=10.1.0.1"}), 0);
+  EXPECT_EQ(interface_.addresses(), "10.1.0.7/32 ");
+  EXPECT_EQ(DefaultRoutes(), "default via 10.1.0.1 dev net0 metric " + MetricOf("net0") + " onlink\n");
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, WithoutANetmaskHasThatOfTheAddresssClass) {
+  const std::pair<const char*, const char*> rows[] = {
+      {"10.1.0.7", "10.1.0.7/8 "}, {"172.16.0.7", "172.16.0.7/16 "}, {"192.168.1.7", "192.168.1.7/24 "}};
+  for (const auto& [szAddress, szGiven] : rows) {
+    for (const char* szMask : {"", "subnet=", "subnet=0.0.0.0"}) {
+      EXPECT_EQ(Run({"deconfig"}, {"interface=net0"}), 0);
+      EXPECT_EQ(Run({"bound"}, {"interface=net0", std::string("ip=") + szAddress, szMask}), 0);
+      EXPECT_EQ(interface_.addresses(), szGiven);
+    }
+  }
+}
+
+TEST_F(ALease, LeavesAllElseInTheResolversFileAsItIs) {
+  for (const std::string& text : {
+           std::string(),
+           std::string("nameserver 192.0.2.1\n"),
+           std::string("nameserver 192.0.2.1"),
+           std::string("\n\n# by hand\r\nnameserver 192.0.2.1\r\n\n\n"),
+           std::string("options ndots:2 \\t %s $x `x` *\n\tnameserver\t192.0.2.1\n\xff\xfe\n"),
+           Block("nameserver 10.7.0.1\n", "wlan7") + "nameserver 192.0.2.1\n",
+           std::string("# By the DHCP client of net0, until it leaves the network:\nnameserver 192.0.2.1\n"),
+           std::string("# (end of what the DHCP client of net0 has added)\n"),
+       }) {
+    WriteFile(kResolver, text, 0644);
+    EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+    std::string with = text + (text.empty() || text.ends_with('\n') ? "" : "\n") + Block("nameserver 10.1.0.2\n");
+    if (!text.empty() && !text.ends_with('\n')) with.pop_back();
+    EXPECT_EQ(ReadFile(kResolver), with) << text;
+    EXPECT_EQ(Run({"renew"}, Usual({"dns=10.1.0.3"})), 0);
+    EXPECT_THAT(ReadFile(kResolver), HasSubstr("10.1.0.3"));
+    EXPECT_THAT(ReadFile(kResolver), Not(HasSubstr("10.1.0.2")));
+    EXPECT_EQ(Run({"left", "net0"}), 0);
+    EXPECT_EQ(ReadFile(kResolver), text);
+  }
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, PutsItsBlockAtTheEndAgainWhenSomebodyHasWrittenBehindIt) {
+  WriteFile(kResolver, "", 0644);
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+  Shell("echo nameserver 192.0.2.1 >>/etc/resolv.conf");
+  EXPECT_EQ(Run({"renew"}, Usual({"dns=10.1.0.2"})), 0);
+  EXPECT_EQ(ReadFile(kResolver), "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n"));
+}
+
+TEST_F(ALease, NamesADomainOnlyWhereThereIsNone) {
+  for (const char* szText : {"search work.example\n", "nameserver 192.0.2.1\ndomain\twork.example\n"}) {
+    WriteFile(kResolver, szText, 0644);
+    EXPECT_EQ(Bound({"dns=10.1.0.2", "domain=home.example"}), 0);
+    EXPECT_EQ(ReadFile(kResolver), szText + Block("nameserver 10.1.0.2\n"));
+    EXPECT_EQ(Run({"left", "net0"}), 0);
+  }
+}
+
+TEST_F(ALease, NamesNoMoreServersThanTheLibraryAsks) {
+  EXPECT_EQ(Bound({"dns=10.1.0.1 10.1.0.2 10.1.0.3 10.1.0.4"}), 0);
+  EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.0.1\nnameserver 10.1.0.2\nnameserver 10.1.0.3\n"));
+}
+
+TEST_F(ALease, KeepsTheModeAndTheOwnerOfTheResolversFileWhateverTheUmask) {
+  for (const mode_t mask : {0, 077}) {
+    WriteFile(kResolver, "nameserver 192.0.2.1\n", 0664);
+    ASSERT_EQ(::chown(kResolver, 3, 4), 0);
+    EXPECT_EQ(Run({"bound"}, Usual({"dns=10.1.0.2"}), mask), 0);
+    for (int round = 0; round < 2; ++round) {
+      struct stat info = {};
+      ASSERT_EQ(::stat(kResolver, &info), 0);
+      EXPECT_EQ(info.st_mode & 07777, 0664u) << mask;
+      EXPECT_EQ(info.st_uid, 3u);
+      EXPECT_EQ(info.st_gid, 4u);
+      EXPECT_EQ(Run({"left", "net0"}, {}, mask), 0);
+    }
+    fs::remove(kResolver);
+    EXPECT_EQ(Run({"bound"}, Usual({"dns=10.1.0.2"}), mask), 0);
+    EXPECT_EQ(ModeOf(kResolver), 0644u) << mask;
+    EXPECT_EQ(Run({"left", "net0"}, {}, mask), 0);
+    EXPECT_EQ(ModeOf(kResolver), 0644u) << mask;
+    EXPECT_EQ(ReadFile(kResolver), "");
+  }
+}
+
+TEST_F(ALease, ReplacesTheTargetOfALinkInItsOwnDirectory) {
+  fs::create_directory("/tmp/platform/resolver");
+  WriteFile("/tmp/platform/resolver/conf", "nameserver 192.0.2.1\n", 0644);
+  fs::create_symlink("/tmp/platform/resolver/conf", kResolver);
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+  EXPECT_TRUE(fs::is_symlink(kResolver));
+  EXPECT_EQ(ReadFile("/tmp/platform/resolver/conf"), "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n"));
+  EXPECT_THAT(NamesIn("/tmp/platform/resolver"), testing::ElementsAre("conf"));
+}
+
+TEST_F(ALease, LeavesAFileAloneThatItHasNothingToSayIn) {
+  fs::create_symlink("/tmp/platform/none/conf", kResolver);
+  EXPECT_EQ(Bound(), 1);
+  ExpectLogged("cannot find where /etc/resolv.conf leads\n");
+  fs::remove(kResolver);
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_FALSE(fs::exists(kResolver));
+  WriteFile(kResolver, "nameserver 192.0.2.1\n", 0644);
+  const auto before = fs::last_write_time(kResolver);
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(fs::last_write_time(kResolver), before);
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, SaysThatTheResolversFileCannotBeChanged) {
+  MemoryFileSystem files("/tmp/platform/read-only", "");
+  WriteFile("/tmp/platform/read-only/conf", "nameserver 192.0.2.1\n", 0644);
+  fs::create_symlink("/tmp/platform/read-only/conf", kResolver);
+  files.MakeReadOnly();
+  EXPECT_EQ(Bound({"dns=10.1.0.2", "router=10.1.0.1"}), 1);
+  ExpectLogged("cannot change /tmp/platform/read-only/conf: ");
+  EXPECT_THAT(DefaultRoutes(), HasSubstr("10.1.0.1"));
+}
+
+// A lease is a stranger's text.
+TEST_F(ALease, CannotDoAnythingButSetAddresses) {
+  const std::string hostile[] = {
+      "a; touch /tmp/platform/made",
+      "$(touch /tmp/platform/made)",
+      "`touch /tmp/platform/made`",
+      "a\nnameserver fe80::1",
+      "a\noptions use-vc",
+      "home.example\n",
+      "-x",
+      "*",
+      "/etc/*",
+      "a b",
+      "%s%n",
+  };
+  for (const std::string& text : hostile) {
+    WriteFile(kResolver, "", 0644);
+    EXPECT_EQ(Bound({"dns=10.1.0.2", "domain=" + text}), 0);
+    EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.0.2\n")) << text;
+    ExpectLogged("the lease of net0 has a domain that is no name\n");
+
+    EXPECT_EQ(Bound({"dns=" + text + " 10.1.0.2", "router=" + text + " 10.1.0.1"}), 0);
+    EXPECT_THAT(ReadFile(kResolver), HasSubstr("nameserver 10.1.0.2\n"));
+    EXPECT_THAT(DefaultRoutes(), HasSubstr("default via 10.1.0.1 dev net0"));
+    ExpectLogged("the lease of net0 has a router that is no host's address\n");
+
+    EXPECT_EQ(Run({"bound"}, {"interface=net0", "ip=10.1.0.7", "subnet=" + text}), 1);
+    ExpectLogged("the lease of net0 has a netmask that is none\n");
+    EXPECT_EQ(Run({"bound"}, {"interface=net0", "ip=" + text, "subnet=255.255.255.0"}), 1);
+    ExpectLogged("the lease of net0 has no address\n");
+    EXPECT_EQ(Bound({"broadcast=" + text}), 0);
+    EXPECT_EQ(Run({"bound"}, {"interface=" + text, "ip=10.1.0.7", "subnet=255.255.255.0"}), 1);
+    EXPECT_EQ(Run({"left", text.c_str()}), 1);
+    WriteFile(kLogged, "");
+  }
+  EXPECT_FALSE(fs::exists("/tmp/platform/made"));
+  EXPECT_EQ(Shell("cat /etc/resolv.conf"), "");
+}
+
+TEST_F(ALease, PassesOverWhatIsNoHostsAddress) {
+  for (const char* szText :
+       {"0.0.0.0", "127.0.0.1", "224.0.0.1", "255.255.255.255", "256.1.1.1", "10.1.0", "10.1.0.1.2", "10..0.1",
+        "10.1.0.1.", "10.1.0.0001", "99999999999999999999.1.1.1", "::1", "home"}) {
+    EXPECT_EQ(Bound({std::string("dns=") + szText + " 10.1.0.2"}), 0);
+    EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.0.2\n")) << szText;
+    ExpectLogged("the lease of net0 has a name server that is no host's address\n");
+    EXPECT_EQ(Run({"bound"}, {"interface=net0", std::string("ip=") + szText, "subnet=255.255.255.0"}), 1);
+    ExpectLogged("the lease of net0 has no address\n");
+  }
+}
+
+TEST_F(ALease, SaysWhatTheKernelDoesNotTake) {
+  EXPECT_EQ(Run({"bound"}, {"interface=net0", "ip=10.1.0.7", "subnet=255.0.255.0"}), 1);
+  ExpectLogged("cannot give net0 the address 10.1.0.7/255.0.255.0: ");
+  EXPECT_EQ(Bound({"router=10.1.0.255"}), 1);
+  ExpectLogged("cannot route through 10.1.0.255 on net0: ");
+  EXPECT_EQ(Run({"something"}, {"interface=net0"}), 1);
+  ExpectLogged("unknown event 'something'\n");
+}
+
+TEST_F(ALease, OfAnInterfaceThatIsGoneIsGivenBack) {
+  WriteFile(kResolver, "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n", "wlan9"), 0644);
+  EXPECT_EQ(Run({"left", "wlan9"}), 0);
+  EXPECT_EQ(ReadFile(kResolver), "nameserver 192.0.2.1\n");
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, IsGivenBackWhenTheKitEndsTheClientOrFindsItDead) {
+  const std::string ends = std::string("for part in report files daemon bridge; do . ") + APPLIANCE_KIT +
+                           "/lib/$part.sh; done; PATH=/tmp/platform:$PATH; end_lease net0 2>&1";
+  WriteFile("/var/run/udhcpc-net0.pid", "999999999\n");
+  EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2"}), 0);
+  EXPECT_EQ(Shell(ends), "");
+  EXPECT_EQ(DefaultRoutes(), "");
+  EXPECT_EQ(ReadFile(kResolver), "");
+  EXPECT_FALSE(fs::exists("/var/run/udhcpc-net0.pid"));
+
+  WriteFile(kScript, "#!/bin/sh\nexit 1\n", 0755);
+  EXPECT_THAT(Shell(ends), HasSubstr("what net0 had leased is not all given back\n"));
+  fs::remove(kScript);
+  EXPECT_EQ(Shell(ends), "");
+}
+
+TEST_F(ALease, LosesNothingWhenSeveralAreAppliedAtOnce) {
+  std::deque<NetworkInterface> interfaces;
+  std::string all;
+  for (int i = 0; i < 8; ++i) {
+    const std::string name = "many" + std::to_string(i);
+    interfaces.emplace_back(name);
+    all += "env PATH=/tmp/platform:$PATH interface=" + name + " ip=10.3." + std::to_string(i) +
+           ".7 subnet=255.255.255.0 dns=10.3." + std::to_string(i) + ".1 " + kScript + " bound & ";
+  }
+  Shell(all + "wait");
+  for (int i = 0; i < 8; ++i) {
+    EXPECT_THAT(ReadFile(kResolver), HasSubstr("nameserver 10.3." + std::to_string(i) + ".1\n"));
+  }
+}
+
+// ---- The client ----
+
+class ALeasingClient : public ALease {
+ protected:
+  void SetUp() override {
+    ALease::SetUp();
+    Shell(
+        "ip link add serve0 type veth peer name wlan0 && ip address add 10.1.14.1/24 dev serve0 &&"
+        " ip link set serve0 up && ip link set wlan0 up");
+  }
+
+  void TearDown() override {
+    Shell("ip link delete serve0; { kill $(cat /var/run/udhcpc-wlan0.pid); } 2>/dev/null || true");
+    ALease::TearDown();
+  }
+
+  static NETINFO Asker() {
+    NETINFO netInfo{};
+    CopyText(netInfo.szInterface, "wlan0");
+    return netInfo;
+  }
+
+  // The pid of the client that runs; empty when none does.
+  static std::string Client() {
+    return Shell(
+        "{ read -r pid </var/run/udhcpc-wlan0.pid && grep -qx busybox /proc/$pid/comm; } 2>/dev/null &&"
+        " printf %s $pid || true");
+  }
+
+  // Whether a process is no more, or only waits for somebody to ask what became of it.
+  static bool HasEnded(const std::string& pid) {
+    return Shell("grep ^State: /proc/" + pid + "/status 2>/dev/null | grep -v Z || true") == "";
+  }
+
+  static std::string Addresses() { return Shell("ip -4 -o address show dev wlan0 | awk '{ printf \"%s\", $4 }'"); }
+
+  // The name servers are what is applied last.
+  static bool IsAppliedWithin(int seconds) {
+    for (int i = 0; i < seconds * 20; ++i) {
+      if (fs::exists(kResolver)) return true;
+      ::usleep(50000);
+    }
+    return false;
+  }
+
+  static void ExpectApplied() {
+    EXPECT_EQ(Addresses(), "10.1.14.77/24");
+    EXPECT_EQ(DefaultRoutes(), "default via 10.1.14.2 dev wlan0 metric " + MetricOf("wlan0") + "\n");
+    EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.14.3\n", "wlan0"));
+  }
+
+  static void ExpectGivenBack() {
+    EXPECT_EQ(Client(), "");
+    EXPECT_EQ(DefaultRoutes(), "");
+    EXPECT_EQ(ReadFile(kResolver), "");
+  }
+};
+
+// A server at the other end, for as long as the holder lives.
+class Server : public RunningProgram {
+ public:
+  Server()
+      : RunningProgram({"/usr/sbin/dnsmasq", "--conf-file=/dev/null", "--keep-in-foreground", "--interface=serve0",
+                        "--port=0", "--user=root", "--pid-file=", "--no-ping", "--dhcp-authoritative",
+                        "--dhcp-range=10.1.14.77,10.1.14.77,255.255.255.0,1h", "--dhcp-option=option:router,10.1.14.2",
+                        "--dhcp-option=option:dns-server,10.1.14.3", "--dhcp-leasefile=/tmp/platform/leases"}) {}
+};
+
+TEST_F(ALeasingClient, StaysBehindAndIsEndedWithWhatItHasLeased) {
+  const Server server;
+  NETINFO netInfo = Asker();
+  Shell("ip address add 192.0.2.7/24 dev wlan0");
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 16), 0);
+  EXPECT_STREQ(netInfo.szIp, "10.1.14.77");
+  EXPECT_STREQ(netInfo.szMask, "255.255.255.0");
+  ExpectApplied();
+  EXPECT_NE(Client(), "");
+
+  netInfo.blManual = TRUE;
+  CopyText(netInfo.szIp, "10.1.14.9");
+  EXPECT_EQ(MERONetSetCard1(&netInfo, 0), 0);
+  EXPECT_EQ(Addresses(), "10.1.14.9/24");
+  ExpectGivenBack();
+}
+
+// It gave up, and a server that came late was not asked.
+TEST_F(ALeasingClient, GoesOnAskingWhenNobodyAnswersInTime) {
+  NETINFO netInfo = Asker();
+  const auto begin = std::chrono::steady_clock::now();
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 4), -1);
+  const auto waited = std::chrono::steady_clock::now() - begin;
+  EXPECT_GE(waited, std::chrono::milliseconds(3900));
+  EXPECT_LT(waited, std::chrono::seconds(6));
+  ExpectFailure(ERR_UNKNOWN, "Failed to lease an address for wlan0: Connection timed out");
+  EXPECT_STREQ(netInfo.szIp, "");
+  const std::string client = Client();
+  EXPECT_NE(client, "");
+
+  const Server server;
+  EXPECT_TRUE(IsAppliedWithin(40));  // it rests for 20 s between its rounds
+  ExpectApplied();
+  EXPECT_EQ(Client(), client);
+
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 16), 0);
+  EXPECT_NE(Client(), client);
+  EXPECT_TRUE(HasEnded(client));
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
+  ExpectGivenBack();
+}
+
+TEST_F(ALeasingClient, ThatAsksInVainIsEndedByDisconnecting) {
+  NETINFO netInfo = Asker();
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 4), -1);
+  TakeLog();
+  EXPECT_NE(Client(), "");
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
+  EXPECT_EQ(Client(), "");
+}
+
+TEST_F(ALeasingClient, ThatWasKilledHasItsLeaseGivenBack) {
+  const Server server;
+  NETINFO netInfo = Asker();
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 16), 0);
+  Shell("kill -KILL $(cat /var/run/udhcpc-wlan0.pid)");
+  ExpectApplied();
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
+  ExpectGivenBack();
+}
+
+TEST_F(ALeasingClient, IsEndedWithoutTheScriptThatWouldApplyALease) {
+  fs::remove(kScript);
+  NETINFO netInfo = Asker();
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 4), -1);
+  TakeLog();
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
+  EXPECT_EQ(Client(), "");
+}
+
+TEST_F(ALeasingClient, IsReportedWhenTheLeaseCannotBeGivenBack) {
+  WriteFile(kScript, "#!/bin/sh\nexit 1\n", 0755);
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), -1);
+  ExpectFailure(ERR_COMMAND_FAILED, "Failed to end the DHCP client of wlan0: Exec format error");
+}
+
+}  // namespace
