@@ -8,7 +8,7 @@
 #include <string_view>
 
 // Copies what fits of `text` and terminates it; a null byte in the text ends it.
-inline void CopyText(char* szTo, size_t cbTo, std::string_view text) {
+[[gnu::noinline]] inline void CopyText(char* szTo, size_t cbTo, std::string_view text) {
   if (cbTo == 0) return;
   const size_t size = std::min({cbTo - 1, text.size(), text.find('\0')});
   if (size > 0) std::memcpy(szTo, text.data(), size);

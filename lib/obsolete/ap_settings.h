@@ -5,12 +5,13 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <cstdio>
 #include <iterator>
 
 #include "wireless.h"
 
-enum class SettingKind {
+enum class SettingKind : uint8_t {
   kSwitch,           // "yes" or "no"
   kInteger,          // decimal; also every BOOL and enumeration
   kText,             // as it stands
@@ -23,8 +24,8 @@ struct Setting {
   const char* szKey;
   SettingKind kind;
   int missing;                      // what the field is when a section lacks the key
-  size_t offset;                    // of the field in the record
-  size_t size;                      // of the field, for texts
+  uint16_t offset;                  // of the field in the record
+  uint16_t size;                    // of the field, for texts
   const char* szMissing = nullptr;  // what a text is when a section lacks the key
 };
 
@@ -42,7 +43,7 @@ static_assert(sizeof kAlwaysOn == sizeof(MERO_WIFI_SCHED_CONF::szWifiSched));
 #define SECRET_FIELD(member) SETTING_FIELD(MERO_HOSTAP_ENCRYPT_INFO, member)
 
 struct ApSetting {
-  int turn;  // at which it is read; 0 for what is only written
+  uint8_t turn;  // at which it is read; 0 for what is only written
   Setting setting;
 };
 

@@ -5,7 +5,7 @@
 // walk takes one reading, and nothing of the file, least of all its secrets, stays in memory behind it.
 #include <sys/stat.h>
 
-#include <charconv>
+#include <algorithm>
 #include <cstdlib>
 #include <ctime>
 #include <new>
@@ -94,12 +94,18 @@ void Keep(Bytes&& text, SectionIndex&& index, const FileStamp& stamp) {
   if (room != nullptr) g_kept = new (room) KeptFile{std::move(text), stamp, std::move(index)};
 }
 
+// Seconds as a number; one beyond 32 bits is the nearest that has them, and 0 stands for what is none.
 int32_t ParseTime(std::string_view text) {
+  constexpr int64_t kMany = int64_t{1} << 40;
+  const bool negative = text.starts_with('-');
+  if (negative) text.remove_prefix(1);
+  if (text.empty()) return 0;
   int64_t seconds = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), seconds);
-  if (end != text.data() + text.size()) return 0;
-  if (error == std::errc::result_out_of_range) return SaturatedTime(text.front() == '-' ? INT64_MIN : INT64_MAX);
-  return SaturatedTime(seconds);
+  for (const char c : text) {
+    if (c < '0' || c > '9') return 0;
+    seconds = std::min(10 * seconds + (c - '0'), kMany);
+  }
+  return SaturatedTime(negative ? -seconds : seconds);
 }
 
 void TakeBssid(std::string_view text, WIRELESS_NETWORK& network) {
