@@ -2,24 +2,26 @@
 # shellcheck shell=sh
 # shellcheck disable=SC2154  # what the other parts set
 
-# The first one by name; false when there is none.
+# The first one by name, but for the guests' interface, which is a second one on the same radio; false when there is
+# none.
 adapter() {
 	for phy in /sys/class/net/*/phy80211; do
-		[ -e "$phy" ] || return 1
-		interface=${phy%/phy80211}
-		printf '%s' "${interface##*/}"
-		return
+		interface=${phy%/phy80211} interface=${interface##*/}
+		if [ -e "$phy" ] && [ "$interface" != "$guest_interface" ]; then
+			printf '%s' "$interface"
+			return
+		fi
 	done
+	return 1
 }
 
 # PRODUCT names the adapter's section in the access point's settings.
 note_adapter() { # INTERFACE
 	section=$(section_of "$1") || exit 1
-	put "$adapter_info" <<-END
+	put "$adapter_info" 644 <<-END
 		INTERFACE="$1"
 		PRODUCT="$section"
 	END
-	attempt "let programs read $adapter_info" chmod 644 "$adapter_info"
 }
 
 # A USB adapter has a name, mostly; others are known by their numbers, or by what drives them.

@@ -23,7 +23,7 @@ is_there() { # INTERFACE
 }
 
 # make_bridge BRIDGE: the bridge with its first member, which is wired, and its address. A wireless member comes in when
-# its access point starts.
+# its access point starts. Without its first member the bridge is made all the same, and that is a failure.
 make_bridge() {
 	ask bridge "$1" hardware-address member static address mask || fail "$scripts/ifcfg-$1 describes no bridge"
 	{
@@ -36,8 +36,46 @@ make_bridge() {
 		$answer
 	END
 	create_bridge "$1" "$hardware"
-	if [ -n "$primary" ] && ! is_wireless "$primary"; then join_bridge "$primary" "$1"; fi
+	missing=''
+	if [ -n "$primary" ] && ! is_wireless "$primary"; then
+		if is_there "$primary"; then join_bridge "$primary" "$1"; else missing=yes; fi
+	fi
 	if [ "$static" = yes ]; then set_address "$1" "$address/$mask"; else lease_address "$1"; fi
+	[ -z "$missing" ] || fail "there is no interface '$primary' for the bridge $1"
+}
+
+# make_bridge_of_boot NAME: makes the bridge of that network-script file, if it is one that comes up at boot.
+make_bridge_of_boot() { # NAME
+	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1"; then
+		await_first_member "$1"
+		make_bridge "$1"
+	fi
+}
+
+# is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and no copy that somebody keeps beside it. The
+# file says so by its DEVICE; without one, what follows a dot is a VLAN's number.
+is_file_of_interface() {
+	is_name "$1" || return 1
+	device=$(script_value DEVICE "$1") || exit 1
+	case $device,$1 in
+	"$1,$1") return 0 ;;
+	,*. | ,*.*[!0-9.]* | ?*,*) return 1 ;;
+	esac
+}
+
+# be_patient SECONDS: from now on, so long in all, first members are waited for that come a moment later than this.
+be_patient() {
+	patience_ends=$(($(uptime_seconds) + $1))
+}
+
+await_first_member() { # BRIDGE
+	primary=$(script_value PRIMARY "$1") || exit 1
+	[ -n "$primary" ] || return 0
+	while ! is_there "$primary" && [ "$(uptime_seconds)" -lt "$patience_ends" ]; do sleep 0.1; done
+}
+
+uptime_seconds() {
+	read -r seconds _ </proc/uptime && printf '%s' "${seconds%.*}"
 }
 
 create_bridge() { # BRIDGE HARDWARE-ADDRESS, which may be empty
@@ -52,7 +90,6 @@ is_wireless() { # INTERFACE
 
 # A member has no addresses of its own: the bridge has them.
 join_bridge() { # INTERFACE BRIDGE
-	expect_interface "$1"
 	end_lease "$1"
 	attempt "bring $1 into $2" ip link set dev "$1" master "$2"
 	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
@@ -63,7 +100,8 @@ join_bridge() { # INTERFACE BRIDGE
 set_address() {
 	end_lease "$1"
 	attempt "give $1 the address $2" ip address replace "$2" broadcast + dev "$1"
-	[ "$(ip -4 -oneline address show dev "$1" | wc -l)" -gt 1 ] || return 0
+	addresses=$(ip -4 -oneline address show dev "$1") || fail "cannot tell the addresses of $1"
+	case $addresses in *"$newline"*) ;; *) return 0 ;; esac
 	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
 	attempt "give $1 the address $2" ip address add "$2" broadcast + dev "$1"
 }
@@ -86,17 +124,54 @@ lease_pid() { # INTERFACE
 	printf '/var/run/udhcpc-%s.pid' "$1"
 }
 
-# leave_bridge INTERFACE BRIDGE: takes the interface out. The bridge stays where it comes up at boot, for its other
-# members.
-leave_bridge() {
-	if [ -e "/sys/class/net/$2/brif/$1" ]; then
-		attempt "take $1 out of $2" ip link set dev "$1" nomaster
+# ---- The bridge of an access point --------------------------------------------------------------------------------
+
+# The bridge that an access point is in is noted: its interface's file may not tell any more when it is to be left.
+bridge_note() { # INTERFACE
+	printf '%s/bridge-%s' "$state" "$1"
+}
+
+note_bridge() { # INTERFACE BRIDGE
+	put "$(bridge_note "$1")" <<-END
+		$2
+	END
+}
+
+forget_bridge() { # INTERFACE
+	attempt "remove $(bridge_note "$1")" rm -f "$(bridge_note "$1")"
+}
+
+# bridge_of INTERFACE: the bridge that its access point was put into; without a note, the one that it is in.
+bridge_of() {
+	note=$(bridge_note "$1")
+	if [ -s "$note" ]; then
+		read -r noted <"$note" && printf '%s' "$noted"
+	elif [ -e "/sys/class/net/$1/master" ]; then
+		master=$(readlink "/sys/class/net/$1/master") || fail "cannot tell the bridge of $1"
+		if is_bridge "${master##*/}"; then printf '%s' "${master##*/}"; fi
 	fi
-	if ! comes_up_at_boot "$2" || ! has_members "$2"; then remove_bridge "$2"; fi
+}
+
+leave_bridge() { # INTERFACE BRIDGE
+	[ -e "/sys/class/net/$2/brif/$1" ] || return 0
+	attempt "take $1 out of $2" ip link set dev "$1" nomaster
+}
+
+# give_up_bridge BRIDGE: it stays where it comes up at boot, for its other members, whom it may serve.
+give_up_bridge() {
+	if comes_up_at_boot "$1" && has_members "$1"; then
+		serve_addresses "$1"
+	else
+		end_dnsmasq "$1"
+		remove_bridge "$1"
+	fi
 }
 
 has_members() { # BRIDGE
-	[ -n "$(ls "/sys/class/net/$1/brif" 2>/dev/null)" ]
+	for member in "/sys/class/net/$1/brif"/*; do
+		[ ! -e "$member" ] || return 0
+	done
+	return 1
 }
 
 remove_bridge() { # BRIDGE

@@ -10,16 +10,31 @@ daemon_of() {
 	[ "$name" = "$1" ] && printf '%s' "$pid"
 }
 
+# announce_daemon PIDFILE: an empty pid file stands for a daemon that is being started, and has not written it yet.
+announce_daemon() {
+	put "$1" </dev/null
+}
+
+await_pid() { # PIDFILE
+	tries=20
+	while [ $tries -gt 0 ] && [ -e "$1" ] && [ ! -s "$1" ]; do
+		sleep 0.1
+		tries=$((tries - 1))
+	done
+}
+
 # end_daemon NAME PIDFILE: ends it, and waits until it has.
 end_daemon() {
+	await_pid "$2"
 	for signal in TERM KILL; do
 		ended=$(daemon_of "$1" "$2") || break
-		kill -s "$signal" "$ended" || fail "cannot end $1 (process $ended)"
+		kill -s "$signal" "$ended" 2>/dev/null # in vain where it has just ended by itself
 		tries=50
 		while [ $tries -gt 0 ] && [ -d "/proc/$ended" ]; do
 			sleep 0.1
 			tries=$((tries - 1))
 		done
 	done
-	rm -f "$2"
+	! daemon_of "$1" "$2" >/dev/null || fail "cannot end $1 (process $ended)"
+	attempt "remove $2" rm -f "$2"
 }

@@ -11,6 +11,7 @@ serve_addresses() {
 }
 
 serve_guest_addresses() {
+	[ -n "$guests" ] || return 0
 	put "$state/dnsmasq-$guest_bridge.conf" <<-END
 		interface=$guest_bridge
 		dhcp-range=$guest_range
@@ -38,9 +39,10 @@ start_dnsmasq() { # BRIDGE CONFIGURATION
 run_dnsmasq() { # BRIDGE CONFIGURATION [OPTION...]
 	bridge=$1 file=$2
 	shift 2
-	grep -q '^dhcp-leasefile=' "$file" || set -- "$@" "--dhcp-leasefile=$state/dnsmasq-$bridge.leases"
+	leases=$(sed -n '/^dhcp-leasefile=/p' "$file") || fail "cannot read $file"
+	[ -n "$leases" ] || set -- "$@" "--dhcp-leasefile=$state/dnsmasq-$bridge.leases"
 	dnsmasq --conf-file="$file" --pid-file="$(dnsmasq_pid "$bridge")" --bind-interfaces --except-interface=lo \
-		--no-ping "$@"
+		--no-ping "$@" && chown -h 0:0 "$(dnsmasq_pid "$bridge")"
 }
 
 end_dnsmasq() { # BRIDGE

@@ -6,6 +6,8 @@ settings_reader=/usr/mero/sbin/mero-settings
 scripts=/etc/sysconfig/network-scripts
 adapter_info=/tmp/wireless.info
 state=/var/run/rc.network
+newline='
+'
 
 # ask REQUEST...: what settings hold, in $answer, as the library reads them. False when something is missing, or not as
 # checked. Settings that cannot be read end the script: an empty answer is neither on nor off.
@@ -53,8 +55,24 @@ is_on() {
 	esac
 }
 
-# put FILE: replaces a file by what it reads. Nobody sees a half of it, and nobody but root the whole.
+# put FILE [MODE]: replaces a file by what it reads. Nobody sees a half of it, and nobody but root the whole, unless the
+# mode says so. Anybody may have put something in its place, also in /tmp: that is neither followed nor written to, and
+# the new file is made under a name that nobody can foresee.
 put() {
-	(umask 077 && cat >"$1.new") || fail "cannot write $1.new"
-	attempt "replace $1" mv -f "$1.new" "$1"
+	new=$(mktemp "$1.XXXXXXXXXX" 2>&1) || fail "cannot write $1: $new"
+	{ cat >"$new" && chmod "${2:-600}" "$new"; } || give_up "$new" "cannot write $1"
+	if [ -d "$1" ] && [ ! -L "$1" ]; then set_aside "$1"; fi
+	said=$(mv -fT "$new" "$1" 2>&1) || give_up "$new" "cannot replace $1: $said"
+}
+
+give_up() { # NEW-FILE TEXT
+	rm -f "$1"
+	fail "$2"
+}
+
+# set_aside PATH: what stands in the way is kept, under another name.
+set_aside() {
+	aside=$(mktemp -u "$1.foreign-XXXXXX") || fail "cannot move $1 aside"
+	attempt "move $1 aside" mv -T "$1" "$aside"
+	warn "$1 was in the way, and is $aside now"
 }

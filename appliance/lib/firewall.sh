@@ -5,42 +5,46 @@
 forwarding=/proc/sys/net/ipv4/ip_forward
 forwarding_before=$state/ip_forward
 
-set_firewall() { # INTERFACE BRIDGE
-	if ! is_nat "$2" && ! guest_is_on "$1"; then
+# What is noted first is whether traffic was passed on before: while that stands, rules may stand too.
+set_firewall() { # BRIDGE
+	if ! is_nat "$1" && [ -z "$guests" ]; then
 		clear_firewall
 		return
 	fi
-	text=$(rules "$1" "$2") || exit 1
-	said=$(printf '%s\n' "$text" | nft -f - 2>&1) || fail "cannot set the rules between networks: $said"
-	forward
-}
-
-clear_firewall() {
-	# Added first, since what is missing cannot be deleted.
-	said=$(printf 'add table inet mero_ap\ndelete table inet mero_ap\n' | nft -f - 2>&1) ||
-		fail "cannot remove the rules between networks: $said"
-	stop_forwarding
-}
-
-forward() {
+	text=$(rules "$1") || exit 1
 	[ -e "$forwarding_before" ] || put "$forwarding_before" <"$forwarding"
+	set_rules "$text" || fail "cannot set the rules between networks: $said"
 	echo 1 >"$forwarding" || fail 'cannot pass traffic on between networks'
 }
 
-# Somebody else may have traffic passed on as well.
-stop_forwarding() {
+# Without rules that could stand, nothing is asked of nft, which may not be there. Somebody else may have traffic passed
+# on as well.
+clear_firewall() {
 	[ -e "$forwarding_before" ] || return 0
-	cat "$forwarding_before" >"$forwarding" || fail 'cannot stop passing traffic on between networks'
-	rm -f "$forwarding_before"
+	read -r before <"$forwarding_before" || fail "cannot read $forwarding_before"
+	echo "$before" >"$forwarding" || fail 'cannot stop passing traffic on between networks'
+	set_rules '' || fail "cannot remove the rules between networks: $said"
+	attempt "remove $forwarding_before" rm -f "$forwarding_before"
 }
 
-# All of it takes the place of what was there in one step.
-rules() { # INTERFACE BRIDGE
-	echo 'add table inet mero_ap'
-	echo 'delete table inet mero_ap'
+# set_rules TEXT: all of it takes the place of what was there in one step. The table is added first, since what is
+# missing cannot be deleted.
+set_rules() {
+	said=$(nft -f - 2>&1 <<-END
+		add table inet mero_ap
+		delete table inet mero_ap
+		$1
+	END
+	)
+}
+
+rules() { # BRIDGE
 	echo 'table inet mero_ap {'
-	if is_nat "$2"; then translation "$2" "$(subnet_of "$2")"; fi
-	if guest_is_on "$1"; then
+	if is_nat "$1"; then
+		subnet=$(subnet_of "$1") || exit 1
+		translation "$1" "$subnet"
+	fi
+	if [ -n "$guests" ]; then
 		translation "$guest_bridge" "$guest_subnet"
 		guest_rules
 	fi
@@ -48,59 +52,59 @@ rules() { # INTERFACE BRIDGE
 }
 
 translation() { # BRIDGE SUBNET
-	cat <<-END
-		chain translate-$1 {
-			type nat hook postrouting priority srcnat; policy accept;
-			ip saddr $2 oifname != "$1" masquerade
-		}
-	END
+	echo "chain translate-$1 {
+		type nat hook postrouting priority srcnat; policy accept;
+		ip saddr $2 oifname != \"$1\" masquerade
+	}"
 }
 
 # subnet_of BRIDGE: its network as ADDRESS/BITS, which the kernel knows by now.
 subnet_of() {
-	ip -4 route show dev "$1" proto kernel scope link | awk '{ print $1; exit }'
+	networks=$(ip -4 route show dev "$1" proto kernel scope link) || fail "cannot tell the network of $1"
+	[ -n "$networks" ] || fail "$1 has no address, and so no network to translate"
+	printf '%s' "${networks%% *}"
 }
 
 # Guests get addresses and names, and an answer to a ping. What else of the appliance, of the networks around it, and of
 # those beyond they reach is set.
 guest_rules() {
+	local_networks=$(local_networks) || exit 1
 	lan=$(verdict guest_net_lan_block) || exit 1
 	internet=$(verdict guest_net_internet_block) || exit 1
-	cat <<-END
-		set local-networks {
+	echo "set local-networks {
 			type ipv4_addr; flags interval; auto-merge
-			elements = { $(local_networks) }
+			elements = { $local_networks }
 		}
 		chain guest-input {
 			type filter hook input priority filter; policy accept;
-			iifname != "$guest_bridge" accept
+			iifname != \"$guest_bridge\" accept
 			ct state established,related accept
 			udp dport { 53, 67 } accept
 			tcp dport 53 accept
-			icmp type echo-request ip daddr $guest_address accept
-	END
+			icmp type echo-request ip daddr $guest_address accept"
 	if is_on guest_net_access_ds; then echo 'meta nfproto ipv4 accept'; fi
 	if is_on guest_net_allow_http; then echo 'meta nfproto ipv4 tcp dport { 80, 443 } accept'; fi
-	cat <<-END
-			reject
+	echo "reject
 		}
 		chain guest-forward {
 			type filter hook forward priority filter; policy accept;
-			iifname != "$guest_bridge" accept
+			iifname != \"$guest_bridge\" accept
 			ct state established,related accept
 			meta nfproto ipv6 reject
 			ip daddr @local-networks $lan
 			$internet
-		}
-	END
+		}"
 }
 
 # Private networks, and whatever the appliance is on itself.
 local_networks() {
-	{
-		printf '%s\n' 10.0.0.0/8 172.16.0.0/12 192.168.0.0/16 169.254.0.0/16
-		ip -4 route show proto kernel scope link | awk '{ print $1 }'
-	} | paste -s -d ,
+	networks=$(ip -4 route show proto kernel scope link) || fail 'cannot tell the networks around the appliance'
+	printf 10.0.0.0/8,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16
+	while read -r network _; do
+		[ -z "$network" ] || printf ',%s' "$network"
+	done <<-END
+		$networks
+	END
 }
 
 verdict() { # KEY

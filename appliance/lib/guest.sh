@@ -1,12 +1,20 @@
 # The guest network: a network of its own on the same radio, in a bridge of its own.
 # shellcheck shell=sh
-# shellcheck disable=SC2034  # the other parts use them
+# shellcheck disable=SC2034,SC2154  # the other parts use them, or set them
 
 guest_interface=gwlan
 guest_bridge=gbr
 guest_address=10.1.15.1
 guest_subnet=10.1.15.0/24
 guest_range=10.1.15.2,10.1.15.254,255.255.255.0,86400
+
+# Whether a start has guests. It asks once: the hour may change between their rules and their network.
+guests=''
+
+decide_on_guests() { # INTERFACE
+	guests=''
+	if guest_is_on "$1"; then guests=yes; fi
+}
 
 # guest_is_on INTERFACE: whether there is a guest network, and it is on the air at this hour.
 guest_is_on() {
@@ -17,7 +25,12 @@ guest_is_on() {
 
 # Without an address of its own, the guest network gets the one behind the radio's.
 guest_configuration() { # INTERFACE
-	sed '/^bssid=$/d' "/etc/hostapd/hostapd-$1-guest.conf"
+	sed '/^bssid=$/d' "/etc/hostapd/hostapd-$1-guest.conf" || fail "cannot read /etc/hostapd/hostapd-$1-guest.conf"
+}
+
+# set_guest_bridge: the bridge is there if the start has guests, and only then.
+set_guest_bridge() {
+	if [ -n "$guests" ]; then make_guest_bridge; else remove_guest_bridge; fi
 }
 
 make_guest_bridge() {
@@ -28,4 +41,5 @@ make_guest_bridge() {
 remove_guest_bridge() {
 	end_dnsmasq "$guest_bridge"
 	remove_bridge "$guest_bridge"
+	attempt "remove $state/dnsmasq-$guest_bridge.conf" rm -f "$state/dnsmasq-$guest_bridge.conf"*
 }

@@ -5,15 +5,17 @@
 control=/var/run/hostapd
 
 start_hostapd() { # INTERFACE
-	end_hostapd "$1"
-	expect_interface "$1"
 	configuration=$state/hostapd-$1.conf log=$state/hostapd-$1.log
 	write_configuration "$1" "$configuration"
 	make_named_files "$configuration"
 
-	: >"$log"
-	said=$(hostapd -B -t -f "$log" -P "$(hostapd_pid "$1")" "$configuration" 2>&1) ||
+	put "$log" </dev/null
+	announce_daemon "$(hostapd_pid "$1")"
+	said=$(hostapd -B -t -f "$log" -P "$(hostapd_pid "$1")" "$configuration" 2>&1) || {
+		rm -f "$(hostapd_pid "$1")"
 		fail "cannot start the access point on $1: $(reason_in "$log" "$said")"
+	}
+	await_pid "$(hostapd_pid "$1")"
 	await_access_point "$1" "$log"
 }
 
@@ -21,10 +23,9 @@ end_hostapd() { # INTERFACE
 	end_daemon hostapd "$(hostapd_pid "$1")"
 }
 
-# end_access_point INTERFACE: ends the daemon for good; what it was told holds secrets.
-end_access_point() {
-	end_hostapd "$1"
-	rm -f "$state/hostapd-$1.conf" "$state/hostapd-$1.log"
+# forget_configuration INTERFACE: it holds secrets, and so does a half that was being written.
+forget_configuration() {
+	attempt "remove $state/hostapd-$1.conf" rm -f "$state/hostapd-$1.conf"* "$state/hostapd-$1.log"*
 }
 
 hostapd_pid() { # INTERFACE
@@ -34,15 +35,23 @@ hostapd_pid() { # INTERFACE
 # What the daemon reads: the main network's file and, while it is on, the guest network's; without what the card cannot
 # do, since a daemon that is told to use that does not start.
 write_configuration() { # INTERFACE FILE
-	[ -s "/etc/hostapd/hostapd-$1-host.conf" ] || fail "/etc/hostapd/hostapd-$1-host.conf is missing or empty"
-	put "$2" <"/etc/hostapd/hostapd-$1-host.conf"
-	unable=$(what_is_unable "$1" "$(band_of "$2")") || exit 1
-	sed "$unable" "$2" | put "$2"
-	if guest_is_on "$1"; then guest_configuration "$1" >>"$2"; fi
+	host=/etc/hostapd/hostapd-$1-host.conf
+	[ -s "$host" ] || fail "$host is missing or empty"
+	band=$(band_of "$host") || exit 1
+	unable=$(what_is_unable "$1" "$band") || exit 1
+	networks=$(sed "$unable" "$host") || fail "cannot read $host"
+	if [ -n "$guests" ]; then
+		second=$(guest_configuration "$1") || exit 1
+		networks=$networks$newline$second
+	fi
+	put "$2" <<-END
+		$networks
+	END
 }
 
 band_of() { # CONFIGURATION
-	if grep -qx 'hw_mode=a' "$1"; then echo 2; else echo 1; fi
+	mode=$(sed -n 's/^hw_mode=//p' "$1") || fail "cannot read $1"
+	if [ "$mode" = a ]; then echo 2; else echo 1; fi
 }
 
 # what_is_unable INTERFACE BAND: what takes the card's lacks out of a configuration, for sed.
@@ -66,16 +75,22 @@ lacks() { # BITS BIT PATTERN
 # What the card can do under 802.11n in a band, as its bits; empty for a card without.
 ht_capabilities() { # INTERFACE BAND
 	phy=$(cat "/sys/class/net/$1/phy80211/name") || fail "$1 is no wireless interface"
-	iw phy "$phy" info | awk -v band="Band $2:" '
+	said=$(iw phy "$phy" info) || fail "cannot tell the capabilities of $1"
+	awk -v band="Band $2:" '
 		$1 == "Band" { inside = ($0 ~ band) }
-		inside && $1 == "Capabilities:" { print $2; exit }'
+		inside && $1 == "Capabilities:" { print $2; exit }' <<-END || fail "cannot tell the capabilities of $1"
+		$said
+	END
 }
 
 # The daemon does not start when a file that it is told to read is missing.
 make_named_files() { # CONFIGURATION
-	sed -n 's/^wpa_psk_file=//p' "$1" | while IFS= read -r file; do
-		[ -e "$file" ] || put "$file" </dev/null
-	done || exit 1
+	files=$(sed -n 's/^wpa_psk_file=//p' "$1") || fail "cannot read $1"
+	while IFS= read -r file; do
+		[ -z "$file" ] || [ -e "$file" ] || put "$file" </dev/null
+	done <<-END
+		$files
+	END
 }
 
 # The daemon is in the background before it has chosen a channel.
@@ -91,7 +106,6 @@ await_access_point() { # INTERFACE LOG
 		sleep 0.1
 		tries=$((tries - 1))
 	done
-	end_hostapd "$1"
 	fail "the access point on $1 does not come up: $(reason_in "$2")"
 }
 

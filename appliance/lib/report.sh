@@ -21,12 +21,15 @@ attempt() {
 	said=$("$@" 2>&1) || fail "cannot $what: ${said:-$1 ended with status $?}"
 }
 
-# expect_name NAME: a name that is put into paths and rules is an interface's, or empty.
-expect_name() {
+# is_name TEXT: whether an interface may be called so, and it may be put into paths and rules.
+is_name() {
 	case $1 in
-	'') ;;
-	*[!A-Za-z0-9_.-]* | .* | -* | ????????????????*) fail "'$1' is no name of an interface" ;;
+	'' | *[!A-Za-z0-9_.-]* | .* | -* | ????????????????*) return 1 ;;
 	esac
+}
+
+expect_name() { # NAME, which may be empty
+	[ -z "$1" ] || is_name "$1" || fail "'$1' is no name of an interface"
 }
 
 expect_interface() { # INTERFACE

@@ -7,9 +7,10 @@
 is_off_now() {
 	is_on "$1" || return 1
 	hours=$(setting "$2") || exit 1
-	hour=$(date +%H)
-	digit=$(($(date +%w) * 24 + ${hour#0} + 1))
-	[ "$(printf '%s' "$hours" | cut -c "$digit")" = 0 ]
+	now=$(date '+%w %H') || fail 'cannot tell the hour of the week'
+	day=${now% *} hour=${now#* }
+	digit=$(printf '%s' "$hours" | cut -c $((day * 24 + ${hour#0} + 1))) || fail "cannot follow the schedule $2"
+	[ "$digit" = 0 ]
 }
 
 # An interface that is down is off the air; the daemon puts its network back when it comes up.
@@ -17,6 +18,23 @@ apply_main_schedule() { # INTERFACE
 	turn=up
 	if is_off_now wifi_sched_enabled wifi_sched; then turn=down; fi
 	attempt "switch $1 $turn" ip link set dev "$1" "$turn"
+}
+
+# What a schedule has begun, and not come to the end of, is noted: meanwhile nothing is on the air that could tell.
+lateness() { # INTERFACE
+	printf '%s/late-%s' "$state" "$1"
+}
+
+note_lateness() { # INTERFACE
+	put "$(lateness "$1")" </dev/null
+}
+
+is_late() { # INTERFACE
+	[ -e "$(lateness "$1")" ]
+}
+
+forget_lateness() { # INTERFACE
+	attempt "remove $(lateness "$1")" rm -f "$(lateness "$1")"
 }
 
 # guest_is_late INTERFACE: whether the guest network is on the air and should not be, or the other way round. The daemon

@@ -1,0 +1,238 @@
+// The network start script's start and restart: all of an access point, or nothing of it.
+#include "kit_radio.h"
+
+namespace {
+
+using testing::HasSubstr;
+using testing::StartsWith;
+
+using KitAccessPoint = KitRadio;
+
+TEST_F(KitAccessPoint, IsOnTheAirWithItsRulesAndOffWithoutALeftover) {
+  const Ran started = Script("start wlan0 lbr0");
+  EXPECT_EQ(started.output, "");
+  EXPECT_EQ(started.status, 0);
+  EXPECT_EQ(Daemons(), OnAir());
+  EXPECT_THAT(RunInShell("cat /tmp/rules").output, HasSubstr("ip saddr 10.1.14.0/24 oifname != \"lbr0\" masquerade"));
+  EXPECT_EQ(RunInShell("cat /proc/sys/net/ipv4/ip_forward").output, "1\n");
+  const Ran ended = Script("restart wlan0 lbr0");
+  EXPECT_EQ(ended.output, "");
+  EXPECT_EQ(ended.status, 0);
+  EXPECT_EQ(Left(), "");
+}
+
+// The rules came last: until then, and for good where they could not be set, anybody who joined was without them.
+TEST_F(KitAccessPoint, HasItsRulesBeforeItIsOnTheAir) {
+  ASSERT_EQ(Script("start wlan0 lbr0").status, 0);
+  const std::string calls = RunInShell("grep -oE '^(nft|dnsmasq|hostapd) ' /tmp/calls | xargs").output;
+  EXPECT_EQ(calls, "nft dnsmasq hostapd\n");
+}
+
+TEST_F(KitAccessPoint, LeavesNothingWhenAStepFails) {
+  const struct {
+    const char* szProgram;
+    const char* szCalls;
+    const char* szReason;
+  } rows[] = {
+      {"nft", "", "rc.network: cannot set the rules between networks: nft is broken\n"},
+      {"dnsmasq", "", "rc.network: cannot serve addresses on lbr0: dnsmasq is broken\n"},
+      {"hostapd", "", "rc.network: cannot start the access point on wlan0: hostapd is broken\n"},
+      {"iw", "info", "iw is broken\nrc.network: cannot tell the capabilities of wlan0\n"},
+      {"ip", "address replace", "rc.network: cannot give lbr0 the address 10.1.14.1/255.255.255.0: ip is broken\n"},
+      {"ip", "route show", "ip is broken\nrc.network: cannot tell the network of lbr0\n"},
+      {"ip", "wlan0 up", "rc.network: cannot switch wlan0 up: ip is broken\n"},
+  };
+  for (const bool again : {false, true}) {
+    for (const auto& row : rows) {
+      if (again) {
+        ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+      }
+      BreakOnce(row.szProgram, row.szCalls);
+      const Ran ran = Script("start wlan0 lbr0");
+      EXPECT_EQ(ran.status, 1) << row.szProgram << row.szCalls;
+      EXPECT_EQ(ran.output, row.szReason);
+      EXPECT_EQ(Left(), "") << row.szProgram << row.szCalls;
+    }
+  }
+}
+
+TEST_F(KitAccessPoint, NeedsNoNftWithoutRules) {
+  SetBridge("NAT=no");
+  fs::remove("/tmp/bin/nft");
+  fs::remove("/usr/sbin/nft");
+  ASSERT_NE(RunInShell("command -v nft").status, 0);
+  EXPECT_EQ(Script("start wlan0 lbr0").output, "");
+  EXPECT_EQ(Daemons(), OnAir());
+  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Left(), "");
+
+  SetBridge("NAT=yes");
+  const Ran refused = Script("start wlan0 lbr0");
+  EXPECT_EQ(refused.status, 1);
+  EXPECT_THAT(refused.output, StartsWith("rc.network: cannot set the rules between networks: "));
+  EXPECT_EQ(Daemons(), "");
+}
+
+TEST_F(KitAccessPoint, SaysThatRulesStandWhichItCannotRemove) {
+  ASSERT_EQ(Script("start wlan0 lbr0").status, 0);
+  fs::remove("/tmp/bin/nft");
+  fs::remove("/usr/sbin/nft");
+  for (const char* szWords : {"restart wlan0 lbr0", "restart wlan0"}) {
+    const Ran ran = Script(szWords);
+    EXPECT_EQ(ran.status, 1);
+    EXPECT_THAT(ran.output, StartsWith("rc.network: cannot remove the rules between networks: ")) << szWords;
+    EXPECT_EQ(Daemons(), "");
+  }
+  SetBridge("NAT=no");
+  EXPECT_EQ(Script("start wlan0 lbr0").status, 1);
+}
+
+// One step that failed kept all that came after it: the interface stayed an access point's.
+TEST_F(KitAccessPoint, IsTakenDownWhateverStepFails) {
+  const struct {
+    const char* szProgram;
+    const char* szCalls;
+  } rows[] = {
+      {"nft", ""}, {"ip", "link delete"}, {"ip", "address flush"}, {"ip", "wlan0 down"}, {"iw", "type managed"}};
+  for (const auto& row : rows) {
+    ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+    Break(row.szProgram, row.szCalls);
+    RunInShell("rm -f /tmp/calls");
+    const Ran ran = Script("restart wlan0 lbr0");
+    EXPECT_EQ(ran.status, 1) << row.szProgram << row.szCalls;
+    EXPECT_THAT(ran.output, StartsWith("rc.network: cannot ")) << row.szProgram << row.szCalls;
+    EXPECT_EQ(Daemons(), "");
+    EXPECT_FALSE(fs::exists("/run/rc.network/hostapd-wlan0.conf"));
+    const std::string calls = RunInShell("cat /tmp/calls").output;
+    for (const char* szStep : {"nft -f -", "ip link delete dev lbr0", "ip -4 address flush dev wlan0",
+                               "ip link set dev wlan0 down", "iw dev wlan0 set type managed"}) {
+      EXPECT_THAT(calls, HasSubstr(szStep)) << row.szProgram << row.szCalls;
+    }
+    Mend();
+    EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+    EXPECT_EQ(Left(), "");
+  }
+}
+
+// Whoever disables the access point twice, since it failed once, cannot name its bridge any more.
+TEST_F(KitAccessPoint, IsTakenDownWithItsBridgeWhenNobodyNamesThat) {
+  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  Break("ip", "link delete");
+  EXPECT_EQ(Script("restart wlan0 lbr0").status, 1);
+  EXPECT_TRUE(fs::exists("/sys/class/net/lbr0"));
+  Mend();
+  EXPECT_EQ(Script("restart wlan0 ''").output, "");
+  EXPECT_EQ(Left(), "");
+}
+
+TEST_F(KitAccessPoint, IsTakenOutOfTheBridgeThatTheKernelHasItIn) {
+  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  ASSERT_EQ(RunInShell("rm /run/rc.network/bridge-wlan0; ip link set dev wlan0 master lbr0").output, "");
+  EXPECT_EQ(Script("restart wlan0").output, "");
+  EXPECT_EQ(Left(), "");
+}
+
+TEST_F(KitAccessPoint, LeavesABridgeThatIsNoneOfTheFilesAsItIs) {
+  ASSERT_EQ(RunInShell("ip link add other type bridge && ip link set dev wlan0 master other").output, "");
+  EXPECT_EQ(Script("restart wlan0").output, "");
+  EXPECT_TRUE(fs::exists("/sys/class/net/other"));
+}
+
+TEST_F(KitAccessPoint, LeavesNothingInTheBridgeThatItMovesFrom) {
+  Write("/etc/sysconfig/network-scripts/ifcfg-abr0",
+        "DEVICE=abr0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT="
+        "yes\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  ASSERT_EQ(Script("start wlan0 abr0").output, "");
+  EXPECT_FALSE(fs::exists("/sys/class/net/lbr0"));
+  EXPECT_EQ(Daemons(), "hostapd\n");
+  EXPECT_EQ(Script("restart wlan0 ''").output, "");
+  EXPECT_TRUE(fs::exists("/sys/class/net/abr0/brif/eth0"));
+}
+
+// A start that was ended by a signal left what it had made by then.
+TEST_F(KitAccessPoint, LeavesNothingWhenASignalEndsItsStart) {
+  const struct {
+    const char* szSignal;
+    const char* szWhere;
+  } rows[] = {
+      {"TERM", "hostapd_cli"}, {"TERM", "nft"}, {"TERM", "hostapd"}, {"HUP", "hostapd_cli"}, {"INT", "hostapd_cli"}};
+  for (const auto& row : rows) {
+    for (const char* szWhom : {"$!", "-$!"}) {  // the script alone, and all that it runs
+      const std::string where = row.szWhere;
+      RunInShell("rm -f /tmp/calls");
+      StandIn("hostapd_cli", where == "hostapd_cli" ? "sleep 0.1\n" : "echo state=ENABLED\n");
+      StandIn("nft", where == "nft" ? "sleep 0.3; cat >/tmp/rules\n" : "cat >/tmp/rules\n");
+      StandIn("hostapd", (where == "hostapd" ? "sleep 0.3\n" : "") + Daemon("hostapd", "-P"));
+      // A shell with job control gives the script a group of its own, and lets it hear of SIGINT.
+      const Ran ran = Run("bash -c 'set -m; /etc/rc.network start wlan0 lbr0 & until grep -q \"^" + where +
+                          " \" /tmp/calls 2>/dev/null; do sleep 0.02; done; kill -s " + row.szSignal + " -- " + szWhom +
+                          "; wait $!; echo status $?'");
+      EXPECT_THAT(ran.output, HasSubstr("status 1\n")) << row.szSignal << szWhom << where;
+      EXPECT_THAT(ran.output, HasSubstr("rc.network: ")) << row.szSignal << szWhom << where;
+      EXPECT_EQ(Left(), "") << row.szSignal << szWhom << where;
+    }
+  }
+}
+
+// Guests came on the air when their hour struck between their rules, which there were none of yet, and their network.
+TEST_F(KitAccessPoint, AsksOnceWhetherThereAreGuests) {
+  Write("/usr/mero/etc/wireless_ap.conf",
+        "[RT [5370]\n\tguest_net_sched_enable=1\n\tguest_net_sched=0" + std::string(167, '1') + "\n");
+  Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  Write("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  Install("date", "if [ -e /tmp/struck ]; then echo 0 01; else >/tmp/struck; echo 0 00; fi\n");
+  EXPECT_EQ(Script("start wlan0 lbr0").output, "");
+  EXPECT_EQ(RunInShell("grep -c gwlan /run/rc.network/hostapd-wlan0.conf").output, "0\n");
+
+  EXPECT_EQ(Script("start wlan0 lbr0").output, "");
+  EXPECT_EQ(RunInShell("grep -c gwlan /run/rc.network/hostapd-wlan0.conf").output, "1\n");
+  EXPECT_THAT(RunInShell("cat /tmp/rules").output, HasSubstr("chain guest-forward"));
+  EXPECT_TRUE(fs::exists("/sys/class/net/gbr"));
+  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Left(), "");
+}
+
+// The access point was off from the hour on in which its start for the guests had failed.
+TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
+  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  Write("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  BreakOnce("nft");
+  EXPECT_EQ(Script("schedule wlan0").output, "rc.network: cannot set the rules between networks: nft is broken\n");
+  EXPECT_EQ(Daemons(), "");
+  EXPECT_EQ(Script("schedule wlan0").output, "");
+  EXPECT_EQ(Daemons(), "dnsmasq\ndnsmasq\nhostapd\n");
+  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+
+  // One that is ended meanwhile stays off.
+  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  BreakOnce("nft");
+  EXPECT_EQ(Script("schedule wlan0").status, 1);
+  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Script("schedule wlan0").output, "");
+  EXPECT_EQ(Left(), "");
+}
+
+// What was made had the mode that the caller's umask left it.
+TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
+  Write("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nwpa_psk_file=/etc/hostapd.psk\n");
+  for (const char* szUmask : {"000", "077", "022"}) {
+    EXPECT_EQ(Run(std::string("sh -c 'umask ") + szUmask + "; /etc/rc.network start wlan0 lbr0'").output, "");
+    EXPECT_EQ(RunInShell("stat -Lc '%a %n' /run/rc.network /run/rc.network/* /etc/hostapd.psk").output,
+              "700 /run/rc.network\n"
+              "600 /run/rc.network/bridge-wlan0\n"
+              "644 /run/rc.network/dnsmasq-lbr0.pid\n"
+              "600 /run/rc.network/hostapd-wlan0.conf\n"
+              "600 /run/rc.network/hostapd-wlan0.log\n"
+              "600 /run/rc.network/hostapd-wlan0.pid\n"
+              "600 /run/rc.network/ip_forward\n"
+              "600 /run/rc.network/lock\n"
+              "600 /etc/hostapd.psk\n")
+        << szUmask;
+    EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+    RunInShell("rm -rf /run/rc.network /etc/hostapd.psk");
+  }
+}
+
+}  // namespace
