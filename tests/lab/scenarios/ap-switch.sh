@@ -41,7 +41,8 @@ leaves guest
 
 say '-- and with the adapter'
 on nas /usr/mero/hotplug/usb.wireless.function remove
-fails_on nas test -e /tmp/wireless.info
+expect_file nas /tmp/wireless.info </dev/null
+expect_mode nas /tmp/wireless.info 644
 plug_in nas
 guest_of nas guest "${home[@]}"
 leaves guest
