@@ -71,7 +71,8 @@ exec "$name" "$@"
            RunInShell(
                "cat /tmp/rules; cat /proc/sys/net/ipv4/ip_forward; ls -d /sys/class/net/* | grep -v /g[aw]; ls -d "
                "/sys/class/net/*/brif/*; "
-               "ip -brief -4 address | sort; cat /sys/class/net/wlan0/flags; cat /etc/hostapd/*.info; "
+               "ip -brief -4 address | sort; cat /sys/class/net/wlan0/flags; cat /etc/hostapd/*.info "
+               "/tmp/wireless.info; "
                "stat -c '%n %a %u' /run/rc.network /run/rc.network/* /tmp/wireless* /etc/hostapd/* | grep "
                "-v 'leases\\|lock'")
                .output;
@@ -171,6 +172,25 @@ TEST_P(KitSweepOfAccessPoint, Schedule) {
   const int failures = Sweep(kSchedule, main_, bring, on_, {main_, off_, late});
   std::printf("%d commands failed\n", failures);
   EXPECT_GE(failures, 15);
+}
+
+TEST_P(KitSweepOfAccessPoint, RemovalOfItsAdapter) {
+  const std::string remove = "/usr/mero/hotplug/usb.wireless.function remove";
+  const auto pull = [] {
+    RunInShell("ip link show wlan0 || ip link add wlan0 type veth peer name air");
+    Write("/tmp/wireless.info", "PRODUCT=\"RT [5370\"\n");
+    Run(kStart);
+    RunInShell("ip link delete wlan0");
+  };
+  pull();
+  const std::string pulled = State();
+  EXPECT_EQ(Run(kRestart).output, "");
+  const std::string ended = State();  // and still noted
+  EXPECT_EQ(Run(remove).output, "");
+  const std::string removed = State();
+  const int failures = Sweep(remove, pulled, pull, removed, {ended, removed});
+  std::printf("%d commands failed\n", failures);
+  EXPECT_GE(failures, 5);
 }
 
 TEST_P(KitSweep, Boot) {

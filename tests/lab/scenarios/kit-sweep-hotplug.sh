@@ -7,4 +7,5 @@ appliance nas
 swept_access_point nas
 sweep nas change-mode-client
 sweep nas change-mode-ap
-expect_swept 12
+sweep nas add
+expect_swept 20
