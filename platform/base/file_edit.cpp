@@ -11,7 +11,6 @@
 #include <ctime>
 
 #include "common/text.h"
-#include "common/umask.h"
 #include "platform/base/file_read.h"
 #include "platform/base/shared_directory.h"
 
@@ -44,11 +43,13 @@ constexpr char kNewFormat[] = "%.*s.%s.new";
 // Stands for the lock: a file of its own, since anyone who may read a file may lock it, and keep it locked.
 constexpr char kLockFormat[] = "%.*s.%s.lock";
 
-// Locks a file by asking again and again, since to wait for a lock has no end.
-Status LockSoon(int fd) {
-  constexpr int kTries = 4000;
-  constexpr timespec kNap = {0, 5'000'000};
-  for (int i = 0; i < kTries; ++i) {
+// How often a lock is asked for, and how long is waited in between: 20 s in all.
+constexpr int kTries = 4000;
+constexpr timespec kNap = {0, 5'000'000};
+
+// Locks a file by asking again and again, since to wait for a lock has no end. Takes off `tries` what it needed.
+Status LockSoon(int fd, int& tries) {
+  for (; tries > 0; --tries) {
     if (::flock(fd, LOCK_EX | LOCK_NB) == 0) return Status::Ok();
     if (errno != EWOULDBLOCK && errno != EINTR) return Status::Failed(errno);
     (void)::nanosleep(&kNap, nullptr);  // a signal only makes it shorter
@@ -119,13 +120,13 @@ Status FlushDirectory(const char* szPath) {
 }  // namespace
 
 // Holds the lock of the file once this succeeds.
-Status FileEdit::Lock() {
+Status FileEdit::Lock(int& tries) {
   const Beside path(kLockFormat, szPath_);
   if (!path.fits()) return Status::Failed(ENAMETOOLONG);
   while (true) {
     Result<Descriptor> lock = OpenLock(path.c_str());
     if (!lock.ok()) return lock.status();
-    if (Status status = LockSoon(lock->get()); !status.ok()) return status;
+    if (Status status = LockSoon(lock->get(), tries); !status.ok()) return status;
     // Its last holder has removed it, and others may hold the next one.
     Result<bool> current = Names(path.c_str(), lock->get());
     if (!current.ok()) return current.status();
@@ -159,27 +160,30 @@ Status Resolve(const char* szPath, char (&szReal)[PATH_MAX]) {
 
 // Makes a file that is missing; where a link leads to none, there.
 Status Make(const char* szPath, mode_t mode) {
-  const Umask umask(kNoUmask);
-  const int exclusively = IsShared(szPath) ? O_EXCL : 0;
-  const Descriptor file(::open(szPath, kReading | O_CREAT | exclusively, mode));
-  return file.valid() || errno == EEXIST ? Status::Ok() : Status::Failed(errno);
+  const Descriptor file(::open(szPath, kReading | O_CREAT | O_EXCL, mode));
+  if (file.valid()) return Status::Of(::fchmod(file.get(), mode));  // whatever the umask
+  if (errno != EEXIST) return Status::Failed(errno);
+  if (IsShared(szPath)) return Status::Ok();
+  const Descriptor target(::open(szPath, kReading | O_CREAT, mode));
+  return target.valid() ? Status::Ok() : Status::Failed(errno);
 }
 
 Result<FileEdit> FileEdit::Open(const char* szPath, mode_t mode) {
-  FileEdit edit;
-  while (true) {
+  bool created = false;
+  for (int tries = kTries;;) {
+    FileEdit edit;
     const Status found = Resolve(szPath, edit.szPath_);
     if (!found.ok() && (found.error() != ENOENT || mode == 0)) return found;
     if (!found.ok()) {
       if (Status status = Make(szPath, mode); !status.ok()) return status;
-      edit.created_ = true;
+      created = true;
       continue;
     }
-    if (Status status = edit.Lock(); !status.ok()) return status;
+    edit.created_ = created;
+    if (Status status = edit.Lock(tries); !status.ok()) return status;
     const Status status = edit.Read();
     if (status.ok()) return edit;
-    if (status.error() != ENOENT) return status;
-    edit = FileEdit();  // a rival has removed it meanwhile
+    if (status.error() != ENOENT) return status;  // else a rival has removed it meanwhile
   }
 }
 

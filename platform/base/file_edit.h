@@ -18,7 +18,7 @@ class FileEdit {
  public:
   FileEdit() = default;
   FileEdit(FileEdit&&) = default;
-  FileEdit& operator=(FileEdit&&) = default;
+  FileEdit& operator=(FileEdit&&) = delete;  // a lock and the path of its file belong together
   ~FileEdit();
 
   // Locks a file, following symbolic links, and reads it. One that is missing is created with mode `mode`, whatever the
@@ -35,7 +35,7 @@ class FileEdit {
   Status Commit(std::string_view content);
 
  private:
-  Status Lock();
+  Status Lock(int& tries);
   Status Read();
 
   Descriptor lock_;  // the file beside it that stands for the lock

@@ -48,12 +48,21 @@ const std::array<Change, 5> kChanges = {{
 }};
 
 int g_naps = -1;  // how many were taken; negative when they are slept
+timespec g_slept = {};
+std::function<void(int)> g_whileNapping;  // what happens meanwhile
 
 }  // namespace
 
 // In the place of libc's, so that waiting in vain takes no time.
 extern "C" int nanosleep(const timespec* pNap, timespec* pRest) {
-  if (g_naps >= 0) return ++g_naps, 0;
+  if (g_naps >= 0) {
+    g_slept.tv_nsec += pNap->tv_nsec;
+    g_slept.tv_sec += pNap->tv_sec + g_slept.tv_nsec / 1'000'000'000;
+    g_slept.tv_nsec %= 1'000'000'000;
+    ++g_naps;
+    if (g_whileNapping) g_whileNapping(g_naps);
+    return 0;
+  }
   return ::clock_nanosleep(CLOCK_REALTIME, 0, pNap, pRest);
 }
 
@@ -167,7 +176,10 @@ class Rival {
   Rival& operator=(const Rival&) = delete;
   ~Rival() { GiveUp(); }
 
-  // As a writer does when it is done. A process that was forked holds it open, too.
+  // In a process that was forked, and holds it open too.
+  void Close() const { ::close(lock_); }
+
+  // As a writer does when it is done.
   void GiveUp() {
     if (lock_ < 0) return;
     EXPECT_EQ(::unlink(kLock), 0);
@@ -192,7 +204,8 @@ bool AsksForLock(pid_t pid) {
 // A process that gives "KEY" the value "new", and has come to ask for the lock.
 class Writer {
  public:
-  Writer() : pid_(::fork()) {
+  explicit Writer(const Rival& rival) : pid_(::fork()) {
+    if (pid_ == 0) rival.Close();
     if (pid_ == 0) ::_exit(PLIBCFileSetKeyValue(kPath, "KEY", "new", "%s=%s\n") == 1 ? 0 : 1);
     using std::chrono_literals::operator""ms;
     bool asks = false;
@@ -219,7 +232,7 @@ class Writer {
 TEST_F(AFileThatIsChanged, WaitsForAnotherWriterAndKeepsWhatThatWrote) {
   WriteFile(kFile, "KEY=old\nRIVAL=old\n");
   Rival rival;
-  const Writer writer;
+  const Writer writer(rival);
   EXPECT_EQ(ReadFile(kFile), "KEY=old\nRIVAL=old\n");
   WriteFile("/tmp/platform/rival", "KEY=old\nRIVAL=new\n");
   fs::rename("/tmp/platform/rival", kFile);
@@ -228,14 +241,16 @@ TEST_F(AFileThatIsChanged, WaitsForAnotherWriterAndKeepsWhatThatWrote) {
   EXPECT_EQ(ReadFile(kFile), "KEY=new\nRIVAL=new\n");
 }
 
+// The process crashed, and left its lock.
 TEST_F(AFileThatIsChanged, IsMadeAnewWhenARivalRemovesItMeanwhile) {
   WriteFile(kFile, "A=1\n");
   Rival rival;
-  const Writer writer;
+  const Writer writer(rival);
   fs::remove(kFile);
   rival.GiveUp();
   EXPECT_TRUE(writer.Succeeds());
   EXPECT_EQ(ReadFile(kFile), "KEY=new\n");
+  EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file"));
 }
 
 TEST_F(AFileThatIsChanged, IsReportedAfterAWhileWhenARivalKeepsItsLock) {
@@ -243,14 +258,37 @@ TEST_F(AFileThatIsChanged, IsReportedAfterAWhileWhenARivalKeepsItsLock) {
     WriteFile(kFile, change.szBefore);
     Rival rival;
     g_naps = 0;
+    g_slept = {};
     EXPECT_FALSE(change.make(kFile)) << change.szName;
-    EXPECT_EQ(g_naps, 4000) << change.szName;  // of 5 ms
+    EXPECT_EQ(g_naps, 4000) << change.szName;
+    EXPECT_EQ(g_slept.tv_sec, 20) << change.szName;
     const std::vector<LogLine> log = TakeLog();
     ASSERT_EQ(log.size(), 1u);
     EXPECT_THAT(log[0].text, testing::EndsWith(" /tmp/platform/file: another process keeps its lock"));
     EXPECT_EQ(ReadFile(kFile), change.szBefore) << change.szName;
     g_naps = -1;
   }
+}
+
+// Each new lock was waited for anew.
+TEST_F(AFileThatIsChanged, IsNotWaitedForLongerWhenItsLockIsTakenAgainAndAgain) {
+  WriteFile(kFile, "KEY=old\n");
+  std::vector<int> locks;
+  g_whileNapping = [&locks](int nap) {
+    if (nap % 1000 != 1) return;
+    (void)::unlink(kLock);
+    for (const int lock : locks) ::flock(lock, LOCK_UN);
+    locks.push_back(::open(kLock, O_RDWR | O_CREAT | O_CLOEXEC, 0600));
+    ::flock(locks.back(), LOCK_EX);
+  };
+  const Rival rival;
+  g_naps = 0;
+  EXPECT_EQ(PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"), -1);
+  EXPECT_EQ(g_naps, 4000);
+  EXPECT_EQ(TakeLog().size(), 1u);
+  g_naps = -1;
+  g_whileNapping = nullptr;
+  for (const int lock : locks) ::close(lock);
 }
 
 TEST_F(AFileThatIsChanged, GetsItsModeWhateverTheUmask) {
