@@ -19,7 +19,4 @@ class Umask {
 // What programs have that nobody wants anything particular of: only the owner may write.
 inline constexpr mode_t kOrdinaryUmask = S_IWGRP | S_IWOTH;
 
-// A file gets the very mode that it is created with.
-inline constexpr mode_t kNoUmask = 0;
-
 #endif  // MERO_COMMON_UMASK_H

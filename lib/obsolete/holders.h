@@ -97,17 +97,20 @@ class NewFile {
   // Who may read a file that is created, whatever the caller's umask; one that exists keeps its mode.
   enum Readers : mode_t { kSecret = 0600, kForAll = 0644 };
 
-  // Who may put files into its directory. Where everybody may, what is there already is not written to.
-  enum Directory { kOurs, kShared };
-
-  NewFile(const char* szPath, Readers readers, Directory directory = kOurs) {
+  NewFile(const char* szPath, Readers readers) {
     constexpr int kFlags = O_WRONLY | O_CREAT | O_CLOEXEC;
     int fd = ::open(szPath, kFlags | O_EXCL, static_cast<mode_t>(readers));
     if (fd >= 0) (void)::fchmod(fd, readers);  // of an open file of our own
-    if (fd < 0 && errno == EEXIST && directory == kOurs) fd = ::open(szPath, kFlags | O_TRUNC, readers);
-    if (fd < 0) return;
-    pfFile_ = ::fdopen(fd, "w");
-    if (pfFile_ == nullptr) ::close(fd);
+    if (fd < 0 && errno == EEXIST) fd = ::open(szPath, kFlags | O_TRUNC, readers);
+    Take(fd);
+  }
+
+  // One of a name that nobody can foresee, for a directory into which anyone may put files: `szTemplate` ends with
+  // "XXXXXX", which it gives way to.
+  static NewFile Unforeseen(char* szTemplate, Readers readers) {
+    const int fd = ::mkostemp(szTemplate, O_CLOEXEC);
+    if (fd >= 0) (void)::fchmod(fd, readers);
+    return NewFile(fd);
   }
   NewFile(const NewFile&) = delete;
   NewFile& operator=(const NewFile&) = delete;
@@ -125,6 +128,14 @@ class NewFile {
   }
 
  private:
+  explicit NewFile(int fd) { Take(fd); }
+
+  void Take(int fd) {
+    if (fd < 0) return;
+    pfFile_ = ::fdopen(fd, "w");
+    if (pfFile_ == nullptr) ::close(fd);
+  }
+
   FILE* pfFile_ = nullptr;
 };
 

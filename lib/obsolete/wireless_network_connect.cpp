@@ -162,23 +162,35 @@ BOOL CheckConnComplete() {
   return FALSE;
 }
 
+// Puts a new record into its place. What others have put there meanwhile, where anyone may, goes.
+bool PutRecord(const char* szNew) {
+  constexpr int kTries = 100;
+  for (int i = 0; i < kTries; ++i) {
+    if (std::rename(szNew, kConnectionRecordPath) == 0) return true;
+    (void)PLIBCSysUnlink(kConnectionRecordPath);
+  }
+  return false;
+}
+
 // Records the connection for other programs; it is recorded once there is a file for it, since a connection that is up
 // is worth more than its record.
 BOOL RecordConnection(const WIRELESS_NETWORK* pNetwork) {
   if (pNetwork == nullptr) return FALSE;
   (void)PLIBCSysUnlink(kConnectionRecordPath);  // what was recorded holds no longer, whatever comes of this
-  NewFile record(kConnectionRecordPath, NewFile::kForAll, NewFile::kShared);
+  char szNew[sizeof kConnectionRecordPath + sizeof ".XXXXXX"];
+  std::snprintf(szNew, sizeof szNew, "%s.XXXXXX", kConnectionRecordPath);
+  NewFile record = NewFile::Unforeseen(szNew, NewFile::kForAll);
   if (!record) return FALSE;
 
   char szBssid[1024] = {};
   const std::string_view essid = TextIn(pNetwork->szEssid);
   std::fprintf(record.get(), "%.*s\n%d\n%d\n%d\n%s\n", static_cast<int>(essid.size()), essid.data(), pNetwork->protocol,
                pNetwork->auth, pNetwork->encrypt, MEROWirelessBssidStringGet(pNetwork->bssid, szBssid, sizeof szBssid));
-  if (!record.Close()) {
-    LOG("Failed to write file [%s]", kConnectionRecordPath);
-    (void)PLIBCSysUnlink(kConnectionRecordPath);  // nothing is better than a part of it
-  }
-  return TRUE;
+  const bool written = record.Close();
+  if (!written) LOG("Failed to write file [%s]", kConnectionRecordPath);  // nothing is better than a part of it
+  const bool put = written && PutRecord(szNew);
+  if (!put) (void)::unlink(szNew);
+  return put || !written ? TRUE : FALSE;
 }
 
 // ---- The connection ----

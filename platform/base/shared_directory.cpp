@@ -56,7 +56,9 @@ Result<Descriptor> OpenOurs(const char* szPath, int flags) {
 
 bool IsForeign(const char* szPath) {
   struct stat info;
-  return IsShared(szPath) && ::lstat(szPath, &info) == 0 && !IsOurs(info);
+  if (!IsShared(szPath)) return false;
+  if (::lstat(szPath, &info) == 0) return !IsOurs(info);
+  return errno != ENOENT && errno != ENOTDIR;  // what root may not look at, others have mounted there
 }
 
 Status RemoveOrMoveAside(const char* szPath) {

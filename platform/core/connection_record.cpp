@@ -5,9 +5,11 @@
 #include <string_view>
 
 #include "common/connection_files.h"
+#include "common/log.h"
 #include "common/text.h"
 #include "platform/base/file_read.h"
 #include "platform/base/number.h"
+#include "platform/base/shared_directory.h"
 
 namespace {
 
@@ -31,7 +33,8 @@ int NumberUpTo(int greatest, std::string_view text) {
 
 Result<ConnectionRecord> RecordOfConnectionTo(const Bssid& accessPoint) {
   Result<Bytes> file = ReadFile(kConnectionRecordPath);
-  if (file.error() == ENOENT) return ConnectionRecord{};
+  if (file.error() == kForeign) LOG("%s is not believed: somebody else has put it there", kConnectionRecordPath);
+  if (file.error() == ENOENT || file.error() == kForeign) return ConnectionRecord{};
   if (!file.ok()) return file.status();
 
   std::string_view text = file->view();

@@ -6,6 +6,7 @@
 #include "platform/base/dhcp_client.h"
 #include "platform/base/error.h"
 #include "platform/base/interface.h"
+#include "platform/base/shared_directory.h"
 #include "platform/core/radio.h"
 
 namespace {
@@ -36,7 +37,8 @@ Status LeaveNetwork(const char* szIfName) {
 }
 
 Status ForgetRecord(const char* /*szIfName*/) {
-  return ::unlink(kConnectionRecordPath) < 0 && errno != ENOENT ? Status::Failed(errno) : Status::Ok();
+  const Status status = RemoveOrMoveAside(kConnectionRecordPath);
+  return status.error() == ENOENT ? Status::Ok() : status;
 }
 
 struct Step {

@@ -1,10 +1,10 @@
 // Files as such: there or not, made, removed.
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdio>
 
-#include "common/umask.h"
 #include "platform/base/descriptor.h"
 #include "platform/base/error.h"
 #include "platform/base/shared_directory.h"
@@ -17,11 +17,13 @@ Status Create(const char* szPath) {
   if (IsForeign(szPath)) {
     if (Status status = RemoveOrMoveAside(szPath); !status.ok()) return status;
   }
-  const Umask umask(kNoUmask);
-  const int exclusively = IsShared(szPath) ? O_EXCL : 0;
-  Descriptor file(::open(szPath, O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK | exclusively, 0600));
-  if (file.valid()) return file.Close();
-  return errno == EEXIST && !IsForeign(szPath) ? Status::Ok() : Status::Failed(errno);
+  constexpr int kFlags = O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK;
+  Descriptor file(::open(szPath, kFlags | O_EXCL, 0600));
+  if (file.valid()) return Status::Of(::fchmod(file.get(), 0600));  // whatever the umask
+  if (errno != EEXIST) return Status::Failed(errno);
+  if (IsShared(szPath)) return IsForeign(szPath) ? Status::Failed(kForeign) : Status::Ok();
+  const Descriptor target(::open(szPath, kFlags, 0600));  // of a link that leads to nothing
+  return target.valid() ? Status::Ok() : Status::Failed(errno);
 }
 
 }  // namespace

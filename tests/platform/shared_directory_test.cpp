@@ -120,6 +120,16 @@ TEST_F(AFileThatAnyoneMayReplace, IsChangedWhateverIsInTheWayOfItsNewContentAndO
   }
 }
 
+// A directory in the record's place kept a connection from being left, for ever.
+TEST_F(AFileThatAnyoneMayReplace, DoesNotKeepAConnectionFromBeingLeft) {
+  static constexpr char kRecord[] = "/var/tmp/.wireless_current_connection";
+  ASSERT_EQ(::chmod("/var/tmp", 01777), 0);
+  ForEachObstacle(kRecord, [] {
+    EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
+    EXPECT_FALSE(fs::exists(fs::symlink_status(kRecord)));
+  });
+}
+
 // A second name of a file of ours, which the kernel lets others give where it is told not to mind.
 TEST_F(AFileThatAnyoneMayReplace, IsSomebodyElsesWhenItIsASecondNameOfAFileOfOurs) {
   ASSERT_EQ(::link(kVictim, kFile), 0);

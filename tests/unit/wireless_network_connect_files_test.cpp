@@ -93,8 +93,9 @@ TEST_F(ConnectionRecord, IsGoneWhenTheNewOneCannotBeWrittenAndTheSupplicantStays
   EXPECT_FALSE(Exists(kMarker));
 }
 
-// Whoever is quick enough to put a link there has it written to what it points to.
-TEST_F(ConnectionRecord, IsNotWrittenToWhatIsThereAlready) {
+// Whoever is quick enough to put a link there had it written to what it points to, and any file of theirs failed a
+// connection that was up.
+TEST_F(ConnectionRecord, TakesThePlaceOfWhatIsPutThereMeanwhile) {
   WriteText("/var/tmp/elsewhere", "theirs");
   for (const auto& occupy : std::vector<std::function<void()>>{
            [] { std::filesystem::create_symlink("/var/tmp/elsewhere", kRecord); },
@@ -104,8 +105,10 @@ TEST_F(ConnectionRecord, IsNotWrittenToWhatIsThereAlready) {
        }) {
     Begin();
     OccupyWhenRemoved(occupy);
-    EXPECT_EQ(Join(), -1);
-    EXPECT_THAT(WithoutLines(fake::Messages()), testing::ElementsAreArray(kCannotRecord));
+    EXPECT_EQ(Join(), 0);
+    EXPECT_THAT(fake::Messages(), IsEmpty());
+    EXPECT_TRUE(std::filesystem::is_regular_file(std::filesystem::symlink_status(kRecord)));
+    EXPECT_EQ(ReadText(kRecord), "Home Net\n7\n5\n8\n00:11:22:AA:BB:CC\n");
     EXPECT_EQ(ReadText("/var/tmp/elsewhere"), "theirs");
     EXPECT_FALSE(Exists("/var/tmp/missing"));
   }
