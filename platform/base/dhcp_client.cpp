@@ -15,6 +15,6 @@ Status EndDhcpClient(const char* szIfName) {
   if (!status.ok()) return status;
   const char* const argv[] = {kLeaseScript, "left", szIfName, nullptr};
   Result<int> exitStatus = RunProgram(argv, Standard::kNull);
-  if (exitStatus.ok() && *exitStatus != 0) return Status::Failed(ENOEXEC);  // it has told why
+  // What it cannot give back it has told, and that keeps nobody from the next network.
   return exitStatus.error() == ENOENT ? Status::Ok() : exitStatus.status();
 }

@@ -272,8 +272,12 @@ TEST_F(ALease, ReplacesTheTargetOfALinkInItsOwnDirectory) {
 
 TEST_F(ALease, LeavesAFileAloneThatItHasNothingToSayIn) {
   fs::create_symlink("/tmp/platform/none/conf", kResolver);
-  EXPECT_EQ(Bound(), 1);
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 1);
   ExpectLogged("cannot find where /etc/resolv.conf leads\n");
+  // A link that leads nowhere kept interfaces from other addresses, although nothing had been leased.
+  EXPECT_EQ(Bound(), 0);
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_TRUE(fs::is_symlink(kResolver));
   fs::remove(kResolver);
   EXPECT_EQ(Run({"left", "net0"}), 0);
   EXPECT_FALSE(fs::exists(kResolver));
@@ -346,8 +350,12 @@ TEST_F(ALease, PassesOverWhatIsNoHostsAddress) {
 }
 
 TEST_F(ALease, SaysWhatTheKernelDoesNotTake) {
-  EXPECT_EQ(Run({"bound"}, {"interface=net0", "ip=10.1.0.7", "subnet=255.0.255.0"}), 1);
-  ExpectLogged("cannot give net0 the address 10.1.0.7/255.0.255.0: ");
+  // A mask of one bit would have taken the routes of half of all addresses.
+  for (const char* szMask :
+       {"255.0.255.0", "128.0.0.0", "254.0.0.0", "255.255.255.1", "255.255.256.0", "255.255.255"}) {
+    EXPECT_EQ(Run({"bound"}, {"interface=net0", "ip=10.1.0.7", std::string("subnet=") + szMask}), 1) << szMask;
+    ExpectLogged("the lease of net0 has a netmask that is none\n");
+  }
   EXPECT_EQ(Bound({"router=10.1.0.255"}), 1);
   ExpectLogged("cannot route through 10.1.0.255 on net0: ");
   EXPECT_EQ(Run({"something"}, {"interface=net0"}), 1);
@@ -530,10 +538,15 @@ TEST_F(ALeasingClient, IsEndedWithoutTheScriptThatWouldApplyALease) {
   EXPECT_EQ(Client(), "");
 }
 
-TEST_F(ALeasingClient, IsReportedWhenTheLeaseCannotBeGivenBack) {
+// A name server that could not be taken out kept an interface from getting a static address.
+TEST_F(ALeasingClient, KeepsNobodyFromAnotherAddressByWhatCannotBeGivenBack) {
   WriteFile(kScript, "#!/bin/sh\nexit 1\n", 0755);
-  EXPECT_EQ(MEROWirelessNetworkDisconnect(), -1);
-  ExpectFailure(ERR_COMMAND_FAILED, "Failed to end the DHCP client of wlan0: Exec format error");
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
+  NETINFO netInfo = Asker();
+  netInfo.blManual = TRUE;
+  CopyText(netInfo.szIp, "10.9.0.2");
+  CopyText(netInfo.szMask, "255.255.255.0");
+  EXPECT_EQ(MERONetSetCard1(&netInfo, 0), 0);
 }
 
 }  // namespace
