@@ -41,6 +41,26 @@ constexpr struct {
   ifaddrmsg about;
 } kListAll = {{sizeof kListAll, RTM_GETADDR, NLM_F_REQUEST | NLM_F_DUMP, 0, 0}, {AF_INET, 0, 0, 0, 0}};
 
+// Walks the messages that stand one behind another.
+class Messages {
+ public:
+  Messages(char* at, size_t left) : at_(at), left_(left) {}
+
+  // The next one; null behind the last, and where the rest is no whole one.
+  nlmsghdr* Next() {
+    auto* message = reinterpret_cast<nlmsghdr*>(at_);
+    if (left_ < sizeof *message || message->nlmsg_len < sizeof *message || message->nlmsg_len > left_) return nullptr;
+    const size_t size = std::min<size_t>(NLMSG_ALIGN(message->nlmsg_len), left_);
+    at_ += size;
+    left_ -= size;
+    return message;
+  }
+
+ private:
+  char* at_;
+  size_t left_;
+};
+
 // The IPv4 addresses of one interface, as the kernel's routing socket tells of them, and is told.
 class Addresses {
  public:
@@ -52,10 +72,10 @@ class Addresses {
     if (::send(kernel_.get(), &kListAll, sizeof kListAll, 0) < 0) return Status::Failed(errno);
     while (true) {
       alignas(nlmsghdr) char part[8192];  // the kernel gives no more at a time
-      auto left = static_cast<int>(::recv(kernel_.get(), part, sizeof part, 0));
-      if (left < 0) return Status::Failed(errno);
-      for (auto* message = reinterpret_cast<nlmsghdr*>(part); NLMSG_OK(message, left);
-           message = NLMSG_NEXT(message, left)) {
+      const ssize_t size = ::recv(kernel_.get(), part, sizeof part, 0);
+      if (size < 0) return Status::Failed(errno);
+      Messages messages(part, static_cast<size_t>(size));
+      while (nlmsghdr* message = messages.Next()) {
         const void* content = NLMSG_DATA(message);
         // Both the end and a failure begin with an errno.
         if (message->nlmsg_type != RTM_NEWADDR) return Status::Failed(-*static_cast<const int*>(content));
@@ -70,13 +90,11 @@ class Addresses {
   // Calls `visit(message)` for each that was found, up to the first time that it fails.
   template <class Visit>
   Status ForEach(Visit visit) {
-    auto left = static_cast<int>(found_.view().size());
-    Status status = Status::Ok();
-    for (auto* message = reinterpret_cast<nlmsghdr*>(found_.data()); status.ok() && NLMSG_OK(message, left);
-         message = NLMSG_NEXT(message, left)) {
-      status = visit(*message);
+    Messages messages(found_.data(), found_.view().size());
+    while (nlmsghdr* message = messages.Next()) {
+      if (Status status = visit(*message); !status.ok()) return status;
     }
-    return status;
+    return Status::Ok();
   }
 
   // Has the address of a message added.

@@ -114,7 +114,8 @@ bool IsOrdinary(char c) {
 }
 
 bool IsTagWord(std::string_view word) {
-  return word.starts_with("set:") || word.starts_with("tag:");
+  const std::string_view beginning = Slice(word, 0, 4);
+  return beginning == "set:" || beginning == "tag:";
 }
 
 // The seconds of a lease time, as the server reads it; none when it is anything else.
