@@ -50,9 +50,11 @@ bool ComputeRange(const NETINFO& netInfo, MERO_DHCPD_CONF& conf) {
   }
   const uint32_t address = ntohl(ip.s_addr);
   const uint32_t bits = ntohl(mask.s_addr);
-  CopyText(conf.szRangeStart, MERONetNtoa({htonl(address + 1)}));
-  CopyText(conf.szRangeEnd, MERONetNtoa({htonl((address & bits) + ~bits - 1)}));
-  if (IsInSubnet(netInfo, conf.szRangeStart) && IsInSubnet(netInfo, conf.szRangeEnd)) return true;
+  const auto put = [&netInfo](char(&szEnd)[20], uint32_t end) {
+    CopyText(szEnd, MERONetNtoa({htonl(end)}));
+    return IsInSubnet(netInfo, szEnd);
+  };
+  if (put(conf.szRangeStart, address + 1) && put(conf.szRangeEnd, (address & bits) + ~bits - 1)) return true;
   return LOG("Failed to get the valid range of dhcp server[%s].", netInfo.szInterface), false;
 }
 

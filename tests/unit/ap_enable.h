@@ -77,13 +77,15 @@ inline Effects AsksForServer(const std::string& bridge) {
 inline Effects ChecksAddress(const std::string& address, const std::string& ip, const std::string& mask) {
   return {"MERONetIsSameSubnet(" + address + ", " + ip + ", " + mask + ")"};
 }
-inline const Effects kComputesRange = {"MERONetNtoa({})", "MERONetNtoa({})"};
+// An end of a new range: made a text, and only then, and before the other end, checked.
+inline Effects MakesEnd(const std::string& address, const std::string& ip, const std::string& mask) {
+  return Effects{"MERONetNtoa({})"} + ChecksAddress(address, ip, mask);
+}
 inline const Effects kWritesServer = {"MERONetSetDhcpServerConfigFiles(&, 1)"};
 
 // What a new bridge "lbr0" brings.
-inline const Effects kMakesServer = AsksForServer("lbr0") + kComputesRange +
-                                    ChecksAddress("10.1.14.2", "10.1.14.1", "255.255.255.0") +
-                                    ChecksAddress("10.1.14.254", "10.1.14.1", "255.255.255.0") + kWritesServer;
+inline const Effects kMakesServer = AsksForServer("lbr0") + MakesEnd("10.1.14.2", "10.1.14.1", "255.255.255.0") +
+                                    MakesEnd("10.1.14.254", "10.1.14.1", "255.255.255.0") + kWritesServer;
 inline const Effects kMakesNatBridge = AsksForBridge("lbr0") + kMakesBridge + kMakesServer;
 
 inline Effects WritesScript(const std::string& bridge) {

@@ -248,8 +248,8 @@ TEST_F(BridgeOfAnAccessPoint, GivesOutTheAddressesBehindItsOwn) {
   };
   for (const auto& row : rows) {
     BeginWith(row.szIp, row.szMask);
-    ExpectEnabledBy(kChecksKnown + kComputesRange + ChecksAddress(row.szStart, row.szIp, row.szMask) +
-                        ChecksAddress(row.szEnd, row.szIp, row.szMask) + kWritesServer,
+    ExpectEnabledBy(kChecksKnown + MakesEnd(row.szStart, row.szIp, row.szMask) +
+                        MakesEnd(row.szEnd, row.szIp, row.szMask) + kWritesServer,
                     "lbr0");
     ASSERT_TRUE(written_.has_value()) << row.szIp << " " << row.szMask;
     EXPECT_STREQ(written_->szRangeStart, row.szStart);
@@ -275,7 +275,7 @@ TEST_F(BridgeOfAnAccessPoint, IsGivenUpWhenThereIsNoAddressBehindItsOwn) {
   };
   for (const auto& row : rows) {
     BeginWith(row.szIp, row.szMask);
-    ExpectGivenUpAfter(kChecksKnown + kComputesRange + ChecksAddress(row.szStart, row.szIp, row.szMask) +
+    ExpectGivenUpAfter(kChecksKnown + MakesEnd(row.szStart, row.szIp, row.szMask) +
                        Effects{EnableReport("Failed to get the valid range of dhcp server[lbr0].")} + kNoBridge);
     EXPECT_FALSE(written_.has_value()) << row.szIp;
   }
@@ -284,8 +284,8 @@ TEST_F(BridgeOfAnAccessPoint, IsGivenUpWhenThereIsNoAddressBehindItsOwn) {
 TEST_F(BridgeOfAnAccessPoint, IsGivenUpWhenTheLastAddressIsNone) {
   BeginWith("10.1.14.1", "255.255.255.0");
   fake::MERONetIsSameSubnet.Returns(1, 0);
-  ExpectGivenUpAfter(kChecksKnown + kComputesRange + ChecksAddress("10.1.14.2", "10.1.14.1", "255.255.255.0") +
-                     ChecksAddress("10.1.14.254", "10.1.14.1", "255.255.255.0") +
+  ExpectGivenUpAfter(kChecksKnown + MakesEnd("10.1.14.2", "10.1.14.1", "255.255.255.0") +
+                     MakesEnd("10.1.14.254", "10.1.14.1", "255.255.255.0") +
                      Effects{EnableReport("Failed to get the valid range of dhcp server[lbr0].")} + kNoBridge);
 }
 
