@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <cstring>
 
+#include "common/guest_network.h"
 #include "common/log.h"
 #include "holders.h"
 #include "paths.h"
@@ -17,8 +18,6 @@ constexpr char kDirectory[] = "/etc/hostapd";
 constexpr char kPskPath[] = "/etc/hostapd.psk";
 constexpr char kControlDirectory[] = "/var/run/hostapd";
 constexpr char kModelPath[] = "/etc.defaults/meroinfo.conf";
-constexpr char kGuestInterface[] = "gwlan";
-constexpr char kGuestBridge[] = "gbr";
 
 // A configuration that is written line by line. A value that would end its line and begin one of its own is refused:
 // names and secrets may come from anybody.

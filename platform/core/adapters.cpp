@@ -3,7 +3,9 @@
 #include <unistd.h>
 
 #include <cstdio>
+#include <cstring>
 
+#include "common/guest_network.h"
 #include "common/text.h"
 #include "platform/base/directory.h"
 #include "platform/base/error.h"
@@ -19,8 +21,10 @@ bool HasEntry(const char* szIfName, const char* szEntry) {
   return ::access(szPath, F_OK) == 0;
 }
 
+// The guests' interface is none: it is a second one on an adapter's radio.
 bool IsAdapter(const char* szIfName) {
-  return szIfName[0] != '.' && (HasEntry(szIfName, "phy80211") || HasEntry(szIfName, "wireless"));
+  if (szIfName[0] == '.' || std::strcmp(szIfName, kGuestInterface) == 0) return false;
+  return HasEntry(szIfName, "phy80211") || HasEntry(szIfName, "wireless");
 }
 
 // Calls `visit(name)` for each adapter, in no order.

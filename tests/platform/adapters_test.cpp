@@ -38,6 +38,13 @@ TEST_F(Adapters, GiveTheFirstByNameAsPeopleCount) {
   }
 }
 
+// While guests were on the air, their interface was taken for the client's.
+TEST_F(Adapters, AreNotTheGuestsInterface) {
+  const ShownInterfaces shown({{"gwlan", "phy80211"}, {"wlan0", "phy80211"}});
+  EXPECT_EQ(MEROWirelessAdapterNum(), 1);
+  EXPECT_STREQ(MEROWirelessInterfaceGet(), "wlan0");
+}
+
 TEST_F(Adapters, AreLookedForAtEachCall) {
   {
     const ShownInterfaces shown({{"lo", ""}, {"wlan5", "phy80211"}});
