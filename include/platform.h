@@ -18,10 +18,10 @@
  *     caller's umask has no say in the mode of what is created.
  *  5. Operations block for the disk, for another writer's lock (20 s at most, a failure then) and for commands that
  *     they run, and for the network only where it says so.
- *  6. In a directory that anyone may write, such as /tmp, no link is followed, and what somebody else has put there is
- *     neither read (ERR_PERMISSION) nor written to, and is taken for missing: a file is root's or the caller's own, a
- *     plain one, with one name. Operations that make or remove a file remove what is in its place; a directory they
- *     move aside, to NAME.foreign-NUMBER.
+ *  6. In a directory that anyone may write, such as /tmp, no link is followed, and a file is root's or the caller's
+ *     own, a plain one, with one name. What somebody else has put there does not exist (PLIBCFileExist), and is neither
+ *     read nor changed (ERR_PERMISSION). PLIBCFileTouch and PLIBCSysUnlink remove it; a directory they move aside, to
+ *     NAME.foreign-NUMBER.
  *  7. Not thread-safe. Descriptors are close-on-exec.
  *
  * The header is usable from C99 and from C++11 on.
@@ -141,8 +141,8 @@ int PLIBCSzListRemove(PPLIBSZLIST pslList, int index);
 
 /* ---- Files ---------------------------------------------------------------------------------------------------- */
 
-/** @return 1 when the path names something that exists (a dangling link does not), or that cannot be looked at; else
- *          0. */
+/** @return 1 when the path names something that exists (a dangling link does not, nor what 6 above speaks of), or that
+ *          cannot be looked at; else 0. */
 int PLIBCFileExist(const char* szPath);
 
 /**

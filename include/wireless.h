@@ -350,8 +350,7 @@ typedef struct _tag_MERO_AP_INFO {
  * (keys that other programs added stay); any other address, also of a network of the same name, adds a network.
  * Not saved are szUser, noneBssid, and the channel, signal and protocol of the network; `atime` is not looked at.
  *
- * @param pNetCfg  the network; borrowed. No text in it may hold a line feed or end with a carriage return: the file
- *                 could not give it back.
+ * @param pNetCfg  the network; borrowed. No text in it may hold a line feed: the file could not give it back.
  * @return 0; -1 when pNetCfg is null, memory ran out, or the file could not be read or written whole.
  *
  * Reads and replaces /usr/mero/etc/wireless.conf (created with mode 0600), all or nothing also when the power fails.
@@ -537,8 +536,8 @@ BOOL MEROWirelessApConfigSecNameGet(char* szSecName, size_t cbSize);
  * Saves the access-point settings. With `blEnable` FALSE only the switch itself is saved, and all else stays; a section
  * that is new then holds nothing else.
  *
- * @param pConf  the settings; `szSecName` names the section. No text may hold a line feed or end with a carriage
- *               return, nor may the name begin or end with white space: the file could not carry it.
+ * @param pConf  the settings; `szSecName` names the section. No text may hold a line feed, nor may the name begin or
+ *               end with white space: the file could not carry it.
  * @return TRUE; FALSE when pConf is null, a text cannot be saved, an encryption is none of MERO_AP_ENCRYPT or none for
  *         a guest network, memory ran out, or the file could not be written.
  *
