@@ -26,26 +26,32 @@ note_adapter() { # INTERFACE
 
 # A USB adapter has a name, mostly; others are known by their numbers, or by what drives them.
 section_of() { # INTERFACE
-	device=$(readlink -f "/sys/class/net/$1/device")
+	device=$(readlink -f "/sys/class/net/$1/device") || fail "cannot tell which adapter $1 is"
 	for file in "$device/../product" "$device/product"; do
 		if [ -s "$file" ] && ask section-name <"$file"; then
 			printf '%s' "$answer"
 			return
 		fi
 	done
+	numbers=$(numbers_of "$device") || exit 1
 	ask section-name <<-END || fail "the adapter $1 has neither a name nor numbers"
-		$(numbers_of "$device")
+		$numbers
 	END
 	printf '%s' "$answer"
 }
 
 numbers_of() { # DEVICE
+	vendor='' model=''
 	if [ -s "$1/../idVendor" ]; then
-		printf '%s:%s\n' "$(cat "$1/../idVendor")" "$(cat "$1/../idProduct")"
+		read -r vendor <"$1/../idVendor" && read -r model <"$1/../idProduct"
 	elif [ -s "$1/vendor" ]; then
-		printf '%s:%s\n' "$(sed s/^0x// "$1/vendor")" "$(sed s/^0x// "$1/device")"
-	else
-		basename "$(readlink -f "$1/driver")"
+		read -r vendor <"$1/vendor" && read -r model <"$1/device"
+	fi
+	if [ -n "$model" ]; then
+		printf '%s:%s' "${vendor#0x}" "${model#0x}"
+	elif [ -e "$1/driver" ]; then
+		driver=$(readlink -f "$1/driver") || fail "cannot tell what drives $1"
+		printf '%s' "${driver##*/}"
 	fi
 }
 

@@ -46,10 +46,16 @@ make_bridge() {
 
 # make_bridge_of_boot NAME: makes the bridge of that network-script file, if it is one that comes up at boot.
 make_bridge_of_boot() { # NAME
-	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1"; then
+	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1" && ! waits_for_access_point "$1"; then
 		await_first_member "$1"
 		make_bridge "$1"
 	fi
+}
+
+# waits_for_access_point BRIDGE: whether it is there for an access point alone that has been switched off.
+waits_for_access_point() {
+	member=$(script_value PRIMARY "$1") || exit 1
+	[ -n "$member" ] && [ -e "/etc/hostapd/hostapd-$member.info" ] && ! is_enabled "/etc/hostapd/hostapd-$member.info"
 }
 
 # is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and no copy that somebody keeps beside it. The
@@ -109,7 +115,7 @@ set_address() {
 # The client goes on in the background when no server has answered yet.
 lease_address() { # INTERFACE
 	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || return 0
-	attempt "lease an address for $1" busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 -T 2 \
+	attempt "lease an address for $1" timeout -s KILL 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 -T 2 \
 		-s /usr/mero/sbin/udhcpc.lease
 }
 
@@ -135,6 +141,11 @@ note_bridge() { # INTERFACE BRIDGE
 	put "$(bridge_note "$1")" <<-END
 		$2
 	END
+}
+
+# was_started INTERFACE: whether an access point was started there, and not ended.
+was_started() {
+	[ -s "$(bridge_note "$1")" ]
 }
 
 forget_bridge() { # INTERFACE

@@ -5,7 +5,7 @@
 end_client() {
 	end_daemon wpa_supplicant /var/run/wpa_supplicant.pid
 	end_lease "$1"
-	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
+	remove_addresses "$1"
 }
 
 # An interface that is a client's is as it is when it has just been plugged in: without addresses, down, and of the

@@ -1,13 +1,27 @@
 # Daemons, by their pid files: the processes that a machine lists may not include them.
 # shellcheck shell=sh
 
-# daemon_of NAME PIDFILE: the process of a pid file, if it is still one of that name.
+# daemon_of NAME PIDFILE: the process of a pid file, if it is still one of that name, and has not ended.
 daemon_of() {
 	pid=''
 	[ -s "$2" ] && read -r pid <"$2"
 	case $pid in '' | *[!0-9]*) return 1 ;; esac
-	read -r name 2>/dev/null <"/proc/$pid/comm" || return 1
-	[ "$name" = "$1" ] && printf '%s' "$pid"
+	is_daemon "$1" "$pid" && printf '%s' "$pid"
+}
+
+is_daemon() { # NAME PID
+	name='' condition=''
+	[ ! -r "/proc/$2/status" ] || while read -r key value _; do
+		case $key in
+		Name:) name=$value ;;
+		State:) condition=$value && break ;;
+		esac
+	done 2>/dev/null <"/proc/$2/status"
+	case $name,$condition in
+	*,[ZX]) return 1 ;; # nobody has waited for it
+	"$1",*) ;;
+	*) return 1 ;;
+	esac
 }
 
 # announce_daemon PIDFILE: an empty pid file stands for a daemon that is being started, and has not written it yet.

@@ -12,8 +12,16 @@ set_firewall() { # BRIDGE
 		return
 	fi
 	text=$(rules "$1") || exit 1
-	[ -e "$forwarding_before" ] || put "$forwarding_before" <"$forwarding"
-	set_rules "$text" || fail "cannot set the rules between networks: $said"
+	first=''
+	if [ ! -e "$forwarding_before" ]; then
+		first=yes
+		put "$forwarding_before" <"$forwarding"
+	fi
+	set_rules "$text" || {
+		reason=$said
+		[ -z "$first" ] || rm -f "$forwarding_before" # none stand
+		fail "cannot set the rules between networks: $reason"
+	}
 	echo 1 >"$forwarding" || fail 'cannot pass traffic on between networks'
 }
 
@@ -79,8 +87,9 @@ guest_rules() {
 			type filter hook input priority filter; policy accept;
 			iifname != \"$guest_bridge\" accept
 			ct state established,related accept
-			udp dport { 53, 67 } accept
-			tcp dport 53 accept
+			udp dport 67 accept
+			ip daddr $guest_address udp dport 53 accept
+			ip daddr $guest_address tcp dport 53 accept
 			icmp type echo-request ip daddr $guest_address accept"
 	if is_on guest_net_access_ds; then echo 'meta nfproto ipv4 accept'; fi
 	if is_on guest_net_allow_http; then echo 'meta nfproto ipv4 tcp dport { 80, 443 } accept'; fi
@@ -99,7 +108,7 @@ guest_rules() {
 # Private networks, and whatever the appliance is on itself.
 local_networks() {
 	networks=$(ip -4 route show proto kernel scope link) || fail 'cannot tell the networks around the appliance'
-	printf 10.0.0.0/8,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16
+	printf 10.0.0.0/8,100.64.0.0/10,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16
 	while read -r network _; do
 		[ -z "$network" ] || printf ',%s' "$network"
 	done <<-END

@@ -11,16 +11,41 @@ start_hostapd() { # INTERFACE
 
 	put "$log" </dev/null
 	announce_daemon "$(hostapd_pid "$1")"
-	said=$(hostapd -B -t -f "$log" -P "$(hostapd_pid "$1")" "$configuration" 2>&1) || {
+	said=$(run_hostapd "$1" 2>&1) || {
 		rm -f "$(hostapd_pid "$1")"
 		fail "cannot start the access point on $1: $(reason_in "$log" "$said")"
 	}
 	await_pid "$(hostapd_pid "$1")"
 	await_access_point "$1" "$log"
+	daemon_of hostapd "$(hostapd_pid "$1")" >/dev/null || fail "the access point on $1 has not noted its process"
 }
+
+# Strangers fill the log, a line for each frame: it ends at 1 MiB.
+run_hostapd() ( # INTERFACE
+	trap '' XFSZ
+	ulimit -f 2048
+	hostapd -B -t -f "$log" -P "$(hostapd_pid "$1")" "$configuration"
+)
 
 end_hostapd() { # INTERFACE
 	end_daemon hostapd "$(hostapd_pid "$1")"
+	end_stray_hostapd "$1"
+}
+
+# end_stray_hostapd INTERFACE: one whose pid file does not tell it, as when the disk was full.
+end_stray_hostapd() {
+	for process in /proc/[0-9]*; do
+		if is_daemon hostapd "${process#/proc/}" && is_ours "$process" &&
+			grep -qF "$state/hostapd-$1.conf" "$process/cmdline" 2>/dev/null; then
+			printf '%s\n' "${process#/proc/}" | put "$(hostapd_pid "$1")"
+			end_daemon hostapd "$(hostapd_pid "$1")"
+		fi
+	done
+}
+
+# is_ours PROCESS: whether it has this machine's files, and not those of a container.
+is_ours() {
+	[ "$(stat -Lc %d:%i "$1/root" 2>/dev/null)" = "$(stat -Lc %d:%i /)" ]
 }
 
 # forget_configuration INTERFACE: it holds secrets, and so does a half that was being written.
@@ -44,9 +69,23 @@ write_configuration() { # INTERFACE FILE
 		second=$(guest_configuration "$1") || exit 1
 		networks=$networks$newline$second
 	fi
+	expect_protection "$networks"
 	put "$2" <<-END
 		$networks
 	END
+}
+
+# expect_protection TEXT: a network that is to be protected, and would be open for want of a key or of a version, is not
+# put on the air.
+expect_protection() {
+	printf '%s\n' "$1" | awk '
+		function judge() { if ((wep && !key) || (secret && !wpa)) open = 1; wep = key = secret = wpa = 0 }
+		/^bss=/ { judge() }
+		/^wep_default_key=/ { wep = 1 }
+		/^wep_key0=/ { key = 1 }
+		/^wpa_passphrase=|^wpa_key_mgmt=/ { secret = 1 }
+		/^wpa=[1-3]$/ { wpa = 1 }
+		END { judge(); exit open }' || fail 'a network would be open that is to be protected: its key or its version of WPA is none'
 }
 
 band_of() { # CONFIGURATION

@@ -20,7 +20,8 @@ class KitRadio : public Kit {
     StandIn("ip", "exec /usr/sbin/ip \"$@\"\n");
     Install("cat", "case ${1-} in */phy80211/name) echo phy0 ;; *) exec /bin/cat \"$@\" ;; esac\n");
     RunInShell("ip link add wlan0 type veth peer name air; ip link add eth0 type veth peer name wire");
-    Write("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nwpa_passphrase=deux croissants\n");
+    Write("/etc/hostapd/hostapd-wlan0-host.conf",
+          "interface=wlan0\nssid=home\nwpa=2\nwpa_passphrase=deux croissants\n");
     Write("/etc/sysconfig/network-scripts/ifcfg-wlan0", "DEVICE=wlan0\nBRIDGE=lbr0\n");
     SetBridge("NAT=yes");
     Write("/etc/dhcpd/dhcpd-lbr0-lbr0.info", "enable=\"yes\"\n");

@@ -235,4 +235,74 @@ TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
   }
 }
 
+// hostapd serves a network without a key that it can use as an open one, and joins strangers to the bridge.
+TEST_F(KitAccessPoint, IsNotOnTheAirOpenWhenItIsToBeProtected) {
+  const std::string host = "/etc/hostapd/hostapd-wlan0-host.conf";
+  const std::string guest = "/etc/hostapd/hostapd-wlan0-guest.conf";
+  Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  const std::string open = "interface=wlan0\nssid=home\nauth_algs=1\n";
+  const std::string openGuests = "bss=gwlan\nssid=visitors\n";
+  for (const char* szLacking : {"auth_algs=3\nwep_default_key=0\n", "wpa=0\nwpa_key_mgmt=WPA-PSK\nwpa_passphrase=x\n",
+                                "wpa=4\nwpa_passphrase=x\n", "wpa=0\nwpa_key_mgmt=WPA-EAP\n"}) {
+    for (const bool ofGuests : {false, true}) {
+      Write(host, ofGuests ? open : "interface=wlan0\nssid=home\n" + std::string(szLacking));
+      Write(guest, openGuests + (ofGuests ? szLacking : ""));
+      const Ran ran = Script("start wlan0 lbr0");
+      EXPECT_EQ(ran.status, 1) << szLacking;
+      EXPECT_THAT(ran.output, HasSubstr("a network would be open that is to be protected")) << szLacking;
+      EXPECT_EQ(Left(), "") << szLacking;
+    }
+  }
+  for (const char* szGood :
+       {"", "wep_default_key=0\nwep_key0=\"abcde\"\n", "wpa=3\nwpa_passphrase=deux croissants\n"}) {
+    Write(host, open + szGood);
+    Write(guest, openGuests + szGood);
+    EXPECT_EQ(Script("start wlan0 lbr0").status, 0) << szGood;
+  }
+}
+
+// A full disk left the daemon's pid file empty: the end of the access point took its rules away, and left it on the
+// air.
+TEST_F(KitAccessPoint, IsEndedAlsoWhenItsPidFileIsEmpty) {
+  StandIn("hostapd",
+          "while [ $# -gt 1 ]; do [ \"$1\" != -P ] || file=$2; shift; done\n"
+          "(exec -a \"hostapd $1\" /tmp/daemons/hostapd 60) >/dev/null 2>&1 &\necho $! | tee /tmp/started >$file\n");
+  RunInShell("sed -i '1s|.*|#!/bin/bash|' /tmp/bin/hostapd");
+  EXPECT_EQ(Script("start wlan0 lbr0").status, 0);
+  Write("/run/rc.network/hostapd-wlan0.pid", "");
+  Script("restart wlan0 lbr0");
+  EXPECT_NE(RunInShell("grep -v Z /proc/$(cat /tmp/started)/stat").status, 0);
+  EXPECT_EQ(Left(), "");
+}
+
+// The bridge of an access point that had been switched off came up at every boot.
+TEST_F(KitAccessPoint, HasNoBridgeAtBootWhileItIsSwitchedOff) {
+  SetBridge("NAT=yes\nPRIMARY=wlan0");
+  Write("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  EXPECT_EQ(Script("boot").status, 0);
+  EXPECT_FALSE(fs::exists("/sys/class/net/lbr0"));
+  Write("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
+  EXPECT_EQ(Script("boot").status, 0);
+  EXPECT_TRUE(fs::exists("/sys/class/net/lbr0"));
+}
+
+// Nobody noticed a daemon that had been killed.
+TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhenItsDaemonHasEnded) {
+  EXPECT_EQ(Script("start wlan0 lbr0").status, 0);
+  RunInShell("kill -KILL $(cat /run/rc.network/hostapd-wlan0.pid); sleep 0.1");
+  EXPECT_EQ(Script("schedule wlan0").status, 0);
+  EXPECT_EQ(Daemons(), OnAir());
+  EXPECT_EQ(Script("restart wlan0 lbr0").status, 0);
+  EXPECT_EQ(Script("schedule wlan0").status, 0);
+  EXPECT_EQ(Left(), "");
+}
+
+// In another language the state directory was taken for somebody else's, at every run.
+TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
+  const std::string german = "LC_ALL=C.UTF-8 LANGUAGE=de PATH=/tmp/bin:$PATH /etc/rc.network ";
+  EXPECT_EQ(RunInShell(german + "start wlan0 lbr0").output, "");
+  EXPECT_EQ(RunInShell(german + "restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Left(), "");
+}
+
 }  // namespace

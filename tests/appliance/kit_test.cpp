@@ -130,7 +130,7 @@ TEST_F(Kit, GivesGuestsTheRulesThatAreSet) {
   const std::string usual = rules("");
   EXPECT_THAT(usual, HasSubstr("tcp dport { 80, 443 } accept"));
   EXPECT_THAT(usual, ContainsRegex("ip daddr @local-networks reject\n\t*accept\n"));
-  EXPECT_THAT(usual, HasSubstr("10.0.0.0/8,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16,198.51.100.0/24"));
+  EXPECT_THAT(usual, HasSubstr("10.0.0.0/8,100.64.0.0/10,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16,198.51.100.0/24"));
   EXPECT_THAT(usual, Not(HasSubstr("meta nfproto ipv4 accept")));
 
   const std::string other = rules(

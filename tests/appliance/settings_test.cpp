@@ -521,10 +521,18 @@ TEST_F(Settings, OfEveryAdapterAreReadAsTheyWereSaved) {
 
 TEST_F(Settings, OfAnAdapterWithoutANameAndNumbersAreNotMadeUp) {
   Install("readlink", "echo /tmp/none/device\n");
-  Install("basename", "echo\n");
   const Ran ran = RunInParts("note_adapter wlan7");
   EXPECT_EQ(ran.status, 1);
   EXPECT_THAT(ran.output, HasSubstr("the adapter wlan7 has neither a name nor numbers"));
+  EXPECT_THAT(RunInShell("cat /tmp/wireless.info").output, HasSubstr("RT [5370"));
+}
+
+// The adapter's section was made of what a command had not said, and guests got the rules of no settings.
+TEST_F(Settings, OfAnAdapterThatCannotBeLookedAtAreNotMadeUp) {
+  Install("readlink", "exit 1\n");
+  const Ran ran = RunInParts("note_adapter wlan7");
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.output, HasSubstr("cannot tell which adapter wlan7 is"));
   EXPECT_THAT(RunInShell("cat /tmp/wireless.info").output, HasSubstr("RT [5370"));
 }
 

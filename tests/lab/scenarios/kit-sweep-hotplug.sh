@@ -7,5 +7,4 @@ appliance nas
 swept_access_point nas
 sweep nas change-mode-client
 sweep nas change-mode-ap
-sweep nas add
-expect_swept 20
+expect_swept 12
