@@ -35,12 +35,24 @@ make_bridge() {
 	} <<-END
 		$answer
 	END
+	if is_there "$1"; then made=''; else made=yes; fi
 	create_bridge "$1" "$hardware"
-	missing=''
+	missing='' routes=''
 	if [ -n "$primary" ] && ! is_wireless "$primary"; then
-		if is_there "$primary"; then join_bridge "$primary" "$1"; else missing=yes; fi
+		if is_there "$primary"; then
+			routes=$(ip -4 route show default dev "$primary") || fail "cannot tell the routes of $primary"
+			[ -z "$made" ] || [ -z "$starting" ] || note_wire "$primary" "$1"
+			join_bridge "$primary" "$1"
+		else
+			missing=yes
+		fi
 	fi
-	if [ "$static" = yes ]; then set_address "$1" "$address/$mask"; else lease_address "$1"; fi
+	if [ "$static" = yes ]; then
+		set_address "$1" "$address/$mask"
+		move_routes "$1" "$routes"
+	else
+		lease_address "$1"
+	fi
 	[ -z "$missing" ] || fail "there is no interface '$primary' for the bridge $1"
 }
 
@@ -100,6 +112,42 @@ join_bridge() { # INTERFACE BRIDGE
 	attempt "bring $1 into $2" ip link set dev "$1" master "$2"
 	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
 	attempt "bring $1 up" ip link set dev "$1" up
+}
+
+# move_routes BRIDGE TEXT: the way out that its first member had is the bridge's now.
+move_routes() {
+	while read -r line; do
+		[ -n "$line" ] || continue
+		# shellcheck disable=SC2086  # words
+		said=$(ip -4 route add $line dev "$1" 2>&1) || warn "cannot route over $1 as before, '$line': $said"
+	done <<-END
+		$2
+	END
+}
+
+# note_wire INTERFACE BRIDGE: what an interface has by itself that becomes the first member of a new bridge, in case the
+# bridge comes to nothing.
+note_wire() {
+	leased=''
+	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || leased=yes
+	ip -4 address save dev "$1" >"$state/wire-$2.addresses" || fail "cannot note the addresses of $1"
+	ip -4 route save dev "$1" >"$state/wire-$2.routes" || fail "cannot note the routes of $1"
+	printf '%s %s\n' "$1" "$leased" | put "$state/wire-$2"
+}
+
+forget_wire() { # BRIDGE
+	attempt "remove $state/wire-$1" rm -f "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes"
+}
+
+# give_wire_back BRIDGE: the first member is by itself again, as it was, and the bridge is gone.
+give_wire_back() {
+	read -r wire leased <"$state/wire-$1" || fail "cannot read $state/wire-$1"
+	end_dnsmasq "$1"
+	remove_bridge "$1"
+	said=$(ip address restore <"$state/wire-$1.addresses" 2>&1) || fail "cannot give $wire its addresses back: $said"
+	said=$(ip route restore <"$state/wire-$1.routes" 2>&1) || fail "cannot give $wire its routes back: $said"
+	[ -z "$leased" ] || lease_address "$wire"
+	forget_wire "$1"
 }
 
 # set_address INTERFACE ADDRESS/MASK: the only one. What has it already keeps the routes that go with it.
@@ -168,9 +216,15 @@ leave_bridge() { # INTERFACE BRIDGE
 	attempt "take $1 out of $2" ip link set dev "$1" nomaster
 }
 
-# give_up_bridge BRIDGE: it stays where it comes up at boot, for its other members, whom it may serve.
+# Whether an access point is being started, and whether what its start has made comes to nothing.
+starting='' undoing=''
+
+# give_up_bridge BRIDGE: it stays where it comes up at boot, for its other members, whom it may serve; but not when the
+# start that made it failed.
 give_up_bridge() {
-	if comes_up_at_boot "$1" && has_members "$1"; then
+	if [ -n "$undoing" ] && [ -e "$state/wire-$1" ]; then
+		give_wire_back "$1"
+	elif comes_up_at_boot "$1" && has_members "$1"; then
 		serve_addresses "$1"
 	else
 		end_dnsmasq "$1"

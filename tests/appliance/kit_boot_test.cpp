@@ -77,4 +77,15 @@ TEST_F(KitBoot, ReadsTheFilesOfInterfacesAlone) {
   EXPECT_EQ(Bridges(), "br4 br5.7 br6.lan br7\n");
 }
 
+// The way out that an interface had was gone once it was in a bridge.
+TEST_F(KitBoot, TakesTheRoutesOfItsFirstMemberAlongAndNotesNothing) {
+  RunInShell(
+      "ip link add eth0 type veth peer name wire; ip link set eth0 up; ip link set wire up; "
+      "ip address add 192.0.2.1/24 dev eth0; ip route add default via 192.0.2.254");
+  Bridge("abr", "PRIMARY=eth0\n");
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
+  EXPECT_EQ(RunInShell("ip -4 route show default | sed 's/ *$//'").output, "default via 192.0.2.254 dev abr\n");
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").output, "");
+}
+
 }  // namespace

@@ -305,4 +305,34 @@ TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
   EXPECT_EQ(Left(), "");
 }
 
+// A wired appliance that had an access point put into its network lost its address and its way out, also when that
+// failed.
+TEST_F(KitAccessPoint, LeavesTheWireAsItWasWhenItFailsAndTakesItsRoutesAlongWhenItDoesNot) {
+  ASSERT_EQ(RunInShell("ip address add 192.0.2.9/24 dev eth0; ip link set eth0 up; ip link set wire up; "
+                       "ip route add default via 192.0.2.1 metric 7; ip route add 198.51.100.0/24 via 192.0.2.2")
+                .output,
+            "");
+  const std::string ways = "ip -4 -brief address show up | grep -v ^lo; ip -4 route";
+  const std::string before = RunInShell(ways).output;
+  Write(
+      "/etc/sysconfig/network-scripts/ifcfg-br0",
+      "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.9\nNETMASK=255.255.255.0\nONBOOT=yes\n");
+  Break("hostapd");
+  const Ran failed = Script("start wlan0 br0");
+  EXPECT_EQ(failed.status, 1);
+  EXPECT_THAT(failed.output, StartsWith("rc.network: cannot start the access point on wlan0"));
+  EXPECT_EQ(RunInShell(ways).output, before);
+  EXPECT_FALSE(fs::exists("/sys/class/net/br0"));
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").output, "");
+
+  Mend();
+  EXPECT_EQ(Script("start wlan0 br0").output, "");
+  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").output, "192.0.2.9/24\n");
+  EXPECT_THAT(RunInShell("ip -4 route").output, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").output, "");
+  Break("hostapd");
+  EXPECT_EQ(Script("start wlan0 br0").status, 1);
+  EXPECT_THAT(RunInShell("ip -4 route").output, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+}
+
 }  // namespace
