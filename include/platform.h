@@ -498,7 +498,7 @@ int MERONetSetCard1(const NETINFO* pNetInfo, int flags);
  * servers behind those that /etc/resolv.conf names otherwise. Both are given back when the client ends.
  *
  * Blocks for as long at most, and before that up to 2 s for a DHCP client that runs to end; one that does not is
- * killed.
+ * killed. A server that keeps the client busy without a lease has it ended after 15 s more, and nothing goes on asking.
  */
 int MEROIGetDHCPTestNetInfo(PNETINFO pNetInfo, int seconds);
 

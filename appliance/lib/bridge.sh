@@ -160,10 +160,10 @@ set_address() {
 	attempt "give $1 the address $2" ip address add "$2" broadcast + dev "$1"
 }
 
-# The client goes on in the background when no server has answered yet.
+# The client goes on in the background when no server has answered yet; one that a server keeps busy is ended.
 lease_address() { # INTERFACE
 	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || return 0
-	attempt "lease an address for $1" timeout -s KILL 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 -T 2 \
+	attempt "lease an address for $1" timeout -k 2 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 -T 2 \
 		-s /usr/mero/sbin/udhcpc.lease
 }
 

@@ -16,9 +16,9 @@
 
 namespace {
 
-constexpr int kTries = 4;     // and a wait of the same length behind each
-constexpr int kGrace = 15;    // seconds more, for what a lease is applied by
-constexpr int kKilled = 137;  // as timeout(1) tells
+constexpr int kTries = 4;       // and a wait of the same length behind each
+constexpr int kGrace = 15;      // seconds more, for what a lease is applied by
+constexpr int kTimedOut = 124;  // as timeout(1) tells
 
 // Runs the client until it has a lease, or was not answered in time; it stays behind to renew it, or to go on asking.
 Status Lease(const char* szIfName, int seconds) {
@@ -33,11 +33,11 @@ Status Lease(const char* szIfName, int seconds) {
 
   // A server that offers and refuses again and again would keep it in the foreground for ever.
   const char* const argv[] = {
-      "/usr/bin/timeout", "-s", "KILL",       szLimit, kDhcpClientPath, "udhcpc", "-b",   "-S",   "-i", szIfName, "-p",
+      "/usr/bin/timeout", "-k", "2",          szLimit, kDhcpClientPath, "udhcpc", "-b",   "-S",   "-i", szIfName, "-p",
       pidFile.c_str(),    "-s", kLeaseScript, "-t",    szTries,         "-T",     szWait, nullptr};
   Result<int> exitStatus = RunProgram(argv, Standard::kNull);
   if (!exitStatus.ok()) return exitStatus.status();
-  if (*exitStatus == kKilled) return Status::Failed(ETIMEDOUT);
+  if (*exitStatus == kTimedOut) return Status::Failed(ETIMEDOUT);
   if (*exitStatus != 0) return Status::Failed(ENOEXEC);
   // It notes the pid of what stays behind only then, and who has no pid cannot be ended.
   for (int tries = 100; tries > 0 && !IsDaemonThere(pidFile.c_str(), kDhcpClientProgram); --tries) {

@@ -538,6 +538,15 @@ TEST_F(ALeasingClient, IsEndedWithoutTheScriptThatWouldApplyALease) {
   EXPECT_EQ(Client(), "");
 }
 
+// A server that offered and refused again and again kept the caller for ever.
+TEST_F(ALeasingClient, IsEndedWhenItIsKeptBusy) {
+  WriteFile(kScript, "#!/bin/sh\n[ \"$1\" = left ] || sleep 1000\n", 0755);
+  NETINFO netInfo = Asker();
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 4), -1);
+  ExpectFailure(ERR_UNKNOWN, "Failed to lease an address for wlan0: Connection timed out");
+  EXPECT_EQ(Client(), "");
+}
+
 // A name server that could not be taken out kept an interface from getting a static address.
 TEST_F(ALeasingClient, KeepsNobodyFromAnotherAddressByWhatCannotBeGivenBack) {
   WriteFile(kScript, "#!/bin/sh\nexit 1\n", 0755);
