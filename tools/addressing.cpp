@@ -76,7 +76,8 @@ Task SettingAddress(const Program& program, const KnownNetwork& config) {
 
 void RequireLease() {
   if (!library_log::Says("Failed to get IP from DHCP")) return;
-  throw Failed("no DHCP server answered", "give a static address: merowireless address A.B.C.D --mask M");
+  throw Failure(Exit::kNoLease, "no DHCP server answered",
+                "the appliance goes on asking; or give a static address: merowireless address A.B.C.D --mask M");
 }
 
 void ApplyAddress(const Task& task, const KnownNetwork& config) {

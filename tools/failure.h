@@ -14,6 +14,7 @@ enum class Exit : int {
   kOutOfRange = 4,  // no such network, or not in range
   kSecretRefused = 5,
   kRadioOff = 6,
+  kNoLease = 7,  // joined; the appliance goes on asking for an address
   kInterrupted = 130,
 };
 

@@ -78,12 +78,12 @@ TEST_F(Addresses, ThatNoServerGivesAreAFailureThoughTheNetworkWasJoined) {
     return library::Report("Failed to get IP from DHCP"), 0;
   };
   const Ran ran = Tool({"connect", "Home"});
-  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.status, 7);
   EXPECT_THAT(ran.err, HasSubstr("no DHCP server answered"));
 
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
   library::MEROWirelessAutoConnect = [] { return library::Report("Failed to get IP from DHCP"), 0; };
-  EXPECT_EQ(Tool({"autoconnect"}).status, 1);
+  EXPECT_EQ(Tool({"autoconnect"}).status, 7);
 }
 
 TEST_F(Addresses, AreTakenWhenTheyAreAddresses) {
