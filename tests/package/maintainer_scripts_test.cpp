@@ -20,6 +20,7 @@ using testing::Not;
 
 constexpr char kAdapter[] = "/tmp/wireless.info";
 constexpr char kState[] = "/run/rc.network";
+constexpr char kLeaseLock[] = "/run/udhcpc.lease";
 constexpr char kStart[] = "/etc/rc.network";
 constexpr char kConnection[] = "/usr/mero/etc/wpa_supplicant.conf";
 
@@ -77,9 +78,11 @@ TEST_F(PackageScripts, LeaveNothingOfWhatRan) {
   for (const std::string& path : kPublic) Write(path, "");
   Write(std::string(kState) + "/lock", "");
   Write(kConnection, "");
+  fs::create_directory(kLeaseLock);
   EXPECT_EQ(Remove().output, "");
   for (const std::string& path : kPublic) EXPECT_FALSE(IsThere(path)) << path;
   EXPECT_FALSE(IsThere(kState));
+  EXPECT_FALSE(IsThere(kLeaseLock));
   EXPECT_TRUE(IsThere(kConnection));
   EXPECT_EQ(Remove("purge").output, "");
   EXPECT_FALSE(IsThere(kConnection));
