@@ -43,9 +43,13 @@ end_stray_hostapd() {
 	done
 }
 
-# is_ours PROCESS: whether it has this machine's files, and not those of a container.
+# is_ours PROCESS: whether it has this machine's files and network, and not those of a container.
 is_ours() {
-	[ "$(stat -Lc %d:%i "$1/root" 2>/dev/null)" = "$(stat -Lc %d:%i /)" ]
+	[ "$(belongings_of "$1")" = "$(belongings_of /proc/self)" ]
+}
+
+belongings_of() { # PROCESS
+	stat -Lc %d:%i "$1/root" "$1/ns/net" 2>/dev/null
 }
 
 # forget_configuration INTERFACE: it holds secrets, and so does a half that was being written.

@@ -275,6 +275,18 @@ TEST_F(KitAccessPoint, IsEndedAlsoWhenItsPidFileIsEmpty) {
   EXPECT_EQ(Left(), "");
 }
 
+// Whoever looked through all processes for such a daemon ended that of another network namespace, which has an interface
+// of the same name.
+TEST_F(KitAccessPoint, IsNotEndedByAnotherNetworksScript) {
+  const Ran other = RunInShell(
+      "unshare -n bash -c 'exec -a \"hostapd /var/run/rc.network/hostapd-wlan0.conf\" /tmp/daemons/hostapd 60' "
+      ">/dev/null 2>&1 & echo $! >/tmp/other; until grep -qs wlan0.conf /proc/$!/cmdline; do :; done");
+  EXPECT_EQ(other.status, 0);
+  EXPECT_EQ(Script("start wlan0 lbr0").status, 0);
+  EXPECT_EQ(Script("restart wlan0 lbr0").status, 0);
+  EXPECT_EQ(RunInShell("grep -c '^State:.S' /proc/$(cat /tmp/other)/status; kill $(cat /tmp/other)").output, "1\n");
+}
+
 // The bridge of an access point that had been switched off came up at every boot.
 TEST_F(KitAccessPoint, HasNoBridgeAtBootWhileItIsSwitchedOff) {
   SetBridge("NAT=yes\nPRIMARY=wlan0");
