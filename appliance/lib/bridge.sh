@@ -135,8 +135,8 @@ note_wire() {
 	printf '%s %s\n' "$1" "$leased" | put "$state/wire-$2"
 }
 
-forget_wire() { # BRIDGE
-	attempt "remove $state/wire-$1" rm -f "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes"
+forget_wire() { # BRIDGE [FILE]
+	attempt "remove $state/wire-$1" rm -f "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes" "${2-}"
 }
 
 # give_wire_back BRIDGE: the first member is by itself again, as it was, and the bridge is gone.

@@ -309,6 +309,20 @@ TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhenItsDaemonHasEnded) {
   EXPECT_EQ(Left(), "");
 }
 
+// A start at the hour that failed at its very last step was not tried again: the access point stayed off.
+TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhicheverNoteCouldNotBeRemoved) {
+  StandIn("rm", "exec /bin/rm \"$@\"\n");
+  for (const char* szNote : {"wire-lbr0", "late-wlan0"}) {
+    Write("/run/rc.network/late-wlan0", "");
+    BreakOnce("rm", szNote);
+    EXPECT_EQ(Script("schedule wlan0").status, 1) << szNote;
+    EXPECT_EQ(Daemons(), "") << szNote;
+    EXPECT_EQ(Script("schedule wlan0").status, 0) << szNote;
+    EXPECT_EQ(Daemons(), OnAir()) << szNote;
+    EXPECT_EQ(Script("restart wlan0 lbr0").status, 0);
+  }
+}
+
 // In another language the state directory was taken for somebody else's, at every run.
 TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
   const std::string german = "LC_ALL=C.UTF-8 LANGUAGE=de PATH=/tmp/bin:$PATH /etc/rc.network ";
