@@ -6,8 +6,8 @@
 #include <ostream>
 #include <utility>
 
-#include "ap_settings.h"
 #include "commands.h"
+#include "model/ap_settings.h"
 #include "running.h"
 
 using testing::AllOf;

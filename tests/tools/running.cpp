@@ -17,7 +17,7 @@
 #include <iterator>
 #include <utility>
 
-#include "program.h"
+#include "app/run.h"
 
 namespace {
 

@@ -1,5 +1,5 @@
 // What the supplicant says, and what the program makes of it.
-#include "supplicant.h"
+#include "work/supplicant.h"
 
 #include <poll.h>
 #include <sys/socket.h>

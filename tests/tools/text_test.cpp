@@ -1,5 +1,5 @@
 // Bytes from the air as text.
-#include "text.h"
+#include "base/text.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

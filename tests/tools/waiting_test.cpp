@@ -11,8 +11,8 @@
 #include <filesystem>
 #include <functional>
 
-#include "library_log.h"
 #include "running.h"
+#include "work/library_log.h"
 
 using library::Network;
 using testing::AllOf;

@@ -1,0 +1,290 @@
+// The command line.
+#include "app/options.h"
+
+#include <CLI/App.hpp>
+#include <CLI/Config.hpp>
+#include <CLI/Formatter.hpp>
+#include <limits>
+#include <memory>
+#include <sstream>
+
+#include "base/choices.h"
+#include "commands/access_point.h"
+#include "commands/adapter.h"
+#include "commands/addressing.h"
+#include "commands/connection.h"
+#include "commands/networks.h"
+#include "commands/watch.h"
+#include "model/ap_settings.h"
+
+namespace {
+
+constexpr char kAbout[] =
+    "Manages the appliance's wireless networking.\n"
+    "\n"
+    "Exit status: 0 done, 1 failed, 2 wrong usage, 3 no adapter, 4 no such network or\n"
+    "out of range, 5 secret refused, 6 radio switched off, 130 interrupted.";
+
+// Commands are made known with what they are to be given and what they then do. The values live as long as the
+// command, which is as long as the action that holds them.
+class Commands {
+ public:
+  Commands(CLI::App& app, Options& options) : app_(app), options_(options) {}
+
+  template <class Values = std::nullptr_t>
+  CLI::App* Add(CLI::App& parent, const char* szName, const char* szHelp,
+                std::function<void(CLI::App&, Values&)> describe,
+                std::function<void(const Program&, const Values&)> act) {
+    CLI::App* command = parent.add_subcommand(szName, szHelp);
+    const auto values = std::make_shared<Values>();
+    if (describe) describe(*command, *values);
+    command->callback(
+        [this, values, act] { options_.command = [values, act](const Program& program) { act(program, *values); }; });
+    return command;
+  }
+
+  template <class Values = std::nullptr_t>
+  CLI::App* Add(const char* szName, const char* szHelp, std::function<void(CLI::App&, Values&)> describe,
+                std::function<void(const Program&, const Values&)> act) {
+    return Add<Values>(app_, szName, szHelp, std::move(describe), std::move(act));
+  }
+
+  CLI::App* AddPlain(CLI::App& parent, const char* szName, const char* szHelp, void (*act)(const Program&)) {
+    return Add<std::nullptr_t>(parent, szName, szHelp, nullptr,
+                               [act](const Program& program, const std::nullptr_t&) { act(program); });
+  }
+
+  CLI::App* AddPlain(const char* szName, const char* szHelp, void (*act)(const Program&)) {
+    return AddPlain(app_, szName, szHelp, act);
+  }
+
+ private:
+  CLI::App& app_;
+  Options& options_;
+};
+
+void DescribeSecret(CLI::App& command, SecretSource& source) {
+  auto* file = command.add_option("--key-file", source.file, "read the secret from FILE")->option_text("FILE");
+  command.add_flag("--key-stdin", source.standardInput, "read the secret from the standard input")->excludes(file);
+}
+
+void DescribeMask(CLI::App& command, Addressing& addressing) {
+  command.add_option("--mask", addressing.mask, "netmask of a static address")->option_text("A.B.C.D");
+}
+
+void AddNetworkCommands(Commands& commands) {
+  struct Scanning {
+    bool renew = false;
+  };
+  commands.Add<Scanning>(
+      "scan", "List the networks in range",
+      [](CLI::App& command, Scanning& values) {
+        command.add_flag("--renew", values.renew, "scan afresh instead of reading the last results");
+      },
+      [](const Program& program, const Scanning& values) { Scan(program, values.renew); });
+
+  struct Listing {
+    bool byTime = false;
+    bool showSecrets = false;
+  };
+  commands.Add<Listing>(
+      "known", "List the networks that have been saved",
+      [](CLI::App& command, Listing& values) {
+        command.add_flag("--by-time", values.byTime, "the one saved last first");
+        command.add_flag("--show-secrets", values.showSecrets, "show the secrets too");
+      },
+      [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });
+
+  commands.Add<NetworkToSave>(
+      "save", "Save a network, so that it can be joined",
+      [](CLI::App& command, NetworkToSave& values) {
+        command.add_option("network", values.name, "its name, or the address of its access point")
+            ->required()
+            ->option_text("NAME|ADDRESS");
+        DescribeSecret(command, values.secret);
+        command.add_option("--ip", values.addressing.ip, "DHCP (the default), a static address, or none")
+            ->option_text("DHCP|A.B.C.D|none");
+        DescribeMask(command, values.addressing);
+        command.add_option("--gateway", values.addressing.gateway, "default gateway of a static address")
+            ->option_text("A.B.C.D");
+        auto* security = command.add_option("--security", values.security, "how a network that hides is protected")
+                             ->option_text("open|wep|wpa|wpa2|wpa-eap|wpa2-eap");
+        auto* bssid = command.add_option("--bssid", values.address, "access point of a network that hides its name")
+                          ->option_text("ADDRESS")
+                          ->needs(security);
+        security->needs(bssid);  // a network that does not hide tells how it is protected
+      },
+      Save);
+}
+
+void AddForgetting(Commands& commands) {
+  commands.Add<std::string>(
+      "forget", "Forget a network that has been saved",
+      [](CLI::App& command, std::string& name) {
+        command.add_option("network", name, "its name, or the address of its access point")
+            ->required()
+            ->option_text("NAME|ADDRESS");
+      },
+      Forget);
+}
+
+void AddConnectionCommands(Commands& commands) {
+  commands.Add<NetworkToJoin>(
+      "connect", "Join a network and take an address in it",
+      [](CLI::App& command, NetworkToJoin& values) {
+        command.add_option("network", values.name, "its name, or the address of its access point")
+            ->required()
+            ->option_text("NAME|ADDRESS");
+        DescribeSecret(command, values.secret);
+        command.add_option("--user", values.user, "who you are, for networks with EAP")->option_text("NAME");
+        command.add_flag("--any-ap", values.anyAccessPoint, "through any access point that bears the name");
+        command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
+      },
+      Connect);
+  commands.AddPlain("autoconnect", "Join the newest known network that can be joined", AutoConnect);
+  commands.AddPlain("disconnect", "End the connection", Disconnect);
+  commands.AddPlain("status", "Show the state of the connection", ShowStatus);
+
+  struct Watching {
+    std::string times;
+  };
+  commands.Add<Watching>(
+      "watch", "Show the connection's state whenever it changes",
+      [](CLI::App& command, Watching& values) {
+        command.add_option("--count", values.times, "end after so many")->option_text("N");
+      },
+      [](const Program& program, const Watching& values) {
+        constexpr int kMost = std::numeric_limits<int>::max();
+        Watch(program, values.times.empty() ? 0 : NumberOf(values.times, 1, kMost, "count"));
+      });
+
+  commands.Add<Addressing>(
+      "address", "Give the interface an address",
+      [](CLI::App& command, Addressing& values) {
+        command.add_option("address", values.ip, "DHCP or a static address")->required()->option_text("DHCP|A.B.C.D");
+        DescribeMask(command, values);
+      },
+      SetAddress);
+  commands.Add<std::string>(
+      "gateway", "Add a default gateway",
+      [](CLI::App& command, std::string& gateway) {
+        command.add_option("gateway", gateway, "its address")->required()->option_text("A.B.C.D");
+      },
+      SetGateway);
+  commands.Add<CellToMake>(
+      "adhoc", "Start or join an ad-hoc cell",
+      [](CLI::App& command, CellToMake& values) {
+        command.add_option("name", values.name, "the cell's name")->required()->option_text("NAME");
+        command.add_flag("--wep", values.wep, "encrypt, with a secret");
+        DescribeSecret(command, values.secret);
+      },
+      MakeCell);
+}
+
+void AddApCommands(Commands& commands, CLI::App& app) {
+  CLI::App* ap = app.add_subcommand("ap", "Show, change and switch the access point");
+  ap->require_subcommand(1);
+  ap->fallthrough();
+
+  struct Showing {
+    bool secrets = false;
+  };
+  commands.Add<Showing>(
+      *ap, "show", "Show the settings",
+      [](CLI::App& command, Showing& values) {
+        command.add_flag("--show-secrets", values.secrets, "show the secrets too");
+      },
+      [](const Program& program, const Showing& values) { ShowAp(program, values.secrets); });
+  commands.Add<ApChanges>(
+      *ap, "set", "Change settings; the others stay",
+      [](CLI::App& command, ApChanges& values) {
+        for (const ApSetting& setting : ApSettings()) {
+          if (setting.szOption == nullptr) continue;
+          const std::string option = setting.szOption;
+          command
+              .add_option_function<std::string>(
+                  "--" + option, [&values, option](const std::string& text) { values.settings[option] = text; },
+                  setting.szHelp)
+              ->option_text("VALUE");
+        }
+        DescribeSecret(command, values.secret);
+        command.add_option("--guest-key-file", values.guestKeyFile, "read the guest network's secret from FILE")
+            ->option_text("FILE");
+      },
+      SetAp);
+  commands.AddPlain(*ap, "enable", "Put the access point on the air", EnableAp);
+  commands.AddPlain(*ap, "disable", "Take the access point down", DisableAp);
+  commands.AddPlain(*ap, "status", "Show whether the access point is on the air", ShowApStatus);
+}
+
+void AddAdapterCommands(Commands& commands) {
+  commands.Add<std::string>(
+      "mode", "Make the adapter an access point's or a client's",
+      [](CLI::App& command, std::string& mode) {
+        command.add_option("mode", mode, "ap or client")->required()->option_text("ap|client");
+      },
+      ChangeMode);
+  commands.Add<std::string>(
+      "radio", "Show whether the radio may be used, or switch it",
+      [](CLI::App& command, std::string& state) {
+        command.add_option("state", state, "on or off; nothing shows it")->option_text("[on|off]");
+      },
+      [](const Program& program, const std::string& state) {
+        state.empty() ? ShowRadio(program) : SwitchRadio(program, state);
+      });
+}
+
+// The options of the program itself are understood behind a command too.
+void FallThrough(CLI::App& app) {
+  for (CLI::App* command : app.get_subcommands([](CLI::App*) { return true; })) {
+    command->fallthrough();
+    FallThrough(*command);
+  }
+}
+
+bool LacksCommand(const CLI::App& app) {
+  const auto given = app.get_subcommands();
+  return given.empty() ? app.get_require_subcommand_min() > 0 : LacksCommand(*given.front());
+}
+
+// What is wrong. What was given is not repeated: it may be a secret at a wrong place.
+std::string Complaint(const CLI::App& app, const CLI::ParseError& error) {
+  if (LacksCommand(app)) return app.remaining(true).empty() ? "a command is missing" : "there is no such command";
+  if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr) return "there are more arguments than were expected";
+  if (dynamic_cast<const CLI::ConversionError*>(&error) != nullptr) return "an option takes no value and was given one";
+  return Harmless(error.what(), false);
+}
+
+}  // namespace
+
+Options ParseOptions(int argc, const char* const* argv) {
+  Options options;
+  CLI::App app(kAbout, "merowireless");
+  bool json = false;
+  bool porcelain = false;
+  auto* jsonFlag = app.add_flag("--json", json, "write one JSON document");
+  app.add_flag("--porcelain", porcelain, "write one record a line, fields between tabs")->excludes(jsonFlag);
+  app.add_flag("-v,--verbose", options.verbose, "show what the library reports");
+  app.require_subcommand(1);
+
+  Commands commands(app, options);
+  AddNetworkCommands(commands);
+  AddForgetting(commands);
+  AddConnectionCommands(commands);
+  AddApCommands(commands, app);
+  AddAdapterCommands(commands);
+  FallThrough(app);
+
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::ParseError& error) {
+    std::ostringstream help;
+    if (error.get_exit_code() == 0) {
+      app.exit(error, help, help);
+      throw Help{help.str()};
+    }
+    throw WrongUsage{jsonFlag->count() > 0 ? Form::kJson : Form::kHuman, Complaint(app, error)};
+  }
+  options.form = json ? Form::kJson : porcelain ? Form::kPorcelain : Form::kHuman;
+  return options;
+}

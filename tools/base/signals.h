@@ -1,0 +1,33 @@
+// The signals by which somebody ends the program, while it waits for something.
+#ifndef MERO_TOOLS_SIGNALS_H
+#define MERO_TOOLS_SIGNALS_H
+
+#include <csignal>
+#include <initializer_list>
+
+#include "base/descriptor.h"
+
+// Holds the signals back from now on, and others that are asked for; they make fd() readable instead. One that the
+// program was started to ignore stays ignored.
+class Signals {
+ public:
+  explicit Signals(std::initializer_list<int> others = {});
+  Signals(const Signals&) = delete;
+  Signals& operator=(const Signals&) = delete;
+  ~Signals();
+
+  int fd() const { return fd_.get(); }
+
+  // The next one that has come, or 0.
+  int Next() const;
+  bool HasCome() const { return Next() != 0; }
+
+  // Gives a child the mask that was there before.
+  void RestoreMask() const;
+
+ private:
+  sigset_t before_;
+  Descriptor fd_;
+};
+
+#endif  // MERO_TOOLS_SIGNALS_H

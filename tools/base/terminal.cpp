@@ -1,0 +1,43 @@
+// What stands behind a descriptor that people may be looking at.
+#include "base/terminal.h"
+
+#include <langinfo.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <string_view>
+
+namespace {
+
+std::string_view Environment(const char* szName) {
+  const char* szValue = std::getenv(szName);
+  return szValue != nullptr ? szValue : "";
+}
+
+std::size_t WidthOf(int fd) {
+  constexpr std::size_t kCustomary = 80;
+  winsize size{};
+  return ::ioctl(fd, TIOCGWINSZ, &size) == 0 && size.ws_col > 0 ? size.ws_col : kCustomary;
+}
+
+}  // namespace
+
+Terminal TerminalOf(int fd) {
+  const bool isTerminal = ::isatty(fd) == 1;
+  const bool obeys = isTerminal && Environment("TERM") != "dumb";
+  return {
+      .obeys = obeys,
+      .colour = obeys && Environment("NO_COLOR").empty(),
+      .utf8 = std::string_view(::nl_langinfo(CODESET)) == "UTF-8",
+      .width = isTerminal ? WidthOf(fd) : 0,
+  };
+}
+
+void Remark(const std::string& line) {
+  const auto before = std::signal(SIGPIPE, SIG_IGN);
+  std::fprintf(stderr, "%s\n", line.c_str());
+  std::signal(SIGPIPE, before);
+}

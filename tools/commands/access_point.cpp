@@ -1,0 +1,213 @@
+// The commands about the access point.
+#include "commands/access_point.h"
+
+#include <algorithm>
+
+#include "base/signals.h"
+#include "commands/adapter.h"
+#include "model/ap_settings.h"
+#include "model/library.h"
+#include "model/paths.h"
+#include "work/library_log.h"
+
+namespace {
+
+// The library's defaults for an adapter without settings know of no guests; these are what it takes for a guest network
+// of which nothing was said.
+void SetGuestDefaults(ApConf& conf) {
+  constexpr int kStations = 256;
+  conf.hostapConf.guestNet.maxStation = kStations;
+  conf.hostapConf.guestNet.blAPIsolate = TRUE;
+  conf.guestNetAccessRule.blLanBlock = TRUE;
+  conf.guestNetAccessRule.blAllowHttp = TRUE;
+  std::ranges::copy(conf.wifiSchedConf.szWifiSched, conf.guestNetSchedConf.szWifiSched);
+}
+
+// Switching the radio may have made settings in which there is nothing else.
+void SetBridgeDefault(ApConf& conf) {
+  if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, "lbr0", "the bridge");
+}
+
+// Reads the settings of the adapter's model; false, with the defaults, when none were saved.
+bool ReadSaved(ApConf& conf) {
+  return MEROWirelessGetAPConfig(AdapterModel().c_str(), &conf) > 0;
+}
+
+ApConf ReadSettings() {
+  ApConf conf{};
+  if (!ReadSaved(conf)) SetGuestDefaults(conf);
+  return conf;
+}
+
+// What may go on the air. The defaults may not: they are an open network, which nobody has asked for.
+ApConf SettingsToEnable() {
+  ApConf conf{};
+  if (!ReadSaved(conf)) {
+    throw Failure(Exit::kUsage, "no access point has been set up for this adapter",
+                  "`merowireless ap set` gives it a name and a protection");
+  }
+  RequireComplete(conf);
+  return conf;
+}
+
+Failure NotSaved() {
+  return Failed("the settings could not be saved", "is there room on the disk? -v shows more");
+}
+
+void SaveSwitch(ApConf conf, bool on) {
+  conf.blEnable = on ? TRUE : FALSE;
+  if (MEROWirelessSetAPConfig(&conf) == FALSE) throw NotSaved();
+}
+
+// The library saves settings only together with the switch on; where it was off, it is put back, whoever interrupts.
+void SaveKeepingSwitch(const ApConf& conf) {
+  const Signals signals;
+  SaveSwitch(conf, true);
+  if (conf.blEnable == FALSE) SaveSwitch(conf, false);
+}
+
+void ApplySecrets(const Program& program, ApConf& conf, const ApChanges& changes) {
+  if (changes.secret.isGiven() || LacksSecret(conf)) {
+    const auto secret = ReadSecret(changes.secret, "secret of " + program.output.Name(conf.hostapConf.szSSID));
+    if (secret) SetApSecret(conf, *secret);
+  }
+  if (!changes.guestKeyFile.empty()) {
+    SetGuestSecret(conf, ReadSecret({.file = changes.guestKeyFile}, "").value_or(""));
+  }
+}
+
+void ApplySettings(ApConf& conf, const ApChanges& changes) {
+  for (const ApSetting& setting : ApSettings()) {
+    if (setting.szOption == nullptr) continue;
+    const auto change = changes.settings.find(setting.szOption);
+    if (change != changes.settings.end()) setting.set(conf, change->second);
+  }
+}
+
+// Takes down what there is of an access point. Where there never was one, that is a failure for the library alone.
+void TakeDown(const Program& program) {
+  if (Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) != FALSE) return;
+  if (library_log::Says("ifcfg-wlan0] does not exist")) return;
+  throw Failed("the access point could not be taken down whole");
+}
+
+void Disable(const Program& program, const ApConf& conf) {
+  SaveSwitch(conf, false);
+  TakeDown(program);
+}
+
+// ---- Enabling ----
+
+enum class Start { kNotSaved, kFailed, kDone };
+
+// The library puts up what is switched on in the settings.
+Start TryToStart(ApConf conf) {
+  const bool wasOff = conf.blEnable == FALSE;
+  conf.blEnable = TRUE;
+  if (wasOff && MEROWirelessSetAPConfig(&conf) == FALSE) return Start::kNotSaved;
+  return MEROWirelessAPEnable() != FALSE ? Start::kDone : Start::kFailed;
+}
+
+bool IsAnothers() {
+  return library_log::Says("Another ap construction is going");
+}
+
+Failure EnableFailed() {
+  if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
+  if (IsAnothers()) {
+    return Failed("an access point is being set up already, or an attempt was cut off", "wait a moment and try again");
+  }
+  if (library_log::Says("Failed to restart /etc/rc.network")) {
+    return Failed("the network start script failed, and the access point is disabled", "-v shows what it says");
+  }
+  return Failed("the access point could not be enabled");
+}
+
+struct ApStatus {
+  std::string interface;
+  bool enabled;
+  bool settingUp;
+  bool onAir;
+  std::string name;
+};
+
+const char* StateOf(const ApStatus& status) {
+  return status.settingUp ? "setting-up" : status.onAir ? "on-air" : "off";
+}
+
+Shown ShowState(const ApStatus& status, bool) {
+  if (status.settingUp) return {"being set up", Tone::kFair};
+  return status.onAir ? Shown{"on the air", Tone::kGood} : Shown{"off", Tone::kFair};
+}
+
+constexpr Field<ApStatus> kApStatusFields[] = {
+    {"state", "access point", [](const ApStatus& of) { return Value(StateOf(of)); }, Layout::kLeft, ShowState},
+    {"name", "name", [](const ApStatus& of) { return Value(of.name); }},
+    {"enabled", "enabled", [](const ApStatus& of) { return Value(of.enabled); }},
+    {"interface", "interface", [](const ApStatus& of) { return Value(of.interface); }},
+};
+
+bool IsOnAir() {
+  WIRELESS_INFO info{};
+  return MEROWirelessAdapterNum() > 0 && MEROWirelessCurInfoGet(REQUEST_MODE, &info) == 0 &&
+         info.opmode == WIRELESS_OPMODE_MASTER;
+}
+
+ApStatus ReadApStatus() {
+  const ApConf conf = ReadSettings();
+  return {
+      .interface = MEROWirelessAPInterfaceGet(),
+      .enabled = conf.blEnable != FALSE,
+      .settingUp = MEROWirelessTestAPMode() != FALSE,
+      .onAir = IsOnAir(),
+      .name = conf.hostapConf.szSSID,
+  };
+}
+
+}  // namespace
+
+void ShowAp(const Program& program, bool showSecrets) {
+  const auto fields = ApFields(showSecrets);
+  program.output.One<ApConf>("access_point", fields, ReadSettings());
+}
+
+void SetAp(const Program& program, const ApChanges& changes) {
+  if (changes.settings.empty() && !changes.secret.isGiven() && changes.guestKeyFile.empty()) {
+    throw Failure(Exit::kUsage, "there is nothing to change", "`merowireless ap set --help` lists the settings");
+  }
+  ApConf conf = ReadSettings();
+  SetBridgeDefault(conf);
+  ApplySettings(conf, changes);
+  ApplySecrets(program, conf, changes);
+  RequireComplete(conf);
+  SaveKeepingSwitch(conf);
+  const auto fields = ApFields(false);
+  program.output.Done<ApConf>("saved; `merowireless ap enable` puts the settings on the air", "access_point", fields,
+                              conf);
+}
+
+void EnableAp(const Program& program) {
+  const ApConf conf = SettingsToEnable();
+  RequireAdapter();
+  Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
+  task.szMarker = kApMarker;
+  task.undo = [&] { Disable(program, conf); };
+  const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
+  if (start == Start::kNotSaved) throw NotSaved();
+  if (start == Start::kFailed) {
+    if (!IsAnothers()) Undo(task);
+    throw EnableFailed();
+  }
+  program.output.Done<ApStatus>("the access point " + program.output.Name(conf.hostapConf.szSSID) + " is enabled",
+                                "access_point", kApStatusFields, ReadApStatus());
+}
+
+void DisableAp(const Program& program) {
+  const ApConf conf = ReadSettings();
+  Disable(program, conf);
+  program.output.Done<ApStatus>("the access point is disabled", "access_point", kApStatusFields, ReadApStatus());
+}
+
+void ShowApStatus(const Program& program) {
+  program.output.One<ApStatus>("access_point", kApStatusFields, ReadApStatus());
+}

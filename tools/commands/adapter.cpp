@@ -1,0 +1,70 @@
+// The commands about the adapter as a whole: radio, mode.
+#include "commands/adapter.h"
+
+#include "model/library.h"
+#include "model/paths.h"
+
+namespace {
+
+struct Radio {
+  int answer;
+  std::string model;
+};
+
+const char* TextOf(const Radio& radio) {
+  return radio.answer == 1 ? "on" : radio.answer == 0 ? "off" : "unknown";
+}
+
+constexpr Field<Radio> kRadioFields[] = {
+    {"radio", "radio", [](const Radio& of) { return Value(TextOf(of)); }, Layout::kLeft,
+     [](const Radio& of, bool) {
+       return Shown{TextOf(of), of.answer == 1 ? Tone::kGood : Tone::kBad};
+     }},
+    {"adapter", "adapter", [](const Radio& of) { return of.model.empty() ? nullptr : Value(of.model); }},
+};
+
+std::string ModelOrNone() {
+  char szModel[1024];
+  return MEROWirelessApConfigSecNameGet(szModel, sizeof szModel) == TRUE ? szModel : "";
+}
+
+Radio ReadRadio() {
+  return {MEROWirelessCheckBlock(), ModelOrNone()};
+}
+
+}  // namespace
+
+std::string AdapterModel() {
+  std::string model = ModelOrNone();
+  if (!model.empty()) return model;
+  if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
+  throw Failed("the adapter has not been announced",
+               "plug the adapter out and in, so that /tmp/wireless.info is written");
+}
+
+void ShowRadio(const Program& program) {
+  program.output.One<Radio>("radio", kRadioFields, ReadRadio());
+}
+
+// The switch lies in the access-point settings, where the library saves it along with all others, and only while an
+// access point is enabled.
+void SwitchRadio(const Program& program, const std::string& state) {
+  if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
+  const bool on = state == "on";
+  const std::string model = AdapterModel();
+  if (PLIBCFileSetSectionValue(kApSettings, model.c_str(), "unblock", on ? "yes" : "no", kApSettingsLine) < 0) {
+    throw Failed("the radio could not be switched", "is there room on the disk? -v shows more");
+  }
+  program.output.Done<Radio>(on ? "the radio is on" : "the radio is off: no network will be joined", "radio",
+                             kRadioFields, ReadRadio());
+}
+
+void ChangeMode(const Program& program, const std::string& mode) {
+  if (mode != "ap" && mode != "client") throw Wrong("there is no such mode", "it is ap or client");
+  const MERO_WIRELESS_MODE value = mode == "ap" ? WIRELESS_AP_MODE : WIRELESS_CLIENT_MODE;
+  if (Run<BOOL>(program.Doing("changing the mode"), [&] { return MEROWirelessModeChange(value); }) == FALSE) {
+    if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
+    throw Failed("the mode could not be changed");
+  }
+  program.output.Done(mode == "ap" ? "the adapter is an access point's now" : "the adapter is a client's now");
+}

@@ -1,0 +1,20 @@
+// The commands about the adapter as a whole: radio, mode.
+#ifndef MERO_TOOLS_RADIO_H
+#define MERO_TOOLS_RADIO_H
+
+#include <string>
+
+#include "app/run.h"
+
+void ShowRadio(const Program& program);
+
+// "on" or "off".
+void SwitchRadio(const Program& program, const std::string& state);
+
+// "ap" or "client".
+void ChangeMode(const Program& program, const std::string& mode);
+
+// The settings section of the adapter that is plugged in; fails when it has not been announced.
+std::string AdapterModel();
+
+#endif  // MERO_TOOLS_RADIO_H

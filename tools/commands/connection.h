@@ -1,0 +1,30 @@
+// The commands about the connection: connect, autoconnect, disconnect, status, adhoc.
+#ifndef MERO_TOOLS_CONNECTION_H
+#define MERO_TOOLS_CONNECTION_H
+
+#include <string>
+
+#include "app/run.h"
+#include "model/secrets.h"
+
+struct NetworkToJoin {
+  std::string name;  // or the address of its access point
+  SecretSource secret;
+  std::string user;
+  bool anyAccessPoint = false;
+  bool noAddress = false;
+};
+
+struct CellToMake {
+  std::string name;
+  bool wep = false;
+  SecretSource secret;
+};
+
+void Connect(const Program& program, const NetworkToJoin& wanted);
+void AutoConnect(const Program& program);
+void Disconnect(const Program& program);
+void ShowStatus(const Program& program);
+void MakeCell(const Program& program, const CellToMake& wanted);
+
+#endif  // MERO_TOOLS_CONNECTION_H

@@ -1,0 +1,171 @@
+// The commands about networks: scan, known, save, forget.
+#include "commands/networks.h"
+
+#include <algorithm>
+#include <ctime>
+
+#include "model/library.h"
+#include "model/paths.h"
+#include "model/security.h"
+
+namespace {
+
+// What a name is in hexadecimal when it cannot be given as text.
+Value NameInHex(std::string_view name) {
+  return IsUtf8(name) ? Value(nullptr) : Value(Hex(name));
+}
+
+// ---- Signals ----
+
+// In per cent. Some drivers give dBm, which is below 0: by custom -50 dBm is all and -100 dBm nothing.
+int QualityOf(int signal) {
+  return std::clamp(signal < 0 ? 2 * (signal + 100) : signal, 0, 100);
+}
+
+Shown ShowSignal(const Network& network, bool utf8) {
+  constexpr std::string_view kBars[] = {"▂", "▄", "▆", "█"};
+  const int quality = QualityOf(network.signal);
+  const auto lit = static_cast<std::size_t>((quality + 24) / 25);
+  std::string text;
+  for (std::size_t i = 0; i < std::size(kBars); ++i) {
+    text += utf8 ? (i < lit ? kBars[i] : "▁") : (i < lit ? "#" : ".");
+  }
+  const std::string figure = std::to_string(network.signal);
+  text += std::string(figure.size() < 4 ? 4 - figure.size() : 1, ' ') + figure;
+  return {text, quality >= 60 ? Tone::kGood : quality >= 30 ? Tone::kFair : Tone::kBad};
+}
+
+// ---- Rows ----
+
+Value AuthOf(const Network& network) {
+  return std::string(MEROWirelessAuthStringGet(network.auth));
+}
+
+Value EncryptionOf(const Network& network) {
+  return std::string(MEROWirelessEncryptStringGet(network.encrypt, 0));
+}
+
+constexpr Field<Network> kNetworkFields[] = {
+    {"name", "NAME", [](const Network& of) { return Value(of.szEssid); }, Layout::kElastic},
+    {"signal", "  SIGNAL", [](const Network& of) { return Value(int64_t{of.signal}); }, Layout::kLeft, ShowSignal},
+    {"channel", "CH", [](const Network& of) { return Value(int64_t{of.channel}); }, Layout::kRight},
+    {"auth", "SECURITY", AuthOf, Layout::kLeft,
+     [](const Network& of, bool) { return Shown{SecurityText(of.auth, of.encrypt)}; }},
+    {"encryption", "", EncryptionOf},
+    {"standard", "STANDARD", [](const Network& of) { return Value(MEROWirelessProtocolStringGet(of.protocol)); }},
+    {"address", "ACCESS POINT", [](const Network& of) { return Value(AddressText(of.bssid)); }},
+    {"name_hex", "", [](const Network& of) { return NameInHex(of.szEssid); }},
+};
+
+std::string TimeText(std::int32_t seconds, const char* szFormat, std::tm* (*partsOf)(const std::time_t*, std::tm*)) {
+  const std::time_t time = seconds;
+  std::tm parts{};
+  char szText[sizeof "2038-01-19T03:14:07Z"];
+  if (partsOf(&time, &parts) == nullptr || std::strftime(szText, sizeof szText, szFormat, &parts) == 0) return "";
+  return szText;
+}
+
+// The secret is the last one, so that it can be left out.
+constexpr Field<KnownNetwork> kKnownFields[] = {
+    {"name", "NAME", [](const KnownNetwork& of) { return Value(of.network.szEssid); }, Layout::kElastic},
+    {"auth", "SECURITY", [](const KnownNetwork& of) { return AuthOf(of.network); }, Layout::kLeft,
+     [](const KnownNetwork& of, bool) { return Shown{SecurityText(of.network.auth, of.network.encrypt)}; }},
+    {"encryption", "", [](const KnownNetwork& of) { return EncryptionOf(of.network); }},
+    {"mode", "", [](const KnownNetwork& of) { return Value(MEROWirelessOpmodeStringGet(of.network.opmode)); }},
+    {"ip", "ADDRESS", [](const KnownNetwork& of) { return Value(of.szIp); }},
+    {"mask", "", [](const KnownNetwork& of) { return Value(of.szMask); }},
+    {"gateway", "", [](const KnownNetwork& of) { return Value(of.szGateway); }},
+    {"saved", "SAVED",
+     [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(TimeText(of.atime, "%FT%TZ", ::gmtime_r)); },
+     Layout::kLeft,
+     [](const KnownNetwork& of, bool) {
+       return of.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{TimeText(of.atime, "%F %R", ::localtime_r)};
+     }},
+    {"address", "ACCESS POINT", [](const KnownNetwork& of) { return Value(AddressText(of.network.bssid)); }},
+    {"name_hex", "", [](const KnownNetwork& of) { return NameInHex(of.network.szEssid); }},
+    {"has_secret", "", [](const KnownNetwork& of) { return Value(of.szKey[0] != '\0'); }},
+    {"secret", "SECRET", [](const KnownNetwork& of) { return Value(of.szKey); }},
+};
+
+constexpr std::span kWithSecret(kKnownFields);
+constexpr std::span kWithoutSecret = kWithSecret.first(kWithSecret.size() - 1);
+
+// ---- Saving ----
+
+// Neither nobody's address nor one of many.
+bool IsStation(const Address& address) {
+  return address != Address{} && (address[0] & 1) == 0;
+}
+
+// A network as its user describes it, for those that hide or are out of range.
+Network Described(const NetworkToSave& wanted) {
+  const auto address = ParseAddress(wanted.address);
+  if (!address || !IsStation(*address)) {
+    throw Failure(Exit::kUsage, "--bssid is no access point's address", "write it as 00:11:22:33:44:55");
+  }
+  Network network{};
+  std::ranges::copy(*address, network.bssid);
+  SetNetworkName(network.szEssid, wanted.name);
+  if (!SetSecurity(network, wanted.security)) {
+    throw Failure(Exit::kUsage, "with --bssid, --security says how the network is protected", kSecurityNames);
+  }
+  return network;
+}
+
+Failure NotSaved() {
+  return Failed("the network could not be saved", "is there room on the disk? -v shows more");
+}
+
+}  // namespace
+
+void Scan(const Program& program, bool renew) {
+  const auto networks = InRange(program, renew ? WIRELESS_SCAN_RENEW : WIRELESS_SCAN_LAST);
+  program.output.List<Network>("networks", kNetworkFields, networks, "no network is in range");
+}
+
+void ListKnown(const Program& program, bool byTime, bool showSecrets) {
+  const auto known = Known(byTime ? Order::kByTime : Order::kAsSaved);
+  program.output.List<KnownNetwork>("networks", showSecrets ? kWithSecret : kWithoutSecret, known,
+                                    "no network is known; `merowireless save NAME` saves one");
+}
+
+void Save(const Program& program, const NetworkToSave& wanted) {
+  KnownNetwork config{};
+  SetAddressing(config, wanted.addressing);
+  config.network = wanted.address.empty() ? FindInRange(program, wanted.name) : Described(wanted);
+  if (config.network.opmode == WIRELESS_OPMODE_AUTO) config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  SetSecret(program, config, wanted.secret);
+  if (MEROWirelessConfSet(&config) < 0) throw NotSaved();
+  const std::string name = program.output.Name(config.network.szEssid);
+  program.output.Done<KnownNetwork>("saved " + name + " (" + AddressText(config.network.bssid) + ")", "network",
+                                    kWithoutSecret, config);
+}
+
+void Forget(const Program& program, const std::string& name) {
+  const std::vector<KnownNetwork> known = AllKnown(name);
+  const std::string shown = program.output.Name(name);
+  if (known.empty()) {
+    throw Failure(Exit::kOutOfRange, "no network named " + shown + " is known",
+                  "`merowireless known` lists those that are");
+  }
+  for (const KnownNetwork& network : known) {
+    if (PLIBCFileRemoveSection(kKnownNetworks, AddressText(network.network.bssid).c_str()) > 0) continue;
+    throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworks));
+  }
+  program.output.ListDone<KnownNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
+}
+
+void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const SecretSource& source) {
+  const std::string name = program.output.Name(config.network.szEssid);
+  if (!NeedsSecret(config.network.auth)) {
+    if (source.isGiven()) throw Failure(Exit::kUsage, name + " is open and takes no secret", "give none");
+    return;
+  }
+  const auto secret = ReadSecret(source, "secret of " + name);
+  if (!secret) {
+    throw Failure(Exit::kUsage, name + " needs a secret, and there is no terminal to ask on",
+                  "give it with --key-file or --key-stdin");
+  }
+  RequireSecretFor(config.network.auth, *secret);
+  SetText(config.szKey, *secret, "the secret");
+}

@@ -1,0 +1,30 @@
+// The commands about networks: scan, known, save, forget.
+#ifndef MERO_TOOLS_NETWORKS_H
+#define MERO_TOOLS_NETWORKS_H
+
+#include <string>
+
+#include "app/run.h"
+#include "commands/addressing.h"
+#include "model/secrets.h"
+#include "wireless.h"
+
+struct NetworkToSave {
+  std::string name;  // or the address of its access point
+  std::string address;
+  std::string security;  // with `address` what a scan would have said
+  SecretSource secret;
+  Addressing addressing;
+};
+
+void Scan(const Program& program, bool renew);
+void ListKnown(const Program& program, bool byTime, bool showSecrets);
+void Save(const Program& program, const NetworkToSave& wanted);
+
+// Forgets every known network of a name, or the one of an access point's address.
+void Forget(const Program& program, const std::string& name);
+
+// Puts a secret into a network that needs one; from a prompt when no source is given.
+void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const SecretSource& source);
+
+#endif  // MERO_TOOLS_NETWORKS_H

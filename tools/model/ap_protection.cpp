@@ -1,0 +1,108 @@
+// How an access point's network is protected.
+#include "model/ap_protection.h"
+
+#include "base/choices.h"
+#include "model/library.h"
+#include "model/security.h"
+
+namespace {
+
+constexpr Name kCiphers[] = {{"tkip", TYPE_TKIP}, {"aes", TYPE_CCMP}, {"both", TYPE_TKIP_CCMP}};
+
+// The generations of WPA, as the access-point daemon has them: bits.
+constexpr int kMixed = TYPE_WPA | TYPE_WPA2;
+
+struct Protection {
+  std::string_view text;
+  MERO_AP_ENCRYPT encryption;
+  int wpaType;
+};
+
+constexpr Protection kProtections[] = {
+    {"open", AP_ENCRYPT_OPEN, 0},          {"wep", AP_ENCRYPT_WEP, 0},
+    {"wpa", AP_ENCRYPT_WPA_PSK, TYPE_WPA}, {"wpa2", AP_ENCRYPT_WPA_PSK, TYPE_WPA2},
+    {"mixed", AP_ENCRYPT_WPA_PSK, kMixed}, {"eap", AP_ENCRYPT_WPA_EAP, TYPE_WPA2},
+};
+
+int* CipherOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info) {
+  if (encryption == AP_ENCRYPT_WPA_PSK) return &info.wpaPskInfo.encryptType;
+  if (encryption == AP_ENCRYPT_WPA_EAP) return &info.wpaEapInfo.encryptType;
+  return nullptr;
+}
+
+}  // namespace
+
+// What the union holds when its encryption changes is another's.
+void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
+                   const char* szOption) {
+  const Protection& protection = RowOf<Protection>(kProtections, text, szOption);
+  if (encryption != protection.encryption) info = {};
+  encryption = protection.encryption;
+  if (encryption == AP_ENCRYPT_WPA_PSK) {
+    info.wpaPskInfo.wpaType = protection.wpaType;
+    if (info.wpaPskInfo.encryptType == 0) info.wpaPskInfo.encryptType = TYPE_CCMP;
+  }
+  if (encryption == AP_ENCRYPT_WPA_EAP) {
+    constexpr int kRadiusPort = 1812;
+    info.wpaEapInfo.wpaType = protection.wpaType;
+    if (info.wpaEapInfo.encryptType == 0) info.wpaEapInfo.encryptType = TYPE_CCMP;
+    if (info.wpaEapInfo.authPort == 0) info.wpaEapInfo.authPort = kRadiusPort;
+  }
+}
+
+std::string ProtectionText(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {
+  const bool psk = encryption == AP_ENCRYPT_WPA_PSK;
+  for (const Protection& protection : kProtections) {
+    if (protection.encryption != encryption || (psk && protection.wpaType != info.wpaPskInfo.wpaType)) continue;
+    return std::string(protection.text);
+  }
+  return "unknown";
+}
+
+Value CipherValue(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO info) {
+  const int* cipher = CipherOf(encryption, info);
+  return cipher != nullptr ? Value(NameOf(kCiphers, *cipher)) : nullptr;
+}
+
+void SetCipher(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
+               const char* szOption) {
+  int* cipher = CipherOf(encryption, info);
+  if (cipher == nullptr) throw Wrong("only WPA has a choice of ciphers", "add --security wpa2");
+  *cipher = ValueOf(kCiphers, text, szOption);
+}
+
+const char* SecretOf(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {
+  switch (encryption) {
+    case AP_ENCRYPT_WEP:
+      return info.szWepPwd;
+    case AP_ENCRYPT_WPA_PSK:
+      return info.wpaPskInfo.szPassPhrase;
+    case AP_ENCRYPT_WPA_EAP:
+      return info.wpaEapInfo.szAuthSharedSecret;
+    case AP_ENCRYPT_OPEN:
+    case AP_ENCRYPT_MAX:
+      break;
+  }
+  return "";
+}
+
+void SetSecretOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& secret) {
+  switch (encryption) {
+    case AP_ENCRYPT_WEP:
+      RequireWepKey(secret);
+      return SetText(info.szWepPwd, secret, "the WEP key");
+    case AP_ENCRYPT_WPA_PSK:
+      RequirePassphrase(secret);
+      return SetText(info.wpaPskInfo.szPassPhrase, secret, "the passphrase");
+    case AP_ENCRYPT_WPA_EAP:
+      return SetText(info.wpaEapInfo.szAuthSharedSecret, secret, "the RADIUS server's secret");
+    case AP_ENCRYPT_OPEN:
+    case AP_ENCRYPT_MAX:
+      break;
+  }
+  throw Wrong("an open network has no secret", "add --security wpa2");
+}
+
+bool LacksSecret(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {
+  return encryption != AP_ENCRYPT_OPEN && *SecretOf(encryption, info) == '\0';
+}

@@ -1,0 +1,41 @@
+// The access point's settings by the names that people have for them.
+#ifndef MERO_TOOLS_AP_SETTINGS_H
+#define MERO_TOOLS_AP_SETTINGS_H
+
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "show/output.h"
+#include "wireless.h"
+
+using ApConf = MERO_AP_CONF;
+
+enum class Show { kAlways, kOnRequest };  // secrets are shown on request
+
+// One setting: how it is shown and, where it has an option, how it is set.
+struct ApSetting {
+  Field<ApConf> field;
+  const char* szOption = nullptr;  // without its dashes
+  const char* szHelp = nullptr;
+  void (*set)(ApConf&, const std::string& text) = nullptr;  // fails with what would do
+  Show show = Show::kAlways;
+};
+
+// In the order in which they are shown and set; the secrets come last.
+std::span<const ApSetting> ApSettings();
+
+std::vector<Field<ApConf>> ApFields(bool showSecrets);
+
+// Put the secret of the main or of the guest network.
+void SetApSecret(ApConf& conf, const std::string& secret);
+void SetGuestSecret(ApConf& conf, const std::string& secret);
+
+// Whether the main network's protection needs a secret that is not there.
+bool LacksSecret(const ApConf& conf);
+
+// Fails when the settings together make no access point.
+void RequireComplete(const ApConf& conf);
+
+#endif  // MERO_TOOLS_AP_SETTINGS_H

@@ -1,0 +1,166 @@
+// The library in this program's own words.
+#include "model/library.h"
+
+#include <search.h>
+#include <unistd.h>
+
+#include <cstddef>
+#include <cstdlib>
+#include <cstring>
+
+#include "work/library_log.h"
+
+namespace {
+
+// The head of a ring, and the end of its records.
+template <class Record>
+class Ring {
+ public:
+  Ring() : head_{&head_, &head_} {}
+  Ring(const Ring&) = delete;
+  Ring& operator=(const Ring&) = delete;
+  ~Ring() {
+    while (head_.q_forw != &head_) {
+      WIRELESS_LIST* node = head_.q_forw;
+      ::remque(node);
+      std::free(RecordOf(node));
+    }
+  }
+
+  WIRELESS_LIST* head() { return &head_; }
+
+  std::vector<Record> Records() {
+    std::vector<Record> records;
+    for (WIRELESS_LIST* node = head_.q_forw; node != &head_; node = node->q_forw) records.push_back(*RecordOf(node));
+    return records;
+  }
+
+ private:
+  static Record* RecordOf(WIRELESS_LIST* node) {
+    return reinterpret_cast<Record*>(reinterpret_cast<char*>(node) - offsetof(Record, list));
+  }
+
+  WIRELESS_LIST head_;
+};
+
+// A result and the records behind it, as bytes, and back.
+template <class Record>
+std::string Pack(int result, const std::vector<Record>& records) {
+  std::string bytes(reinterpret_cast<const char*>(&result), sizeof result);
+  return bytes.append(reinterpret_cast<const char*>(records.data()), records.size() * sizeof(Record));
+}
+
+template <class Record>
+int Unpack(const std::string& bytes, std::vector<Record>& records) {
+  int result = 0;
+  std::memcpy(&result, bytes.data(), sizeof result);
+  records.resize((bytes.size() - sizeof result) / sizeof(Record));
+  if (!records.empty()) std::memcpy(records.data(), bytes.data() + sizeof result, records.size() * sizeof(Record));
+  return result;
+}
+
+Failure ScanFailed() {
+  if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
+  if (library_log::Says("Failed to activate network interface")) {
+    return Failed("the adapter's interface cannot be brought up", "plug the adapter out and in, and try again");
+  }
+  return Failed("the adapter gave no scan results", "try again with --renew; -v shows what the library reports");
+}
+
+bool IsNamed(const Network& network, const std::string& name, const std::optional<Address>& address) {
+  return name == network.szEssid || (address && std::ranges::equal(*address, network.bssid));
+}
+
+// How a search ended: 1 found, 0 not, below 0 failed.
+struct Answer {
+  int result;
+  Network network;
+};
+
+// Searches the last results of the adapter, or a first scan's.
+Answer LookUp(const std::string& name, const std::optional<Address>& address) {
+  Answer found{};
+  found.result = MEROWirelessNetworkGet(name.c_str(), WIRELESS_FILTER_ESSID, &found.network);
+  if (found.result == 0 && address) {
+    // Six bytes, which the library takes as a pointer to text.
+    const auto* octets = reinterpret_cast<const char*>(address->data());
+    found.result = MEROWirelessNetworkGet(octets, WIRELESS_FILTER_BSSID, &found.network);
+  }
+  return found;
+}
+
+// Those results may be older than the network.
+Answer LookUpAfresh(const std::string& name, const std::optional<Address>& address) {
+  Ring<Network> ring;
+  if (MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, ring.head()) < 0) return {-1, {}};
+  return LookUp(name, address);
+}
+
+}  // namespace
+
+std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan) {
+  const std::string bytes = RunBytes(program.Doing("scanning"), [scan] {
+    Ring<Network> ring;
+    const int result = MEROWirelessNetworkScan(scan, ring.head());
+    return Pack(result, ring.Records());
+  });
+  std::vector<Network> networks;
+  if (Unpack(bytes, networks) < 0) throw ScanFailed();
+  return networks;
+}
+
+std::vector<KnownNetwork> Known(Order order) {
+  Ring<KnownNetwork> ring;
+  const auto list = order == Order::kByTime ? MEROWirelessConfEnumByAtime : MEROWirelessConfEnum;
+  if (list(ring.head()) < 0) {
+    throw Failed("the known networks cannot be read", "-v shows what the library reports");
+  }
+  return ring.Records();
+}
+
+Network FindInRange(const Program& program, const std::string& name) {
+  const std::optional<Address> address = ParseAddress(name);
+  const std::string shown = program.output.Name(name);
+  const auto answer = Run<Answer>(program.Doing("looking for " + shown), [&] {
+    const Answer found = LookUp(name, address);
+    return found.result != 0 ? found : LookUpAfresh(name, address);
+  });
+  if (answer.result < 0) throw ScanFailed();
+  if (answer.result == 0) {
+    throw Failure(Exit::kOutOfRange, "no network named " + shown + " is in range",
+                  "`merowireless scan --renew` shows those that are");
+  }
+  return answer.network;
+}
+
+std::vector<KnownNetwork> AllKnown(const std::string& name) {
+  std::vector<KnownNetwork> known = Known(Order::kByTime);
+  const std::optional<Address> address = ParseAddress(name);
+  std::erase_if(known, [&](const KnownNetwork& other) { return !IsNamed(other.network, name, address); });
+  return known;
+}
+
+std::optional<KnownNetwork> FindKnown(const std::string& name) {
+  const std::vector<KnownNetwork> known = AllKnown(name);
+  return known.empty() ? std::nullopt : std::optional(known.front());
+}
+
+void RequireAdapter() {
+  if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
+}
+
+void RequireRadio() {
+  const int answer = MEROWirelessCheckBlock();
+  if (answer == 1) return;
+  throw Failure(Exit::kRadioOff,
+                answer == 0 ? "the radio is switched off" : "nobody knows whether the radio may be used",
+                "`merowireless radio on` switches it on");
+}
+
+Failure NoAdapter() {
+  return {Exit::kNoAdapter, "no adapter is plugged in", "plug in a wireless USB adapter and try again"};
+}
+
+Failure Failed(const std::string& what, const std::string& advice) {
+  return {Exit::kFailed, what, ::geteuid() == 0 ? advice : "run it as root; -v shows what the library reports"};
+}

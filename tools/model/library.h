@@ -1,0 +1,67 @@
+// The library in this program's own words: rings as vectors, results as failures with sentences.
+#ifndef MERO_TOOLS_LIBRARY_H
+#define MERO_TOOLS_LIBRARY_H
+
+#include <algorithm>
+#include <iterator>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "app/run.h"
+#include "platform.h"
+#include "wireless.h"
+
+using Network = WIRELESS_NETWORK;
+using KnownNetwork = WIRELESS_NETWORK_CONFIG;
+
+enum class Order { kAsSaved, kByTime };
+
+// The networks in range.
+std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan);
+
+// The networks that have been saved.
+std::vector<KnownNetwork> Known(Order order);
+
+// A network in range, by its name or the address of its access point; fails when there is none.
+Network FindInRange(const Program& program, const std::string& name);
+
+// The network that was saved last under a name or an address.
+std::optional<KnownNetwork> FindKnown(const std::string& name);
+
+// All known networks of a name or an address, the one saved last first.
+std::vector<KnownNetwork> AllKnown(const std::string& name);
+
+// Fails when there is no adapter.
+void RequireAdapter();
+
+// Fails when the user has switched the radio off, or nobody knows.
+void RequireRadio();
+
+// What became of a call that went wrong, when the library says that it was the adapter.
+Failure NoAdapter();
+
+// The failure of a call for which the library gave no reason of interest; what it reported follows on request. Who is
+// not root is told to be.
+Failure Failed(const std::string& what, const std::string& advice = "-v shows what the library reports");
+
+// Copies a text that must fit; what it is called is for the failure.
+template <std::size_t kSize>
+void SetText(char (&field)[kSize], std::string_view text, std::string_view what) {
+  if (text.size() >= kSize || text.find('\n') != text.npos || text.find('\0') != text.npos || text.ends_with('\r')) {
+    throw Failure(Exit::kUsage, std::string(what) + " cannot be used",
+                  "give one line of up to " + std::to_string(kSize - 1) + " bytes");
+  }
+  *std::copy(text.begin(), text.end(), std::begin(field)) = '\0';
+}
+
+// A network's name is 1 to 32 bytes on the air.
+template <std::size_t kSize>
+void SetNetworkName(char (&field)[kSize], std::string_view name, const std::string& what = "the name") {
+  constexpr std::size_t kLongest = 32;
+  if (name.empty() || name.size() > kLongest) throw Wrong(what + " cannot be this", "give 1 to 32 bytes");
+  SetText(field, name, what);
+}
+
+#endif  // MERO_TOOLS_LIBRARY_H

@@ -1,0 +1,132 @@
+// What is known about the connection at this moment.
+#include "model/status.h"
+
+#include <arpa/inet.h>
+#include <ifaddrs.h>
+
+#include <algorithm>
+#include <memory>
+
+#include "model/security.h"
+#include "platform.h"
+
+namespace {
+
+struct State {
+  const char* szKey;
+  const char* szText;
+  WIRELESS_STATUS value;
+  Tone tone;
+};
+
+constexpr State kStates[] = {
+    {"unknown", "unknown", WIRELESS_STATUS_UNKNOWN, Tone::kBad},
+    {"not-supported", "the adapter's driver cannot tell", WIRELESS_STATUS_NOT_SUPPORTED, Tone::kBad},
+    {"no-adapter", "no adapter is plugged in", WIRELESS_STATUS_NO_ADAPTER, Tone::kBad},
+    {"down", "not connected (the interface is down)", WIRELESS_STATUS_DOWN, Tone::kFair},
+    {"disconnected", "not connected", WIRELESS_STATUS_DISCONNECTED, Tone::kFair},
+    {"connected", "connected", WIRELESS_STATUS_CONNECTED_MANAGED, Tone::kGood},
+    {"connected-adhoc", "connected to an ad-hoc cell", WIRELESS_STATUS_CONNECTED_ADHOC, Tone::kGood},
+    {"monitor", "monitoring", WIRELESS_STATUS_MONITOR, Tone::kFair},
+};
+
+// For the library it has no connection whose state could be known.
+constexpr State kAccessPoint = {"access-point", "an access point (see `merowireless ap status`)",
+                                WIRELESS_STATUS_UNKNOWN, Tone::kGood};
+
+const State& StateOf(const Status& status) {
+  if (status.isAccessPoint) return kAccessPoint;
+  const auto* found = std::ranges::find(kStates, status.state, &State::value);
+  return found != std::end(kStates) ? *found : kStates[0];
+}
+
+const char* RadioText(const Status& status) {
+  return status.radio == 1 ? "on" : status.radio == 0 ? "off" : "unknown";
+}
+
+Value AuthOf(const Status& status) {
+  return status.isConnected() ? Value(MEROWirelessAuthStringGet(status.auth)) : nullptr;
+}
+
+Shown ShowAuth(const Status& status, bool) {
+  if (!status.isConnected()) return {"-", Tone::kFaint};
+  return {SecurityText(status.auth, WIRELESS_ENCRYPT_UNKNOWN)};
+}
+
+Value StandardOf(const Status& status) {
+  return status.isConnected() ? Value(MEROWirelessProtocolStringGet(status.protocol)) : nullptr;
+}
+
+// A network that is joined as it was saved: no scan has told its standard.
+Shown ShowStandard(const Status& status, bool) {
+  if (!status.isConnected() || status.protocol == WIRELESS_PROTO_UNKNOWN) return {"-", Tone::kFaint};
+  return {MEROWirelessProtocolStringGet(status.protocol)};
+}
+
+constexpr Field<Status> kStatusFields[] = {
+    {"state", "status", [](const Status& of) { return Value(StateOf(of).szKey); }, Layout::kLeft,
+     [](const Status& of, bool) {
+       return Shown{StateOf(of).szText, StateOf(of).tone};
+     }},
+    {"name", "network", [](const Status& of) { return of.isConnected() ? Value(of.name) : nullptr; }},
+    {"auth", "security", AuthOf, Layout::kLeft, ShowAuth},
+    {"standard", "standard", StandardOf, Layout::kLeft, ShowStandard},
+    {"mode", "",
+     [](const Status& of) { return of.isConnected() ? Value(MEROWirelessOpmodeStringGet(of.mode)) : nullptr; }},
+    {"interface", "interface", [](const Status& of) { return Value(of.interface); }},
+    {"ip", "address", [](const Status& of) { return of.ip.empty() ? nullptr : Value(of.ip); }},
+    {"mask", "netmask", [](const Status& of) { return of.mask.empty() ? nullptr : Value(of.mask); }},
+    {"radio", "radio", [](const Status& of) { return Value(RadioText(of)); }},
+    {"name_hex", "", [](const Status& of) { return IsUtf8(of.name) ? Value(nullptr) : Value(Hex(of.name)); }},
+};
+
+std::string DottedText(const sockaddr* address) {
+  char szText[INET_ADDRSTRLEN] = "";
+  if (address == nullptr) return szText;
+  ::inet_ntop(AF_INET, &reinterpret_cast<const sockaddr_in*>(address)->sin_addr, szText, sizeof szText);
+  return szText;
+}
+
+void ReadAddress(Status& status) {
+  ifaddrs* first = nullptr;
+  if (::getifaddrs(&first) < 0) return;  // then none is known
+  const std::unique_ptr<ifaddrs, void (*)(ifaddrs*)> list(first, ::freeifaddrs);
+  for (const ifaddrs* each = first; each != nullptr; each = each->ifa_next) {
+    if (each->ifa_addr == nullptr || each->ifa_addr->sa_family != AF_INET || status.interface != each->ifa_name)
+      continue;
+    status.ip = DottedText(each->ifa_addr);
+    status.mask = DottedText(each->ifa_netmask);
+    return;
+  }
+}
+
+// One answer about the connection, unless there is none.
+template <class Answer>
+void Ask(WIRELESS_REQUEST request, Answer WIRELESS_INFO::*member, Answer& answer) {
+  WIRELESS_INFO info{};
+  if (MEROWirelessCurInfoGet(request, &info) == 0) answer = info.*member;
+}
+
+}  // namespace
+
+Status ReadStatus() {
+  Status status;
+  status.state = MEROWirelessConnStatusGet();
+  status.interface = MEROWirelessInterfaceGet();
+  status.radio = MEROWirelessCheckBlock();
+  ReadAddress(status);
+  if (status.state == WIRELESS_STATUS_UNKNOWN) Ask(REQUEST_MODE, &WIRELESS_INFO::opmode, status.mode);
+  status.isAccessPoint = status.mode == WIRELESS_OPMODE_MASTER;
+  if (!status.isConnected()) return status;
+
+  WIRELESS_INFO info{};
+  if (MEROWirelessCurInfoGet(REQUEST_ESSID, &info) == 0) status.name = info.szEssid;
+  Ask(REQUEST_AUTH, &WIRELESS_INFO::auth, status.auth);
+  Ask(REQUEST_PROTOCOL, &WIRELESS_INFO::protocol, status.protocol);
+  Ask(REQUEST_MODE, &WIRELESS_INFO::opmode, status.mode);
+  return status;
+}
+
+std::span<const Field<Status>> StatusFields() {
+  return kStatusFields;
+}

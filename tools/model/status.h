@@ -1,0 +1,33 @@
+// What is known about the connection at this moment.
+#ifndef MERO_TOOLS_STATUS_H
+#define MERO_TOOLS_STATUS_H
+
+#include <span>
+#include <string>
+
+#include "show/output.h"
+#include "wireless.h"
+
+struct Status {
+  WIRELESS_STATUS state = WIRELESS_STATUS_UNKNOWN;
+  std::string interface;
+  std::string name;  // what follows is empty or unknown unless there is a connection
+  WIRELESS_AUTH auth = WIRELESS_AUTH_UNKNOWN;
+  WIRELESS_PROTOCOL protocol = WIRELESS_PROTO_UNKNOWN;
+  WIRELESS_OPMODE mode = WIRELESS_OPMODE_UNKNOWN;
+  std::string ip;  // also without a connection
+  std::string mask;
+  int radio = -1;
+  bool isAccessPoint = false;
+
+  bool operator==(const Status&) const = default;
+  bool isConnected() const {
+    return state == WIRELESS_STATUS_CONNECTED_MANAGED || state == WIRELESS_STATUS_CONNECTED_ADHOC;
+  }
+};
+
+Status ReadStatus();
+
+std::span<const Field<Status>> StatusFields();
+
+#endif  // MERO_TOOLS_STATUS_H

@@ -1,0 +1,230 @@
+// The three forms of the program's output, all from the same records: tables for people, JSON, and one record a line.
+#include "show/output.h"
+
+#include <algorithm>
+#include <nlohmann/json.hpp>
+#include <numeric>
+
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+template <class... Functions>
+struct Overloaded : Functions... {
+  using Functions::operator()...;
+};
+template <class... Functions>
+Overloaded(Functions...) -> Overloaded<Functions...>;
+
+void Put(std::string_view text) {
+  std::fwrite(text.data(), 1, text.size(), stdout);
+}
+
+// ---- JSON: one document a line ----
+
+Json JsonOf(const Value& value) {
+  return std::visit([](const auto& held) { return Json(held); }, value);
+}
+
+Json JsonOf(const Table& table, std::size_t row) {
+  Json record = Json::object();
+  for (std::size_t i = 0; i < table.columns.size(); ++i) {
+    record[std::string(table.columns[i].key)] = JsonOf(table.rows[row][i].value);
+  }
+  return record;
+}
+
+// A code of UTF-16, as JSON writes it out.
+std::string WrittenOut(char32_t code) {
+  char szCode[sizeof "\\u001b"];
+  std::snprintf(szCode, sizeof szCode, "\\u%04x", static_cast<unsigned int>(code & 0xFFFF));
+  return szCode;
+}
+
+// Only within strings can a document hold what is not shown.
+std::string InDocument(const Character& character) {
+  constexpr char32_t kPairs = 0x10000;
+  if (character.shown) return std::string(character.bytes);
+  if (character.code < kPairs) return WrittenOut(character.code);
+  const char32_t code = character.code - kPairs;
+  return WrittenOut(0xD800 + (code >> 10)) + WrittenOut(0xDC00 + (code & 0x3FF));
+}
+
+// Names are bytes: what is no UTF-8 in them is replaced, and stands in full in a field of its own.
+void PutDocument(const Json& document, bool utf8) {
+  Put(Rewritten(document.dump(-1, ' ', false, Json::error_handler_t::replace), utf8, InDocument) + "\n");
+}
+
+// ---- Porcelain: one record a line, its fields between tabs ----
+
+// As the %b of printf reads it.
+std::string InLine(const Character& character) {
+  if (character.bytes == "\t") return "\\t";
+  if (character.bytes == "\n") return "\\n";
+  if (character.bytes == "\\") return "\\\\";
+  if (character.shown) return std::string(character.bytes);
+  std::string octal;
+  for (char byte : character.bytes) {
+    char szByte[sizeof "\\0033"];
+    std::snprintf(szByte, sizeof szByte, "\\0%03o", static_cast<unsigned int>(static_cast<unsigned char>(byte)));
+    octal += szByte;
+  }
+  return octal;
+}
+
+std::string LineOf(const Value& value, bool utf8) {
+  return std::visit(Overloaded{[](std::nullptr_t) { return std::string(); },
+                               [](bool held) { return std::string(held ? "yes" : "no"); },
+                               [](std::int64_t held) { return std::to_string(held); },
+                               [=](const std::string& held) { return Rewritten(held, utf8, InLine); }},
+                    value);
+}
+
+void PutLines(const Table& table, bool utf8) {
+  for (const auto& row : table.rows) {
+    for (std::size_t i = 0; i < row.size(); ++i) {
+      if (i > 0) Put("\t");
+      Put(LineOf(row[i].value, utf8));
+    }
+    Put("\n");
+  }
+}
+
+// ---- People ----
+
+constexpr std::size_t kGap = 2;
+
+std::string_view ColourOf(Tone tone) {
+  switch (tone) {
+    case Tone::kPlain:
+      return "";
+    case Tone::kGood:
+      return "\x1b[32m";
+    case Tone::kFair:
+      return "\x1b[33m";
+    case Tone::kBad:
+      return "\x1b[31m";
+    case Tone::kFaint:
+      return "\x1b[2m";
+  }
+  return "";
+}
+
+// The columns that people are not shown go.
+void LeaveWhatIsShown(Table& table) {
+  for (std::size_t i = table.columns.size(); i-- > 0;) {
+    if (!table.columns[i].title.empty()) continue;
+    const auto offset = static_cast<std::ptrdiff_t>(i);
+    table.columns.erase(table.columns.begin() + offset);
+    for (auto& row : table.rows) row.erase(row.begin() + offset);
+  }
+}
+
+std::vector<std::size_t> WidthsOf(const Table& table, bool utf8) {
+  std::vector<std::size_t> widths;
+  for (std::size_t i = 0; i < table.columns.size(); ++i) {
+    std::size_t width = table.columns[i].title.size();
+    for (const auto& row : table.rows) width = std::max(width, WidthOf(row[i].shown.text, utf8));
+    widths.push_back(width);
+  }
+  return widths;
+}
+
+// Takes from the elastic columns what a table is too wide.
+void Squeeze(const Table& table, std::vector<std::size_t>& widths, std::size_t room) {
+  const std::size_t total = std::accumulate(widths.begin(), widths.end(), kGap * (widths.size() - 1));
+  if (room == 0 || total <= room) return;
+  std::size_t excess = total - room;
+  for (std::size_t i = 0; i < widths.size(); ++i) {
+    if (table.columns[i].layout != Layout::kElastic) continue;
+    const std::size_t taken = std::min(excess, widths[i] - std::min(widths[i], table.columns[i].title.size()));
+    widths[i] -= taken;
+    excess -= taken;
+  }
+}
+
+}  // namespace
+
+Shown Output::Show(const Value& value) const {
+  return std::visit(Overloaded{[](std::nullptr_t) {
+                                 return Shown{"-", Tone::kFaint};
+                               },
+                               [](bool held) { return Shown{held ? "yes" : "no"}; },
+                               [](std::int64_t held) { return Shown{std::to_string(held)}; },
+                               [&](const std::string& held) {
+                                 return held.empty() ? Shown{"-", Tone::kFaint} : Shown{Harmless(held, terminal_.utf8)};
+                               }},
+                    value);
+}
+
+void Output::Put(const Shown& shown, std::size_t width, Layout layout, bool last) const {
+  const std::string text = CutToWidth(shown.text, width, terminal_.utf8);
+  const std::string blanks(width - std::min(width, WidthOf(text, terminal_.utf8)), ' ');
+  const std::string_view colour = terminal_.colour ? ColourOf(shown.tone) : "";
+  if (layout == Layout::kRight) ::Put(blanks);
+  ::Put(colour);
+  ::Put(text);
+  if (!colour.empty()) ::Put("\x1b[0m");
+  if (last) return;
+  if (layout != Layout::kRight) ::Put(blanks);
+  ::Put(std::string(kGap, ' '));
+}
+
+void Output::WriteColumns(const Table& table) const {
+  std::vector<std::size_t> widths = WidthsOf(table, terminal_.utf8);
+  Squeeze(table, widths, terminal_.width);
+  const std::size_t last = table.columns.size() - 1;
+  for (std::size_t i = 0; i <= last; ++i) {
+    Put({std::string(table.columns[i].title), Tone::kFaint}, widths[i], table.columns[i].layout, i == last);
+  }
+  ::Put("\n");
+  for (const auto& row : table.rows) {
+    for (std::size_t i = 0; i <= last; ++i) Put(row[i].shown, widths[i], table.columns[i].layout, i == last);
+    ::Put("\n");
+  }
+}
+
+void Output::WritePairs(const Table& table) const {
+  std::size_t width = 0;
+  for (const Column& column : table.columns) width = std::max(width, column.title.size());
+  for (std::size_t i = 0; i < table.columns.size(); ++i) {
+    const Shown& shown = table.rows.front()[i].shown;
+    Put({std::string(table.columns[i].title), Tone::kFaint}, width, Layout::kLeft, false);
+    Put(shown, WidthOf(shown.text, terminal_.utf8), Layout::kLeft, true);
+    ::Put("\n");
+  }
+}
+
+void Output::WriteList(std::string_view name, Table table, std::string_view none) const {
+  if (form_ == Form::kPorcelain) return PutLines(table, MachinesSeeUtf8());
+  if (form_ == Form::kJson) {
+    Json records = Json::array();
+    for (std::size_t row = 0; row < table.rows.size(); ++row) records.push_back(JsonOf(table, row));
+    return PutDocument({{"result", "ok"}, {std::string(name), records}}, MachinesSeeUtf8());
+  }
+  if (table.rows.empty()) return Done(std::string(none));
+  LeaveWhatIsShown(table);
+  WriteColumns(table);
+}
+
+void Output::WriteOne(std::string_view name, Table table) const {
+  if (form_ == Form::kPorcelain) return PutLines(table, MachinesSeeUtf8());
+  if (form_ == Form::kJson)
+    return PutDocument({{"result", "ok"}, {std::string(name), JsonOf(table, 0)}}, MachinesSeeUtf8());
+  LeaveWhatIsShown(table);
+  WritePairs(table);
+}
+
+void Output::Done(const std::string& sentence) const {
+  if (form_ == Form::kHuman) ::Put(sentence + "\n");
+  if (form_ == Form::kJson) PutDocument({{"result", "ok"}}, MachinesSeeUtf8());
+}
+
+void Output::Failed(const Failure& failure) const {
+  if (form_ != Form::kJson) return;
+  PutDocument({{"result", "failed"},
+               {"code", static_cast<int>(failure.exit())},
+               {"error", failure.what()},
+               {"advice", failure.advice()}},
+              MachinesSeeUtf8());
+}

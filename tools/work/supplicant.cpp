@@ -1,0 +1,93 @@
+// What the supplicant says about a join that is under way.
+#include "work/supplicant.h"
+
+#include <sys/socket.h>
+#include <sys/un.h>
+
+#include <algorithm>
+#include <cstring>
+
+namespace {
+
+// An event tells something by how it begins and ends; names from the air stand between.
+struct Clue {
+  std::string_view start;
+  std::string_view end;
+  Verdict verdict;
+};
+
+constexpr Clue kClues[] = {
+    {"CTRL-EVENT-SSID-TEMP-DISABLED", "reason=WRONG_KEY", Verdict::kSecretRefused},
+    {"WPA: 4-Way Handshake failed", "pre-shared key may be incorrect", Verdict::kSecretRefused},
+    {"CTRL-EVENT-EAP-FAILURE", "", Verdict::kSecretRefused},
+    {"CTRL-EVENT-AUTH-REJECT", "status_code=15", Verdict::kSecretRefused},  // it failed WEP's challenge
+    {"CTRL-EVENT-AUTH-REJECT", "", Verdict::kRefused},
+    {"CTRL-EVENT-ASSOC-REJECT", "", Verdict::kRefused},
+    {"CTRL-EVENT-NETWORK-NOT-FOUND", "", Verdict::kNotFound},
+};
+
+constexpr std::string_view kLeaving = "CTRL-EVENT-TERMINATING";
+
+// An event without how much it matters, such as "<3>".
+std::string_view WithoutLevel(std::string_view event) {
+  if (event.starts_with('<')) event.remove_prefix(std::min(event.find('>'), event.size() - 1) + 1);
+  return event;
+}
+
+bool Send(int fd, std::string_view request) {
+  return ::send(fd, request.data(), request.size(), MSG_DONTWAIT | MSG_NOSIGNAL) ==
+         static_cast<ssize_t>(request.size());
+}
+
+}  // namespace
+
+Verdict VerdictOf(std::string_view event) {
+  event = WithoutLevel(event);
+  while (event.ends_with(' ')) event.remove_suffix(1);
+  for (const auto& [start, end, verdict] : kClues) {
+    if (event.starts_with(start) && event.ends_with(end)) return verdict;
+  }
+  return Verdict::kNone;
+}
+
+SupplicantListener::SupplicantListener(std::string path) : path_(std::move(path)) {}
+
+// The answers come to an address that the kernel makes up, so that no file is left behind.
+bool SupplicantListener::Attach() {
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  if (path_.size() >= sizeof address.sun_path) return false;
+  std::copy(path_.begin(), path_.end(), address.sun_path);
+
+  socket_ = Descriptor(Require(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0), "socket"));
+  const auto* any = reinterpret_cast<const sockaddr*>(&address);
+  return ::bind(socket_.get(), any, sizeof address.sun_family) == 0 &&
+         ::connect(socket_.get(), any, sizeof address) == 0 && Send(socket_.get(), "ATTACH");
+}
+
+void SupplicantListener::Tick() {
+  constexpr std::chrono::seconds kPatience{1};
+  const auto now = std::chrono::steady_clock::now();
+  if (!socket_) {
+    lastAsked_ = now;
+    if (!Attach()) socket_.Close();
+    return;
+  }
+  if (now - lastAsked_ < kPatience) return;
+  lastAsked_ = now;
+  if (!Send(socket_.get(), "PING") && errno != EAGAIN) socket_.Close();
+}
+
+void SupplicantListener::Receive() {
+  char event[4096];
+  while (socket_) {
+    const ssize_t size = ::recv(socket_.get(), event, sizeof event, 0);
+    if (size < 0) {
+      if (errno != EAGAIN && errno != EINTR) socket_.Close();
+      return;
+    }
+    const std::string_view text(event, static_cast<std::size_t>(size));
+    verdict_ = std::max(verdict_, VerdictOf(text));
+    if (WithoutLevel(text).starts_with(kLeaving)) socket_.Close();
+  }
+}

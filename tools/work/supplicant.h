@@ -1,0 +1,47 @@
+// What the supplicant says about a join that is under way.
+#ifndef MERO_TOOLS_SUPPLICANT_H
+#define MERO_TOOLS_SUPPLICANT_H
+
+#include <chrono>
+#include <string>
+#include <string_view>
+
+#include "base/descriptor.h"
+
+// Why a join came to nothing, the more telling the greater.
+enum class Verdict {
+  kNone,
+  kNotFound,      // no such network in range
+  kRefused,       // the access point would not have this station
+  kSecretRefused  // it would not have this secret
+};
+
+// The verdict of one event, such as "<3>CTRL-EVENT-NETWORK-NOT-FOUND".
+Verdict VerdictOf(std::string_view event);
+
+// Listens to the control socket of the supplicant, which may come, go and come again while it is listened to.
+class SupplicantListener {
+ public:
+  explicit SupplicantListener(std::string path);
+
+  // To be waited for; -1 as long as there is no supplicant. Readable when Receive() has something to do.
+  int fd() const { return socket_.get(); }
+
+  // Finds the supplicant, and finds out that it is gone. To be called a few times a second.
+  void Tick();
+
+  void Receive();
+
+  // The most telling one so far.
+  Verdict verdict() const { return verdict_; }
+
+ private:
+  bool Attach();
+
+  std::string path_;
+  Descriptor socket_;
+  std::chrono::steady_clock::time_point lastAsked_;
+  Verdict verdict_ = Verdict::kNone;
+};
+
+#endif  // MERO_TOOLS_SUPPLICANT_H
