@@ -5,9 +5,9 @@
 #include <cstdio>
 #include <nlohmann/json.hpp>
 
-#include "app/run.h"
 #include "base/text.h"
 #include "running.h"
+#include "app/run.h"
 
 using library::Network;
 using testing::HasSubstr;

@@ -5,8 +5,8 @@
 #include <functional>
 #include <string>
 
-#include "app/run.h"
 #include "show/output.h"
+#include "work/program.h"
 
 struct Options {
   Form form = Form::kHuman;

@@ -1,22 +1,8 @@
-// What every command is given.
-#ifndef MERO_TOOLS_PROGRAM_H
-#define MERO_TOOLS_PROGRAM_H
-
-#include <string>
-
-#include "base/terminal.h"
-#include "show/output.h"
-#include "work/worker.h"
-
-struct Program {
-  Output output;
-  Terminal errors;
-  bool verbose = false;
-
-  Task Doing(std::string what) const { return {.errors = errors, .verbose = verbose, .doing = std::move(what)}; }
-};
+// From a command line to an exit status.
+#ifndef MERO_TOOLS_RUN_H
+#define MERO_TOOLS_RUN_H
 
 // Runs the program. Gives its exit status.
 int RunProgram(int argc, const char* const* argv);
 
-#endif  // MERO_TOOLS_PROGRAM_H
+#endif  // MERO_TOOLS_RUN_H

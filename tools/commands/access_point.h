@@ -5,8 +5,8 @@
 #include <map>
 #include <string>
 
-#include "app/run.h"
 #include "model/secrets.h"
+#include "work/program.h"
 
 struct ApChanges {
   std::map<std::string, std::string> settings;  // by option, as ApSettings() has them

@@ -1,10 +1,10 @@
 // The commands about the adapter as a whole: radio, mode.
-#ifndef MERO_TOOLS_RADIO_H
-#define MERO_TOOLS_RADIO_H
+#ifndef MERO_TOOLS_ADAPTER_H
+#define MERO_TOOLS_ADAPTER_H
 
 #include <string>
 
-#include "app/run.h"
+#include "work/program.h"
 
 void ShowRadio(const Program& program);
 
@@ -17,4 +17,4 @@ void ChangeMode(const Program& program, const std::string& mode);
 // The settings section of the adapter that is plugged in; fails when it has not been announced.
 std::string AdapterModel();
 
-#endif  // MERO_TOOLS_RADIO_H
+#endif  // MERO_TOOLS_ADAPTER_H

@@ -4,8 +4,8 @@
 
 #include <string>
 
-#include "app/run.h"
 #include "model/library.h"
+#include "work/program.h"
 #include "work/worker.h"
 
 // How a network is to be addressed: "DHCP", or an address with its mask, or "none".

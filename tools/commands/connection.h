@@ -4,8 +4,8 @@
 
 #include <string>
 
-#include "app/run.h"
 #include "model/secrets.h"
+#include "work/program.h"
 
 struct NetworkToJoin {
   std::string name;  // or the address of its access point

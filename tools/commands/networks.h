@@ -4,10 +4,10 @@
 
 #include <string>
 
-#include "app/run.h"
 #include "commands/addressing.h"
 #include "model/secrets.h"
 #include "wireless.h"
+#include "work/program.h"
 
 struct NetworkToSave {
   std::string name;  // or the address of its access point

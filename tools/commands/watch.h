@@ -2,7 +2,7 @@
 #ifndef MERO_TOOLS_WATCH_H
 #define MERO_TOOLS_WATCH_H
 
-#include "app/run.h"
+#include "work/program.h"
 
 // Shows the status now and whenever it has changed, `times` times or, with 0, until the program is ended or nobody
 // reads on.

@@ -9,9 +9,9 @@
 #include <string_view>
 #include <vector>
 
-#include "app/run.h"
 #include "platform.h"
 #include "wireless.h"
+#include "work/program.h"
 
 using Network = WIRELESS_NETWORK;
 using KnownNetwork = WIRELESS_NETWORK_CONFIG;
