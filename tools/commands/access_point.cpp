@@ -4,7 +4,6 @@
 #include <algorithm>
 
 #include "base/signals.h"
-#include "commands/adapter.h"
 #include "model/ap_settings.h"
 #include "model/library.h"
 #include "model/paths.h"

@@ -23,24 +23,11 @@ constexpr Field<Radio> kRadioFields[] = {
     {"adapter", "adapter", [](const Radio& of) { return of.model.empty() ? nullptr : Value(of.model); }},
 };
 
-std::string ModelOrNone() {
-  char szModel[1024];
-  return MEROWirelessApConfigSecNameGet(szModel, sizeof szModel) == TRUE ? szModel : "";
-}
-
 Radio ReadRadio() {
-  return {MEROWirelessCheckBlock(), ModelOrNone()};
+  return {MEROWirelessCheckBlock(), AdapterModelOrNone()};
 }
 
 }  // namespace
-
-std::string AdapterModel() {
-  std::string model = ModelOrNone();
-  if (!model.empty()) return model;
-  if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
-  throw Failed("the adapter has not been announced",
-               "plug the adapter out and in, so that /tmp/wireless.info is written");
-}
 
 void ShowRadio(const Program& program) {
   program.output.One<Radio>("radio", kRadioFields, ReadRadio());

@@ -14,7 +14,4 @@ void SwitchRadio(const Program& program, const std::string& state);
 // "ap" or "client".
 void ChangeMode(const Program& program, const std::string& mode);
 
-// The settings section of the adapter that is plugged in; fails when it has not been announced.
-std::string AdapterModel();
-
 #endif  // MERO_TOOLS_ADAPTER_H

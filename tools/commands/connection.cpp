@@ -5,8 +5,7 @@
 #include <optional>
 #include <thread>
 
-#include "commands/addressing.h"
-#include "commands/networks.h"
+#include "model/addressing.h"
 #include "model/library.h"
 #include "model/paths.h"
 #include "model/security.h"

@@ -154,18 +154,3 @@ void Forget(const Program& program, const std::string& name) {
   }
   program.output.ListDone<KnownNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
 }
-
-void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const SecretSource& source) {
-  const std::string name = program.output.Name(config.network.szEssid);
-  if (!NeedsSecret(config.network.auth)) {
-    if (source.isGiven()) throw Failure(Exit::kUsage, name + " is open and takes no secret", "give none");
-    return;
-  }
-  const auto secret = ReadSecret(source, "secret of " + name);
-  if (!secret) {
-    throw Failure(Exit::kUsage, name + " needs a secret, and there is no terminal to ask on",
-                  "give it with --key-file or --key-stdin");
-  }
-  RequireSecretFor(config.network.auth, *secret);
-  SetText(config.szKey, *secret, "the secret");
-}

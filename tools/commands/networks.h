@@ -4,7 +4,7 @@
 
 #include <string>
 
-#include "commands/addressing.h"
+#include "model/addressing.h"
 #include "model/secrets.h"
 #include "wireless.h"
 #include "work/program.h"
@@ -23,8 +23,5 @@ void Save(const Program& program, const NetworkToSave& wanted);
 
 // Forgets every known network of a name, or the one of an access point's address.
 void Forget(const Program& program, const std::string& name);
-
-// Puts a secret into a network that needs one; from a prompt when no source is given.
-void SetSecret(const Program& program, WIRELESS_NETWORK_CONFIG& config, const SecretSource& source);
 
 #endif  // MERO_TOOLS_NETWORKS_H

@@ -157,6 +157,19 @@ void RequireRadio() {
                 "`merowireless radio on` switches it on");
 }
 
+std::string AdapterModelOrNone() {
+  char szModel[1024];
+  return MEROWirelessApConfigSecNameGet(szModel, sizeof szModel) == TRUE ? szModel : "";
+}
+
+std::string AdapterModel() {
+  std::string model = AdapterModelOrNone();
+  if (!model.empty()) return model;
+  if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
+  throw Failed("the adapter has not been announced",
+               "plug the adapter out and in, so that /tmp/wireless.info is written");
+}
+
 Failure NoAdapter() {
   return {Exit::kNoAdapter, "no adapter is plugged in", "plug in a wireless USB adapter and try again"};
 }

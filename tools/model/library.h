@@ -39,6 +39,12 @@ void RequireAdapter();
 // Fails when the user has switched the radio off, or nobody knows.
 void RequireRadio();
 
+// The settings section of the adapter that is plugged in, or nothing when none has been announced.
+std::string AdapterModelOrNone();
+
+// The same; fails when there is none.
+std::string AdapterModel();
+
 // What became of a call that went wrong, when the library says that it was the adapter.
 Failure NoAdapter();
 

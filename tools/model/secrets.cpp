@@ -10,6 +10,7 @@
 #include "base/descriptor.h"
 #include "base/failure.h"
 #include "base/signals.h"
+#include "model/security.h"
 
 namespace {
 
@@ -113,4 +114,19 @@ std::optional<std::string> ReadSecret(const SecretSource& source, const std::str
   const Descriptor terminal(::open("/dev/tty", O_RDWR | O_CLOEXEC));
   if (!terminal) return std::nullopt;
   return Prompt(terminal.get(), prompt);
+}
+
+void SetSecret(const Program& program, KnownNetwork& config, const SecretSource& source) {
+  const std::string name = program.output.Name(config.network.szEssid);
+  if (!NeedsSecret(config.network.auth)) {
+    if (source.isGiven()) throw Failure(Exit::kUsage, name + " is open and takes no secret", "give none");
+    return;
+  }
+  const auto secret = ReadSecret(source, "secret of " + name);
+  if (!secret) {
+    throw Failure(Exit::kUsage, name + " needs a secret, and there is no terminal to ask on",
+                  "give it with --key-file or --key-stdin");
+  }
+  RequireSecretFor(config.network.auth, *secret);
+  SetText(config.szKey, *secret, "the secret");
 }

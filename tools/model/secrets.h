@@ -5,6 +5,9 @@
 #include <optional>
 #include <string>
 
+#include "model/library.h"
+#include "work/program.h"
+
 struct SecretSource {
   std::string file;
   bool standardInput = false;
@@ -15,5 +18,8 @@ struct SecretSource {
 // The secret from its source, or from the terminal by a prompt; nothing when there is neither. One line end behind it
 // is no part of it.
 std::optional<std::string> ReadSecret(const SecretSource& source, const std::string& prompt);
+
+// Puts a secret into a network that needs one; from a prompt when no source is given.
+void SetSecret(const Program& program, KnownNetwork& config, const SecretSource& source);
 
 #endif  // MERO_TOOLS_SECRETS_H

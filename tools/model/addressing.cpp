@@ -1,0 +1,91 @@
+// How a network is addressed, and the address and gateway that the interface is given.
+#include "model/addressing.h"
+
+#include <arpa/inet.h>
+#include <net/if.h>
+
+#include <cstdio>
+#include <fstream>
+#include <string_view>
+
+#include "base/text.h"
+#include "work/library_log.h"
+
+namespace {
+
+bool IsDhcp(const KnownNetwork& config) {
+  return std::string_view(config.szIp) == "DHCP";
+}
+
+void RequireStatic(const Addressing& addressing) {
+  if (!IsIpAddress(addressing.ip)) {
+    throw Wrong("this is no IPv4 address: " + Harmless(addressing.ip, false),
+                "give DHCP or an address such as 192.168.1.20");
+  }
+  if (!IsNetmask(addressing.mask)) {
+    throw Wrong("a static address needs its netmask", "add --mask, such as 255.255.255.0");
+  }
+}
+
+// The kernel's table has addresses as they are in memory, and is headed by a line of titles.
+bool HasDefaultRoute(const std::string& gateway) {
+  in_addr wanted{};
+  ::inet_pton(AF_INET, gateway.c_str(), &wanted);
+  std::ifstream routes("/proc/net/route");
+  for (std::string line; std::getline(routes, line);) {
+    char szInterface[IFNAMSIZ];
+    unsigned int destination, via, mask;
+    if (std::sscanf(line.c_str(), "%15s %x %x %*x %*d %*d %*d %x", szInterface, &destination, &via, &mask) != 4)
+      continue;
+    const bool isDefault = destination == 0 && mask == 0;
+    if (isDefault && via == wanted.s_addr && szInterface == std::string_view(MEROWirelessInterfaceGet())) return true;
+  }
+  return false;
+}
+
+}  // namespace
+
+void RequireGateway(const std::string& gateway) {
+  if (!IsIpAddress(gateway)) throw Wrong("the gateway is no IPv4 address", "give an address such as 192.168.1.1");
+}
+
+void SetAddressing(KnownNetwork& config, const Addressing& addressing) {
+  if (addressing.ip != "DHCP" && addressing.ip != "none") {
+    RequireStatic(addressing);
+  } else if (!addressing.mask.empty() || !addressing.gateway.empty()) {
+    throw Wrong("only a static address has a netmask and a gateway of its own", "add --ip A.B.C.D");
+  }
+  if (!addressing.gateway.empty()) RequireGateway(addressing.gateway);
+  SetText(config.szIp, addressing.ip == "none" ? "" : addressing.ip, "the address");
+  SetText(config.szMask, addressing.mask, "the netmask");
+  SetText(config.szGateway, addressing.gateway, "the gateway");
+}
+
+Task SettingAddress(const Program& program, const KnownNetwork& config) {
+  return program.Doing(IsDhcp(config) ? "asking for an address" : "setting the address");
+}
+
+void RequireLease() {
+  if (!library_log::Says("Failed to get IP from DHCP")) return;
+  throw Failure(Exit::kNoLease, "no DHCP server answered",
+                "the appliance goes on asking; or give a static address: merowireless address A.B.C.D --mask M");
+}
+
+void ApplyAddress(const Task& task, const KnownNetwork& config) {
+  const std::string interface = MEROWirelessInterfaceGet();
+  const int result = Run<int>(task, [&] { return MEROWirelessIfconfigSet(interface.c_str(), config); });
+  RequireLease();
+  if (result < 0) throw Failed("the address could not be set");
+}
+
+// The library reports a command that could not be run, and none that failed.
+void ApplyGateway(const std::string& gateway) {
+  if (MEROWirelessDefaultGatewaySet(gateway.c_str()) < 0 || !HasDefaultRoute(gateway)) {
+    throw Failed("the gateway " + gateway + " could not be set",
+                 "it has to be in the network of the interface's address: `merowireless status` shows that");
+  }
+}
+
+void ApplySavedGateway(const KnownNetwork& config) {
+  if (config.szGateway[0] != '\0' && !IsDhcp(config)) ApplyGateway(config.szGateway);
+}
