@@ -8,7 +8,7 @@
 #include "common/guest_network.h"
 #include "common/text.h"
 #include "platform/base/directory.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 
 namespace {
 

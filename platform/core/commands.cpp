@@ -1,5 +1,5 @@
 // Running a program.
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/program.h"
 
 int PLIBCExec(const char* szPath, const char* szArg1, const char* szArg2, const char* szArg3, const char* szArg4) {

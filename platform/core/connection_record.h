@@ -4,7 +4,7 @@
 
 #include "platform.h"
 #include "platform/base/result.h"
-#include "platform/core/literals.h"
+#include "platform/core/radio_texts.h"
 
 struct ConnectionRecord {
   WIRELESS_PROTOCOL protocol = WIRELESS_PROTO_UNKNOWN;

@@ -1,5 +1,5 @@
 // What is known about the current connection.
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/core/connection_record.h"
 #include "platform/core/radio.h"
 

@@ -4,7 +4,7 @@
 #include "common/connection_files.h"
 #include "platform/base/daemon.h"
 #include "platform/base/dhcp_client.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/interface.h"
 #include "platform/base/shared_directory.h"
 #include "platform/core/radio.h"

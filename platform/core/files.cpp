@@ -6,7 +6,7 @@
 #include <cstdio>
 
 #include "platform/base/descriptor.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/shared_directory.h"
 
 namespace {

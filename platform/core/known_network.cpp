@@ -13,9 +13,9 @@
 #include "common/clock.h"
 #include "common/known_networks_file.h"
 #include "common/text.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/file_read.h"
-#include "platform/core/literals.h"
+#include "platform/core/radio_texts.h"
 #include "platform/core/section_index.h"
 
 namespace {

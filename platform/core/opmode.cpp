@@ -1,5 +1,5 @@
 // What the client interface is operated as.
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/core/radio.h"
 
 int MEROWirelessOpmodeSet(WIRELESS_OPMODE opmode) {

@@ -7,7 +7,7 @@
 #include "platform.h"
 #include "platform/base/descriptor.h"
 #include "platform/base/result.h"
-#include "platform/core/literals.h"
+#include "platform/core/radio_texts.h"
 
 class Radio {
  public:

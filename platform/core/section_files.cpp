@@ -1,6 +1,6 @@
 // Section files.
 #include "common/text.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/file_edit.h"
 #include "platform/base/file_read.h"
 #include "platform/core/section_text.h"

@@ -5,7 +5,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 
 namespace {
 

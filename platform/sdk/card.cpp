@@ -4,7 +4,7 @@
 #include <optional>
 
 #include "platform/base/dhcp_client.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/interface.h"
 #include "platform/sdk/addresses.h"
 #include "platform/sdk/network_script.h"

@@ -7,7 +7,7 @@
 
 #include "common/text.h"
 #include "platform/base/directory.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/file_edit.h"
 #include "platform/base/file_read.h"
 #include "platform/base/interface.h"

@@ -1,7 +1,7 @@
 // The appliance's media service.
 #include <iterator>
 
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 
 namespace {
 

@@ -4,7 +4,7 @@
 #include <cstdio>
 
 #include "platform/base/directory.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 
 namespace {
 

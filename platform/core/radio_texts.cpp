@@ -1,13 +1,13 @@
 // The texts of the radio's enumerations, and back.
-#include "platform/core/literals.h"
+#include "platform/core/radio_texts.h"
 
 #include <cstdio>
 #include <iterator>
 
-#include "common/literals.h"
 #include "common/protocol_texts.h"
 #include "common/text.h"
-#include "platform/base/error.h"
+#include "common/value_texts.h"
+#include "platform/base/failure.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <iterator>
 
 #include "common/text.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/interface.h"
 #include "platform/sdk/network_script.h"
 

@@ -4,7 +4,7 @@
 #include <cstring>
 
 #include "platform/base/directory.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/interface.h"
 #include "platform/core/text_list.h"
 

@@ -10,7 +10,7 @@
 #include <cstring>
 
 #include "platform/base/daemon.h"
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 #include "platform/base/interface.h"
 #include "platform/base/program.h"
 

@@ -1,7 +1,7 @@
 // Network interfaces up and down.
 #include "platform/base/interface.h"
 
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 
 int PLIBNetIfUp(const char* szIfName) {
   if (szIfName == nullptr) return REFUSE_NULL(), 0;

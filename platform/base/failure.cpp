@@ -1,5 +1,5 @@
 // The error codes of errnos.
-#include "platform/base/error.h"
+#include "platform/base/failure.h"
 
 #include <cstring>
 

@@ -1,6 +1,6 @@
 // What only the platform itself reads back from text.
-#ifndef MERO_PLATFORM_LITERALS_H
-#define MERO_PLATFORM_LITERALS_H
+#ifndef MERO_PLATFORM_RADIO_TEXTS_H
+#define MERO_PLATFORM_RADIO_TEXTS_H
 
 #include <optional>
 #include <string_view>
@@ -19,4 +19,4 @@ struct Bssid {
 // The address of a text such as "00:11:22:AA:BB:CC"; none when it is anything else.
 std::optional<Bssid> ParseBssid(std::string_view text);
 
-#endif  // MERO_PLATFORM_LITERALS_H
+#endif  // MERO_PLATFORM_RADIO_TEXTS_H

@@ -1,6 +1,6 @@
 // Where an errno becomes the error code and a line in the system log: at the boundary of an operation, and only there.
-#ifndef MERO_PLATFORM_ERROR_H
-#define MERO_PLATFORM_ERROR_H
+#ifndef MERO_PLATFORM_FAILURE_H
+#define MERO_PLATFORM_FAILURE_H
 
 #include <cerrno>
 
@@ -27,4 +27,4 @@ void ReportNull(SourcePlace place);
 // Refuses a null argument.
 #define REFUSE_NULL() ReportNull(HERE)
 
-#endif  // MERO_PLATFORM_ERROR_H
+#endif  // MERO_PLATFORM_FAILURE_H

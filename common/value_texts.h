@@ -1,6 +1,6 @@
 // Tables between texts and the values of an enumeration, walked in both directions.
-#ifndef MERO_COMMON_LITERALS_H
-#define MERO_COMMON_LITERALS_H
+#ifndef MERO_COMMON_VALUE_TEXTS_H
+#define MERO_COMMON_VALUE_TEXTS_H
 
 #include <span>
 
@@ -27,4 +27,4 @@ inline int32_t ValueOf(Literals literals, const char* szText) {
   return literals.front().type.value;
 }
 
-#endif  // MERO_COMMON_LITERALS_H
+#endif  // MERO_COMMON_VALUE_TEXTS_H
