@@ -7,24 +7,24 @@
 #include "common/text.h"
 #include "wireless.h"
 
-using Literals = std::span<const WIRELESS_LITERAL_MAPPING>;
+using ValueTexts = std::span<const WIRELESS_LITERAL_MAPPING>;
 
 // The text of a value; that of the table's first row, the unknown, when no row has the value.
-constexpr const char* TextOf(Literals literals, int32_t value) {
-  for (const WIRELESS_LITERAL_MAPPING& literal : literals) {
-    if (literal.type.value == value) return literal.str;
+constexpr const char* TextOf(ValueTexts texts, int32_t value) {
+  for (const WIRELESS_LITERAL_MAPPING& text : texts) {
+    if (text.type.value == value) return text.str;
   }
-  return literals.front().str;
+  return texts.front().str;
 }
 
 // The value of a text, in any case of its ASCII letters; that of the first row when no row has the text.
-inline int32_t ValueOf(Literals literals, const char* szText) {
+inline int32_t ValueOf(ValueTexts texts, const char* szText) {
   if (szText != nullptr) {
-    for (const WIRELESS_LITERAL_MAPPING& literal : literals) {
-      if (EqualIgnoringCase(literal.str, szText)) return literal.type.value;
+    for (const WIRELESS_LITERAL_MAPPING& text : texts) {
+      if (EqualIgnoringCase(text.str, szText)) return text.type.value;
     }
   }
-  return literals.front().type.value;
+  return texts.front().type.value;
 }
 
 #endif  // MERO_COMMON_VALUE_TEXTS_H
