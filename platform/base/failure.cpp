@@ -37,21 +37,21 @@ const char* ReasonOf(int error) {
   }
 }
 
-}  // namespace
-
-int CodeOfError(int error) {
+int CodeOf(int error) {
   for (const CodeOfErrno& row : kCodes) {
     if (row.error == error) return row.code;
   }
   return ERR_UNKNOWN;
 }
 
-void ReportFailure(SourcePlace place, int error, const char* szVerb, const char* szSubject) {
-  PLIBCErrSet(CodeOfError(error));
-  LOG_AS(place.szUnit, place.line, "Failed to %s %s: %s", szVerb, szSubject, ReasonOf(error));
+}  // namespace
+
+const char* NoteFailure(int error) {
+  PLIBCErrSet(CodeOf(error));
+  return ReasonOf(error);
 }
 
-void ReportNull(SourcePlace place) {
+void RefuseNull(const char* szUnit, int line) {
   PLIBCErrSet(ERR_BAD_PARAMETERS);
-  LOG_AS(place.szUnit, place.line, "Bad parameters");
+  LOG_AS(szUnit, line, "Bad parameters");
 }

@@ -7,24 +7,15 @@
 #include "common/log.h"
 #include "platform.h"
 
-// The error code of an errno.
-int CodeOfError(int error);
+// Sets the error code of a failure, and gives its reason.
+const char* NoteFailure(int error);
 
-// Where in the source something is reported.
-struct SourcePlace {
-  const char* szUnit;
-  int line;
-};
-#define HERE (SourcePlace{TextOfUnit<__FILE_NAME__>(), __LINE__})
+// Reports `format` with its values and, behind them, the reason of the failure, whose error code it sets. An expression
+// without a value, as is the next one.
+#define FAIL(error, format, ...) LOG(format ": %s" __VA_OPT__(, ) __VA_ARGS__, NoteFailure(error))
 
-// Functions, since there are many places to report from.
-void ReportFailure(SourcePlace place, int error, const char* szVerb, const char* szSubject);
-void ReportNull(SourcePlace place);
-
-// Sets the error code and reports "Failed to VERB SUBJECT: reason"; both are texts. An expression without a value.
-#define FAIL(error, verb, subject) ReportFailure(HERE, error, verb, subject)
-
-// Refuses a null argument.
-#define REFUSE_NULL() ReportNull(HERE)
+// Refuses a null argument: sets the error code, and reports.
+#define REFUSE_NULL() RefuseNull(TextOfUnit<__FILE_NAME__>(), __LINE__)
+void RefuseNull(const char* szUnit, int line);
 
 #endif  // MERO_PLATFORM_FAILURE_H

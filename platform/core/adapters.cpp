@@ -31,7 +31,7 @@ bool IsAdapter(const char* szIfName) {
 template <class Visit>
 void ForEachAdapter(Visit visit) {
   const Directory directory(::opendir(kInterfaces));
-  if (!directory) return FAIL(errno, "list", kInterfaces);
+  if (!directory) return FAIL(errno, "Failed to list %s", kInterfaces);
   while (const dirent* entry = ::readdir(directory.get())) {
     if (IsAdapter(entry->d_name)) visit(entry->d_name);
   }

@@ -57,7 +57,7 @@ int PLIBNetBridgeSlaveEnum(const char* szBridge, PPLIBSZLIST* ppslList) {
   PLIBSZLIST& list = **ppslList;
   const int before = list.nItem;
   if (Status status = AppendMembers(szBridge, list); !status.ok()) {
-    return FAIL(status.error(), "list the members of", szBridge), -1;
+    return FAIL(status.error(), "Failed to list the members of %s", szBridge), -1;
   }
   return list.nItem - before;
 }

@@ -8,7 +8,7 @@ int PLIBCExec(const char* szPath, const char* szArg1, const char* szArg2, const 
 
   Result<int> exitStatus = RunProgram(argv, Standard::kInherited);
   if (!exitStatus.ok()) {
-    FAIL(exitStatus.error(), "run", szPath);
+    FAIL(exitStatus.error(), "Failed to run %s", szPath);
     return PLIBCErrSet(ERR_COMMAND_FAILED), -1;
   }
   return *exitStatus;

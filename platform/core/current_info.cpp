@@ -94,6 +94,6 @@ int MEROWirelessCurInfoGet(WIRELESS_REQUEST request, PWIRELESS_INFO pInfo) {
   const char* szIfName = MEROWirelessInterfaceGet();
   Result<Radio> radio = Radio::OfAdapter(szIfName);
   const Status status = radio.ok() ? Ask(*radio, request, *pInfo) : radio.status();
-  if (!status.ok()) return FAIL(status.error(), "ask the adapter", szIfName), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to ask the adapter %s", szIfName), -1;
   return 0;
 }

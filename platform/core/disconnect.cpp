@@ -11,10 +11,6 @@
 
 namespace {
 
-Status EndSupplicant(const char* /*szIfName*/) {
-  return EndDaemon(kSupplicantPidPath, "wpa_supplicant");
-}
-
 // An ad-hoc cell has nobody to tell: the interface stops being part of it by being a station again, which the driver
 // only takes while the interface is down.
 Status LeaveCell(const char* szIfName, const Radio& radio) {
@@ -36,36 +32,33 @@ Status LeaveNetwork(const char* szIfName) {
   return *accessPoint ? radio->Leave() : Status::Ok();
 }
 
-Status ForgetRecord(const char* /*szIfName*/) {
+Status ForgetRecord() {
   const Status status = RemoveOrMoveAside(kConnectionRecordPath);
   return status.error() == ENOENT ? Status::Ok() : status;
 }
 
-struct Step {
-  const char* szName;
-  Status (*run)(const char* szIfName);
-  bool needsAdapter;
-};
-
-// Daemons first: they would join and address the interface again.
-constexpr Step kSteps[] = {
-    {"end the supplicant of", EndSupplicant, false},   {"end the DHCP client of", EndDhcpClient, false},
-    {"leave the network of", LeaveNetwork, true},      {"remove the addresses of", RemoveAddresses, true},
-    {"forget the connection of", ForgetRecord, false},
-};
-
 }  // namespace
 
+// A step that fails is reported, and the others are taken all the same.
 int MEROWirelessNetworkDisconnect(void) {
   const bool adapter = MEROWirelessAdapterNum() > 0;
   const char* szIfName = MEROWirelessInterfaceGet();
-  int result = 0;
-  for (const Step& step : kSteps) {
-    if (step.needsAdapter && !adapter) continue;
-    if (Status status = step.run(szIfName); !status.ok()) {
-      FAIL(status.error(), step.szName, szIfName);
-      result = -1;
-    }
+  int failures = 0;
+  // Daemons first: they would join and address the interface again.
+  if (Status status = EndDaemon(kSupplicantPidPath, "wpa_supplicant"); !status.ok()) {
+    ++failures, FAIL(status.error(), "Failed to end the supplicant of %s", szIfName);
   }
-  return result;
+  if (Status status = EndDhcpClient(szIfName); !status.ok()) {
+    ++failures, FAIL(status.error(), "Failed to end the DHCP client of %s", szIfName);
+  }
+  if (Status status = adapter ? LeaveNetwork(szIfName) : Status::Ok(); !status.ok()) {
+    ++failures, FAIL(status.error(), "Failed to leave the network of %s", szIfName);
+  }
+  if (Status status = adapter ? RemoveAddresses(szIfName) : Status::Ok(); !status.ok()) {
+    ++failures, FAIL(status.error(), "Failed to remove the addresses of %s", szIfName);
+  }
+  if (Status status = ForgetRecord(); !status.ok()) {
+    ++failures, FAIL(status.error(), "Failed to forget the connection of %s", szIfName);
+  }
+  return failures == 0 ? 0 : -1;
 }

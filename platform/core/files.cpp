@@ -39,19 +39,19 @@ int PLIBCFileExist(const char* szPath) {
 int PLIBCFileTouch(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
   if (PLIBCFileExist(szPath) != 0) return 0;
-  if (Status status = Create(szPath); !status.ok()) return FAIL(status.error(), "create", szPath), -1;
+  if (Status status = Create(szPath); !status.ok()) return FAIL(status.error(), "Failed to create %s", szPath), -1;
   return 0;
 }
 
 int PLIBCSysUnlink(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
   const Status status = RemoveOrMoveAside(szPath);
-  if (!status.ok() && status.error() != ENOENT) return FAIL(status.error(), "remove", szPath), -1;
+  if (!status.ok() && status.error() != ENOENT) return FAIL(status.error(), "Failed to remove %s", szPath), -1;
   return 0;
 }
 
 int PLIBCSysRemove(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
-  if (std::remove(szPath) < 0 && errno != ENOENT) return FAIL(errno, "remove", szPath), -1;
+  if (std::remove(szPath) < 0 && errno != ENOENT) return FAIL(errno, "Failed to remove %s", szPath), -1;
   return 0;
 }

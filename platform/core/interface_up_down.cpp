@@ -6,7 +6,7 @@
 int PLIBNetIfUp(const char* szIfName) {
   if (szIfName == nullptr) return REFUSE_NULL(), 0;
   if (Status status = SetInterfaceUp(szIfName, true); !status.ok()) {
-    return FAIL(status.error(), "bring up", szIfName), 0;
+    return FAIL(status.error(), "Failed to bring up %s", szIfName), 0;
   }
   return 1;
 }
@@ -14,7 +14,7 @@ int PLIBNetIfUp(const char* szIfName) {
 int PLIBNetIfDown(const char* szIfName) {
   if (szIfName == nullptr) return REFUSE_NULL(), 0;
   if (Status status = SetInterfaceUp(szIfName, false); !status.ok()) {
-    return FAIL(status.error(), "take down", szIfName), 0;
+    return FAIL(status.error(), "Failed to take down %s", szIfName), 0;
   }
   return 1;
 }

@@ -23,7 +23,7 @@ template <class Use>
 int UseValue(const char* szPath, const char* szKey, Use use) {
   Result<Bytes> file = ReadFile(szPath);
   if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!file.ok()) return FAIL(file.error(), "read", szPath), -1;
+  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", szPath), -1;
   const std::optional<std::string_view> value = ValueIn(file->view(), szKey);
   if (!value) return PLIBCErrSet(ERR_KEY_NOT_FOUND), 0;
   use(*value);
@@ -68,7 +68,7 @@ int PLIBCFileSetKeyValue(const char* szPath, const char* szKey, const char* szVa
     if (Status done = AppendPair(content, szFormat, {szKey, szValue}, ValueForm::kShell); !done.ok()) return done;
     return AppendText(content, Slice(text, place.end));
   });
-  if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
 }
 
@@ -77,13 +77,13 @@ int PLIBCFileRemoveKey(const char* szPath, const char* szKey) {
 
   Result<FileEdit> edit = FileEdit::Open(szPath, 0);
   if (edit.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!edit.ok()) return FAIL(edit.error(), "read", szPath), -1;
+  if (!edit.ok()) return FAIL(edit.error(), "Failed to read %s", szPath), -1;
 
   Bytes content;
   bool removed = false;
   Status status = CopyWithout(edit->text(), szKey, content, removed);
   if (status.ok() && !removed) return PLIBCErrSet(ERR_KEY_NOT_FOUND), 0;
   if (status.ok()) status = edit->Commit(content.view());
-  if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
 }

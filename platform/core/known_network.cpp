@@ -194,6 +194,6 @@ int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg)
   const Status status = Read(szSection, *pNetCfg);
   if (status.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), -1;
   if (status.error() == kNoSection) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
-  if (!status.ok()) return FAIL(status.error(), "read", kKnownNetworksPath), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to read %s", kKnownNetworksPath), -1;
   return 0;
 }

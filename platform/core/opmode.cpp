@@ -5,10 +5,10 @@
 int MEROWirelessOpmodeSet(WIRELESS_OPMODE opmode) {
   const char* szIfName = MEROWirelessInterfaceGet();
   if (opmode < WIRELESS_OPMODE_AUTO || opmode >= WIRELESS_OPMODE_UNKNOWN) {
-    return FAIL(EINVAL, "set the mode of", szIfName), -1;
+    return FAIL(EINVAL, "Failed to set the mode of %s", szIfName), -1;
   }
   Result<Radio> radio = Radio::OfAdapter(szIfName);
   const Status status = radio.ok() ? radio->SetMode(opmode) : radio.status();
-  if (!status.ok()) return FAIL(status.error(), "set the mode of", szIfName), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to set the mode of %s", szIfName), -1;
   return 0;
 }

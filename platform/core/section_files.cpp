@@ -127,7 +127,7 @@ int WriteSection(const char* szPath, const char* szSection, const char* szNewNam
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
     return ComposeSection(text, szSection, szNewName, pairs, content);
   });
-  if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
 }
 
@@ -138,14 +138,14 @@ int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList) {
 
   Result<Bytes> file = ReadFile(szPath);
   if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!file.ok()) return FAIL(file.error(), "read", szPath), -1;
+  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", szPath), -1;
 
   PLIBSZLIST& list = **ppslList;
   const int before = list.nItem;
   for (Sections sections(file->view()); sections.Next();) {
     if (!AppendToList(list, sections.name())) {
       TruncateList(list, before);
-      return FAIL(ENOMEM, "read", szPath), -1;
+      return FAIL(ENOMEM, "Failed to read %s", szPath), -1;
     }
   }
   return list.nItem - before;
@@ -158,13 +158,13 @@ int PLIBCFileGetSection(const char* szPath, const char* szSection, PPLIBSZHASH* 
 
   Result<Bytes> file = ReadFile(szPath);
   if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!file.ok()) return FAIL(file.error(), "read", szPath), -1;
+  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", szPath), -1;
 
   const std::optional<SectionPlace> place = FindSection(file->view(), szSection);
   if (!place) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
   for (Lines lines = LinesOf(file->view(), *place); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
-    if (pair && !SetInHash(**ppshHash, pair->key, pair->value)) return FAIL(ENOMEM, "read", szPath), -1;
+    if (pair && !SetInHash(**ppshHash, pair->key, pair->value)) return FAIL(ENOMEM, "Failed to read %s", szPath), -1;
   }
   return 1;
 }
@@ -188,7 +188,7 @@ int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const ch
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
     return ComposeValue(text, szSection, {szKey, szValue}, szFormat, content);
   });
-  if (!status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 0;
 }
 
@@ -197,11 +197,12 @@ int PLIBCFileRemoveSection(const char* szPath, const char* szSection) {
 
   Result<FileEdit> edit = FileEdit::Open(szPath, 0);
   if (edit.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!edit.ok()) return FAIL(edit.error(), "read", szPath), -1;
+  if (!edit.ok()) return FAIL(edit.error(), "Failed to read %s", szPath), -1;
 
   Bytes content;
-  if (!AppendWithout(content, edit->text(), szSection)) return FAIL(ENOMEM, "write", szPath), -1;
+  if (!AppendWithout(content, edit->text(), szSection)) return FAIL(ENOMEM, "Failed to write %s", szPath), -1;
   if (content.view().size() == edit->text().size()) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
-  if (Status status = edit->Commit(content.view()); !status.ok()) return FAIL(status.error(), "write", szPath), -1;
+  if (Status status = edit->Commit(content.view()); !status.ok())
+    return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
 }

@@ -101,13 +101,13 @@ bool SetInHash(PLIBSZHASH& hash, std::string_view key, std::string_view value) {
 
 PPLIBSZHASH PLIBCSzHashAlloc(int cbSize) {
   auto* hash = static_cast<PLIBSZHASH*>(std::calloc(1, sizeof(PLIBSZHASH)));
-  if (hash == nullptr) return FAIL(ENOMEM, "make", "a text hash"), nullptr;
+  if (hash == nullptr) return FAIL(ENOMEM, "Failed to make a text hash"), nullptr;
   const uint32_t wanted = cbSize > 0 ? static_cast<uint32_t>(cbSize) / kBytesOfAnEntry : 0;
   hash->nChains = std::bit_ceil(std::clamp(wanted, kLeastChains, kMostChainsAtFirst));
   hash->chains = static_cast<HashEntry**>(std::calloc(hash->nChains, sizeof(HashEntry*)));
   if (hash->chains == nullptr) {
     std::free(hash);
-    return FAIL(ENOMEM, "make", "a text hash"), nullptr;
+    return FAIL(ENOMEM, "Failed to make a text hash"), nullptr;
   }
   return hash;
 }
@@ -131,6 +131,6 @@ const char* PLIBCSzHashGetValue(const PLIBSZHASH* pshHash, const char* szKey) {
 
 int PLIBCSzHashSetValue(PPLIBSZHASH* ppshHash, const char* szKey, const char* szValue) {
   if (ppshHash == nullptr || *ppshHash == nullptr || szKey == nullptr || szValue == nullptr) return REFUSE_NULL(), -1;
-  if (!SetInHash(**ppshHash, szKey, szValue)) return FAIL(ENOMEM, "set", szKey), -1;
+  if (!SetInHash(**ppshHash, szKey, szValue)) return FAIL(ENOMEM, "Failed to set %s", szKey), -1;
   return 1;
 }

@@ -40,10 +40,10 @@ void TruncateList(PLIBSZLIST& list, int nItem) {
 
 PPLIBSZLIST PLIBCSzListAlloc(int cbSize) {
   auto* list = static_cast<PLIBSZLIST*>(std::calloc(1, sizeof(PLIBSZLIST)));
-  if (list == nullptr) return FAIL(ENOMEM, "make", "a text list"), nullptr;
+  if (list == nullptr) return FAIL(ENOMEM, "Failed to make a text list"), nullptr;
   if (!Reserve(*list, std::clamp(cbSize / kBytesOfAnItem, 1, kMostItemsAtFirst))) {
     std::free(list);
-    return FAIL(ENOMEM, "make", "a text list"), nullptr;
+    return FAIL(ENOMEM, "Failed to make a text list"), nullptr;
   }
   return list;
 }

@@ -55,10 +55,10 @@ int SetStatic(const NETINFO& netInfo) {
   if (!subnet) return PLIBCErrSet(ERR_BAD_PARAMETERS), -1;
   // A DHCP client that stayed would put its own address back.
   if (Status status = EndDhcpClient(netInfo.szInterface); !status.ok()) {
-    return FAIL(status.error(), "end the DHCP client of", netInfo.szInterface), -1;
+    return FAIL(status.error(), "Failed to end the DHCP client of %s", netInfo.szInterface), -1;
   }
   if (Status status = Apply(netInfo.szInterface, *subnet); !status.ok()) {
-    return FAIL(status.error(), "address", netInfo.szInterface), -1;
+    return FAIL(status.error(), "Failed to address %s", netInfo.szInterface), -1;
   }
   return WriteStatic(netInfo) ? 0 : -1;
 }
@@ -66,7 +66,7 @@ int SetStatic(const NETINFO& netInfo) {
 // The DHCP client has set the address, or will.
 int SetDhcp(const NETINFO& netInfo) {
   if (Status status = SetInterfaceUp(netInfo.szInterface, true); !status.ok()) {
-    return FAIL(status.error(), "bring up", netInfo.szInterface), -1;
+    return FAIL(status.error(), "Failed to bring up %s", netInfo.szInterface), -1;
   }
   return WriteDhcp(netInfo) ? 0 : -1;
 }

@@ -89,7 +89,7 @@ Status LeaseAnew(NETINFO& netInfo, int seconds) {
 int MEROIGetDHCPTestNetInfo(PNETINFO pNetInfo, int seconds) {
   if (pNetInfo == nullptr) return REFUSE_NULL(), -1;
   if (Status status = LeaseAnew(*pNetInfo, seconds); !status.ok()) {
-    return FAIL(status.error(), "lease an address for", pNetInfo->szInterface), -1;
+    return FAIL(status.error(), "Failed to lease an address for %s", pNetInfo->szInterface), -1;
   }
   return 0;
 }

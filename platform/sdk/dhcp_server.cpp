@@ -241,7 +241,7 @@ bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
 bool WriteFiles(const MERO_DHCPD_CONF& conf, bool enable) {
   const ServerFile path(kConfFormat, conf.szInterface, conf.szTag);
   if (Status status = WriteConf(path.c_str(), conf); !status.ok()) {
-    return FAIL(status.error(), "write", path.c_str()), false;
+    return FAIL(status.error(), "Failed to write %s", path.c_str()), false;
   }
   return WriteAutoTime(conf) && WriteSwitch(conf, enable);
 }
@@ -385,7 +385,7 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
   MERO_DHCPD_CONF conf{};
   const Status status = ReadConf(path.c_str(), szIfName, conf);
   if (status.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!status.ok()) return FAIL(status.error(), "read", path.c_str()), 0;
+  if (!status.ok()) return FAIL(status.error(), "Failed to read %s", path.c_str()), 0;
   if (!ReadInfo(ServerFile(kInfoFormat, szIfName, szTag).c_str(), conf)) return 0;
   CopyText(conf.szTag, szTag);
   *pConf = conf;

@@ -14,7 +14,7 @@ int MEROMediaService(int action) {
   if (action < 0 || action >= static_cast<int>(std::size(kVerbs))) {
     return LOG("There is no action %d of the media service", action), PLIBCErrSet(ERR_BAD_PARAMETERS), -1;
   }
-  if (PLIBCFileExist(kScript) == 0) return FAIL(ENOENT, "find the media service", kScript), -1;
+  if (PLIBCFileExist(kScript) == 0) return FAIL(ENOENT, "Failed to find the media service %s", kScript), -1;
   const int exitStatus = PLIBCExec(kScript, kVerbs[action], nullptr, nullptr, nullptr);
   if (exitStatus > 0) LOG("%s %s ended with status %d", kScript, kVerbs[action], exitStatus);
   return exitStatus == 0 ? 0 : -1;

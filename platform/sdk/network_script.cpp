@@ -16,7 +16,7 @@ constexpr char kLineFormat[] = "%s=%s\n";
 bool MakeDirectories() {
   for (const char* szDirectory : kDirectories) {
     if (Status status = MakeDirectory(szDirectory); !status.ok()) {
-      return FAIL(status.error(), "make", szDirectory), false;
+      return FAIL(status.error(), "Failed to make %s", szDirectory), false;
     }
   }
   return true;
