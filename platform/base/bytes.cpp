@@ -18,11 +18,14 @@ bool Bytes::Reserve(size_t capacity) {
   return true;
 }
 
-bool Bytes::Append(std::string_view text) {
-  if (text.empty()) return true;
+void Bytes::Append(std::string_view text) {
+  if (text.empty() || error_ != 0) return;
   const size_t size = size_ + text.size();
-  if (size > capacity_ && !Reserve(std::max(size, 2 * capacity_))) return false;
+  if (size > capacity_ && !Reserve(std::max(size, 2 * capacity_))) return Fail(ENOMEM);
   std::memcpy(data_ + size_, text.data(), text.size());
   size_ = size;
-  return true;
+}
+
+void Bytes::Fail(int error) {
+  if (error_ == 0) error_ = error;
 }

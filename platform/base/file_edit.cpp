@@ -197,12 +197,13 @@ void FileEdit::Abandon() {
   if (created_ && text_.view().empty()) (void)::unlink(szPath_);  // it is as good as never made
 }
 
-Status FileEdit::Commit(std::string_view content) {
+Status FileEdit::Commit(const Bytes& content) {
+  if (!content.status().ok()) return content.status();
   const Beside beside(kNewFormat, szPath_);
   if (!beside.fits()) return Status::Failed(ENAMETOOLONG);
   if (Status status = RemoveOrMoveAside(beside.c_str()); !status.ok() && status.error() != ENOENT) return status;
 
-  Status status = WriteBeside(beside.c_str(), content, file_.get());
+  Status status = WriteBeside(beside.c_str(), content.view(), file_.get());
   if (status.ok()) status = Status::Of(::rename(beside.c_str(), szPath_));
   if (!status.ok()) {
     (void)::unlink(beside.c_str());  // may never have come into being
@@ -215,8 +216,8 @@ Status EditFile(const char* szPath, mode_t mode, Composer compose) {
   Result<FileEdit> edit = FileEdit::Open(szPath, mode);
   if (!edit.ok()) return edit.status();
   Bytes content;
-  Status status = compose(edit->text(), content);
-  if (status.ok()) status = edit->Commit(content.view());
+  compose(edit->text(), content);
+  const Status status = edit->Commit(content);
   if (!status.ok()) edit->Abandon();
   return status;
 }

@@ -31,8 +31,9 @@ class FileEdit {
   // Gives up, and removes the file again if it was made for this edit.
   void Abandon();
 
-  // Replaces the content. The file holds the old content or the new one, whole, whenever this is interrupted.
-  Status Commit(std::string_view content);
+  // Replaces the content, unless it failed to be built. The file holds the old content or the new one, whole, whenever
+  // this is interrupted.
+  Status Commit(const Bytes& content);
 
  private:
   Status Lock(int& tries);
@@ -45,21 +46,21 @@ class FileEdit {
   char szPath_[PATH_MAX] = {};  // where the file really is
 };
 
-// What composes the new content of a file from what it holds, or says why not. Refers to a function object that
-// outlives it.
+// What composes the new content of a file from what it holds; the content remembers why that failed. Refers to a
+// function object that outlives it.
 class Composer {
  public:
   template <class Compose>
   Composer(const Compose& compose)  // NOLINT(google-explicit-constructor)
       : object_(&compose), call_([](const void* object, std::string_view text, Bytes& content) {
-          return (*static_cast<const Compose*>(object))(text, content);
+          (*static_cast<const Compose*>(object))(text, content);
         }) {}
 
-  Status operator()(std::string_view text, Bytes& content) const { return call_(object_, text, content); }
+  void operator()(std::string_view text, Bytes& content) const { call_(object_, text, content); }
 
  private:
   const void* object_;
-  Status (*call_)(const void* object, std::string_view text, Bytes& content);
+  void (*call_)(const void* object, std::string_view text, Bytes& content);
 };
 
 // Changes a file in one go.

@@ -78,9 +78,12 @@ class Addresses {
       while (nlmsghdr* message = messages.Next()) {
         const void* content = NLMSG_DATA(message);
         // Both the end and a failure begin with an errno.
-        if (message->nlmsg_type != RTM_NEWADDR) return Status::Failed(-*static_cast<const int*>(content));
+        if (message->nlmsg_type != RTM_NEWADDR) {
+          const int error = -*static_cast<const int*>(content);
+          return error != 0 ? Status::Failed(error) : found_.status();
+        }
         if (static_cast<const ifaddrmsg*>(content)->ifa_index != index_) continue;
-        if (!found_.Append({reinterpret_cast<char*>(message), message->nlmsg_len})) return Status::Failed(ENOMEM);
+        found_.Append({reinterpret_cast<char*>(message), message->nlmsg_len});
       }
     }
   }

@@ -30,17 +30,18 @@ int UseValue(const char* szPath, const char* szKey, Use use) {
   return 1;
 }
 
-// Copies a text without the lines of a key; false in `removed` when it had none.
-Status CopyWithout(std::string_view text, std::string_view key, Bytes& content, bool& removed) {
+// Appends a text without the lines of a key; false when it has none.
+bool AppendWithout(Bytes& content, std::string_view text, std::string_view key) {
+  bool removed = false;
   for (Lines lines(text); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kShell);
     if (pair && pair->key == key) {
       removed = true;
-    } else if (Status status = AppendText(content, lines.whole()); !status.ok()) {
-      return status;
+    } else {
+      content.Append(lines.whole());
     }
   }
-  return Status::Ok();
+  return removed;
 }
 
 }  // namespace
@@ -63,10 +64,10 @@ int PLIBCFileSetKeyValue(const char* szPath, const char* szKey, const char* szVa
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
     const LinePlace end{text.size(), text.size()};
     const LinePlace place = FindKey(text, szKey, ValueForm::kShell).value_or(end);
-    if (Status done = AppendText(content, Slice(text, 0, place.begin)); !done.ok()) return done;
-    if (Status done = EndLine(content); !done.ok()) return done;
-    if (Status done = AppendPair(content, szFormat, {szKey, szValue}, ValueForm::kShell); !done.ok()) return done;
-    return AppendText(content, Slice(text, place.end));
+    content.Append(Slice(text, 0, place.begin));
+    EndLine(content);
+    AppendPair(content, szFormat, {szKey, szValue}, ValueForm::kShell);
+    content.Append(Slice(text, place.end));
   });
   if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
@@ -80,10 +81,8 @@ int PLIBCFileRemoveKey(const char* szPath, const char* szKey) {
   if (!edit.ok()) return FAIL(edit.error(), "Failed to read %s", szPath), -1;
 
   Bytes content;
-  bool removed = false;
-  Status status = CopyWithout(edit->text(), szKey, content, removed);
-  if (status.ok() && !removed) return PLIBCErrSet(ERR_KEY_NOT_FOUND), 0;
-  if (status.ok()) status = edit->Commit(content.view());
+  if (!AppendWithout(content, edit->text(), szKey)) return PLIBCErrSet(ERR_KEY_NOT_FOUND), 0;
+  const Status status = edit->Commit(content);
   if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
 }

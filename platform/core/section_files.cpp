@@ -30,57 +30,50 @@ LinePlace PlaceOfPairs(std::string_view body) {
   return place.value_or(LinePlace{0, 0});
 }
 
-Status AppendPairs(Bytes& content, const NewPairs& pairs, LineEnds ends) {
+void AppendPairs(Bytes& content, const NewPairs& pairs, LineEnds ends) {
   for (const HashEntry* entry = pairs.hash->first; entry != nullptr; entry = entry->next) {
-    const Pair pair{entry->szKey, entry->szValue};
-    if (Status status = AppendPair(content, pairs.szFormat, pair, ValueForm::kPlain, ends); !status.ok()) return status;
+    AppendPair(content, pairs.szFormat, {entry->szKey, entry->szValue}, ValueForm::kPlain, ends);
   }
-  return Status::Ok();
 }
 
-Status AppendAllButPairs(Bytes& content, std::string_view text) {
+void AppendAllButPairs(Bytes& content, std::string_view text) {
   for (Lines lines(text); lines.Next();) {
-    if (IsPair(lines)) continue;
-    if (Status status = AppendText(content, lines.whole()); !status.ok()) return status;
+    if (!IsPair(lines)) content.Append(lines.whole());
   }
-  return Status::Ok();
 }
 
 // The text and, behind it, the header of a new section.
-Status ComposeNewHeader(std::string_view text, const char* szSection, Bytes& content) {
-  if (Status status = AppendText(content, text); !status.ok()) return status;
-  if (Status status = EndLine(content); !status.ok()) return status;
-  return AppendHeader(content, szSection);
-}
-
-Status ComposeAdded(std::string_view text, const char* szSection, const NewPairs& pairs, Bytes& content) {
-  if (Status status = ComposeNewHeader(text, szSection, content); !status.ok()) return status;
-  return AppendPairs(content, pairs, LineEnds::kLf);
+void ComposeNewHeader(std::string_view text, const char* szSection, Bytes& content) {
+  content.Append(text);
+  EndLine(content);
+  AppendHeader(content, szSection);
 }
 
 // The text with the pairs of one section replaced, and its header when it gets a new name.
-Status ComposeReplaced(std::string_view text, const SectionPlace& place, const char* szNewName, const NewPairs& pairs,
-                       Bytes& content) {
+void ComposeReplaced(std::string_view text, const SectionPlace& place, const char* szNewName, const NewPairs& pairs,
+                     Bytes& content) {
   const std::string_view body = Slice(text, place.body, place.end);
   const LinePlace old = PlaceOfPairs(body);
 
-  if (Status status = AppendText(content, Slice(text, 0, place.header)); !status.ok()) return status;
-  const Status header = szNewName != nullptr ? AppendHeader(content, szNewName)
-                                             : AppendText(content, Slice(text, place.header, place.body));
-  if (!header.ok()) return header;
-  if (Status status = AppendText(content, Slice(body, 0, old.begin)); !status.ok()) return status;
-  if (Status status = EndLine(content); !status.ok()) return status;
-  const LineEnds ends = szNewName != nullptr ? LineEnds::kLf : LineEndsOf(text, place);
-  if (Status status = AppendPairs(content, pairs, ends); !status.ok()) return status;
-  if (Status status = AppendAllButPairs(content, Slice(body, old.begin)); !status.ok()) return status;
-  return AppendText(content, Slice(text, place.end));
+  content.Append(Slice(text, 0, place.header));
+  if (szNewName != nullptr) {
+    AppendHeader(content, szNewName);
+  } else {
+    content.Append(Slice(text, place.header, place.body));
+  }
+  content.Append(Slice(body, 0, old.begin));
+  EndLine(content);
+  AppendPairs(content, pairs, szNewName != nullptr ? LineEnds::kLf : LineEndsOf(text, place));
+  AppendAllButPairs(content, Slice(body, old.begin));
+  content.Append(Slice(text, place.end));
 }
 
-Status ComposeSection(std::string_view text, const char* szSection, const char* szNewName, const NewPairs& pairs,
-                      Bytes& content) {
+void ComposeSection(std::string_view text, const char* szSection, const char* szNewName, const NewPairs& pairs,
+                    Bytes& content) {
   const std::optional<SectionPlace> place = FindSection(text, szSection);
   if (place) return ComposeReplaced(text, *place, szNewName, pairs, content);
-  return ComposeAdded(text, szNewName != nullptr ? szNewName : szSection, pairs, content);
+  ComposeNewHeader(text, szNewName != nullptr ? szNewName : szSection, content);
+  AppendPairs(content, pairs, LineEnds::kLf);
 }
 
 // Where the line of a key is to stand in a text: in place of the old one, or behind the section's last pair.
@@ -91,32 +84,31 @@ LinePlace PlaceOfKey(std::string_view text, const SectionPlace& section, std::st
   return {section.body + place.begin, section.body + place.end};
 }
 
-Status ComposeValue(std::string_view text, const char* szSection, const Pair& pair, const char* szFormat,
-                    Bytes& content) {
+void ComposeValue(std::string_view text, const char* szSection, const Pair& pair, const char* szFormat,
+                  Bytes& content) {
   const std::optional<SectionPlace> section = FindSection(text, szSection);
   if (!section) {
-    if (Status status = ComposeNewHeader(text, szSection, content); !status.ok()) return status;
+    ComposeNewHeader(text, szSection, content);
     return AppendPair(content, szFormat, pair, ValueForm::kPlain);
   }
 
   const LinePlace place = PlaceOfKey(text, *section, pair.key);
-  if (Status status = AppendText(content, Slice(text, 0, place.begin)); !status.ok()) return status;
-  if (Status status = EndLine(content); !status.ok()) return status;
-  const LineEnds ends = LineEndsOf(text, *section);
-  if (Status status = AppendPair(content, szFormat, pair, ValueForm::kPlain, ends); !status.ok()) return status;
-  return AppendText(content, Slice(text, place.end));
+  content.Append(Slice(text, 0, place.begin));
+  EndLine(content);
+  AppendPair(content, szFormat, pair, ValueForm::kPlain, LineEndsOf(text, *section));
+  content.Append(Slice(text, place.end));
 }
 
-// Appends a text but for its sections of a name; false when memory ran out.
-bool AppendWithout(Bytes& content, std::string_view text, std::string_view name) {
+// Appends a text but for its sections of a name.
+void AppendWithout(Bytes& content, std::string_view text, std::string_view name) {
   size_t copied = 0;
   for (Sections sections(text); sections.Next();) {
     if (!EqualIgnoringCase(sections.name(), name)) continue;
     const SectionPlace& place = sections.place();
-    if (!content.Append(Slice(text, copied, place.header))) return false;
+    content.Append(Slice(text, copied, place.header));
     copied = place.end;
   }
-  return content.Append(Slice(text, copied));
+  content.Append(Slice(text, copied));
 }
 
 int WriteSection(const char* szPath, const char* szSection, const char* szNewName, const NewPairs& pairs) {
@@ -125,7 +117,7 @@ int WriteSection(const char* szPath, const char* szSection, const char* szNewNam
     return PLIBCErrSet(ERR_OUT_OF_MEMORY), -1;
   }
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
-    return ComposeSection(text, szSection, szNewName, pairs, content);
+    ComposeSection(text, szSection, szNewName, pairs, content);
   });
   if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
@@ -186,7 +178,7 @@ int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const ch
     return REFUSE_NULL(), -1;
   }
   const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
-    return ComposeValue(text, szSection, {szKey, szValue}, szFormat, content);
+    ComposeValue(text, szSection, {szKey, szValue}, szFormat, content);
   });
   if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 0;
@@ -200,9 +192,9 @@ int PLIBCFileRemoveSection(const char* szPath, const char* szSection) {
   if (!edit.ok()) return FAIL(edit.error(), "Failed to read %s", szPath), -1;
 
   Bytes content;
-  if (!AppendWithout(content, edit->text(), szSection)) return FAIL(ENOMEM, "Failed to write %s", szPath), -1;
+  AppendWithout(content, edit->text(), szSection);
   if (content.view().size() == edit->text().size()) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
-  if (Status status = edit->Commit(content.view()); !status.ok())
-    return FAIL(status.error(), "Failed to write %s", szPath), -1;
+  const Status status = edit->Commit(content);
+  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
   return 1;
 }

@@ -19,23 +19,23 @@ bool IsOneLine(std::string_view text) {
   return text.ends_with('\n') && text.find('\n') == text.size() - 1;
 }
 
-// Expands the two "%s" of a line format; EINVAL when it has another number of them, or any other conversion.
-Status Expand(Bytes& to, std::string_view format, Pair pair, LineEnds ends) {
+// Expands the two "%s" of a line format; fails with EINVAL when it has another number of them, or any other conversion.
+void Expand(Bytes& to, std::string_view format, Pair pair, LineEnds ends) {
   const std::string_view values[] = {pair.key, pair.value};
   size_t used = 0;
   while (!format.empty()) {
     const size_t percent = std::min(format.find('%'), format.size());
-    if (!to.Append(Slice(format, 0, percent))) return Status::Failed(ENOMEM);
+    to.Append(Slice(format, 0, percent));
     format.remove_prefix(percent);
     if (format.empty()) break;
-    if (Slice(format, 0, 2) != "%s" || used == std::size(values)) return Status::Failed(EINVAL);
+    if (Slice(format, 0, 2) != "%s" || used == std::size(values)) return to.Fail(EINVAL);
     const std::string_view value = values[used++];
-    if (!to.Append(value)) return Status::Failed(ENOMEM);
+    to.Append(value);
     format.remove_prefix(2);
     const bool wouldBeCut = ends == LineEnds::kCrLf && value.ends_with('\r') && format == "\n";
-    if (wouldBeCut && !to.Append("\r")) return Status::Failed(ENOMEM);
+    if (wouldBeCut) to.Append("\r");
   }
-  return used == std::size(values) ? Status::Ok() : Status::Failed(EINVAL);
+  if (used < std::size(values)) to.Fail(EINVAL);
 }
 
 }  // namespace
@@ -106,33 +106,30 @@ std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, Va
   return place;
 }
 
-Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, LineEnds ends) {
+void AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, LineEnds ends) {
   const size_t begin = to.view().size();
-  if (Status status = Expand(to, szFormat, pair, ends); !status.ok()) return status;
+  Expand(to, szFormat, pair, ends);
 
   const std::string_view written = Slice(to.view(), begin);
   Lines line(written, ends);
   const bool one = IsOneLine(written) && line.Next();
   const std::optional<Pair> read = one ? PairOfLine(line.text(), form) : std::nullopt;
   const bool same = read && read->key == pair.key && read->value == pair.value;
-  return same ? Status::Ok() : Status::Failed(EINVAL);
+  if (!same) to.Fail(EINVAL);
 }
 
-Status AppendHeader(Bytes& to, std::string_view name) {
+void AppendHeader(Bytes& to, std::string_view name) {
   const size_t begin = to.view().size();
-  if (!to.Append("[") || !to.Append(name) || !to.Append("]\n")) return Status::Failed(ENOMEM);
+  to.Append("[");
+  to.Append(name);
+  to.Append("]\n");
 
   const std::string_view written = Slice(to.view(), begin);
   Lines line(written);
   const bool one = IsOneLine(written) && line.Next();
-  return one && SectionOfLine(line.text()) == name ? Status::Ok() : Status::Failed(EINVAL);
+  if (!one || SectionOfLine(line.text()) != name) to.Fail(EINVAL);
 }
 
-Status AppendText(Bytes& to, std::string_view text) {
-  return to.Append(text) ? Status::Ok() : Status::Failed(ENOMEM);
-}
-
-Status EndLine(Bytes& to) {
-  const std::string_view text = to.view();
-  return text.empty() || text.ends_with('\n') ? Status::Ok() : AppendText(to, "\n");
+void EndLine(Bytes& to) {
+  if (!to.view().empty() && !to.view().ends_with('\n')) to.Append("\n");
 }

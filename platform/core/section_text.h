@@ -7,7 +7,6 @@
 
 #include "common/text.h"
 #include "platform/base/bytes.h"
-#include "platform/base/result.h"
 
 // Where the line ends that holds the byte at `offset`: behind its feed, or where the text ends.
 inline size_t LineEnd(std::string_view text, size_t offset) {
@@ -124,17 +123,14 @@ struct LinePlace {
 std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, ValueForm form);
 
 // Appends the line of a pair in the format of the caller ("%s" twice). Among lines that end in CR LF, a value that ends
-// in a carriage return gets one more, since that line's end takes one away. EINVAL when the format is another, or when
-// the line would not read back as that pair in that form.
-Status AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, LineEnds ends = LineEnds::kLf);
+// in a carriage return gets one more, since that line's end takes one away. Fails with EINVAL when the format is
+// another, or when the line would not read back as that pair in that form.
+void AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, LineEnds ends = LineEnds::kLf);
 
-// Appends a section's header; EINVAL when it would not read back as that name.
-Status AppendHeader(Bytes& to, std::string_view name);
-
-// Appends bytes as they are.
-Status AppendText(Bytes& to, std::string_view text);
+// Appends a section's header; fails with EINVAL when it would not read back as that name.
+void AppendHeader(Bytes& to, std::string_view name);
 
 // Ends the last line, if it has no end yet, so that a line can follow.
-Status EndLine(Bytes& to);
+void EndLine(Bytes& to);
 
 #endif  // MERO_PLATFORM_SECTION_TEXT_H

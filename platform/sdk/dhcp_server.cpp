@@ -194,34 +194,30 @@ class PartText {
 };
 
 // Appends a line. The separators of empty parts wait until a part that is not empty needs them.
-bool AppendLine(Bytes& content, const ConfLine& line, const MERO_DHCPD_CONF& conf) {
+void AppendLine(Bytes& content, const ConfLine& line, const MERO_DHCPD_CONF& conf) {
   bool begun = false;
-  bool good = true;
   size_t separators = 0;
   ForEachPart(line, [&](const Part& part) {
     const PartText text(conf, part);
     if (!text.view().empty()) {
-      if (!begun) good = good && content.Append(line.szPrefix);
+      if (!begun) content.Append(line.szPrefix);
       begun = true;
-      for (; separators > 0; --separators) good = good && content.Append(",");
-      good = good && content.Append(text.quote()) && content.Append(text.view()) && content.Append(text.quote());
+      for (; separators > 0; --separators) content.Append(",");
+      content.Append(text.quote());
+      content.Append(text.view());
+      content.Append(text.quote());
     }
     ++separators;
   });
-  return !begun || (good && content.Append("\n"));
-}
-
-bool Compose(Bytes& content, const MERO_DHCPD_CONF& conf) {
-  return content.Append(kHeading) &&
-         std::all_of(std::begin(kLines), std::end(kLines),
-                     [&](const ConfLine& line) { return AppendLine(content, line, conf); }) &&
-         content.Append(kEnding);
+  if (begun) content.Append("\n");
 }
 
 Status WriteConf(const char* szPath, const MERO_DHCPD_CONF& conf) {
   if (Status status = MakeDirectory(kDirectory); !status.ok()) return status;
   return EditFile(szPath, 0644, [&](std::string_view, Bytes& content) {
-    return Compose(content, conf) ? Status::Ok() : Status::Failed(ENOMEM);
+    content.Append(kHeading);
+    for (const ConfLine& line : kLines) AppendLine(content, line, conf);
+    content.Append(kEnding);
   });
 }
 
