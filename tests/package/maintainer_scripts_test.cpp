@@ -26,7 +26,8 @@ constexpr char kConnection[] = "/usr/mero/etc/wpa_supplicant.conf";
 
 // What stands in directories that anyone may write, and what the scripts remove.
 const std::vector<std::string> kPublic = {"/var/tmp/.wireless_connecting", "/var/tmp/.wireless_current_connection",
-                                          "/var/tmp/.wireless_ap_connecting", kAdapter};
+                                          "/var/tmp/.wireless_ap_connecting",
+                                          "/var/tmp/.wireless_current_connection.aB3xYz", kAdapter};
 
 Ran Script(const std::string& name, const std::string& arguments) {
   return RunInShell("PATH=/tmp/bin:$PATH sh " PACKAGE_SCRIPTS "/" + name + " " + arguments);
