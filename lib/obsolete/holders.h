@@ -106,11 +106,11 @@ class NewFile {
   }
 
   // One of a name that nobody can foresee, for a directory into which anyone may put files: `szTemplate` ends with
-  // "XXXXXX", which it gives way to.
+  // "XXXXXX", which it gives way to. Where it cannot be written to, it is not left behind.
   static NewFile Unforeseen(char* szTemplate, Readers readers) {
     const int fd = ::mkostemp(szTemplate, O_CLOEXEC);
     if (fd >= 0) (void)::fchmod(fd, readers);
-    return NewFile(fd);
+    return NewFile(fd, szTemplate);
   }
   NewFile(const NewFile&) = delete;
   NewFile& operator=(const NewFile&) = delete;
@@ -128,7 +128,10 @@ class NewFile {
   }
 
  private:
-  explicit NewFile(int fd) { Take(fd); }
+  NewFile(int fd, const char* szPath) {
+    Take(fd);
+    if (fd >= 0 && pfFile_ == nullptr) (void)::unlink(szPath);
+  }
 
   void Take(int fd) {
     if (fd < 0) return;

@@ -126,6 +126,20 @@ TEST_F(ConnectionRecord, ThatDoesNotReachTheDiskIsReportedAndRemovedAndTheConnec
   EXPECT_EQ(::umount("/var/tmp"), 0);
 }
 
+// An empty file stayed beside the record's place when memory ran out between making it and writing to it.
+TEST_F(ConnectionRecord, ThatFindsNoMemoryLeavesNoFileBehind) {
+  int failures = 0;
+  memory::FailEach([this] { return MEROWirelessNetworkConnect(&config_); },
+                   [&failures](int n, int result) {
+                     failures += result < 0 ? 1 : 0;
+                     for (const auto& entry : std::filesystem::directory_iterator("/var/tmp")) {
+                       EXPECT_EQ(entry.path(), kRecord) << n;
+                     }
+                   });
+  EXPECT_GT(failures, 0);
+  EXPECT_TRUE(Exists(kRecord));
+}
+
 TEST_F(ConnectionRecord, StaysWhenTheNetworkIsNotJoined) {
   WriteText(kRecord, "old");
   fake::PipesGive({""});
