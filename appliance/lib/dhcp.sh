@@ -39,8 +39,7 @@ start_dnsmasq() { # BRIDGE CONFIGURATION
 run_dnsmasq() { # BRIDGE CONFIGURATION [OPTION...]
 	bridge=$1 file=$2
 	shift 2
-	leases=$(sed -n '/^dhcp-leasefile=/p' "$file") || fail "cannot read $file"
-	[ -n "$leases" ] || set -- "$@" "--dhcp-leasefile=$state/dnsmasq-$bridge.leases"
+	ask file "$file" dhcp-leasefile || set -- "$@" "--dhcp-leasefile=$state/dnsmasq-$bridge.leases"
 	dnsmasq --conf-file="$file" --pid-file="$(dnsmasq_pid "$bridge")" --bind-interfaces --except-interface=lo \
 		--no-ping "$@" && chown -h 0:0 "$(dnsmasq_pid "$bridge")"
 }

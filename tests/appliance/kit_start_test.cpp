@@ -56,6 +56,25 @@ TEST_F(KitAccessPoint, LeavesNothingWhenAStepFails) {
   }
 }
 
+// A lease file with blanks around its name, as dnsmasq reads it, gave way to the kit's own.
+TEST_F(KitAccessPoint, KeepsLeasesInTheFileThatItsServerNames) {
+  const struct {
+    const char* szLine;
+    bool named;
+  } rows[] = {
+      {"dhcp-leasefile=/tmp/leases\n", true}, {"\tdhcp-leasefile = /tmp/leases\n", true},
+      {"dhcp-leasefile=/tmp/leases", true},   {"#dhcp-leasefile=/tmp/leases\n", false},
+      {"no-dhcp-leasefile=x\n", false},       {"", false},
+  };
+  for (const auto& row : rows) {
+    Write("/etc/dhcpd/dhcpd-lbr0-lbr0.conf", std::string("interface=lbr0\n") + row.szLine);
+    Write("/tmp/calls", "");
+    ASSERT_EQ(Script("start wlan0 lbr0").output, "") << row.szLine;
+    const std::string own = RunInShell("grep -o 'dhcp-leasefile=.*' /tmp/calls").output;
+    EXPECT_EQ(own, row.named ? "" : "dhcp-leasefile=/var/run/rc.network/dnsmasq-lbr0.leases\n") << row.szLine;
+  }
+}
+
 TEST_F(KitAccessPoint, NeedsNoNftWithoutRules) {
   SetBridge("NAT=no");
   fs::remove("/tmp/bin/nft");
