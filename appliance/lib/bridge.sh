@@ -22,8 +22,9 @@ is_there() { # INTERFACE
 	[ -e "/sys/class/net/$1" ]
 }
 
-# make_bridge BRIDGE: the bridge with its first member, which is wired, and its address. A wireless member comes in when
-# its access point starts. Without its first member the bridge is made all the same, and that is a failure.
+# make_bridge BRIDGE [undoable]: makes the bridge with its address and its first member, if that one is wired; a wireless
+# member comes in when its access point starts. Without its first member the bridge is made all the same, and that is a
+# failure. A new bridge that is undoable has noted what give_wire_back needs.
 make_bridge() {
 	ask bridge "$1" hardware-address member static address mask || fail "$scripts/ifcfg-$1 describes no bridge"
 	{
@@ -35,13 +36,14 @@ make_bridge() {
 	} <<-END
 		$answer
 	END
-	if is_there "$1"; then made=''; else made=yes; fi
+	undoable=${2-}
+	if is_there "$1"; then undoable=''; fi
 	create_bridge "$1" "$hardware"
 	missing='' routes=''
 	if [ -n "$primary" ] && ! is_wireless "$primary"; then
 		if is_there "$primary"; then
 			routes=$(ip -4 route show default dev "$primary") || fail "cannot tell the routes of $primary"
-			[ -z "$made" ] || [ -z "$starting" ] || note_wire "$primary" "$1"
+			[ -z "$undoable" ] || note_wire "$primary" "$1"
 			join_bridge "$primary" "$1"
 		else
 			missing=yes
@@ -56,10 +58,11 @@ make_bridge() {
 	[ -z "$missing" ] || fail "there is no interface '$primary' for the bridge $1"
 }
 
-# make_bridge_of_boot NAME: makes the bridge of that network-script file, if it is one that comes up at boot.
-make_bridge_of_boot() { # NAME
+# make_bridge_of_boot NAME DEADLINE: makes the bridge of that network-script file, if it is one that comes up at boot.
+# A first member that is not there yet is waited for until the deadline, which is in seconds since the machine's start.
+make_bridge_of_boot() {
 	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1" && ! waits_for_access_point "$1"; then
-		await_first_member "$1"
+		await_first_member "$1" "$2"
 		make_bridge "$1"
 	fi
 }
@@ -81,15 +84,10 @@ is_file_of_interface() {
 	esac
 }
 
-# be_patient SECONDS: from now on, so long in all, first members are waited for that come a moment later than this.
-be_patient() {
-	patience_ends=$(($(uptime_seconds) + $1))
-}
-
-await_first_member() { # BRIDGE
+await_first_member() { # BRIDGE DEADLINE
 	primary=$(script_value PRIMARY "$1") || exit 1
 	[ -n "$primary" ] || return 0
-	while ! is_there "$primary" && [ "$(uptime_seconds)" -lt "$patience_ends" ]; do sleep 0.1; done
+	while ! is_there "$primary" && [ "$(uptime_seconds)" -lt "$2" ]; do sleep 0.1; done
 }
 
 uptime_seconds() {
@@ -97,9 +95,9 @@ uptime_seconds() {
 }
 
 create_bridge() { # BRIDGE HARDWARE-ADDRESS, which may be empty
-	is_there "$1" || attempt "make the bridge $1" ip link add name "$1" type bridge
-	[ -z "$2" ] || attempt "give $1 the address $2" ip link set dev "$1" address "$2"
-	attempt "bring $1 up" ip link set dev "$1" up
+	is_there "$1" || attempt "cannot make the bridge $1" ip link add name "$1" type bridge
+	[ -z "$2" ] || attempt "cannot give $1 the address $2" ip link set dev "$1" address "$2"
+	attempt "cannot bring $1 up" ip link set dev "$1" up
 }
 
 is_wireless() { # INTERFACE
@@ -109,9 +107,9 @@ is_wireless() { # INTERFACE
 # A member has no addresses of its own: the bridge has them.
 join_bridge() { # INTERFACE BRIDGE
 	end_lease "$1"
-	attempt "bring $1 into $2" ip link set dev "$1" master "$2"
-	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
-	attempt "bring $1 up" ip link set dev "$1" up
+	attempt "cannot bring $1 into $2" ip link set dev "$1" master "$2"
+	remove_addresses "$1"
+	attempt "cannot bring $1 up" ip link set dev "$1" up
 }
 
 # move_routes BRIDGE TEXT: the way out that its first member had is the bridge's now.
@@ -136,12 +134,12 @@ note_wire() {
 }
 
 forget_wire() { # BRIDGE [FILE]
-	attempt "remove $state/wire-$1" rm -f "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes" "${2-}"
+	remove_files "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes" "${2-}"
 }
 
 # give_wire_back BRIDGE: the first member is by itself again, as it was, and the bridge is gone.
 give_wire_back() {
-	read -r wire leased <"$state/wire-$1" || fail "cannot read $state/wire-$1"
+	read -r wire leased <"$state/wire-$1" || cannot_read "$state/wire-$1"
 	end_dnsmasq "$1"
 	remove_bridge "$1"
 	said=$(ip address restore <"$state/wire-$1.addresses" 2>&1) || fail "cannot give $wire its addresses back: $said"
@@ -153,18 +151,23 @@ give_wire_back() {
 # set_address INTERFACE ADDRESS/MASK: the only one. What has it already keeps the routes that go with it.
 set_address() {
 	end_lease "$1"
-	attempt "give $1 the address $2" ip address replace "$2" broadcast + dev "$1"
+	attempt "cannot give $1 the address $2" ip address replace "$2" broadcast + dev "$1"
 	addresses=$(ip -4 -oneline address show dev "$1") || fail "cannot tell the addresses of $1"
 	case $addresses in *"$newline"*) ;; *) return 0 ;; esac
-	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
-	attempt "give $1 the address $2" ip address add "$2" broadcast + dev "$1"
+	remove_addresses "$1"
+	attempt "cannot give $1 the address $2" ip address add "$2" broadcast + dev "$1"
 }
 
-# The client goes on in the background when no server has answered yet; one that a server keeps busy is ended.
+remove_addresses() { # INTERFACE
+	is_there "$1" || return 0
+	attempt "cannot remove the addresses of $1" ip -4 address flush dev "$1"
+}
+
+# The client goes on in the background when no server has answered yet. A client that a server keeps busy is ended.
 lease_address() { # INTERFACE
 	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || return 0
-	attempt "lease an address for $1" timeout -k 2 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 -T 2 \
-		-s /usr/mero/sbin/udhcpc.lease
+	attempt "cannot lease an address for $1" timeout -k 2 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 \
+		-T 2 -s /usr/mero/sbin/udhcpc.lease
 }
 
 # end_lease INTERFACE: ends the client, and gives back what one has leased, also one that ended by itself.
@@ -197,7 +200,7 @@ was_started() {
 }
 
 forget_bridge() { # INTERFACE
-	attempt "remove $(bridge_note "$1")" rm -f "$(bridge_note "$1")"
+	remove_files "$(bridge_note "$1")"
 }
 
 # bridge_of INTERFACE: the bridge that its access point was put into; without a note, the one that it is in.
@@ -213,16 +216,13 @@ bridge_of() {
 
 leave_bridge() { # INTERFACE BRIDGE
 	[ -e "/sys/class/net/$2/brif/$1" ] || return 0
-	attempt "take $1 out of $2" ip link set dev "$1" nomaster
+	attempt "cannot take $1 out of $2" ip link set dev "$1" nomaster
 }
 
-# Whether an access point is being started, and whether what its start has made comes to nothing.
-starting='' undoing=''
-
-# give_up_bridge BRIDGE: it stays where it comes up at boot, for its other members, whom it may serve; but not when the
-# start that made it failed.
+# give_up_bridge BRIDGE [undo]: removes the bridge, unless it comes up at boot and has other members, whom it may serve.
+# With "undo", a bridge that was made for the start that failed goes in any case.
 give_up_bridge() {
-	if [ -n "$undoing" ] && [ -e "$state/wire-$1" ]; then
+	if [ -n "${2-}" ] && [ -e "$state/wire-$1" ]; then
 		give_wire_back "$1"
 	elif comes_up_at_boot "$1" && has_members "$1"; then
 		serve_addresses "$1"
@@ -242,5 +242,5 @@ has_members() { # BRIDGE
 remove_bridge() { # BRIDGE
 	end_lease "$1"
 	[ -e "/sys/class/net/$1/bridge" ] || return 0
-	attempt "remove the bridge $1" ip link delete dev "$1" type bridge
+	attempt "cannot remove the bridge $1" ip link delete dev "$1" type bridge
 }

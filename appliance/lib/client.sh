@@ -11,17 +11,12 @@ end_client() {
 # An interface that is a client's is as it is when it has just been plugged in: without addresses, down, and of the
 # kind "managed". One that was pulled is nobody's.
 
-remove_addresses() { # INTERFACE
-	is_there "$1" || return 0
-	attempt "remove the addresses of $1" ip -4 address flush dev "$1"
-}
-
 take_down() { # INTERFACE
 	is_there "$1" || return 0
-	attempt "take $1 down" ip link set dev "$1" down
+	attempt "cannot take $1 down" ip link set dev "$1" down
 }
 
 make_client() { # INTERFACE
 	is_there "$1" || return 0
-	attempt "make $1 a client's" iw dev "$1" set type managed
+	attempt "cannot make $1 a client's" iw dev "$1" set type managed
 }

@@ -50,5 +50,5 @@ end_daemon() {
 		done
 	done
 	! daemon_of "$1" "$2" >/dev/null || fail "cannot end $1 (process $ended)"
-	attempt "remove $2" rm -f "$2"
+	remove_files "$2"
 }

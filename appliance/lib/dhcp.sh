@@ -29,7 +29,7 @@ start_dnsmasq() { # BRIDGE CONFIGURATION
 	case $said in
 	*'failed to create listening socket for port 53'* | *'failed to create listening socket for '*'ddress already in use'*)
 		warn "no names are answered on $1: $said"
-		attempt "serve addresses on $1" run_dnsmasq "$1" "$2" --port=0
+		attempt "cannot serve addresses on $1" run_dnsmasq "$1" "$2" --port=0
 		;;
 	*) fail "cannot serve addresses on $1: $said" ;;
 	esac

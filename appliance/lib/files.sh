@@ -55,6 +55,16 @@ is_on() {
 	esac
 }
 
+# cannot_read FILE: ends the script when a file that it needs cannot be read.
+cannot_read() {
+	fail "cannot read $1"
+}
+
+# remove_files FILE...: removes files, which need not be there. A failure is told of the first one.
+remove_files() {
+	attempt "cannot remove $1" rm -f "$@"
+}
+
 # put FILE [MODE]: replaces a file by what it reads. Nobody sees a half of it, and nobody but root the whole, unless the
 # mode says so. Anybody may have put something in its place, also in /tmp: that is neither followed nor written to, and
 # the new file is made under a name that nobody can foresee.
@@ -73,6 +83,6 @@ give_up() { # NEW-FILE TEXT
 # set_aside PATH: what stands in the way is kept, under another name.
 set_aside() {
 	aside=$(mktemp -u "$1.foreign-XXXXXX") || fail "cannot move $1 aside"
-	attempt "move $1 aside" mv -T "$1" "$aside"
+	attempt "cannot move $1 aside" mv -T "$1" "$aside"
 	warn "$1 was in the way, and is $aside now"
 }

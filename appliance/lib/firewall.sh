@@ -17,10 +17,9 @@ set_firewall() { # BRIDGE
 		first=yes
 		put "$forwarding_before" <"$forwarding"
 	fi
-	set_rules "$text" || {
-		reason=$said
+	said=$(set_rules "$text") || {
 		[ -z "$first" ] || rm -f "$forwarding_before" # none stand
-		fail "cannot set the rules between networks: $reason"
+		fail "cannot set the rules between networks: $said"
 	}
 	echo 1 >"$forwarding" || fail 'cannot pass traffic on between networks'
 }
@@ -29,21 +28,20 @@ set_firewall() { # BRIDGE
 # on as well.
 clear_firewall() {
 	[ -e "$forwarding_before" ] || return 0
-	read -r before <"$forwarding_before" || fail "cannot read $forwarding_before"
+	read -r before <"$forwarding_before" || cannot_read "$forwarding_before"
 	echo "$before" >"$forwarding" || fail 'cannot stop passing traffic on between networks'
-	set_rules '' || fail "cannot remove the rules between networks: $said"
-	attempt "remove $forwarding_before" rm -f "$forwarding_before"
+	said=$(set_rules '') || fail "cannot remove the rules between networks: $said"
+	remove_files "$forwarding_before"
 }
 
-# set_rules TEXT: all of it takes the place of what was there in one step. The table is added first, since what is
-# missing cannot be deleted.
+# set_rules TEXT: replaces all rules by the text's in one step, and prints what nft says. The table is added first, since
+# a missing one cannot be deleted.
 set_rules() {
-	said=$(nft -f - 2>&1 <<-END
+	nft -f - 2>&1 <<-END
 		add table inet mero_ap
 		delete table inet mero_ap
 		$1
 	END
-	)
 }
 
 rules() { # BRIDGE

@@ -25,7 +25,7 @@ guest_is_on() {
 
 # Without an address of its own, the guest network gets the one behind the radio's.
 guest_configuration() { # INTERFACE
-	sed '/^bssid=$/d' "/etc/hostapd/hostapd-$1-guest.conf" || fail "cannot read /etc/hostapd/hostapd-$1-guest.conf"
+	sed '/^bssid=$/d' "/etc/hostapd/hostapd-$1-guest.conf" || cannot_read "/etc/hostapd/hostapd-$1-guest.conf"
 }
 
 # set_guest_bridge: the bridge is there if the start has guests, and only then.
@@ -41,5 +41,5 @@ make_guest_bridge() {
 remove_guest_bridge() {
 	end_dnsmasq "$guest_bridge"
 	remove_bridge "$guest_bridge"
-	attempt "remove $state/dnsmasq-$guest_bridge.conf" rm -f "$state/dnsmasq-$guest_bridge.conf"*
+	remove_files "$state/dnsmasq-$guest_bridge.conf" "$state/dnsmasq-$guest_bridge.conf".*
 }

@@ -11,9 +11,10 @@ start_hostapd() { # INTERFACE
 
 	put "$log" </dev/null
 	announce_daemon "$(hostapd_pid "$1")"
-	said=$(run_hostapd "$1" 2>&1) || {
+	said=$(run_hostapd "$1" "$configuration" "$log" 2>&1) || {
 		rm -f "$(hostapd_pid "$1")"
-		fail "cannot start the access point on $1: $(reason_in "$log" "$said")"
+		reason=$(reason_in "$log" "$said")
+		fail "cannot start the access point on $1: $reason"
 	}
 	await_pid "$(hostapd_pid "$1")"
 	await_access_point "$1" "$log"
@@ -21,10 +22,10 @@ start_hostapd() { # INTERFACE
 }
 
 # Strangers fill the log, a line for each frame: it ends at 1 MiB.
-run_hostapd() ( # INTERFACE
+run_hostapd() ( # INTERFACE CONFIGURATION LOG
 	trap '' XFSZ
 	ulimit -f 2048
-	hostapd -B -t -f "$log" -P "$(hostapd_pid "$1")" "$configuration"
+	hostapd -B -t -f "$3" -P "$(hostapd_pid "$1")" "$2"
 )
 
 end_hostapd() { # INTERFACE
@@ -54,7 +55,7 @@ belongings_of() { # PROCESS
 
 # forget_configuration INTERFACE: it holds secrets, and so does a half that was being written.
 forget_configuration() {
-	attempt "remove $state/hostapd-$1.conf" rm -f "$state/hostapd-$1.conf"* "$state/hostapd-$1.log"*
+	remove_files "$state/hostapd-$1.conf" "$state/hostapd-$1.conf".* "$state/hostapd-$1.log" "$state/hostapd-$1.log".*
 }
 
 hostapd_pid() { # INTERFACE
@@ -68,7 +69,7 @@ write_configuration() { # INTERFACE FILE
 	[ -s "$host" ] || fail "$host is missing or empty"
 	band=$(band_of "$host") || exit 1
 	unable=$(what_is_unable "$1" "$band") || exit 1
-	networks=$(sed "$unable" "$host") || fail "cannot read $host"
+	networks=$(sed "$unable" "$host") || cannot_read "$host"
 	if [ -n "$guests" ]; then
 		second=$(guest_configuration "$1") || exit 1
 		networks=$networks$newline$second
@@ -93,7 +94,7 @@ expect_protection() {
 }
 
 band_of() { # CONFIGURATION
-	mode=$(sed -n 's/^hw_mode=//p' "$1") || fail "cannot read $1"
+	mode=$(sed -n 's/^hw_mode=//p' "$1") || cannot_read "$1"
 	if [ "$mode" = a ]; then echo 2; else echo 1; fi
 }
 
@@ -128,7 +129,7 @@ ht_capabilities() { # INTERFACE BAND
 
 # The daemon does not start when a file that it is told to read is missing.
 make_named_files() { # CONFIGURATION
-	files=$(sed -n 's/^wpa_psk_file=//p' "$1") || fail "cannot read $1"
+	files=$(sed -n 's/^wpa_psk_file=//p' "$1") || cannot_read "$1"
 	while IFS= read -r file; do
 		[ -z "$file" ] || [ -e "$file" ] || put "$file" </dev/null
 	done <<-END
@@ -149,7 +150,8 @@ await_access_point() { # INTERFACE LOG
 		sleep 0.1
 		tries=$((tries - 1))
 	done
-	fail "the access point on $1 does not come up: $(reason_in "$2")"
+	reason=$(reason_in "$2")
+	fail "the access point on $1 does not come up: $reason"
 }
 
 # reason_in LOG [TEXT]: the line in which a daemon says what went wrong, without its time.

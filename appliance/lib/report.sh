@@ -14,11 +14,11 @@ warn() {
 	logger -t "${0##*/}" -p daemon.warning -- "$1"
 }
 
-# attempt WHAT COMMAND...: runs a command; one that fails ends the script, with what it said.
+# attempt TEXT COMMAND...: runs a command. If it fails, the script ends with that text, and with what the command said.
 attempt() {
-	what=$1
+	complaint=$1
 	shift
-	said=$("$@" 2>&1) || fail "cannot $what: ${said:-$1 ended with status $?}"
+	said=$("$@" 2>&1) || fail "$complaint: ${said:-$1 ended with status $?}"
 }
 
 # is_name TEXT: whether an interface may be called so, and it may be put into paths and rules.

@@ -17,7 +17,7 @@ is_off_now() {
 apply_main_schedule() { # INTERFACE
 	turn=up
 	if is_off_now wifi_sched_enabled wifi_sched; then turn=down; fi
-	attempt "switch $1 $turn" ip link set dev "$1" "$turn"
+	attempt "cannot switch $1 $turn" ip link set dev "$1" "$turn"
 }
 
 # What a schedule has begun, and not come to the end of, is noted: meanwhile nothing is on the air that could tell.
@@ -34,7 +34,7 @@ is_late() { # INTERFACE
 }
 
 forget_lateness() { # INTERFACE
-	attempt "remove $(lateness "$1")" rm -f "$(lateness "$1")"
+	remove_files "$(lateness "$1")"
 }
 
 # guest_is_late INTERFACE: whether the guest network is on the air and should not be, or the other way round. The daemon

@@ -7,14 +7,18 @@ lock=$state/lock
 # own_state: the directory is there, root's, and holds nothing that anybody else has made or may open, whatever stood
 # there before.
 own_state() {
-	[ -e "$state" ] || [ -L "$state" ] || attempt "make $state" mkdir -p -m 700 "$state"
+	[ -e "$state" ] || [ -L "$state" ] || make_state
 	owner=$(stat -c '%u %F' "$state") || fail "cannot tell whose $state is"
 	if [ "$owner" != '0 directory' ]; then
 		set_aside "$state"
-		attempt "make $state" mkdir -p -m 700 "$state"
+		make_state
 	fi
-	attempt "keep $state to root" chmod 700 "$state"
+	attempt "cannot keep $state to root" chmod 700 "$state"
 	remove_foreign_entries
+}
+
+make_state() {
+	attempt "cannot make $state" mkdir -p -m 700 "$state"
 }
 
 # Root's are plain files of one name each. A lock that was open to others may be held by them for ever.
@@ -24,8 +28,8 @@ remove_foreign_entries() {
 	adopt_pid_files
 	foreign=$(foreign_entries -exec rm -rf --one-file-system -- '{}' +) ||
 		fail "cannot remove what is not root's from $state"
-	[ -z "$foreign" ] ||
-		warn "removed from $state what was not root's alone: $(printf '%s' "${foreign% }" | tr -c '[:print:]' '?')"
+	foreign=$(printf '%s' "${foreign% }" | tr -c '[:print:]' '?')
+	[ -z "$foreign" ] || warn "removed from $state what was not root's alone: $foreign"
 }
 
 foreign_entries() { # WHAT-ELSE-TO-DO-WITH-THEM...
@@ -39,7 +43,7 @@ adopt_pid_files() {
 	for file in "$state"/dnsmasq-*.pid; do
 		server=$(daemon_of dnsmasq "$file") || continue
 		if tr '\0' '\n' <"/proc/$server/cmdline" | grep -qxF -e "--pid-file=$file"; then
-			attempt "keep $file to root" chown -h 0:0 "$file"
+			attempt "cannot keep $file to root" chown -h 0:0 "$file"
 		fi
 	done
 }
