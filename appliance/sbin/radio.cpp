@@ -56,14 +56,19 @@ int OnError(sockaddr_nl*, nlmsgerr* error, void* answer) {
   return NL_STOP;
 }
 
-[[noreturn]] void Fail(const std::string& what, const char* why) {
-  throw std::runtime_error(what + ": " + why);
+// For an error of libnl's.
+[[noreturn]] void FailToReachDriver(int error) {
+  throw std::runtime_error(std::string("cannot reach the driver: ") + nl_geterror(error));
+}
+
+[[noreturn]] void RefuseInterface(const std::string& interface) {
+  throw std::runtime_error(interface + ": not a wireless interface");
 }
 
 Socket Connect() {
   Socket socket(nl_socket_alloc());
   if (!socket) throw std::bad_alloc();
-  if (const int error = genl_connect(socket.get()); error < 0) Fail("cannot reach the driver", nl_geterror(error));
+  if (const int error = genl_connect(socket.get()); error < 0) FailToReachDriver(error);
   return socket;
 }
 
@@ -151,13 +156,13 @@ std::optional<Network> NetworkOfMessage(nlmsghdr* message) {
 
 std::vector<Network> ReadScanResults(const std::string& interface) {
   const unsigned index = if_nametoindex(interface.c_str());
-  if (index == 0) Fail(interface, "no such interface");
+  if (index == 0) throw std::runtime_error(interface + ": no such interface");
 
   const Socket socket = Connect();
   const int family = genl_ctrl_resolve(socket.get(), NL80211_GENL_NAME);
   // A kernel that has never seen a radio need not know nl80211.
-  if (family == -NLE_OBJ_NOTFOUND) Fail(interface, "not a wireless interface");
-  if (family < 0) Fail("cannot reach the driver", nl_geterror(family));
+  if (family == -NLE_OBJ_NOTFOUND) RefuseInterface(interface);
+  if (family < 0) FailToReachDriver(family);
 
   // The radio may hear something while the driver answers. Then the answer may lack a network or tell one twice, and
   // is worth asking for again; not for ever, since a busy band never rests.
@@ -169,9 +174,11 @@ std::vector<Network> ReadScanResults(const std::string& interface) {
     result = Ask(socket.get(), family, index, answer);
     if (result != -NLE_DUMP_INTR) break;
   }
-  if (SaysNotWireless(answer.error)) Fail(interface, "not a wireless interface");
-  if (answer.error != 0) Fail(interface + ": cannot read the scan results", std::strerror(answer.error));
-  if (result < 0 && result != -NLE_DUMP_INTR) Fail(interface + ": cannot read the scan results", nl_geterror(result));
+  if (SaysNotWireless(answer.error)) RefuseInterface(interface);
+  if (answer.error != 0 || (result < 0 && result != -NLE_DUMP_INTR)) {
+    const char* reason = answer.error != 0 ? std::strerror(answer.error) : nl_geterror(result);
+    throw std::runtime_error(interface + ": cannot read the scan results: " + reason);
+  }
   return std::move(answer.networks);
 }
 
