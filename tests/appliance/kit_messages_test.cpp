@@ -1,0 +1,169 @@
+// What the kit says when something cannot be done: each message, from a program that fails at that step.
+#include "kit_radio.h"
+
+namespace {
+
+using testing::HasSubstr;
+
+// A command in the kit's parts, what of its programs fails, and what is said then.
+struct Step {
+  const char* szCommand;
+  const char* szProgram;
+  const char* szCalls;
+  const char* szMessage;
+};
+
+class KitMessage : public KitRadio {
+ protected:
+  KitMessage() {
+    for (const char* szName :
+         {"busybox", "chmod", "cut", "date", "find", "flock", "mktemp", "mv", "readlink", "rm", "stat"}) {
+      StandIn(szName, "exec /usr/bin/" + std::string(szName) + " \"$@\"\n");
+    }
+  }
+
+  // Runs it with a state directory of its own, as somebody who started nothing yet.
+  static void ExpectMessages(std::initializer_list<Step> steps) {
+    for (const Step& step : steps) {
+      RunInShell("rm -rf /run/rc.network; mkdir -p -m 700 /run/rc.network");
+      Mend();
+      if (*step.szProgram != '\0') Break(step.szProgram, step.szCalls);
+      const Ran ran = RunInParts(step.szCommand);
+      EXPECT_THAT(ran.output, HasSubstr(std::string(step.szMessage) + "\n")) << step.szCommand;
+    }
+  }
+};
+
+TEST_F(KitMessage, OfABridgeSaysWhichStepCannotBeTaken) {
+  SetBridge("PRIMARY=eth0");
+  ExpectMessages({
+      {"make_bridge br9", "", "", "/etc/sysconfig/network-scripts/ifcfg-br9 describes no bridge"},
+      {"make_bridge lbr0", "ip", "route show", "cannot tell the routes of eth0"},
+      {"remove_bridge lbr0; make_bridge lbr0", "ip", "add name lbr0", "cannot make the bridge lbr0: ip is broken"},
+      {"make_bridge lbr0", "ip", "lbr0 up", "cannot bring lbr0 up: ip is broken"},
+      {"make_bridge lbr0", "ip", "master lbr0", "cannot bring eth0 into lbr0: ip is broken"},
+      {"make_bridge lbr0", "ip", "address flush", "cannot remove the addresses of eth0: ip is broken"},
+      {"make_bridge lbr0", "ip", "-oneline", "cannot tell the addresses of lbr0"},
+      {"leave_bridge eth0 lbr0", "ip", "nomaster", "cannot take eth0 out of lbr0: ip is broken"},
+      {"bridge_of eth0", "readlink", "master", "cannot tell the bridge of eth0"},
+      {"remove_bridge lbr0", "ip", "link delete", "cannot remove the bridge lbr0: ip is broken"},
+      {"move_routes lbr0 'default via 192.0.2.1'", "ip", "route add",
+       "cannot route over lbr0 as before, 'default via 192.0.2.1': ip is broken"},
+      {"lease_address lbr0", "busybox", "udhcpc", "cannot lease an address for lbr0: busybox is broken"},
+  });
+}
+
+TEST_F(KitMessage, OfAWireSaysWhatCannotBeGivenBack) {
+  Write("/usr/mero/sbin/udhcpc.lease", "#!/bin/sh\nexit 1\n");
+  const std::string noted = "note_wire eth0 lbr0; ";
+  const std::string gives = noted + "give_wire_back lbr0";
+  ExpectMessages({
+      {"note_wire eth0 lbr0", "ip", "address save", "cannot note the addresses of eth0"},
+      {"note_wire eth0 lbr0", "ip", "route save", "cannot note the routes of eth0"},
+      {gives.c_str(), "ip", "address restore", "cannot give eth0 its addresses back: ip is broken"},
+      {gives.c_str(), "ip", "route restore", "cannot give eth0 its routes back: ip is broken"},
+      {"chmod 755 /usr/mero/sbin/udhcpc.lease; end_lease eth0", "", "", "what eth0 had leased is not all given back"},
+      {"take_down wlan0", "ip", "wlan0 down", "cannot take wlan0 down: ip is broken"},
+      {"make_client wlan0", "iw", "managed", "cannot make wlan0 a client's: iw is broken"},
+  });
+}
+
+TEST_F(KitMessage, OfSettingsSaysWhatIsWrongWithThem) {
+  ExpectMessages({
+      {"settings_reader=/tmp/bin/ip; setting ssid", "ip", "", "cannot read settings: access-point ssid"},
+      {"ask() { answer=perhaps; }; is_on guests", "", "", "the setting guests is 'perhaps', which is no number"},
+      {"ask() { return 1; }; setting ssid", "", "", "cannot read the setting ssid"},
+      {"ask() { return 1; }; is_on guests", "", "", "cannot read the setting guests"},
+      {"ask() { answer=perhaps; }; is_nat lbr0", "", "", "neither yes nor no, but 'perhaps': bridge lbr0 nat"},
+      {"guest_configuration wlan0", "", "", "cannot read /etc/hostapd/hostapd-wlan0-guest.conf"},
+      {"write_configuration wlan1 /tmp/conf", "", "", "/etc/hostapd/hostapd-wlan1-host.conf is missing or empty"},
+  });
+}
+
+TEST_F(KitMessage, OfAFileSaysWhichItIs) {
+  ExpectMessages({
+      {"remove_files /tmp/file", "rm", "/tmp/file", "cannot remove /tmp/file: rm is broken"},
+      {"put /tmp/file </dev/null", "mktemp", "", "cannot write /tmp/file: mktemp is broken"},
+      {"put /tmp/file </dev/null", "mv", "", "cannot replace /tmp/file: mv is broken"},
+      {"set_aside /tmp/file", "mktemp", "", "cannot move /tmp/file aside"},
+      {"set_aside /tmp/file", "mv", "", "cannot move /tmp/file aside: mv is broken"},
+      {"mktemp() { echo /tmp/other; }; >/tmp/file; set_aside /tmp/file", "", "",
+       "/tmp/file was in the way, and is /tmp/other now"},
+      {"mkdir -p /tmp/device/driver; numbers_of /tmp/device", "readlink", "", "cannot tell what drives /tmp/device"},
+  });
+}
+
+TEST_F(KitMessage, OfTrafficBetweenNetworksSaysWhatDoesNotPass) {
+  const std::string closed = "forwarding=/proc/version; is_nat() { return 1; }; rules() { :; }; guests=yes; ";
+  const std::string opens = closed + "set_firewall lbr0";
+  const std::string closes = closed + "echo 0 >$forwarding_before; clear_firewall";
+  ExpectMessages({
+      {opens.c_str(), "", "", "cannot pass traffic on between networks"},
+      {closes.c_str(), "", "", "cannot stop passing traffic on between networks"},
+      {"subnet_of lo", "", "", "lo has no address, and so no network to translate"},
+      {"local_networks", "ip", "route show", "cannot tell the networks around the appliance"},
+  });
+}
+
+TEST_F(KitMessage, OfADaemonSaysWhatItDoesNotDo) {
+  const std::string stays =
+      "(sleep 60 & echo $! >/tmp/pid; wait) >/dev/null 2>&1 & until [ -s /tmp/pid ]; do :; done; ";
+  const Ran ran = RunInParts(stays + "kill() { :; }; sleep() { :; }; end_daemon sleep /tmp/pid; unset -f kill");
+  EXPECT_THAT(ran.output, testing::ContainsRegex("cannot end sleep \\(process [0-9]+\\)\n"));
+  RunInShell("kill $(cat /tmp/pid)");
+
+  Write("/tmp/log", "1795.2: Driver does not support configured HT\n");
+  StandIn("hostapd_cli", "echo state=DISABLED\n");
+  ExpectMessages({
+      {"await_access_point wlan0 /tmp/log", "", "",
+       "the access point on wlan0 does not come up: Driver does not support configured HT"},
+      {"write_configuration() { :; }; make_named_files() { :; }; await_access_point() { :; }; await_pid() { :; }; "
+       "run_hostapd() { :; }; start_hostapd wlan0",
+       "", "", "the access point on wlan0 has not noted its process"},
+      {"cat() { return 1; }; ht_capabilities nowhere 1", "", "", "nowhere is no wireless interface"},
+      {"expect_protection wpa_passphrase=x", "", "",
+       "a network would be open that is to be protected: its key or its version of WPA is none"},
+  });
+}
+
+TEST_F(KitMessage, OfAScheduleSaysThatItCannotBeFollowed) {
+  const std::string is_off = "is_on() { :; }; setting() { echo 1; }; is_off_now wifi_sched_enabled wifi_sched";
+  ExpectMessages({
+      {is_off.c_str(), "date", "", "cannot tell the hour of the week"},
+      {is_off.c_str(), "cut", "", "cannot follow the schedule wifi_sched"},
+  });
+}
+
+TEST_F(KitMessage, OfTheStateDirectorySaysWhatCannotBeMadeOfIt) {
+  const struct {
+    const char* szProgram;
+    const char* szCalls;
+    const char* szMessage;
+  } rows[] = {
+      {"stat", "rc.network", "cannot tell whose /var/run/rc.network is"},
+      {"chmod", "rc.network", "cannot keep /var/run/rc.network to root: chmod is broken"},
+      {"find", "rc.network", "cannot tell what of /var/run/rc.network is root's"},
+      {"find", "-exec", "cannot remove what is not root's from /var/run/rc.network"},
+      {"flock", "", "cannot lock /var/run/rc.network/lock"},
+  };
+  for (const auto& row : rows) {
+    RunInShell("rm -rf /run/rc.network; mkdir -p /run/rc.network/directory");
+    Mend();
+    Break(row.szProgram, row.szCalls);
+    EXPECT_THAT(Script("boot").output, HasSubstr("rc.network: " + std::string(row.szMessage) + "\n"));
+  }
+  Mend();
+  StandIn("find", "");
+  RunInShell("rm -rf /run/rc.network; mkdir -p -m 700 /run/rc.network/lock");
+  EXPECT_THAT(Script("boot").output, HasSubstr("rc.network: cannot open /var/run/rc.network/lock\n"));
+}
+
+TEST_F(KitMessage, OfAnAdapterSaysThatItCannotBeAnAccessPoint) {
+  RunInShell(
+      "sed -i 's,/sys/class/net,/tmp/net,' /usr/mero/lib/network/adapter.sh; mkdir -p /tmp/net/wlan0/phy80211; "
+      "echo phy0 >/tmp/net/wlan0/phy80211/name");
+  EXPECT_EQ(Run("/usr/mero/hotplug/usb.wireless.function change-mode ap").output,
+            "usb.wireless.function: wlan0 cannot be an access point\n");
+}
+
+}  // namespace
