@@ -5,7 +5,7 @@
 #include <unistd.h>
 
 extern "C" {
-#include <sys/pidfd.h>  // says nothing of the language of its functions
+#include <sys/pidfd.h>  // which does not declare its functions as C for C++
 }
 
 #include <csignal>
@@ -27,8 +27,8 @@ pid_t PidIn(std::string_view text) {
   return text.empty() && pid > 0 ? pid : 0;
 }
 
-// Whether a process runs a program, by the name that the kernel knows it by. A pid file may be left from a process
-// that ended long ago and whose pid is another's now.
+// Whether a process runs a program, by the name that the kernel knows it by. A pid file may have been left by a process
+// that ended long ago, and another process may have its pid now.
 bool Runs(pid_t pid, const char* szProgram) {
   char szPath[64];
   std::snprintf(szPath, sizeof szPath, "/proc/%d/exe", pid);
@@ -50,7 +50,7 @@ bool EndsWithin(int process, int milliseconds) {
 }
 
 Status End(pid_t pid, const char* szProgram) {
-  // Held before the name is looked at, so that the pid cannot become another's in between.
+  // The process is held before its name is looked at, so that its pid cannot become another process's in between.
   const Descriptor process(::pidfd_open(pid, 0));
   if (!process.valid()) return errno == ESRCH ? Status::Ok() : Status::Failed(errno);
   if (!Runs(pid, szProgram)) return Status::Ok();

@@ -15,6 +15,6 @@ Status EndDhcpClient(const char* szIfName) {
   if (!status.ok()) return status;
   const char* const argv[] = {kLeaseScript, "left", szIfName, nullptr};
   Result<int> exitStatus = RunProgram(argv, Standard::kNull);
-  // What it cannot give back it has told, and that keeps nobody from the next network.
+  // The script reports what it cannot take back. The next network can be joined all the same.
   return exitStatus.error() == ENOENT ? Status::Ok() : exitStatus.status();
 }

@@ -8,7 +8,7 @@
 
 inline constexpr char kDhcpClientPath[] = "/bin/busybox";
 inline constexpr char kDhcpClientProgram[] = "busybox";
-inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";  // applies what the client leases, gives it back
+inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";  // applies a lease, and takes it back
 
 // A file of an interface's client, by a format that takes the interface's name.
 class DhcpClientFile {
@@ -23,8 +23,8 @@ class DhcpClientFile {
 
 inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
 
-// Ends the client of an interface, if it has one, and gives back what a client has leased for it, also one that ended
-// by itself. Without the script nothing was ever applied.
+// Ends the client of an interface, if it has one, and has the script take back what a lease has set, also when the
+// client has ended by itself. It is no failure when the script is missing: without it no lease was ever applied.
 Status EndDhcpClient(const char* szIfName);
 
 #endif  // MERO_PLATFORM_DHCP_CLIENT_H

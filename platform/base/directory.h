@@ -1,4 +1,4 @@
-// Directories: made, and one that is read, closed in one place.
+// Making directories, and a holder that closes one that is read.
 #ifndef MERO_PLATFORM_DIRECTORY_H
 #define MERO_PLATFORM_DIRECTORY_H
 

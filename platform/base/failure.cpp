@@ -1,4 +1,4 @@
-// The error codes of errnos.
+// The error codes and the reasons of failures.
 #include "platform/base/failure.h"
 
 #include <cstring>
@@ -25,7 +25,7 @@ constexpr CodeOfErrno kCodes[] = {
     {kForeign, ERR_PERMISSION},
 };
 
-// The reason of an error; that of an errno as libc has it.
+// The reason of an error as a text; of an errno, libc's.
 const char* ReasonOf(int error) {
   switch (error) {
     case kForeign:

@@ -1,4 +1,4 @@
-// Where an errno becomes the error code and a line in the system log: at the boundary of an operation, and only there.
+// Failures of operations. Here, and only here, an errno becomes the error code and a line in the system log.
 #ifndef MERO_PLATFORM_FAILURE_H
 #define MERO_PLATFORM_FAILURE_H
 

@@ -18,7 +18,7 @@ namespace {
 
 constexpr int kReading = O_RDONLY | O_CLOEXEC | O_NONBLOCK;
 
-// A file beside that of a path, by a format that takes its directory and its name.
+// The path of a file beside another one, by a format that takes the directory and the name of that one.
 class Beside {
  public:
   Beside(const char* szFormat, const char* szPath) {
@@ -36,18 +36,18 @@ class Beside {
   bool fits_;
 };
 
-// Takes the new content. Only the holder of the lock writes it, so that the name can be fixed, and what a writer left
-// that was killed is not left for long.
+// The new file, which takes the new content. Only the holder of the lock writes it, so that its name can be a fixed
+// one, and what a killed writer has left of it is removed by the next.
 constexpr char kNewFormat[] = "%.*s.%s.new";
 
-// Stands for the lock: a file of its own, since anyone who may read a file may lock it, and keep it locked.
+// The lock file, which is locked instead of the file itself: who may read a file may lock it, and keep it locked.
 constexpr char kLockFormat[] = "%.*s.%s.lock";
 
-// How often a lock is asked for, and how long is waited in between: 20 s in all.
+// How often a lock is asked for, and how long to wait in between: 20 s in all.
 constexpr int kTries = 4000;
 constexpr timespec kNap = {0, 5'000'000};
 
-// Locks a file by asking again and again, since to wait for a lock has no end. Takes off `tries` what it needed.
+// Locks a file by asking again and again, since flock() itself would wait without end. Takes its tries off `tries`.
 Status LockSoon(int fd, int& tries) {
   for (; tries > 0; --tries) {
     if (::flock(fd, LOCK_EX | LOCK_NB) == 0) return Status::Ok();
@@ -66,7 +66,7 @@ Result<bool> Names(const char* szPath, int fd) {
   return named.st_dev == open.st_dev && named.st_ino == open.st_ino;
 }
 
-// Opens the file of a lock, or makes it. What others have put in its place, where anyone may, goes.
+// Opens a lock file, or makes it. In a directory that anyone may write, what others have put in its place is removed.
 Result<Descriptor> OpenLock(const char* szLock) {
   if (IsForeign(szLock)) {
     if (Status status = RemoveOrMoveAside(szLock); !status.ok()) return status;
@@ -106,7 +106,7 @@ Status WriteBeside(const char* szBeside, std::string_view content, int model) {
   return file.Close();
 }
 
-// Makes a rename in the directory of `path` last.
+// Flushes the directory of a path, so that a rename in it outlasts a power cut.
 Status FlushDirectory(const char* szPath) {
   char szDirectory[PATH_MAX];
   const char* szName = std::strrchr(szPath, '/') + 1;
@@ -127,7 +127,7 @@ Status FileEdit::Lock(int& tries) {
     Result<Descriptor> lock = OpenLock(path.c_str());
     if (!lock.ok()) return lock.status();
     if (Status status = LockSoon(lock->get(), tries); !status.ok()) return status;
-    // Its last holder has removed it, and others may hold the next one.
+    // The last holder has removed the lock file, and another process may have made and locked the next one.
     Result<bool> current = Names(path.c_str(), lock->get());
     if (!current.ok()) return current.status();
     if (!*current) continue;
@@ -158,7 +158,7 @@ Status Resolve(const char* szPath, char (&szReal)[PATH_MAX]) {
   return Status::Of(::faccessat(AT_FDCWD, szReal, F_OK, AT_SYMLINK_NOFOLLOW));
 }
 
-// Makes a file that is missing; where a link leads to none, there.
+// Makes a file that is missing. When the path is a link to a missing file, makes that one.
 Status Make(const char* szPath, mode_t mode) {
   const Descriptor file(::open(szPath, kReading | O_CREAT | O_EXCL, mode));
   if (file.valid()) return Status::Of(::fchmod(file.get(), mode));  // whatever the umask
@@ -183,18 +183,19 @@ Result<FileEdit> FileEdit::Open(const char* szPath, mode_t mode) {
     if (Status status = edit.Lock(tries); !status.ok()) return status;
     const Status status = edit.Read();
     if (status.ok()) return edit;
-    if (status.error() != ENOENT) return status;  // else a rival has removed it meanwhile
+    if (status.error() != ENOENT) return status;  // else another process has removed it meanwhile
   }
 }
 
 FileEdit::~FileEdit() {
-  // While it is held: who waits for it will notice. One that stays is the next one's.
+  // While the lock is held: a process that waits for it will notice. A lock file that stays is used by the next edit.
   if (lock_.valid()) (void)::unlink(Beside(kLockFormat, szPath_).c_str());
 }
 
 void FileEdit::Abandon() {
-  // Under the lock, so that nobody is writing it; who waits for the lock will notice.
-  if (created_ && text_.view().empty()) (void)::unlink(szPath_);  // it is as good as never made
+  // While the lock is held, so that nobody is writing the file; a process that waits for the lock will notice. A file
+  // that cannot be removed stays, empty.
+  if (created_ && text_.view().empty()) (void)::unlink(szPath_);
 }
 
 Status FileEdit::Commit(const Bytes& content) {

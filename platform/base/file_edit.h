@@ -1,4 +1,4 @@
-// Changing a file: what it held is replaced as a whole, and nobody else changes it meanwhile.
+// Changing a file. Its content is replaced as a whole, under a lock that keeps other processes from changing it.
 #ifndef MERO_PLATFORM_FILE_EDIT_H
 #define MERO_PLATFORM_FILE_EDIT_H
 
@@ -11,7 +11,7 @@
 #include "platform/base/descriptor.h"
 #include "platform/base/result.h"
 
-// Another process has kept the lock of a file for as long as is waited. An error of our own: no errno says so.
+// Another process has kept a file's lock for as long as this one would wait. An error of our own: no errno says so.
 inline constexpr int kLockKept = -2;
 
 class FileEdit {
@@ -39,15 +39,15 @@ class FileEdit {
   Status Lock(int& tries);
   Status Read();
 
-  Descriptor lock_;  // the file beside it that stands for the lock
+  Descriptor lock_;  // of the file's lock file
   Descriptor file_;
   Bytes text_;
   bool created_ = false;
   char szPath_[PATH_MAX] = {};  // where the file really is
 };
 
-// What composes the new content of a file from what it holds; the content remembers why that failed. Refers to a
-// function object that outlives it.
+// Composes the new content of a file from its old text; a failure is remembered by the content. Refers to a function
+// object that outlives it.
 class Composer {
  public:
   template <class Compose>

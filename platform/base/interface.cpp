@@ -46,7 +46,7 @@ class Messages {
  public:
   Messages(char* at, size_t left) : at_(at), left_(left) {}
 
-  // The next one; null behind the last, and where the rest is no whole one.
+  // The next message; null when there is no more, or the rest is not a whole one.
   nlmsghdr* Next() {
     auto* message = reinterpret_cast<nlmsghdr*>(at_);
     if (left_ < sizeof *message || message->nlmsg_len < sizeof *message || message->nlmsg_len > left_) return nullptr;
@@ -61,10 +61,10 @@ class Messages {
   size_t left_;
 };
 
-// The IPv4 addresses of one interface, as the kernel's routing socket tells of them, and is told.
+// The IPv4 addresses of one interface, read and changed through the kernel's routing socket.
 class Addresses {
  public:
-  // Asks for those that the interface has. One that is not there has none.
+  // Reads those that the interface has. An interface that is not there has none.
   Status List(const char* szIfName) {
     index_ = ::if_nametoindex(szIfName);
     kernel_ = Descriptor(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_ROUTE));
@@ -77,7 +77,7 @@ class Addresses {
       Messages messages(part, static_cast<size_t>(size));
       while (nlmsghdr* message = messages.Next()) {
         const void* content = NLMSG_DATA(message);
-        // Both the end and a failure begin with an errno.
+        // The message that ends the list begins with an errno, as does one that tells of a failure; at the end it is 0.
         if (message->nlmsg_type != RTM_NEWADDR) {
           const int error = -*static_cast<const int*>(content);
           return error != 0 ? Status::Failed(error) : found_.status();
@@ -90,7 +90,7 @@ class Addresses {
 
   unsigned index() const { return index_; }
 
-  // Calls `visit(message)` for each that was found, up to the first time that it fails.
+  // Calls `visit(message)` for each address that was read, until a call fails.
   template <class Visit>
   Status ForEach(Visit visit) {
     Messages messages(found_.data(), found_.view().size());
@@ -100,10 +100,10 @@ class Addresses {
     return Status::Ok();
   }
 
-  // Has the address of a message added.
+  // Adds the address of a message.
   Status Add(nlmsghdr& message) { return Tell(message, RTM_NEWADDR, NLM_F_CREATE | NLM_F_REPLACE); }
 
-  // Has it removed. The kernel removes others along with it, or not; one that is gone already is none to remove.
+  // Removes the address of a message. It may be gone already: with some addresses the kernel removes others.
   Status Remove(nlmsghdr& message) {
     const Status status = Tell(message, RTM_DELADDR, 0);
     return status.error() == EADDRNOTAVAIL ? Status::Ok() : status;
@@ -123,7 +123,7 @@ class Addresses {
   }
 
   Descriptor kernel_;
-  Bytes found_;  // the kernel's own messages: with one an address can be given back with all that it had
+  Bytes found_;  // the kernel's own messages, by which an address can be added again with all that it had
   unsigned index_ = 0;
 };
 
@@ -178,9 +178,10 @@ Status SetOnlyAddress(const char* szIfName, uint32_t address, uint32_t mask) {
   wanted.about.ifa_index = addresses.index();
   wanted.local = Part(IFA_LOCAL, address);
   wanted.subnet = Part(IFA_ADDRESS, address);
-  wanted.broadcast = Part(IFA_BROADCAST, ~mask > 1 ? address | ~mask : 0);  // one or two addresses have none
+  wanted.broadcast = Part(IFA_BROADCAST, ~mask > 1 ? address | ~mask : 0);  // a subnet of one or two addresses has none
 
-  // First what can be refused. It comes again behind the others, which may have taken it with them.
+  // The wanted address is added first, since the kernel may refuse it; and again after the others have been removed,
+  // since it may have been removed with them.
   if (Status status = addresses.Add(wanted.header); !status.ok()) return status;
   Status status = addresses.ForEach(
       [&](nlmsghdr& found) { return Same(found, wanted, szIfName) ? Status::Ok() : addresses.Remove(found); });

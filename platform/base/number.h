@@ -5,8 +5,8 @@
 #include <optional>
 #include <string_view>
 
-// Takes a decimal number off the beginning of a text; none, and all stays, when there is none, or one that an int
-// cannot hold. As from_chars() has it, for a tenth of the room.
+// Takes a decimal number off the beginning of a text. When there is none, or an int cannot hold it, the text stays and
+// the result is empty. from_chars() does the same, and takes ten times the room.
 std::optional<int> TakeNumber(std::string_view& text);
 
 #endif  // MERO_PLATFORM_NUMBER_H

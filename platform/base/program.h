@@ -4,7 +4,7 @@
 
 #include "platform/base/result.h"
 
-// What a program's standard input, output and error are.
+// The standard input, output and error of a program.
 enum class Standard {
   kInherited,
   kNull,  // for a program that stays behind as a daemon and must not hold the caller's

@@ -1,4 +1,4 @@
-// What the helpers under the platform's operations return: an error is a value that nobody can ignore.
+// Results of the helpers under the platform's operations: an error is a value that nobody can ignore.
 #ifndef MERO_PLATFORM_RESULT_H
 #define MERO_PLATFORM_RESULT_H
 

@@ -14,7 +14,7 @@
 
 namespace {
 
-// A second name may be one that somebody else has given to a file of ours.
+// A file of ours with a second name is not taken for ours: somebody else may have given it that name.
 bool IsOurs(const struct stat& info) {
   return (info.st_uid == 0 || info.st_uid == ::geteuid()) && S_ISREG(info.st_mode) && info.st_nlink == 1;
 }
@@ -40,7 +40,7 @@ bool IsShared(const char* szPath) {
   const char* szSlash = std::strrchr(szPath, '/');
   if (szSlash != nullptr) CopyText(szDirectory, {szPath, static_cast<size_t>(szSlash - szPath) + 1});
   struct stat info;
-  return ::stat(szDirectory, &info) < 0 || (info.st_mode & S_IWOTH) != 0;  // who cannot know is careful
+  return ::stat(szDirectory, &info) < 0 || (info.st_mode & S_IWOTH) != 0;  // not trusted when it cannot be examined
 }
 
 Result<Descriptor> OpenOurs(const char* szPath, int flags) {
@@ -58,7 +58,7 @@ bool IsForeign(const char* szPath) {
   struct stat info;
   if (!IsShared(szPath)) return false;
   if (::lstat(szPath, &info) == 0) return !IsOurs(info);
-  return errno != ENOENT && errno != ENOTDIR;  // what root may not look at, others have mounted there
+  return errno != ENOENT && errno != ENOTDIR;  // root may look at all files but those that others have mounted
 }
 
 Status RemoveOrMoveAside(const char* szPath) {

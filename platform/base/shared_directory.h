@@ -6,10 +6,10 @@
 #include "platform/base/descriptor.h"
 #include "platform/base/result.h"
 
-// What is there is somebody else's. An error of our own: no errno says so.
+// The file is somebody else's. An error of our own: no errno says so.
 inline constexpr int kForeign = -1;
 
-// Whether anyone may put files where a path leads to.
+// Whether anyone may put files into the directory of a path.
 bool IsShared(const char* szPath);
 
 // Opens a file that exists. In a directory that anyone may write, kForeign unless the file is a plain one with one name

@@ -21,7 +21,7 @@ bool HasEntry(const char* szIfName, const char* szEntry) {
   return ::access(szPath, F_OK) == 0;
 }
 
-// The guests' interface is none: it is a second one on an adapter's radio.
+// The guest network's interface is not an adapter: it is a second interface on an adapter's radio.
 bool IsAdapter(const char* szIfName) {
   if (szIfName[0] == '.' || std::strcmp(szIfName, kGuestInterface) == 0) return false;
   return HasEntry(szIfName, "phy80211") || HasEntry(szIfName, "wireless");

@@ -23,7 +23,7 @@ std::string_view TakeLastLine(std::string_view& text) {
   return line;
 }
 
-// A number from 0 to `greatest`; 0, which is unknown throughout, for anything else.
+// A number from 0 to `greatest`. For anything else it is 0, which means unknown in each of the enumerations.
 int NumberUpTo(int greatest, std::string_view text) {
   const int number = TakeNumber(text).value_or(0);
   return text.empty() && number >= 0 && number <= greatest ? number : 0;

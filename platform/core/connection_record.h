@@ -1,4 +1,4 @@
-// The record of the last join, as the driver's own word about the current connection qualifies it.
+// What the record of the last join says of the current connection.
 #ifndef MERO_PLATFORM_CONNECTION_RECORD_H
 #define MERO_PLATFORM_CONNECTION_RECORD_H
 

@@ -1,12 +1,12 @@
-// What is known about the current connection.
+// Queries about the current connection.
 #include "platform/base/failure.h"
 #include "platform/core/connection_record.h"
 #include "platform/core/radio.h"
 
 namespace {
 
-// Whether an adapter operated so can be in a network of somebody else's. Drivers refuse to tell the network of one that
-// cannot, as an access point, which is no failure: there is none.
+// Whether an adapter in this mode can be in a network that it has joined. In any other mode, such as that of an access
+// point, drivers refuse to name a network. That is no failure: there is none.
 bool CanBeInNetwork(WIRELESS_OPMODE mode) {
   return mode == WIRELESS_OPMODE_MANAGED || mode == WIRELESS_OPMODE_ADHOC || mode == WIRELESS_OPMODE_AUTO;
 }

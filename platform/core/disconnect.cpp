@@ -11,8 +11,8 @@
 
 namespace {
 
-// An ad-hoc cell has nobody to tell: the interface stops being part of it by being a station again, which the driver
-// only takes while the interface is down.
+// An ad-hoc cell has no access point to take leave of. The interface leaves it by becoming a station again, and a
+// driver changes the mode only while the interface is down.
 Status LeaveCell(const char* szIfName, const Radio& radio) {
   if (Status status = SetInterfaceUp(szIfName, false); !status.ok()) return status;
   if (Status status = radio.SetMode(WIRELESS_OPMODE_MANAGED); !status.ok()) return status;

@@ -1,4 +1,4 @@
-// Files as such: there or not, made, removed.
+// Whether a file exists; making one, and removing one.
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -11,8 +11,8 @@
 
 namespace {
 
-// In a directory that anyone may write, what others have put in the file's place goes, and no link is followed that is
-// put there meanwhile.
+// In a directory that anyone may write, what others have put in the file's place is removed, and a link that they put
+// there meanwhile is not followed.
 Status Create(const char* szPath) {
   if (IsForeign(szPath)) {
     if (Status status = RemoveOrMoveAside(szPath); !status.ok()) return status;
@@ -22,7 +22,7 @@ Status Create(const char* szPath) {
   if (file.valid()) return Status::Of(::fchmod(file.get(), 0600));  // whatever the umask
   if (errno != EEXIST) return Status::Failed(errno);
   if (IsShared(szPath)) return IsForeign(szPath) ? Status::Failed(kForeign) : Status::Ok();
-  const Descriptor target(::open(szPath, kFlags, 0600));  // of a link that leads to nothing
+  const Descriptor target(::open(szPath, kFlags, 0600));  // the missing target of a link
   return target.valid() ? Status::Ok() : Status::Failed(errno);
 }
 
@@ -32,7 +32,7 @@ int PLIBCFileExist(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), 0;
   if (IsForeign(szPath)) return LOG("%s is taken for missing: somebody else has put it there", szPath), 0;
   if (::access(szPath, F_OK) == 0) return 1;
-  // What cannot be looked at may well be there: who takes it for missing would write over it.
+  // A file that cannot be looked at may exist. A caller that took it for missing would write over it.
   return errno == ENOENT || errno == ENOTDIR || errno == ELOOP || errno == ENAMETOOLONG ? 0 : 1;
 }
 

@@ -1,4 +1,4 @@
-// What the client interface is operated as.
+// Setting the operating mode of the client interface.
 #include "platform/base/failure.h"
 #include "platform/core/radio.h"
 

@@ -33,7 +33,7 @@ constexpr uint16_t kReasonLeaving = 3;  // "the station is leaving", as a frame 
 }  // namespace
 
 Result<Radio> Radio::OfAdapter(const char* szIfName) {
-  // Asked first, since a kernel without wireless extensions gives another reason.
+  // Looked at first: without an adapter, a kernel without wireless extensions would give another reason.
   if (MEROWirelessAdapterNum() <= 0) return Status::Failed(ENODEV);
   Result<Descriptor> control = OpenControl();
   if (!control.ok()) return control.status();

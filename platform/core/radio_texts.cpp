@@ -24,7 +24,7 @@ constexpr WIRELESS_LITERAL_MAPPING kEncryptTexts[] = {
     {"AES", {WIRELESS_ENCRYPT_AES}},         {"TKIPAES", {WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES}},
 };
 
-// What the supplicant calls the ciphers of WPA; the first row stands for whatever is none.
+// What the supplicant calls the ciphers of WPA. The first row is for a value with neither of them.
 constexpr WIRELESS_LITERAL_MAPPING kSupplicantCiphers[] = {
     {"", {WIRELESS_ENCRYPT_UNKNOWN}},
     {"TKIP", {WIRELESS_ENCRYPT_TKIP}},
@@ -45,7 +45,7 @@ constexpr int HexDigit(char c) {
   const bool digit = c >= '0' && c <= '9';
   const char lower = ToLower(c);
   const bool letter = lower >= 'a' && lower <= 'f';
-  if (!(digit | letter)) return -1;  // without a branch between the two, which no processor could foretell
+  if (!(digit | letter)) return -1;  // a bitwise or, since no processor could predict a branch between the two
   return (c & 0xF) + 9 * letter;
 }
 

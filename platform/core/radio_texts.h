@@ -1,4 +1,4 @@
-// What only the platform itself reads back from text.
+// The texts of the radio that only the platform itself reads back: of operating modes and hardware addresses.
 #ifndef MERO_PLATFORM_RADIO_TEXTS_H
 #define MERO_PLATFORM_RADIO_TEXTS_H
 

@@ -9,7 +9,7 @@
 
 namespace {
 
-constexpr mode_t kMode = 0600;  // what stands in sections are settings with their secrets
+constexpr mode_t kMode = 0600;  // sections hold settings, and secrets among them
 
 // The pairs that a section is to hold, and the form of their lines.
 struct NewPairs {
@@ -99,7 +99,7 @@ void ComposeValue(std::string_view text, const char* szSection, const Pair& pair
   content.Append(Slice(text, place.end));
 }
 
-// Appends a text but for its sections of a name.
+// Appends a text without its sections of a name.
 void AppendWithout(Bytes& content, std::string_view text, std::string_view name) {
   size_t copied = 0;
   for (Sections sections(text); sections.Next();) {

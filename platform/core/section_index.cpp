@@ -22,17 +22,17 @@ uint64_t Mix(uint64_t hash, uint64_t word) {
   return (std::rotl(hash, 32) ^ word) * 0x9E3779B97F4A7C15;
 }
 
-// Equal for names that differ in nothing but the case of letters.
+// The same for names that differ only in the case of their letters.
 size_t HashOfName(std::string_view name) {
   uint64_t hash = name.size();
   if (name.size() < kWord) {
     for (const char c : name) hash = Mix(hash, static_cast<unsigned char>(ToLower(c)));
   } else {
-    const char* last = name.data() + name.size() - kWord;  // may take in bytes that the word before it has
+    const char* last = name.data() + name.size() - kWord;  // may overlap the word before it
     for (const char* at = name.data(); at < last; at += kWord) hash = Mix(hash, WordAt(at));
     hash = Mix(hash, WordAt(last));
   }
-  return static_cast<size_t>(Mix(hash, 0) >> 32);  // the product's middle, which all that went in has a part in
+  return static_cast<size_t>(Mix(hash, 0) >> 32);  // the middle of the product, which depends on all that went in
 }
 
 bool IsSameName(std::string_view a, std::string_view b) {
@@ -40,14 +40,14 @@ bool IsSameName(std::string_view a, std::string_view b) {
 }
 
 bool IsFree(const SectionPlace& place) {
-  return place.body == 0;  // no body begins a text: its header does
+  return place.body == 0;  // a section's body comes after its header, so that it never begins at 0
 }
 
 std::string_view NameAt(std::string_view text, const SectionPlace& place) {
   return *SectionOfLine(Slice(text, place.header, place.body));
 }
 
-// No less than the number of sections, and faster than to count them.
+// At least the number of sections; faster than to count them, which would look at each header.
 size_t MostSections(std::string_view text) {
   size_t brackets = 0;
   for (size_t at = text.find('['); at != std::string_view::npos; at = text.find('[', at + 1)) ++brackets;
@@ -60,7 +60,7 @@ SectionIndex::~SectionIndex() {
   std::free(places_);
 }
 
-// The slot of a name: where it stands, or the free one where it would.
+// The slot that holds a name, or the free slot that would take it.
 SectionPlace* SectionIndex::Slot(std::string_view text, std::string_view name) const {
   size_t slot = HashOfName(name) & (nPlaces_ - 1);
   while (!IsFree(places_[slot]) && !IsSameName(NameAt(text, places_[slot]), name)) {

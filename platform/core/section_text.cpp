@@ -14,7 +14,7 @@ std::string_view Unquoted(std::string_view value) {
   return value;
 }
 
-// Whether the text that begins at `begin` is one whole line.
+// Whether a text is one whole line.
 bool IsOneLine(std::string_view text) {
   return text.ends_with('\n') && text.find('\n') == text.size() - 1;
 }

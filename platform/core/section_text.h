@@ -8,16 +8,16 @@
 #include "common/text.h"
 #include "platform/base/bytes.h"
 
-// Where the line ends that holds the byte at `offset`: behind its feed, or where the text ends.
+// Where the line of the byte at `offset` ends: behind its line feed, or at the end of the text.
 inline size_t LineEnd(std::string_view text, size_t offset) {
   const size_t feed = text.find('\n', offset);
   return feed == std::string_view::npos ? text.size() : feed + 1;
 }
 
-// What ends the lines of a text.
+// The ends of the lines of a text.
 enum class LineEnds {
-  kLf,    // a carriage return before the feed is a byte of the line
-  kCrLf,  // one before the feed, or at the end of the text, is not; lines without one are read all the same
+  kLf,    // a carriage return before the line feed is a byte of the line
+  kCrLf,  // a carriage return before the line feed, or at the end of the text, is not; a line need not have one
 };
 
 // Walks a text line by line.
@@ -74,7 +74,7 @@ struct SectionPlace {
   size_t end;
 };
 
-// What ends the lines of a section: what ends its header.
+// The ends of the lines of a section: as that of its header.
 LineEnds LineEndsOf(std::string_view text, const SectionPlace& place);
 
 // The lines of a section's body.
@@ -115,7 +115,8 @@ std::optional<SectionPlace> FindSection(std::string_view text, std::string_view 
 // How many sections there are, those included that stand twice.
 size_t CountSections(std::string_view text);
 
-// Where a key's line stands in a text, as offsets: its last, which is the one that counts. None when absent.
+// Where a key's line stands in a text, as offsets. When the key stands there several times, its last line counts. None
+// when the key is absent.
 struct LinePlace {
   size_t begin;
   size_t end;

@@ -1,4 +1,4 @@
-// The text list from inside: what fills it.
+// The text list from inside: filling it.
 #ifndef MERO_PLATFORM_TEXT_LIST_H
 #define MERO_PLATFORM_TEXT_LIST_H
 

@@ -20,7 +20,7 @@ std::optional<Ipv4> ParseMask(const char* szMask) {
 }
 
 bool IsHost(Ipv4 address, Ipv4 mask) {
-  if (~mask <= 1) return true;  // in a subnet of one or two addresses all are hosts'
+  if (~mask <= 1) return true;  // neither is there in a subnet of one or two addresses
   const Ipv4 host = address & ~mask;
   return host != 0 && host != ~mask;
 }

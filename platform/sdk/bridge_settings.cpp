@@ -64,8 +64,8 @@ BRIDGE_INFO ReadBridge(const NetworkScript& script, const char* szBridge) {
   return bridgeInfo;
 }
 
-// Whether a field ends, and is one word to a shell, without quotes. Checked before anything is written, so that no
-// record is written half.
+// Whether the text of a field ends within it, and is one word to a shell without quotes. All fields are checked before
+// anything is written, so that no record is written half.
 template <size_t kSize>
 bool IsWord(const char (&szField)[kSize]) {
   const char* const end = std::find(szField, std::end(szField), '\0');
@@ -128,7 +128,7 @@ bool Write(const NETINFO& netInfo, const BRIDGE_INFO& bridgeInfo, const char* sz
   SetOrRemove(script, kMaskKey, netInfo.szMask);
   script.Set(kAtBootKey, kNoYes[netInfo.blActive != FALSE]);
   SetHardwareAddress(script, netInfo);
-  script.Set(kTypeKey, kBridgeType);  // last, so that a file that was not finished is no bridge's yet
+  script.Set(kTypeKey, kBridgeType);  // last, so that a file that was not finished describes no bridge
   return script.written();
 }
 

@@ -16,7 +16,7 @@ struct Subnet {
   Ipv4 mask;
 };
 
-// The record's address and mask; none after a report that names the one that is none.
+// The record's address and mask; none after a report when either of them is not valid.
 std::optional<Subnet> SubnetOf(const NETINFO& netInfo) {
   const std::optional<Ipv4> mask = ParseMask(netInfo.szMask);
   if (!mask || *mask == 0) return LOG("'%s' is no netmask for %s", netInfo.szMask, netInfo.szInterface), std::nullopt;

@@ -16,11 +16,12 @@
 
 namespace {
 
-constexpr int kTries = 4;       // and a wait of the same length behind each
-constexpr int kGrace = 15;      // seconds more, for what a lease is applied by
-constexpr int kTimedOut = 124;  // as timeout(1) tells
+constexpr int kTries = 4;       // the client waits as long after each
+constexpr int kGrace = 15;      // seconds more, for the script that applies the lease
+constexpr int kTimedOut = 124;  // timeout(1)'s exit status when the time is up
 
-// Runs the client until it has a lease, or was not answered in time; it stays behind to renew it, or to go on asking.
+// Runs the client until it has a lease, or was not answered in time. It stays behind to renew the lease, or to go on
+// asking for one.
 Status Lease(const char* szIfName, int seconds) {
   const DhcpClientFile pidFile(kDhcpClientPidFormat, szIfName);
   char szTries[16];
@@ -31,7 +32,7 @@ Status Lease(const char* szIfName, int seconds) {
   char szLimit[16];
   std::snprintf(szLimit, sizeof szLimit, "%d", std::max(seconds, kTries) + kGrace);
 
-  // A server that offers and refuses again and again would keep it in the foreground for ever.
+  // The time is limited: a server that offers and refuses again and again would keep the client in the foreground.
   const char* const argv[] = {
       "/usr/bin/timeout", "-k", "2",          szLimit, kDhcpClientPath, "udhcpc", "-b",   "-S",   "-i", szIfName, "-p",
       pidFile.c_str(),    "-s", kLeaseScript, "-t",    szTries,         "-T",     szWait, nullptr};
@@ -39,7 +40,7 @@ Status Lease(const char* szIfName, int seconds) {
   if (!exitStatus.ok()) return exitStatus.status();
   if (*exitStatus == kTimedOut) return Status::Failed(ETIMEDOUT);
   if (*exitStatus != 0) return Status::Failed(ENOEXEC);
-  // It notes the pid of what stays behind only then, and who has no pid cannot be ended.
+  // The client that stays behind writes its pid file only now, and without its pid it could not be ended.
   for (int tries = 100; tries > 0 && !IsDaemonThere(pidFile.c_str(), kDhcpClientProgram); --tries) {
     (void)::poll(nullptr, 0, 10);
   }

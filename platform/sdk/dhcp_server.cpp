@@ -1,4 +1,4 @@
-// The files of a DHCP server: the configuration that dnsmasq reads, and beside it what dnsmasq has no word for.
+// The files of a DHCP server: the configuration that dnsmasq reads, and the settings that dnsmasq does not have.
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
@@ -233,7 +233,7 @@ bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
   return PLIBCFileSetKeyValue(path.c_str(), kAutoTimeKey, szAutoTime, kLineFormat) > 0;
 }
 
-// The switch comes last, so that it never runs ahead of the rest.
+// The switch is written last, so that no server is switched on before its other settings are there.
 bool WriteFiles(const MERO_DHCPD_CONF& conf, bool enable) {
   const ServerFile path(kConfFormat, conf.szInterface, conf.szTag);
   if (Status status = WriteConf(path.c_str(), conf); !status.ok()) {
@@ -261,7 +261,7 @@ std::string_view WithoutComment(std::string_view line) {
   return line;
 }
 
-// Takes the beginning of a line, around whose signs there may be blanks; false when the line begins otherwise.
+// Takes the beginning of a line, which may have blanks around its "=" and ","; false when the line begins otherwise.
 bool TakePrefix(std::string_view& rest, std::string_view prefix) {
   for (const char c : prefix) {
     if (c == '=' || c == ',') rest = Trim(rest);
@@ -390,7 +390,7 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
 
 int MERONetSetDhcpServerConfigFiles(const MERO_DHCPD_CONF* pConf, int enable) {
   if (pConf == nullptr) return REFUSE_NULL(), 0;
-  // What a file says that the record has no field for stays, as long as nothing else changes.
+  // The files may say more than the record has fields for. That stays when the record as such has not changed.
   if (HasNames(*pConf) && IsWritten(*pConf)) return WriteSwitch(*pConf, enable != 0) ? 1 : 0;
   if (!Check(*pConf)) return PLIBCErrSet(ERR_BAD_PARAMETERS), 0;
   return WriteFiles(*pConf, enable != 0) ? 1 : 0;
