@@ -65,6 +65,10 @@ class WithoutMemory : public PlatformTest {
 };
 
 TEST_F(WithoutMemory, NoHashAndNoListIsMade) {
+  RunWithoutMemory(1, [] { return PLIBCSzHashAlloc(1024) != nullptr; });
+  ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to make a text hash: Cannot allocate memory");
+  RunWithoutMemory(1, [] { return PLIBCSzListAlloc(1024) != nullptr; });
+  ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to make a text list: Cannot allocate memory");
   ExpectEachToFail(-1, [] {
     PPLIBSZHASH hash = PLIBCSzHashAlloc(1024);
     PLIBCSzHashFree(hash);
@@ -209,6 +213,8 @@ TEST_F(WithoutMemory, NoProgramIsRun) {
 }
 
 TEST_F(WithoutMemory, NoAdapterIsSeen) {
+  RunWithoutMemory(1, [] { return MEROWirelessAdapterNum(); });
+  ExpectFailure(ERR_OUT_OF_MEMORY, "Failed to list /sys/class/net: Cannot allocate memory");
   ExpectEachToFail(0, [] { return MEROWirelessAdapterNum(); });
 }
 

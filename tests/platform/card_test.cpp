@@ -11,6 +11,7 @@
 #include "common/text.h"
 #include "tests/platform/network_interfaces.h"
 #include "tests/platform/platform_test.h"
+#include "tests/platform/simulated_radio.h"
 
 namespace {
 
@@ -182,6 +183,24 @@ TEST_F(ACard, ThatCannotBeAddressedHasTheAddressesThatItHad) {
     ++refused;
   }
   EXPECT_EQ(refused, 8);  // the wanted one twice, the five that were there, and one more that was not reached
+}
+
+TEST_F(ACard, ThatKeepsAnAddressWhenItIsDisconnectedIsReported) {
+  const ShownInterfaces shown({{"lo", ""}, {"net0", "phy80211"}});
+  const SimulatedDriver driver("net0");
+  Shell("ip address add 10.1.1.1/16 dev net0");
+  g_refused = 1;
+  EXPECT_EQ(MEROWirelessNetworkDisconnect(), -1);
+  ExpectFailure(ERR_UNKNOWN, "Failed to remove the addresses of net0: No buffer space available");
+}
+
+TEST_F(ACard, ThatKeepsItsDhcpClientIsReported) {
+  const std::filesystem::path pidFile = "/var/run/udhcpc-net0.pid";
+  std::filesystem::create_directory(pidFile);
+  EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), -1);
+  ExpectFailure(ERR_BAD_PARAMETERS, "Failed to end the DHCP client of net0: Invalid argument");
+  EXPECT_EQ(interface_.addresses(), "");
+  std::filesystem::remove(pidFile);
 }
 
 TEST_F(ACard, ThatIsNotThereIsReported) {

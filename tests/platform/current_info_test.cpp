@@ -1,4 +1,7 @@
 // What is known about the current connection.
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <cerrno>
 #include <cstring>
 
@@ -178,6 +181,15 @@ TEST_F(CurrentConnection, HasProtocolAndAuthenticationFromTheRecordOfItsAccessPo
 TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationWithoutARecord) {
   EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, WIRELESS_PROTO_UNKNOWN);
   EXPECT_EQ(Ask(REQUEST_AUTH).auth, WIRELESS_AUTH_UNKNOWN);
+}
+
+TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationFromARecordOfSomebodyElses) {
+  WriteFile(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
+  ASSERT_EQ(::chmod("/var/tmp", 01777), 0);
+  ASSERT_EQ(::chown(kRecord, 65534, 65534), 0);
+  EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, WIRELESS_PROTO_UNKNOWN);
+  constexpr char kReport[] = "/var/tmp/.wireless_current_connection is not believed: somebody else has put it there";
+  EXPECT_THAT(TakeLog(), testing::ElementsAre(Says(kReport)));
 }
 
 TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationWhenThereIsNone) {

@@ -161,6 +161,20 @@ TEST_F(Disconnecting, GoesOnAfterAStepThatFails) {
   fs::remove(kSupplicantPid);
 }
 
+TEST_F(Disconnecting, ReportsEachStepThatFails) {
+  fs::create_directory(kSupplicantPid);
+  fs::create_directory("/var/run/udhcpc-wlan0.pid");
+  {
+    const MemoryFileSystem kept(kRecord, "");  // can be neither removed nor moved aside
+    EXPECT_EQ(MEROWirelessNetworkDisconnect(), -1);
+  }
+  EXPECT_EQ(PLIBCErrGet(), ERR_UNKNOWN);
+  EXPECT_THAT(TakeLog(), ElementsAre(Says("Failed to end the supplicant of wlan0: Invalid argument"),
+                                     Says("Failed to end the DHCP client of wlan0: Invalid argument"),
+                                     Says("Failed to forget the connection of wlan0: Device or resource busy")));
+  for (const char* szPath : {kSupplicantPid, "/var/run/udhcpc-wlan0.pid", kRecord}) fs::remove(szPath);
+}
+
 class DisconnectingAnAdapter : public Disconnecting {
  protected:
   const NetworkInterface interface_{"wlan3"};

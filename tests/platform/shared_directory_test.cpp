@@ -57,9 +57,8 @@ class AFileThatAnyoneMayReplace : public PlatformTest {
 TEST_F(AFileThatAnyoneMayReplace, IsTakenForMissingWhenItIsSomebodyElses) {
   ForEachObstacle(kFile, [] {
     EXPECT_EQ(PLIBCFileExist(kFile), 0);
-    EXPECT_THAT(TakeLog(), ElementsAre(Field(&LogLine::text,
-                                             "/tmp/platform/file is taken for missing: somebody else "
-                                             "has put it there")));
+    EXPECT_THAT(TakeLog(),
+                ElementsAre(Says("/tmp/platform/file is taken for missing: somebody else has put it there")));
   });
   fs::remove_all(kFile);
   WriteFile(kFile, "ours");
