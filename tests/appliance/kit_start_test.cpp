@@ -294,8 +294,8 @@ TEST_F(KitAccessPoint, IsEndedAlsoWhenItsPidFileIsEmpty) {
   EXPECT_EQ(Left(), "");
 }
 
-// Whoever looked through all processes for such a daemon ended that of another network namespace, which has an interface
-// of the same name.
+// Whoever looked through all processes for such a daemon ended that of another network namespace, which has an
+// interface of the same name.
 TEST_F(KitAccessPoint, IsNotEndedByAnotherNetworksScript) {
   const Ran other = RunInShell(
       "unshare -n bash -c 'exec -a \"hostapd /var/run/rc.network/hostapd-wlan0.conf\" /tmp/daemons/hostapd 60' "
