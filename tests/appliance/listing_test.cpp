@@ -248,6 +248,7 @@ TEST(WritingTheListing, FailsAloudWhenTheDiskIsFull) {
     ADD_FAILURE() << "the lost listing went unnoticed";
   } catch (const std::system_error& failure) {
     EXPECT_EQ(failure.code().value(), ENOSPC);
+    EXPECT_STREQ(failure.what(), "cannot write the listing: No space left on device");
   }
   close(full);
 }

@@ -665,12 +665,29 @@ TEST_F(Settings, AreToldManyAtOnce) {
 }
 
 TEST_F(Settings, AreNotToldForWrongWords) {
-  for (const char* szWords : {"", "what", "access-point", "bridge br0", "bridge br0 colour", "file /tmp/file",
-                              "check /tmp/file KEY", "check /tmp/file KEY yes no", "section-name x", "--",
-                              "file /tmp/file KEY --", "-- file /tmp/file KEY", "--helpx", "help file"}) {
-    const Ran ran = RunReader(szWords);
-    EXPECT_EQ(ran.status, 2) << szWords;
-    EXPECT_THAT(ran.output, AllOf(StartsWith("mero-settings: "), HasSubstr("\nusage: mero-settings "))) << szWords;
+  const struct {
+    const char* szWords;
+    const char* szMessage;
+  } rows[] = {
+      {"", "a request is missing"},
+      {"what", "there is no request 'what'"},
+      {"access-point", "access-point needs a KEY"},
+      {"bridge br0", "bridge needs a BRIDGE and a VALUE"},
+      {"bridge br0 colour", "a bridge has no 'colour'"},
+      {"file /tmp/file", "file needs a FILE and a KEY"},
+      {"check /tmp/file KEY", "check needs a FILE, a KEY and a VALUE"},
+      {"check /tmp/file KEY yes no", "check needs a FILE, a KEY and a VALUE"},
+      {"section-name x", "section-name takes no more words"},
+      {"--", "a request is missing"},
+      {"file /tmp/file KEY --", "a request is missing"},
+      {"-- file /tmp/file KEY", "a request is missing"},
+      {"--helpx", "there is no request '--helpx'"},
+      {"help file", "there is no request 'help'"},
+  };
+  for (const auto& row : rows) {
+    const Ran ran = RunReader(row.szWords);
+    EXPECT_EQ(ran.status, 2) << row.szWords;
+    EXPECT_THAT(ran.output, StartsWith("mero-settings: "s + row.szMessage + "\nusage: mero-settings "));
   }
   for (const char* szWord : {"help", "-h", "--help"}) {
     const Ran ran = RunReader(szWord);
@@ -684,6 +701,9 @@ TEST_F(Settings, ThatCannotBeToldAreAFailure) {
   for (const char* szWords : {"file /tmp/file KEY", "help"}) {
     EXPECT_EQ(RunReader(szWords + " >/dev/full"s).status, 2) << szWords;
   }
+  EXPECT_EQ(RunReader("file /tmp/file KEY >/dev/full").output,
+            "mero-settings: cannot write: No space left on device\n");
+  EXPECT_EQ(RunReader("section-name </tmp").output, "mero-settings: cannot read the adapter's name\n");
 }
 
 }  // namespace

@@ -362,6 +362,40 @@ TEST_F(ALease, SaysWhatTheKernelDoesNotTake) {
   ExpectLogged("unknown event 'something'\n");
 }
 
+TEST_F(ALease, SaysWhichStepCannotBeTaken) {
+  const struct {
+    const char* szProgram;
+    const char* szCalls;  // those of its calls that fail
+    const char* szEvent;
+    const char* szMessage;
+  } rows[] = {
+      {"busybox", "ifconfig", "bound", "cannot give net0 the address 10.1.0.7/255.255.255.0: broken\n"},
+      {"ip", "route delete", "bound", "cannot remove the default route of net0: broken\n"},
+      {"ip", "address flush", "deconfig", "cannot remove the addresses of net0: broken\n"},
+      {"ip", "net0 up", "deconfig", "cannot bring net0 up: broken\n"},
+      {"cat", "ifindex", "bound", "there is no interface net0\n"},
+      {"cat", "resolv.conf", "bound", "cannot read /etc/resolv.conf\n"},
+      {"mkdir", "udhcpc.lease", "bound", "cannot make /var/run/udhcpc.lease\n"},
+      {"flock", "", "bound", "another run takes too long to change /etc/resolv.conf\n"},
+  };
+  WriteFile(kResolver, "nameserver 192.0.2.1\n", 0644);
+  for (const auto& row : rows) {
+    const std::string program = row.szProgram;
+    ASSERT_EQ(Bound({"router=10.1.0.1"}), 0);
+    fs::remove("/var/run/udhcpc.lease");
+    WriteFile("/tmp/platform/" + program,
+              "#!/bin/sh\ncase $* in *'" + std::string(row.szCalls) +
+                  "'*) echo broken >&2; exit 1 ;; esac\nexec /usr/bin/env PATH=/usr/sbin:/usr/bin " + program +
+                  " \"$@\"\n",
+              0755);
+    EXPECT_EQ(Run({row.szEvent}, Usual({"router=10.1.0.2", "dns=10.1.0.2"})), 1) << row.szMessage;
+    ExpectLogged(row.szMessage);
+    fs::remove("/tmp/platform/" + program);
+  }
+  EXPECT_EQ(Run({"left", "a b"}), 1);
+  ExpectLogged("'a b' is no name of an interface\n");
+}
+
 TEST_F(ALease, OfAnInterfaceThatIsGoneIsGivenBack) {
   WriteFile(kResolver, "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n", "wlan9"), 0644);
   EXPECT_EQ(Run({"left", "wlan9"}), 0);
