@@ -5,9 +5,9 @@
 #include <cstdio>
 #include <nlohmann/json.hpp>
 
+#include "app/run.h"
 #include "base/text.h"
 #include "running.h"
-#include "app/run.h"
 
 using library::Network;
 using testing::HasSubstr;
@@ -203,7 +203,8 @@ TEST_F(Output, ThatCannotBeWrittenIsAFailure) {
   int status = 0;
   ::waitpid(pid, &status, 0);
   EXPECT_EQ(WEXITSTATUS(status), 1);
-  EXPECT_THAT(testing::internal::GetCapturedStderr(), HasSubstr("could not be written"));
+  EXPECT_THAT(testing::internal::GetCapturedStderr(),
+              HasSubstr("merowireless: the output could not be written: look at where it goes\n"));
 }
 
 TEST_F(Output, OfTheStatusNamesWhatThereIs) {
