@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "base/descriptor.h"
+#include "work/listener.h"
 
 // Why a join came to nothing, the more telling the greater.
 enum class Verdict {
@@ -20,17 +21,17 @@ enum class Verdict {
 Verdict VerdictOf(std::string_view event);
 
 // Listens to the control socket of the supplicant, which may come, go and come again while it is listened to.
-class SupplicantListener {
+class SupplicantListener final : public Listener {
  public:
   explicit SupplicantListener(std::string path);
 
-  // To be waited for; -1 as long as there is no supplicant. Readable when Receive() has something to do.
-  int fd() const { return socket_.get(); }
+  // -1 as long as there is no supplicant.
+  int fd() const override { return socket_.get(); }
 
-  // Finds the supplicant, and finds out that it is gone. To be called a few times a second.
-  void Tick();
+  // Finds the supplicant, and finds out that it is gone.
+  void Tick() override;
 
-  void Receive();
+  void Receive() override;
 
   // The most telling one so far.
   Verdict verdict() const { return verdict_; }

@@ -9,22 +9,23 @@
 #include <type_traits>
 
 #include "base/terminal.h"
-#include "work/supplicant.h"
+#include "work/listener.h"
 
 struct Task {
-  Terminal errors;                         // where progress is shown
-  bool verbose = false;                    // show what commands print on their standard error output
-  std::string doing;                       // "joining Home"
-  const char* szMarker = nullptr;          // the file that exists while the library is at it
-  SupplicantListener* listener = nullptr;  // told what happens meanwhile
-  std::function<void()> undo = [] {};      // what to do when it comes to nothing
+  Terminal errors;                     // where progress is shown
+  bool verbose = false;                // show what commands print on their standard error output
+  std::string doing;                   // "joining Home"
+  const char* szMarker = nullptr;      // the file that exists while the library is at it
+  Listener* listener = nullptr;        // hears what happens meanwhile
+  std::function<void()> undo = [] {};  // takes back what a call has done that did not come to its end
 };
 
-// Undoes a task. What cannot be undone is told.
+// Undoes a task. When that fails, a remark says so.
 void Undo(const Task& task);
 
-// Gives what `call` gave. Interrupted when the user did not want to wait: then nothing of the call goes on and it is
-// undone, as after any other failure to wait for it, and when it breaks off.
+// Runs `call` in a process of its own and gives its result. Fails when the call breaks off, or cannot be waited for;
+// throws Interrupted when the user ends the program. Then all processes of the call have been ended, and the task has
+// been undone.
 std::string RunBytes(const Task& task, const std::function<std::string()>& call);
 
 template <class Result>
