@@ -188,7 +188,7 @@ TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
       {"Failed to enable AP.", "could not be enabled"},
   };
   for (const auto& [szReport, szSentence] : reports) {
-    library::MEROWirelessAPEnable = [szReport] { return library::Report(szReport), FALSE; };
+    library::MEROWirelessAPEnable = [szReport] { return library::Report("wireless_ap_enable", szReport), FALSE; };
     const Ran ran = Tool({"ap", "enable"});
     EXPECT_EQ(ran.status, 1);
     EXPECT_THAT(ran.err, HasSubstr(szSentence));
@@ -208,7 +208,9 @@ TEST_F(AccessPoint, ThatCannotBeEnabledIsDisabled) {
 }
 
 TEST_F(AccessPoint, ThatAnotherSetsUpIsLeftToIt) {
-  library::MEROWirelessAPEnable = [] { return library::Report("Another ap construction is going"), FALSE; };
+  library::MEROWirelessAPEnable = [] {
+    return library::Report("wireless_ap_enable", "Another ap construction is going"), FALSE;
+  };
   EXPECT_EQ(Tool({"ap", "enable"}).status, 1);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable"));
 }
@@ -221,10 +223,13 @@ TEST_F(AccessPoint, ThatCannotBeSavedIsNotTried) {
 
 TEST_F(AccessPoint, ThatThereNeverWasIsDisabled) {
   library::MEROWirelessAPDisable = [] {
-    return library::Report("File[/etc/sysconfig/network-scripts/ifcfg-wlan0] does not exist."), FALSE;
+    return library::Report("wireless_ap_disable", "File[/etc/sysconfig/network-scripts/ifcfg-wlan0] does not exist."),
+           FALSE;
   };
   EXPECT_EQ(Tool({"ap", "disable"}).out, "the access point is disabled\n");
-  library::MEROWirelessAPDisable = [] { return library::Report("Failed to restart /etc/rc.network"), FALSE; };
+  library::MEROWirelessAPDisable = [] {
+    return library::Report("wireless_ap_disable", "Failed to restart /etc/rc.network"), FALSE;
+  };
   EXPECT_EQ(Tool({"ap", "disable"}).status, 1);
 }
 

@@ -75,14 +75,16 @@ TEST_F(Addresses, OfTheNetworkThatAutoconnectHasJoinedComeWithItsGateway) {
 TEST_F(Addresses, ThatNoServerGivesAreAFailureThoughTheNetworkWasJoined) {
   library::Known({Home("DHCP")});
   library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) {
-    return library::Report("Failed to get IP from DHCP"), 0;
+    return library::Report("wireless_ifcfg_set", "Failed to get IP from DHCP"), 0;
   };
   const Ran ran = Tool({"connect", "Home"});
   EXPECT_EQ(ran.status, 7);
   EXPECT_THAT(ran.err, HasSubstr("no DHCP server answered"));
 
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
-  library::MEROWirelessAutoConnect = [] { return library::Report("Failed to get IP from DHCP"), 0; };
+  library::MEROWirelessAutoConnect = [] {
+    return library::Report("wireless_ifcfg_set", "Failed to get IP from DHCP"), 0;
+  };
   EXPECT_EQ(Tool({"autoconnect"}).status, 7);
 }
 

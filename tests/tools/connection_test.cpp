@@ -131,7 +131,7 @@ TEST_F(Connection, ThatFailsWithoutAReasonSaysSo) {
 
 TEST_F(Connection, ThatMeetsAnotherAttemptSaysSo) {
   library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
-    return library::Report("Another connection construction is going"), -1;
+    return library::Report("wireless_network_connect", "Another connection construction is going"), -1;
   };
   EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("is being joined already"));
 }
@@ -140,7 +140,7 @@ TEST_F(Connection, ThatCannotBeWrittenDownSaysSo) {
   for (const char* szReport :
        {"Failed to set [/usr/mero/etc/wpa_supplicant.conf]", "Failed to record this connection."}) {
     library::MEROWirelessNetworkConnect = [szReport](const WIRELESS_NETWORK_CONFIG*) {
-      return library::Report(szReport), -1;
+      return library::Report("wireless_network_connect", szReport), -1;
     };
     EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("could not be written down")) << szReport;
   }
@@ -160,7 +160,9 @@ TEST_F(Connection, ThatExistsIsKeptByAutoconnect) {
 
 TEST_F(Connection, IsMadeByAutoconnectOrNotAtAll) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
-  library::MEROWirelessAutoConnect = [] { return library::Report("Failed to connect any access point"), -1; };
+  library::MEROWirelessAutoConnect = [] {
+    return library::Report("wireless_auto_connect", "Failed to connect any access point"), -1;
+  };
   EXPECT_EQ(Tool({"autoconnect"}).status, 4);
   library::MEROWirelessAutoConnect = [] { return 0; };
   EXPECT_EQ(Tool({"autoconnect"}).status, 0);

@@ -158,8 +158,8 @@ void SavedAp(const MERO_AP_CONF& conf) {
   MEROWirelessGetAPConfig = [conf](const char*, PMERO_AP_CONF read) { return *read = conf, 1; };
 }
 
-void Report(const char* szMessage) {
-  ::syslog(LOG_ERR, "%s:%d %s", "unit", 7, szMessage);
+void Report(const char* szUnit, const char* szMessage) {
+  ::syslog(LOG_ERR, "%s:%d %s", szUnit, 7, szMessage);
 }
 
 }  // namespace library

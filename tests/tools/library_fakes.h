@@ -73,8 +73,8 @@ void SavedAp(const MERO_AP_CONF& conf);
 // Who runs the program, 0 for root.
 extern uid_t g_user;
 
-// As the library reports.
-void Report(const char* szMessage);
+// As a unit of the library reports.
+void Report(const char* szUnit, const char* szMessage);
 
 }  // namespace library
 

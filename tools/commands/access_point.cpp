@@ -6,8 +6,8 @@
 #include "base/signals.h"
 #include "model/ap_settings.h"
 #include "model/library.h"
+#include "model/library_lines.h"
 #include "model/paths.h"
-#include "work/library_log.h"
 
 namespace {
 
@@ -86,7 +86,7 @@ void ApplySettings(ApConf& conf, const ApChanges& changes) {
 // Takes down what there is of an access point. Where there never was one, that is a failure for the library alone.
 void TakeDown(const Program& program) {
   if (Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) != FALSE) return;
-  if (library_log::Says("ifcfg-wlan0] does not exist")) return;
+  if (WasReported(Report::kNeverAnAp)) return;
   throw Failed("the access point could not be taken down whole");
 }
 
@@ -108,7 +108,7 @@ Start TryToStart(ApConf conf) {
 }
 
 bool IsAnothers() {
-  return library_log::Says("Another ap construction is going");
+  return WasReported(Report::kAnotherAp);
 }
 
 Failure EnableFailed() {
@@ -116,7 +116,7 @@ Failure EnableFailed() {
   if (IsAnothers()) {
     return Failed("an access point is being set up already, or an attempt was cut off", "wait a moment and try again");
   }
-  if (library_log::Says("Failed to restart /etc/rc.network")) {
+  if (WasReported(Report::kScriptFailed)) {
     return Failed("the network start script failed, and the access point is disabled", "-v shows what it says");
   }
   return Failed("the access point could not be enabled");

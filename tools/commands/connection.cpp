@@ -7,10 +7,10 @@
 
 #include "model/addressing.h"
 #include "model/library.h"
+#include "model/library_lines.h"
 #include "model/paths.h"
 #include "model/security.h"
 #include "model/status.h"
-#include "work/library_log.h"
 #include "work/supplicant.h"
 
 namespace {
@@ -37,13 +37,13 @@ std::string SupplicantSocket() {
 // What the library says about an attempt that came to nothing before any access point had a say.
 std::optional<Failure> AttemptFailed(const std::string& name) {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (library_log::Says("Another connection construction is going")) {
+  if (WasReported(Report::kAnotherJoin)) {
     return Failed("a network is being joined already, or an attempt was cut off", "wait a moment and try again");
   }
-  if (library_log::Says("Failed to detect authentication/encryption type")) {
+  if (WasReported(Report::kUnknownSecurity)) {
     return Failed(name + " is protected in a way that cannot be joined", "`merowireless scan` shows how");
   }
-  if (library_log::Says("Failed to set [") || library_log::Says("Failed to record this connection")) {
+  if (WasReported(Report::kSupplicantNotConfigured) || WasReported(Report::kJoinNotRecorded)) {
     return Failed("the join could not be written down", "is there room on the disk? -v shows which file it is");
   }
   return std::nullopt;
@@ -75,7 +75,7 @@ Failure JoinFailed(const std::string& name, Verdict verdict) {
 
 Failure AutoConnectFailed(Verdict verdict) {
   if (const auto failure = AttemptFailed("a known network")) return *failure;
-  if (library_log::Says("Failed to set interface configuration")) {
+  if (WasReported(Report::kAddressNotSet)) {
     return Failed("a network was joined, but its address could not be set");
   }
   if (verdict > Verdict::kNotFound) return *Refused("one of the known networks", verdict);

@@ -9,7 +9,7 @@
 #include <string_view>
 
 #include "base/text.h"
-#include "work/library_log.h"
+#include "model/library_lines.h"
 
 namespace {
 
@@ -66,7 +66,7 @@ Task SettingAddress(const Program& program, const KnownNetwork& config) {
 }
 
 void RequireLease() {
-  if (!library_log::Says("Failed to get IP from DHCP")) return;
+  if (!WasReported(Report::kNoLease)) return;
   throw Failure(Exit::kNoLease, "no DHCP server answered",
                 "the appliance goes on asking; or give a static address: merowireless address A.B.C.D --mask M");
 }

@@ -8,7 +8,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "work/library_log.h"
+#include "model/library_lines.h"
 
 namespace {
 
@@ -61,7 +61,7 @@ int Unpack(const std::string& bytes, std::vector<Record>& records) {
 
 Failure ScanFailed() {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (library_log::Says("Failed to activate network interface")) {
+  if (WasReported(Report::kInterfaceStaysDown)) {
     return Failed("the adapter's interface cannot be brought up", "plug the adapter out and in, and try again");
   }
   return Failed("the adapter gave no scan results", "try again with --renew; -v shows what the library reports");

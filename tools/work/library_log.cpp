@@ -4,10 +4,8 @@
 #include <syslog.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cstdarg>
 #include <cstdio>
-#include <deque>
 
 #include "base/terminal.h"
 #include "base/text.h"
@@ -34,8 +32,8 @@ void Report(int priority, const char* szFormat, va_list values) {
 
 }  // namespace
 
-bool Says(std::string_view text) {
-  return std::ranges::any_of(g_lines, [&](const std::string& line) { return line.find(text) != line.npos; });
+const std::deque<std::string>& Lines() {
+  return g_lines;
 }
 
 void Keep(std::string_view line) {

@@ -3,13 +3,15 @@
 #ifndef MERO_TOOLS_LIBRARY_LOG_H
 #define MERO_TOOLS_LIBRARY_LOG_H
 
+#include <deque>
 #include <functional>
+#include <string>
 #include <string_view>
 
 namespace library_log {
 
-// Whether one of the lines that are kept holds this text.
-bool Says(std::string_view text);
+// The lines that are kept, the oldest first.
+const std::deque<std::string>& Lines();
 
 // Keeps a line, in place of the oldest when there are very many, and shows it on the standard error output when that is
 // asked for.
