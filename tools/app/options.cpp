@@ -72,114 +72,108 @@ void DescribeMask(CLI::App& command, Addressing& addressing) {
   command.add_option("--mask", addressing.mask, "netmask of a static address")->option_text("A.B.C.D");
 }
 
-void AddNetworkCommands(Commands& commands) {
-  struct Scanning {
-    bool renew = false;
-  };
-  commands.Add<Scanning>(
-      "scan", "List the networks in range",
-      [](CLI::App& command, Scanning& values) {
-        command.add_flag("--renew", values.renew, "scan afresh instead of reading the last results");
-      },
-      [](const Program& program, const Scanning& values) { Scan(program, values.renew); });
+// ---- Networks ----
 
-  struct Listing {
-    bool byTime = false;
-    bool showSecrets = false;
-  };
-  commands.Add<Listing>(
-      "known", "List the networks that have been saved",
-      [](CLI::App& command, Listing& values) {
-        command.add_flag("--by-time", values.byTime, "the one saved last first");
-        command.add_flag("--show-secrets", values.showSecrets, "show the secrets too");
-      },
-      [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });
+struct Scanning {
+  bool renew = false;
+};
 
-  commands.Add<NetworkToSave>(
-      "save", "Save a network, so that it can be joined",
-      [](CLI::App& command, NetworkToSave& values) {
-        command.add_option("network", values.name, "its name, or the address of its access point")
-            ->required()
-            ->option_text("NAME|ADDRESS");
-        DescribeSecret(command, values.secret);
-        command.add_option("--ip", values.addressing.ip, "DHCP (the default), a static address, or none")
-            ->option_text("DHCP|A.B.C.D|none");
-        DescribeMask(command, values.addressing);
-        command.add_option("--gateway", values.addressing.gateway, "default gateway of a static address")
-            ->option_text("A.B.C.D");
-        auto* security = command.add_option("--security", values.security, "how a network that hides is protected")
-                             ->option_text("open|wep|wpa|wpa2|wpa-eap|wpa2-eap");
-        auto* bssid = command.add_option("--bssid", values.address, "access point of a network that hides its name")
-                          ->option_text("ADDRESS")
-                          ->needs(security);
-        security->needs(bssid);  // a network that does not hide tells how it is protected
-      },
-      Save);
+void DescribeScanning(CLI::App& command, Scanning& values) {
+  command.add_flag("--renew", values.renew, "scan afresh instead of reading the last results");
 }
 
-void AddForgetting(Commands& commands) {
-  commands.Add<std::string>(
-      "forget", "Forget a network that has been saved",
-      [](CLI::App& command, std::string& name) {
-        command.add_option("network", name, "its name, or the address of its access point")
-            ->required()
-            ->option_text("NAME|ADDRESS");
-      },
-      Forget);
+struct Listing {
+  bool byTime = false;
+  bool showSecrets = false;
+};
+
+void DescribeListing(CLI::App& command, Listing& values) {
+  command.add_flag("--by-time", values.byTime, "the one saved last first");
+  command.add_flag("--show-secrets", values.showSecrets, "show the secrets too");
+}
+
+void DescribeNetwork(CLI::App& command, std::string& name) {
+  command.add_option("network", name, "its name, or the address of its access point")
+      ->required()
+      ->option_text("NAME|ADDRESS");
+}
+
+void DescribeSaving(CLI::App& command, NetworkToSave& values) {
+  DescribeNetwork(command, values.name);
+  DescribeSecret(command, values.secret);
+  command.add_option("--ip", values.addressing.ip, "DHCP (the default), a static address, or none")
+      ->option_text("DHCP|A.B.C.D|none");
+  DescribeMask(command, values.addressing);
+  command.add_option("--gateway", values.addressing.gateway, "default gateway of a static address")
+      ->option_text("A.B.C.D");
+  auto* security = command.add_option("--security", values.security, "how a network that hides is protected")
+                       ->option_text("open|wep|wpa|wpa2|wpa-eap|wpa2-eap");
+  auto* bssid = command.add_option("--bssid", values.address, "access point of a network that hides its name")
+                    ->option_text("ADDRESS")
+                    ->needs(security);
+  security->needs(bssid);  // a network that does not hide tells how it is protected
+}
+
+void AddNetworkCommands(Commands& commands) {
+  commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
+                         [](const Program& program, const Scanning& values) { Scan(program, values.renew); });
+  commands.Add<Listing>(
+      "known", "List the networks that have been saved", DescribeListing,
+      [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });
+  commands.Add<NetworkToSave>("save", "Save a network, so that it can be joined", DescribeSaving, Save);
+  commands.Add<std::string>("forget", "Forget a network that has been saved", DescribeNetwork, Forget);
+}
+
+// ---- The connection ----
+
+void DescribeJoining(CLI::App& command, NetworkToJoin& values) {
+  DescribeNetwork(command, values.name);
+  DescribeSecret(command, values.secret);
+  command.add_option("--user", values.user, "who you are, for networks with EAP")->option_text("NAME");
+  command.add_flag("--any-ap", values.anyAccessPoint, "through any access point that bears the name");
+  command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
+}
+
+struct Watching {
+  std::string times;
+};
+
+void DescribeWatching(CLI::App& command, Watching& values) {
+  command.add_option("--count", values.times, "end after so many")->option_text("N");
+}
+
+void WatchSoOften(const Program& program, const Watching& values) {
+  constexpr int kMost = std::numeric_limits<int>::max();
+  Watch(program, values.times.empty() ? 0 : NumberOf(values.times, 1, kMost, "count"));
+}
+
+void DescribeAddress(CLI::App& command, Addressing& values) {
+  command.add_option("address", values.ip, "DHCP or a static address")->required()->option_text("DHCP|A.B.C.D");
+  DescribeMask(command, values);
+}
+
+void DescribeGateway(CLI::App& command, std::string& gateway) {
+  command.add_option("gateway", gateway, "its address")->required()->option_text("A.B.C.D");
+}
+
+void DescribeCell(CLI::App& command, CellToMake& values) {
+  command.add_option("name", values.name, "the cell's name")->required()->option_text("NAME");
+  command.add_flag("--wep", values.wep, "encrypt, with a secret");
+  DescribeSecret(command, values.secret);
 }
 
 void AddConnectionCommands(Commands& commands) {
-  commands.Add<NetworkToJoin>(
-      "connect", "Join a network and take an address in it",
-      [](CLI::App& command, NetworkToJoin& values) {
-        command.add_option("network", values.name, "its name, or the address of its access point")
-            ->required()
-            ->option_text("NAME|ADDRESS");
-        DescribeSecret(command, values.secret);
-        command.add_option("--user", values.user, "who you are, for networks with EAP")->option_text("NAME");
-        command.add_flag("--any-ap", values.anyAccessPoint, "through any access point that bears the name");
-        command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
-      },
-      Connect);
+  commands.Add<NetworkToJoin>("connect", "Join a network and take an address in it", DescribeJoining, Connect);
   commands.AddPlain("autoconnect", "Join the newest known network that can be joined", AutoConnect);
   commands.AddPlain("disconnect", "End the connection", Disconnect);
   commands.AddPlain("status", "Show the state of the connection", ShowStatus);
-
-  struct Watching {
-    std::string times;
-  };
-  commands.Add<Watching>(
-      "watch", "Show the connection's state whenever it changes",
-      [](CLI::App& command, Watching& values) {
-        command.add_option("--count", values.times, "end after so many")->option_text("N");
-      },
-      [](const Program& program, const Watching& values) {
-        constexpr int kMost = std::numeric_limits<int>::max();
-        Watch(program, values.times.empty() ? 0 : NumberOf(values.times, 1, kMost, "count"));
-      });
-
-  commands.Add<Addressing>(
-      "address", "Give the interface an address",
-      [](CLI::App& command, Addressing& values) {
-        command.add_option("address", values.ip, "DHCP or a static address")->required()->option_text("DHCP|A.B.C.D");
-        DescribeMask(command, values);
-      },
-      SetAddress);
-  commands.Add<std::string>(
-      "gateway", "Add a default gateway",
-      [](CLI::App& command, std::string& gateway) {
-        command.add_option("gateway", gateway, "its address")->required()->option_text("A.B.C.D");
-      },
-      SetGateway);
-  commands.Add<CellToMake>(
-      "adhoc", "Start or join an ad-hoc cell",
-      [](CLI::App& command, CellToMake& values) {
-        command.add_option("name", values.name, "the cell's name")->required()->option_text("NAME");
-        command.add_flag("--wep", values.wep, "encrypt, with a secret");
-        DescribeSecret(command, values.secret);
-      },
-      MakeCell);
+  commands.Add<Watching>("watch", "Show the connection's state whenever it changes", DescribeWatching, WatchSoOften);
+  commands.Add<Addressing>("address", "Give the interface an address", DescribeAddress, SetAddress);
+  commands.Add<std::string>("gateway", "Add a default gateway", DescribeGateway, SetGateway);
+  commands.Add<CellToMake>("adhoc", "Start or join an ad-hoc cell", DescribeCell, MakeCell);
 }
+
+// ---- The access point and the adapter ----
 
 void AddApCommands(Commands& commands, CLI::App& app) {
   CLI::App* ap = app.add_subcommand("ap", "Show, change and switch the access point");
@@ -269,7 +263,6 @@ Options ParseOptions(int argc, const char* const* argv) {
 
   Commands commands(app, options);
   AddNetworkCommands(commands);
-  AddForgetting(commands);
   AddConnectionCommands(commands);
   AddApCommands(commands, app);
   AddAdapterCommands(commands);
