@@ -281,7 +281,7 @@ const char* MEROWirelessInterfaceGet(void);
  * the adapter is an access point there is no connection: no name, nothing known, WIRELESS_STATUS_DISCONNECTED.
  *
  * @param pInfo  receives the answer in the member that belongs to the request. For REQUEST_STATUS it is also set,
- *               to WIRELESS_STATUS_NO_ADAPTER or _DOWN, when there is nothing to ask.
+ *               to WIRELESS_STATUS_NO_ADAPTER or WIRELESS_STATUS_DOWN, when there is nothing to ask.
  * @return 0; -1 when the request is unknown or the adapter cannot be asked.
  */
 int MEROWirelessCurInfoGet(WIRELESS_REQUEST request, PWIRELESS_INFO pInfo);
@@ -453,7 +453,7 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
  *                szTag is empty or holds a '/'.
  * @param enable  1: the server serves; 0: it does not, and all else is kept.
  * @return 1; 0 on failure. What has to be written is refused with ERR_BAD_PARAMETERS before anything is: a text with a
- *         control character, '"', '\\' or '#'; any but the domain and the lease file with a ','; a first address that
+ *         control character, '"', '\' or '#'; any but the domain and the lease file with a ','; a first address that
  *         begins as a tag does, and a netmask that is a lease time.
  *
  * dnsmasq takes a range that has both its ends, and a mask before a lease time; no second name server without a first;

@@ -6,8 +6,9 @@
  *
  *  1. Text is a run of bytes that ends with NUL, in no particular encoding: network names are up to 32 arbitrary
  *     bytes, and are compared and stored as bytes. A text that does not fit a field is cut and still terminated.
- *  2. Every function works synchronously in the caller's process and keeps nothing in memory between calls. All
- *     state is in files, and in the system's own network configuration.
+ *  2. Every function works synchronously in the caller's process, tells what it blocks on (the disk, another writer's
+ *     lock, the adapter, a DHCP server, a script of the appliance) and for how long at most where that is bounded, and
+ *     keeps nothing in memory between calls. All state is in files, and in the system's own network configuration.
  *  3. A function that returns `int` gives 0 on success and -1 on failure unless it says otherwise; one that returns
  *     BOOL gives exactly TRUE or FALSE. A null pointer where a value is required is a failure, never a crash, unless
  *     a function says otherwise.
@@ -54,6 +55,8 @@ typedef int32_t MERO_AP_WPA_ENCRYPT_TYPE;
 #ifdef __cplusplus
 extern "C" {
 #endif
+
+/* ---- Types ---------------------------------------------------------------------------------------------------- */
 
 /** A truth value. */
 enum BOOL MERO_INT32 { FALSE = 0, TRUE = 1 };
@@ -460,9 +463,8 @@ int MEROWirelessNetworkConnect(const WIRELESS_NETWORK_CONFIG* pNetCfg);
  * tried all the same if its authentication and encryption are known.
  *
  * A network is found by its access point's address alone, and takes on all that the scan tells of it: name,
- * authentication and encryption, whatever was saved. So whoever puts up an access point with the address of a known one
- * has it joined in the way that he chooses, open for instance, or has the secret used in that way. SECURITY.md tells
- * what becomes of it. MEROWirelessNetworkConnect() keeps to the record that it is given.
+ * authentication and encryption, whatever was saved. Addresses can be made up: SECURITY.md tells what becomes of it.
+ * MEROWirelessNetworkConnect() keeps to the record that it is given.
  *
  * @return 0 when connected and addressed; -1 otherwise, with nothing left connected: also a connection that exists
  *         already is ended, and the result is -1. Where MEROWirelessNetworkConnect() gives 0 because the radio may not
@@ -482,7 +484,8 @@ int MEROWirelessAutoConnect(void);
  * @param szIfName  the interface, up to 15 characters.
  * @param config    the saved network; only szIp and szMask are used.
  * @return 0; -1 when szIfName is null or the interface could not be set. A DHCP server that does not answer is
- *         reported, and is not by itself a failure: it is asked on until the network is left or another address is set.
+ *         reported, and is not by itself a failure: it is asked on until the network is left or another address is set,
+ *         and a late answer addresses the interface.
  *
  * Blocks up to 16 s for DHCP, and before that up to 2 s for a DHCP client that runs to end. Writes the interface's file
  * in /etc/sysconfig/network-scripts.
@@ -515,7 +518,8 @@ WIRELESS_STATUS MEROWirelessConnStatusGet(void);
  * @param szSecName  the settings section, from MEROWirelessApConfigSecNameGet().
  * @param pConf      receives the settings; the defaults when the file or the section is missing; untouched when an
  *                   argument is null.
- * @return greater than 0 when the section was read; 0 or less when pConf holds defaults only, or an argument is null.
+ * @return a number greater than 0 when the section was read; 0 or less when pConf holds defaults only, or an argument
+ *         is null.
  *
  * Reads /usr/mero/etc/wireless_ap.conf. Does not block.
  */
@@ -541,8 +545,8 @@ BOOL MEROWirelessApConfigSecNameGet(char* szSecName, size_t cbSize);
  * @return TRUE; FALSE when pConf is null, a text cannot be saved, an encryption is none of MERO_AP_ENCRYPT or none for
  *         a guest network, memory ran out, or the file could not be written.
  *
- * Reads and replaces /usr/mero/etc/wireless_ap.conf (created with mode 0600), all or nothing. Does not block on the
- * network.
+ * Reads and replaces /usr/mero/etc/wireless_ap.conf (created with mode 0600), all or nothing. Blocks while another
+ * process writes the file and until the disk has the data, never on the network.
  */
 BOOL MEROWirelessSetAPConfig(const PMERO_AP_CONF pConf);
 

@@ -1,15 +1,19 @@
 #!/bin/sh
-# manual_test.sh CHECK SOURCE_DIRECTORY [ARGUMENT]
+# manual_test.sh CHECK SOURCE_DIRECTORY BUILD_DIRECTORY [ARGUMENT]
 #
 # One of the checks below: the manual agrees with the headers, the sources or the program. What differs is named, with
 # "<" before what the manual lacks and ">" before what only the manual has.
 set -eu
 export LC_ALL=C
-check=$1 source=$2 argument=${3-}
-manual=$source/docs/man
+check=$1 source=$2 build=$3 argument=${4-}
 
+# The pages, but for those that only lead to another one: of section 3 as they were made, of the others as written.
 work=$(mktemp -d)
 trap 'rm -r "$work"' EXIT
+manual=$work/described
+mkdir "$manual"
+cp "$source"/docs/man/*.[158] "$manual"
+for page in "$source"/docs/man/*.3.in; do cp "$build/docs/man/man3/$(basename "$page" .in)" "$manual"; done
 
 # ---- What there is -------------------------------------------------------------------------------------------------
 
@@ -75,7 +79,7 @@ files() {
 
 # What a component installs, from the build directory.
 installed() { # COMPONENT
-  DESTDIR=$work/$1 cmake --install "$argument" --component "$1" >"$work/log" || fail "$(cat "$work/log")"
+  DESTDIR=$work/$1 cmake --install "$build" --component "$1" >"$work/log" || fail "$(cat "$work/log")"
   (cd "$work/$1" && find . -not -type d | sed 's/^\.//')
 }
 
@@ -129,7 +133,7 @@ described_constants() { cat "$manual"/*.3 | sed -n 's/^\.It Dv \(.* = .*\)/\1/p'
 
 described_members() {
   cat "$manual"/*.3 | awk '
-    /^\.Vt (struct|union) / { record = $3 }
+    /^\.It Vt (struct|union) / { record = $4 }
     /^\.It Li "/ && record != "" { gsub(/"/, ""); print record ": " substr($0, 8) }
     /^\.El/ { record = "" }'
 }
@@ -159,7 +163,7 @@ described_options() {
 described_paths() { grep -hE '(^|[. ])Pa ' "$manual"/*.[1358]; }
 
 # The types that a heading is about.
-headed_types() { cat "$manual"/*.3 | sed -n 's/^\.Vt \(enum\|struct\|union\) //p; s/^\.Pq Vt //p'; }
+headed_types() { cat "$manual"/*.3 | sed -n 's/^\.It Vt \(enum\|struct\|union\) //p' | tr -s ' ,' '\n'; }
 
 described_script_commands() {
   sed -n 's/^\.It Cm \([a-z -]*[a-z]\).*/\1/p' "$manual/${argument##*/}.8" | grep -vx help
@@ -253,6 +257,35 @@ expect_names() {
   [ -z "$strange" ] || fail "there is no $strange"
 }
 
+# Takes the examples out of the pages, each into a file "PAGE.NUMBER.c": what is shown under EXAMPLES.
+take_examples() {
+  for page in "$manual"/*.3; do
+    awk -v to="$work/examples/$(basename "$page" .3)" '
+      /^\.Sh/ { inside = /EXAMPLES/ }
+      inside && /^\.Bd/ { file = to "." ++count ".c"; next }
+      /^\.Ed/ { file = "" }
+      file == "" { next }
+      { sub(/^\\&/, ""); gsub(/\\-/, "-"); gsub(/\\e/, "\\"); print >file }' "$page"
+  done
+}
+
+# Strictly as C99, but for insque(3).
+expect_examples() {
+  mkdir "$work/examples"
+  take_examples
+  for example in "$work"/examples/*.c; do
+    "$argument" -std=c99 -D_XOPEN_SOURCE=700 -pedantic -Wall -Wextra -Werror -I"$source/include" -c "$example" \
+      -o "$work/object" || fail "$(basename "$example") is no good"
+  done
+  for page in "$manual"/*.3; do
+    name=$(basename "$page" .3)
+    sed -n 's/^\.Fn \([A-Za-z0-9]*\) [^.,].*/\1/p' "$page" | while read -r called; do
+      cat "$work/examples/$name".*.c | grep -q "\<$called(" || echo "$called"
+    done
+  done >"$work/lacking"
+  expect_all 'example of'
+}
+
 # References to other packages' pages are few, and listed.
 expect_references() {
   for section in 1 3 5 8; do names "$section" | sed "s/ .*/ $section/"; done >"$work/pages"
@@ -273,6 +306,7 @@ case $check in
   functions) expect_functions ;;
   types) expect_types ;;
   constants) expect_same constants described_constants ;;
+  examples) expect_examples ;;
   members) expect_same members described_members ;;
   files) expect_files ;;
   installed) expect_installed ;;
