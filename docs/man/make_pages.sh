@@ -10,11 +10,11 @@ source=$1 directory=$2
 rm -rf "$directory"
 mkdir -p "$directory"
 for template in "$source"/docs/man/*.3.in; do
-	page=$(basename "$template" .3.in)
-	awk -f "$source/docs/man/page.awk" "$source/include/wireless.h" "$source/include/platform.h" "$template" \
-		>"$directory/$page.3"
-	sed -nE '/^\.Sh NAME/,/^\.Nd/s/^\.Nm ((libmero|P?(MERO|PLIB|WIRELESS_))[^ ]*).*/\1/p' "$directory/$page.3" |
-		while read -r name; do
-			[ "$name" = "$page" ] || echo ".so man3/$page.3" >"$directory/$name.3"
-		done
+  page=$(basename "$template" .3.in)
+  awk -f "$source/docs/man/page.awk" "$source/include/wireless.h" "$source/include/platform.h" "$template" \
+    >"$directory/$page.3"
+  sed -nE '/^\.Sh NAME/,/^\.Nd/s/^\.Nm ((libmero|P?(MERO|PLIB|WIRELESS_))[^ ]*).*/\1/p' "$directory/$page.3" |
+    while read -r name; do
+      [ "$name" = "$page" ] || echo ".so man3/$page.3" >"$directory/$name.3"
+    done
 done

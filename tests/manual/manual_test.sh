@@ -13,7 +13,7 @@ trap 'rm -r "$work"' EXIT
 manual=$work/described
 mkdir "$manual"
 cp "$source"/docs/man/*.[158] "$manual"
-for page in "$source"/docs/man/*.3.in; do cp "$build/docs/man/man3/$(basename "$page" .in)" "$manual"; done
+for page in "$source"/docs/man/*.3.in; do cp "$build/manual/man3/$(basename "$page" .in)" "$manual"; done
 
 # ---- What there is -------------------------------------------------------------------------------------------------
 
@@ -315,6 +315,7 @@ case $check in
   commands) expect_same program_options described_options ;;
   names) expect_names ;;
   references) expect_references ;;
+  browser) "$source/docs/make_html.sh" "$source" "$work/browser" ;;
   form) "$argument" -Tlint -Wwarning "$manual"/*.[1358] ;;
   *) fail "there is no check '$check'" ;;
 esac
