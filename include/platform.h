@@ -153,9 +153,7 @@ int PLIBCFileExist(const char* szPath);
 int PLIBCFileTouch(const char* szPath);
 
 /*
- * Key/value files: one KEY=value a line, as a shell reads them. The value may stand in double or single quotes, which
- * are not part of it; without quotes, white space around it is not. Of a repeated key the last line counts. Keys are
- * compared exactly. Lines that begin with '#' or ';' are comments.
+ * Key/value files: one KEY=value a line, as a shell reads them; mero-network-scripts(5) tells what counts.
  *
  * `szFormat` is the form of the line that is written: it holds "%s" twice, for the key and the value, and no other
  * conversion, such as "%s=%s\n". A key or value that could not be read back (a line feed in it, say) is refused with
@@ -190,10 +188,8 @@ int PLIBCFileRemoveKey(const char* szPath, const char* szKey);
 
 /*
  * Section files: a line with a name in square brackets opens a section, which reaches to the next such line; KEY=value
- * lines follow, each value exactly the bytes behind the "=". Where the header's line ends in CR LF, those of its
- * section may, too. White space around names is no part of them. Section names are compared without regard to ASCII
- * case, keys exactly. Of a repeated section the first counts, of a repeated key the last. These files hold secrets: one
- * that is created gets mode 0600. `szFormat` is as above.
+ * lines follow. mero-wireless.conf(5) tells what counts. These files hold secrets: one that is created gets mode 0600.
+ * `szFormat` is as above.
  */
 
 /**
@@ -452,12 +448,8 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
  * @param pConf   reads back the same, field by field; only blEnable is what the switch was. Neither szInterface nor
  *                szTag is empty or holds a '/'.
  * @param enable  1: the server serves; 0: it does not, and all else is kept.
- * @return 1; 0 on failure. What has to be written is refused with ERR_BAD_PARAMETERS before anything is: a text with a
- *         control character, '"', '\' or '#'; any but the domain and the lease file with a ','; a first address that
- *         begins as a tag does, and a netmask that is a lease time.
- *
- * dnsmasq takes a range that has both its ends, and a mask before a lease time; no second name server without a first;
- * and lines of up to 1,024 bytes.
+ * @return 1; 0 on failure. What the .conf cannot hold is refused with ERR_BAD_PARAMETERS before anything is written:
+ *         mero-dhcpd(5) tells what that is, and what dnsmasq asks for besides.
  */
 int MERONetSetDhcpServerConfigFiles(const MERO_DHCPD_CONF* pConf, int enable);
 
@@ -494,8 +486,8 @@ int MERONetSetCard1(const NETINFO* pNetInfo, int flags);
  * @param seconds   how long to wait for a server, at most; less than 4 counts as 4.
  * @return 0; -1 when no server has answered yet, or the interface cannot be brought up.
  *
- * /usr/mero/sbin/udhcpc.lease applies what is leased: the default route stands behind those of others, and the name
- * servers behind those that /etc/resolv.conf names otherwise. Both are given back when the client ends.
+ * /usr/mero/sbin/udhcpc.lease applies what is leased, and gives it back when the client ends; mero_connection(3) tells
+ * what that is.
  *
  * Blocks for as long at most, and before that up to 2 s for a DHCP client that runs to end; one that does not is
  * killed. A server that keeps the client busy without a lease has it ended after 15 s more, and nothing goes on asking.

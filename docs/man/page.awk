@@ -164,7 +164,7 @@ function add_word(text,    core, before, after, macro) {
   if (match(core, /('s)?[.,;:)]*$/)) {
     after = substr(core, RSTART)
     core = substr(core, 1, RSTART - 1)
-    if (core ~ /\($/ && after ~ /^\)/) { core = core ")"; after = substr(after, 2) }
+    if (core ~ /\([0-9]?$/ && after ~ /^\)/) { core = core ")"; after = substr(after, 2) }
   }
   macro = macro_of(core)
   if (macro == "") {
@@ -182,6 +182,7 @@ function add_word(text,    core, before, after, macro) {
 # The mdoc macro for a word that is not just a word.
 function macro_of(core,    is_quoted, is_call) {
   is_quoted = gsub(/`/, "", core) > 0
+  if (core ~ /^[a-z].*\([0-9]\)$/) { sub(/\(/, " ", core); sub(/\)/, "", core); return "Xr " core }
   is_call = sub(/\(\)$/, "", core)
   if (core in is_parameter && (is_quoted || core ~ /[A-Z]/)) return "Fa " core
   if (core in function_group) return (function_group[core] in described ? "Fn " core : "Xr " core " 3")

@@ -286,6 +286,13 @@ expect_examples() {
   expect_all 'example of'
 }
 
+# What a page names as SECURITY.md, say, comes with the program.
+expect_documents() {
+  installed program | sed -n 's,.*/,,; /\.md$/p' | sort >"$work/there"
+  described_paths | grep -oE '[A-Za-z-]+\.md' | sort -u | comm -13 "$work/there" - >"$work/lacking"
+  [ ! -s "$work/lacking" ] || fail "there is no $(cat "$work/lacking")"
+}
+
 # References to other packages' pages are few, and listed.
 expect_references() {
   for section in 1 3 5 8; do names "$section" | sed "s/ .*/ $section/"; done >"$work/pages"
@@ -306,6 +313,7 @@ case $check in
   functions) expect_functions ;;
   types) expect_types ;;
   constants) expect_same constants described_constants ;;
+  documents) expect_documents ;;
   examples) expect_examples ;;
   members) expect_same members described_members ;;
   files) expect_files ;;
