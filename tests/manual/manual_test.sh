@@ -286,6 +286,10 @@ expect_examples() {
   expect_all 'example of'
 }
 
+# The program that the README shows is the one that is installed as an example.
+# shellcheck disable=SC2016  # the backquotes are Markdown's
+expect_readme() { sed -n '/^```c$/,/^```$/{//!p}' "$source/README.md" | diff - "$source/examples/scan-one/scan_one.c"; }
+
 # What a page names as SECURITY.md, say, comes with the program.
 expect_documents() {
   installed program | sed -n 's,.*/,,; /\.md$/p' | sort >"$work/there"
@@ -322,6 +326,7 @@ case $check in
   program) expect_program ;;
   commands) expect_same program_options described_options ;;
   names) expect_names ;;
+  readme) expect_readme ;;
   references) expect_references ;;
   browser) "$source/docs/make_html.sh" "$source" "$work/browser" ;;
   form) "$argument" -Tlint -Wwarning "$manual"/*.[1358] ;;
