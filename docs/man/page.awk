@@ -7,8 +7,8 @@
 #   @describe OF     functions and types, one after the other
 #   @example         all lines up to one with @end are shown as they stand
 #
-# OF is a group of declarations, which a line such as "/* ---- Scanning ---- */" begins in a header, or a header with all
-# its groups.
+# OF is a group of declarations, which a line such as "/* ---- Scanning ---- */" begins in a header, or a header with
+# all its groups.
 
 # ---- The headers ---------------------------------------------------------------------------------------------------
 
@@ -210,61 +210,68 @@ function literal(text) {
 
 # ---- A comment: paragraphs, numbered rules, code, parameters and result ---------------------------------------------
 
-function paragraphs(text,    lines, count, i, held, list, parts) {
+function paragraphs(text,    lines, count, i, tags) {
+  tags = "-tag -width " tag_width(text) "n -compact"
+  held = list_kind = ""
+  is_first = 1
   count = split(text, lines, "\n")
-  starts = 1
   for (i = 1; i <= count; ++i) {
-    if (lines[i] ~ /^ +[0-9]+\. /) {
-      finish(held, list)
-      held = ""
-      if (list == "") print ".Bl -enum"
-      list = "enum"
-      print ".It"
-      sub(/^ +[0-9]+\. /, "", lines[i])
-      held = lines[i]
-    } else if (lines[i] ~ /^@/) {
-      if (held != "") finish(held, list)
-      held = ""
-      if (list == "") {
-        if (!starts) print ".Pp"
-        print ".Bl -tag -width " tag_width(text) "n -compact"
-      }
-      list = "tag"
-      if (lines[i] ~ /^@return/) print ".It Em returns"
-      else {
-        split(lines[i], parts, " ")
-        print ".It Fa " parts[2]
-        sub(/^@param [^ ]+ +/, "", lines[i])
-      }
-      sub(/^@return +/, "", lines[i])
-      held = lines[i]
-    } else if (lines[i] == "") {
-      finish(held, list)
-      held = ""
-      if (list != "" && lines[i + 1] !~ /^( +[0-9]+\. |@)/) { print ".El"; list = "" }
-    } else if (held == "" && lines[i] ~ /^    /) {
-      print ".Bd -literal -offset indent"
-      for (; lines[i] ~ /^    /; ++i) literal(substr(lines[i], 5))
-      print ".Ed"
-    } else held = held " " lines[i]
+    if (sub(/^ +[0-9]+\. /, "", lines[i])) start_item("-enum", ".It", lines[i])
+    else if (sub(/^@return +/, "", lines[i])) start_item(tags, ".It Em returns", lines[i])
+    else if (sub(/^@param /, "", lines[i]))
+      start_item(tags, ".It Fa " first_word(lines[i]), behind_first_word(lines[i]))
+    else if (lines[i] == "") {
+      end_paragraph()
+      if (lines[i + 1] !~ /^( +[0-9]+\. |@)/) end_list()
+    } else if (held == "" && lines[i] ~ /^    /) i = show_code(lines, i)
+    else held = held " " lines[i]
   }
-  finish(held, list)
-  if (list != "") print ".El"
+  end_paragraph()
+  end_list()
 }
 
-function finish(held, list) {
+function start_item(kind, head, text) {
+  end_paragraph()
+  if (list_kind == "") print (is_first || kind == "-enum" ? "" : ".Pp\n") ".Bl " kind
+  list_kind = kind
+  print head
+  held = text
+}
+
+function end_paragraph() {
   if (held == "") return
-  if (list == "" && !starts) print ".Pp"
+  if (list_kind == "" && !is_first) print ".Pp"
   prose(held)
-  starts = 0
+  held = ""
+  is_first = 0
+}
+
+function end_list() {
+  if (list_kind != "") print ".El"
+  list_kind = ""
+}
+
+# Returns the number of the line behind it.
+function show_code(lines, i) {
+  print ".Bd -literal -offset indent"
+  for (; lines[i] ~ /^    /; ++i) literal(substr(lines[i], 5))
+  print ".Ed"
+  return i
+}
+
+function first_word(text) { return substr(text, 1, index(text " ", " ") - 1) }
+
+function behind_first_word(text) {
+  sub(/^[^ ]+ +/, "", text)
+  return text
 }
 
 # Of what is said of a function: the longest parameter.
-function tag_width(text,    lines, count, i, widest, parts) {
+function tag_width(text,    lines, count, i, widest) {
   widest = length("returns")
   count = split(text, lines, "\n")
   for (i = 1; i <= count; ++i)
-    if (split(lines[i], parts, " ") > 1 && parts[1] == "@param" && length(parts[2]) > widest) widest = length(parts[2])
+    if (sub(/^@param /, "", lines[i]) && length(first_word(lines[i])) > widest) widest = length(first_word(lines[i]))
   return widest
 }
 
