@@ -16,7 +16,8 @@ trap 'rm -r "$work"' EXIT
 docs/man/make_pages.sh . "$work/manual"
 cp docs/man/*.[158] "$work/manual"
 documents=$(echo README.md SECURITY.md CONTRIBUTING.md CHANGELOG.md docs/*.md tests/lab/README.md examples/*/README.md)
-manual=$(cd "$work/manual" && grep -L '^\.so ' ./*.1 ./*.3 ./*.5 ./*.8 | sed 's,^\./,,') # without pages that only lead to another one
+# Without pages that only lead to another one.
+manual=$(cd "$work/manual" && grep -L '^\.so ' ./*.1 ./*.3 ./*.5 ./*.8 | sed 's,^\./,,')
 
 title_of() { sed -n '/^# /{s///p;q}' "$1"; } # DOCUMENT
 
@@ -27,7 +28,8 @@ way_up() { echo "$1" | sed 's,[^/]*$,,; s,[^/]*/,../,g'; } # PAGE
 write_page() {
   mkdir -p "$(dirname "$directory/$1")"
   {
-    echo '<!DOCTYPE html><html lang="en"><head><meta charset="utf-8"/><meta name="viewport" content="width=device-width"/>'
+    echo '<!DOCTYPE html><html lang="en"><head><meta charset="utf-8"/>'
+    echo '<meta name="viewport" content="width=device-width"/>'
     echo "<title>$2</title><link rel=\"stylesheet\" href=\"$(way_up "$1")docs/style.css\"/></head>"
     echo "<body><nav><a href=\"$(way_up "$1")index.html\">libmerowireless-core</a></nav>"
     cat
@@ -45,7 +47,8 @@ write_links() {
   printf '%s\n' 's,href="([^":]*)\.md",href="\1.html",g' 's,href="([^":]*\.[1358h])",href="\1.html",g' \
     's,href="docs/man",href="index.html",' 's,(<dd[^>]*>)&#x00A0;</dd>,\1</dd>,'
   for page in $manual; do
-    printf 's,(^|[ (]|<td>)(%s\\(%s\\)),\\1<a href="@UP@docs/man/%s.html">\\2</a>,g\n' "${page%.*}" "${page##*.}" "$page"
+    printf 's,(^|[ (]|<td>)(%s\\(%s\\)),\\1<a href="@UP@docs/man/%s.html">\\2</a>,g\n' \
+      "${page%.*}" "${page##*.}" "$page"
   done
   for document in $documents; do
     echo "s,<span class=\"Pa\">${document##*/}</span>,<a href=\"@UP@${document%.md}.html\">&</a>,g"

@@ -1,8 +1,8 @@
 #!/bin/sh
 # make_pages.sh SOURCE_DIRECTORY DIRECTORY
 #
-# Makes the manual's section 3 anew, in a directory of its own. Functions and types that bear the libraries' prefixes get
-# a page each that leads to the one that describes them; `man bool` is not for us to answer.
+# Makes the manual's section 3 anew, in a directory of its own. Functions and types that bear the libraries' prefixes
+# get a page each that leads to the one that describes them; `man bool` is not for us to answer.
 set -eu
 export LC_ALL=C
 source=$1 directory=$2
