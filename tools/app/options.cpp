@@ -25,8 +25,8 @@ constexpr char kAbout[] =
     "Exit status: 0 done, 1 failed, 2 wrong usage, 3 no adapter, 4 no such network or\n"
     "out of range, 5 secret refused, 6 radio switched off, 130 interrupted.";
 
-// Commands are made known with what they are to be given and what they then do. The values live as long as the
-// command, which is as long as the action that holds them.
+// Adds commands: a name, a sentence of help, the function that describes the options, and the one that acts on their
+// values. The values live as long as the action, which holds them.
 class Commands {
  public:
   Commands(CLI::App& app, Options& options) : app_(app), options_(options) {}
@@ -228,7 +228,7 @@ void AddAdapterCommands(Commands& commands) {
       });
 }
 
-// The options of the program itself are understood behind a command too.
+// Lets the options of the program itself stand behind a command too.
 void FallThrough(CLI::App& app) {
   for (CLI::App* command : app.get_subcommands([](CLI::App*) { return true; })) {
     command->fallthrough();
@@ -241,7 +241,7 @@ bool LacksCommand(const CLI::App& app) {
   return given.empty() ? app.get_require_subcommand_min() > 0 : LacksCommand(*given.front());
 }
 
-// What is wrong. What was given is not repeated: it may be a secret at a wrong place.
+// Says why the command line is wrong. It repeats none of the arguments: one may be a secret at a wrong place.
 std::string Complaint(const CLI::App& app, const CLI::ParseError& error) {
   if (LacksCommand(app)) return app.remaining(true).empty() ? "a command is missing" : "there is no such command";
   if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr) return "there are more arguments than were expected";

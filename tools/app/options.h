@@ -14,18 +14,18 @@ struct Options {
   std::function<void(const Program&)> command;
 };
 
-// What is to be shown instead of running a command.
+// The help that was asked for instead of a command.
 struct Help {
   std::string text;
 };
 
-// What is wrong with a command line, and the form in which that is to be told.
+// A command line that cannot be understood: why, and the form in which to say so.
 struct WrongUsage {
   Form form;
   std::string text;
 };
 
-// Throws these two.
+// Throws Help or WrongUsage.
 Options ParseOptions(int argc, const char* const* argv);
 
 #endif  // MERO_TOOLS_OPTIONS_H

@@ -18,7 +18,8 @@ int Status(Exit exit) {
   return static_cast<int>(exit);
 }
 
-// What is opened later must not take the place of a standard descriptor that is closed. Using one fails as before.
+// A file that is opened later must not get the number of a standard descriptor that is closed. The directions are the
+// wrong ones on purpose: using such a descriptor fails as it did.
 void FillStandardDescriptors() {
   for (int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
     if (::fcntl(fd, F_GETFD) < 0) Require(::open("/dev/null", fd == STDIN_FILENO ? O_WRONLY : O_RDONLY), "/dev/null");
@@ -48,7 +49,7 @@ int RunCommand(const Options& options) {
   return Status(Exit::kDone);
 }
 
-// What was written and did not arrive is no success.
+// Turns success into failure when the output could not be written.
 int Finish(int status) {
   if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return status;
   Remark("merowireless: the output could not be written: look at where it goes");

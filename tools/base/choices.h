@@ -1,4 +1,4 @@
-// Words of the command line that stand for values.
+// Words of the command line that stand for values, in tables whose rows have a `text`.
 #ifndef MERO_TOOLS_CHOICES_H
 #define MERO_TOOLS_CHOICES_H
 
@@ -10,7 +10,7 @@
 #include "base/failure.h"
 #include "base/text.h"
 
-// Tables of choices have rows with a `text`.
+// All texts of a table, for a sentence.
 template <class Row>
 std::string Choices(std::span<const Row> rows) {
   std::string choices;
@@ -32,7 +32,7 @@ struct Name {
   int value;
 };
 
-// The name of a value; the number itself for one that the settings should not hold.
+// The name of a value, or its number when the table has no name for it.
 inline std::string NameOf(std::span<const Name> names, int value) {
   const auto found = std::ranges::find(names, value, &Name::value);
   return found != names.end() ? std::string(found->text) : std::to_string(value);

@@ -1,4 +1,4 @@
-// Descriptors that are closed in one place.
+// The holder of a descriptor, which closes it.
 #ifndef MERO_TOOLS_DESCRIPTOR_H
 #define MERO_TOOLS_DESCRIPTOR_H
 
@@ -30,7 +30,7 @@ class Descriptor {
   int fd_;
 };
 
-// The result of a system call that has no business failing.
+// The result of a system call that is not expected to fail; throws when it does.
 inline int Require(int result, const char* szWhat) {
   if (result < 0) throw std::system_error(errno, std::generic_category(), szWhat);
   return result;

@@ -32,12 +32,12 @@ class Failure : public std::runtime_error {
   std::string advice_;
 };
 
-// What was asked for cannot be.
+// A failure of the command line: the arguments ask for something impossible.
 inline Failure Wrong(const std::string& what, const std::string& advice) {
   return {Exit::kUsage, what, advice};
 }
 
-// The user, or whoever ended the program, did not want to wait.
+// Thrown when a signal ends the program while it waits.
 struct Interrupted {};
 
 #endif  // MERO_TOOLS_FAILURE_H

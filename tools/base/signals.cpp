@@ -28,7 +28,7 @@ Signals::Signals(std::initializer_list<int> others) : before_() {
   Require(::sigprocmask(SIG_BLOCK, &held, &before_), "sigprocmask");
 }
 
-// What came meanwhile and was seen by nobody ends the program now.
+// A signal that has come and was not read by Next() ends the program now.
 Signals::~Signals() {
   RestoreMask();
 }

@@ -7,8 +7,8 @@
 
 #include "base/descriptor.h"
 
-// Holds the signals back from now on, and others that are asked for; they make fd() readable instead. One that the
-// program was started to ignore stays ignored.
+// Blocks the signals that end the program, and `others`, as long as it lives; they make fd() readable instead. A signal
+// that the program was started to ignore stays ignored.
 class Signals {
  public:
   explicit Signals(std::initializer_list<int> others = {});

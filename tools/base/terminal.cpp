@@ -1,4 +1,4 @@
-// What stands behind a descriptor that people may be looking at.
+// What the terminal behind a descriptor can show.
 #include "base/terminal.h"
 
 #include <langinfo.h>

@@ -1,4 +1,4 @@
-// What stands behind a descriptor that people may be looking at.
+// What the terminal behind a descriptor can show, if there is one.
 #ifndef MERO_TOOLS_TERMINAL_H
 #define MERO_TOOLS_TERMINAL_H
 
@@ -15,7 +15,7 @@ struct Terminal {
 // The program's locale must have been set before.
 Terminal TerminalOf(int fd);
 
-// Writes a line on the standard error output. That nobody reads it any more ends nothing.
+// Writes a line on the standard error output. A pipe that nobody reads any more does not end the program.
 void Remark(const std::string& line);
 
 #endif  // MERO_TOOLS_TERMINAL_H

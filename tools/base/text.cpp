@@ -11,7 +11,7 @@
 
 namespace {
 
-// The character that a text begins with; size 1 and not valid where it begins with none.
+// The character that a text begins with. When the bytes are no UTF-8, it is one byte long and not valid.
 struct Start {
   char32_t code;
   std::size_t size;
@@ -41,7 +41,7 @@ struct Range {
   char32_t last;
 };
 
-// What has no look of its own: controls, direction marks, joiners and other things that hide.
+// Characters that cannot be seen by themselves: controls, direction marks, joiners and others.
 constexpr Range kUnseen[] = {
     {0x00, 0x1F},     {0x7F, 0x9F},     {0xAD, 0xAD},     {0x061C, 0x061C}, {0x115F, 0x1160},
     {0x180B, 0x180F}, {0x200B, 0x200F}, {0x2028, 0x202E}, {0x2060, 0x206F}, {0x3164, 0x3164},

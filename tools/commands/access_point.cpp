@@ -11,8 +11,8 @@
 
 namespace {
 
-// The library's defaults for an adapter without settings know of no guests; these are what it takes for a guest network
-// of which nothing was said.
+// For an adapter without settings the library gives defaults for the main network alone. These are the defaults of the
+// guest network: those that the library takes where settings say nothing about guests.
 void SetGuestDefaults(ApConf& conf) {
   constexpr int kStations = 256;
   conf.hostapConf.guestNet.maxStation = kStations;
@@ -22,7 +22,7 @@ void SetGuestDefaults(ApConf& conf) {
   std::ranges::copy(conf.wifiSchedConf.szWifiSched, conf.guestNetSchedConf.szWifiSched);
 }
 
-// Switching the radio may have made settings in which there is nothing else.
+// `radio off` may have saved settings that hold the switch alone, and so no bridge.
 void SetBridgeDefault(ApConf& conf) {
   if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, "lbr0", "the bridge");
 }
@@ -38,7 +38,7 @@ ApConf ReadSettings() {
   return conf;
 }
 
-// What may go on the air. The defaults may not: they are an open network, which nobody has asked for.
+// The saved settings. The defaults are never enabled: they are an open network, which nobody has asked for.
 ApConf SettingsToEnable() {
   ApConf conf{};
   if (!ReadSaved(conf)) {
@@ -58,7 +58,8 @@ void SaveSwitch(ApConf conf, bool on) {
   if (MEROWirelessSetAPConfig(&conf) == FALSE) throw NotSaved();
 }
 
-// The library saves settings only together with the switch on; where it was off, it is put back, whoever interrupts.
+// The library saves settings only when the access point is switched on in them. Where it was off, this saves twice: on,
+// then off again, and a signal must not come between.
 void SaveKeepingSwitch(const ApConf& conf) {
   const Signals signals;
   SaveSwitch(conf, true);
@@ -83,7 +84,8 @@ void ApplySettings(ApConf& conf, const ApChanges& changes) {
   }
 }
 
-// Takes down what there is of an access point. Where there never was one, that is a failure for the library alone.
+// Takes the access point down. The library fails when none has ever been set up; the command does not, since there is
+// nothing to take down then.
 void TakeDown(const Program& program) {
   if (Run<BOOL>(program.Doing("taking the access point down"), [] { return MEROWirelessAPDisable(); }) != FALSE) return;
   if (WasReported(Report::kNeverAnAp)) return;
@@ -99,7 +101,7 @@ void Disable(const Program& program, const ApConf& conf) {
 
 enum class Start { kNotSaved, kFailed, kDone };
 
-// The library puts up what is switched on in the settings.
+// The library starts an access point only when the saved settings say that it is switched on.
 Start TryToStart(ApConf conf) {
   const bool wasOff = conf.blEnable == FALSE;
   conf.blEnable = TRUE;

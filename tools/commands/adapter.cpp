@@ -33,8 +33,8 @@ void ShowRadio(const Program& program) {
   program.output.One<Radio>("radio", kRadioFields, ReadRadio());
 }
 
-// The switch lies in the access-point settings, where the library saves it along with all others, and only while an
-// access point is enabled.
+// The radio's switch is a key in the access-point settings. The library can save it only along with all the others, and
+// only when the access point is enabled, so the key is set in the file.
 void SwitchRadio(const Program& program, const std::string& state) {
   if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
   const bool on = state == "on";

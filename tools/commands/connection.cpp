@@ -17,7 +17,7 @@ namespace {
 
 // ---- Joining ----
 
-// Whatever an attempt has left that came to nothing.
+// Ends everything that a failed attempt has left.
 void LeaveNothing() {
   if (MEROWirelessNetworkDisconnect() < 0) throw Failed("the connection could not be ended whole");
 }
@@ -34,7 +34,7 @@ std::string SupplicantSocket() {
   return std::string(kSupplicantDirectory) + MEROWirelessInterfaceGet();
 }
 
-// What the library says about an attempt that came to nothing before any access point had a say.
+// Why the library gave an attempt up before it asked an access point, if it did.
 std::optional<Failure> AttemptFailed(const std::string& name) {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
   if (WasReported(Report::kAnotherJoin)) {
@@ -49,7 +49,7 @@ std::optional<Failure> AttemptFailed(const std::string& name) {
   return std::nullopt;
 }
 
-// What the supplicant says about one that did.
+// Why an access point let nobody in, by what the supplicant said.
 std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
   switch (verdict) {
     case Verdict::kSecretRefused:
@@ -83,13 +83,13 @@ Failure AutoConnectFailed(Verdict verdict) {
           "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
 }
 
-// The library tells a supplicant that runs to end, and starts the next one without waiting; that one gives up when it
-// comes upon the former one's socket.
+// The library tells a running supplicant to end and starts the next one at once. That one gives up while the control
+// socket of the former one is still there, so the program waits for its end before it calls the library.
 void EndFormerSupplicant(const Program& program) {
   if (PLIBCFileExist(kSupplicantPid) == 0) return;
   const bool gone = Run<bool>(program.Doing("leaving the former network"), [] {
     if (PLIBCExec(kSupplicantClient, "terminate", nullptr, nullptr, nullptr) != 0)
-      return true;  // only its file is left
+      return true;  // no supplicant runs, and only the file of one is left
     for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPid) != 0; --tries) {
       std::this_thread::sleep_for(std::chrono::milliseconds(100));
     }
@@ -150,12 +150,12 @@ void SayConnected(const Program& program) {
                       status);
 }
 
-// The static networks' gateway, which the library leaves to its caller.
+// A static address needs its gateway too, which the library leaves to its caller.
 void ApplyGatewayOfConnection() {
   if (const auto known = FindKnown(ReadStatus().name)) ApplySavedGateway(*known);
 }
 
-// The library reports a command that could not be run, and none that the driver refused.
+// The library does not notice when the driver refuses the cell.
 bool IsInCell(const std::string& name) {
   WIRELESS_INFO info{};
   return MEROWirelessCurInfoGet(REQUEST_MODE, &info) == 0 && info.opmode == WIRELESS_OPMODE_ADHOC &&
@@ -176,7 +176,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
 void AutoConnect(const Program& program) {
   RequireAdapter();
   RequireRadio();
-  // The library ends a connection that exists, and calls that a failure.
+  // Called while there is a connection, the library would end it and fail.
   if (ReadStatus().isConnected()) return SayConnected(program);
   if (Known(Order::kByTime).empty()) {
     throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");

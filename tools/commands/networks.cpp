@@ -10,7 +10,7 @@
 
 namespace {
 
-// What a name is in hexadecimal when it cannot be given as text.
+// A name in hexadecimal, for one that is no UTF-8 and so cannot be given as text.
 Value NameInHex(std::string_view name) {
   return IsUtf8(name) ? Value(nullptr) : Value(Hex(name));
 }
@@ -65,7 +65,7 @@ std::string TimeText(std::int32_t seconds, const char* szFormat, std::tm* (*part
   return szText;
 }
 
-// The secret is the last one, so that it can be left out.
+// The secret is the last field, so that it can be left out.
 constexpr Field<KnownNetwork> kKnownFields[] = {
     {"name", "NAME", [](const KnownNetwork& of) { return Value(of.network.szEssid); }, Layout::kElastic},
     {"auth", "SECURITY", [](const KnownNetwork& of) { return AuthOf(of.network); }, Layout::kLeft,
@@ -92,12 +92,12 @@ constexpr std::span kWithoutSecret = kWithSecret.first(kWithSecret.size() - 1);
 
 // ---- Saving ----
 
-// Neither nobody's address nor one of many.
+// Whether an address can be an access point's: it is not all zeros, and not a group's.
 bool IsStation(const Address& address) {
   return address != Address{} && (address[0] & 1) == 0;
 }
 
-// A network as its user describes it, for those that hide or are out of range.
+// A network that no scan shows, since it hides its name or is out of range, as the user describes it.
 Network Described(const NetworkToSave& wanted) {
   const auto address = ParseAddress(wanted.address);
   if (!address || !IsStation(*address)) {

@@ -12,7 +12,7 @@
 struct NetworkToSave {
   std::string name;  // or the address of its access point
   std::string address;
-  std::string security;  // with `address` what a scan would have said
+  std::string security;  // how it is protected; given together with `address`, for a network that no scan shows
   SecretSource secret;
   Addressing addressing;
 };

@@ -25,8 +25,8 @@ Descriptor News() {
   return socket;
 }
 
-// Waits until there is news, or time has passed in which some drivers have news that they do not tell. False when the
-// program is to end: it was told to, or nobody reads what it writes.
+// Waits for news, and a second at most, since some drivers do not announce every change. False when the program is to
+// end: a signal says so, or nobody reads its output any more.
 bool WaitForNews(const Descriptor& news, const Signals& signals) {
   constexpr int kPatience = 1000;
   pollfd waited[] = {{news.get(), POLLIN, 0}, {signals.fd(), POLLIN, 0}, {STDOUT_FILENO, 0, 0}};

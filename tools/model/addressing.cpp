@@ -27,7 +27,8 @@ void RequireStatic(const Addressing& addressing) {
   }
 }
 
-// The kernel's table has addresses as they are in memory, and is headed by a line of titles.
+// The kernel's table begins with a line of titles; an address in it is a hexadecimal number in the byte order of
+// memory.
 bool HasDefaultRoute(const std::string& gateway) {
   in_addr wanted{};
   ::inet_pton(AF_INET, gateway.c_str(), &wanted);
@@ -78,7 +79,7 @@ void ApplyAddress(const Task& task, const KnownNetwork& config) {
   if (result < 0) throw Failed("the address could not be set");
 }
 
-// The library reports a command that could not be run, and none that failed.
+// The library notices that the command could not be run, but not that it failed.
 void ApplyGateway(const std::string& gateway) {
   if (MEROWirelessDefaultGatewaySet(gateway.c_str()) < 0 || !HasDefaultRoute(gateway)) {
     throw Failed("the gateway " + gateway + " could not be set",

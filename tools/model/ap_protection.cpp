@@ -32,7 +32,7 @@ int* CipherOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info) {
 
 }  // namespace
 
-// What the union holds when its encryption changes is another's.
+// The details are a union: those of another encryption mean nothing to this one and are cleared.
 void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
                    const char* szOption) {
   const Protection& protection = RowOf<Protection>(kProtections, text, szOption);

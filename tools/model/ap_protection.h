@@ -7,7 +7,8 @@
 #include "show/output.h"
 #include "wireless.h"
 
-// Sets the protection that is called `text`: open, wep, wpa, wpa2, mixed or eap. A secret stays as long as it is one.
+// Sets the protection that is called `text`: open, wep, wpa, wpa2, mixed or eap. The secret stays when it is of the
+// same kind.
 void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
                    const char* szOption);
 std::string ProtectionText(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info);
@@ -17,11 +18,12 @@ void SetCipher(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const
                const char* szOption);
 Value CipherValue(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO info);
 
-// The secret: a key, a passphrase, or what is shared with the RADIUS server. It fails when it cannot be that.
+// The secret: a WEP key, a passphrase, or the one shared with the RADIUS server. Setting one fails when it is not
+// valid.
 void SetSecretOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& secret);
 const char* SecretOf(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info);
 
-// Whether there has to be a secret, and is none.
+// Whether the protection needs a secret and has none.
 bool LacksSecret(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info);
 
 #endif  // MERO_TOOLS_AP_PROTECTION_H

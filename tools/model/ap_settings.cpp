@@ -19,7 +19,7 @@ namespace {
 constexpr Name kWidths[] = {{"20", AP_FREQ_20_MHZ}, {"40", AP_FREQ_40_MHZ}, {"both", AP_FREQ_ALL}};
 constexpr Name kSwitch[] = {{"yes", TRUE}, {"no", FALSE}};
 
-// The access-point daemon takes one mode, and 802.11n beside it.
+// The access-point daemon is given one of the modes b, g and a, and 802.11n as a switch of its own.
 struct Mode {
   std::string_view text;
   int hwMode;
@@ -160,7 +160,7 @@ const MERO_HOSTAP_GUEST_NET& Guest(const ApConf& conf) {
   return conf.hostapConf.guestNet;
 }
 
-// Elsewhere the library would write no guest network, and say nothing.
+// Without a built-in card the library writes no guest network and reports nothing.
 void SetGuest(ApConf& conf, const std::string& text) {
   Guest(conf).blEnable = SwitchOf(text, "guest");
   if (Guest(conf).blEnable == FALSE || PLIBCFileCheckKeyValue(kModelFacts, "support_pci_wifi", "yes", 0) != 0) return;

@@ -19,7 +19,7 @@ struct ApSetting {
   Field<ApConf> field;
   const char* szOption = nullptr;  // without its dashes
   const char* szHelp = nullptr;
-  void (*set)(ApConf&, const std::string& text) = nullptr;  // fails with what would do
+  void (*set)(ApConf&, const std::string& text) = nullptr;  // fails with advice
   Show show = Show::kAlways;
 };
 
@@ -28,11 +28,11 @@ std::span<const ApSetting> ApSettings();
 
 std::vector<Field<ApConf>> ApFields(bool showSecrets);
 
-// Put the secret of the main or of the guest network.
+// Set the secret of the main or of the guest network.
 void SetApSecret(ApConf& conf, const std::string& secret);
 void SetGuestSecret(ApConf& conf, const std::string& secret);
 
-// Whether the main network's protection needs a secret that is not there.
+// Whether the main network's protection needs a secret and has none.
 bool LacksSecret(const ApConf& conf);
 
 // Fails when the settings together make no access point.

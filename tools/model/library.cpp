@@ -77,7 +77,7 @@ struct Answer {
   Network network;
 };
 
-// Searches the last results of the adapter, or a first scan's.
+// Searches the results of the adapter's last scan; when there are none, the library scans.
 Answer LookUp(const std::string& name, const std::optional<Address>& address) {
   Answer found{};
   found.result = MEROWirelessNetworkGet(name.c_str(), WIRELESS_FILTER_ESSID, &found.network);
@@ -89,7 +89,7 @@ Answer LookUp(const std::string& name, const std::optional<Address>& address) {
   return found;
 }
 
-// Those results may be older than the network.
+// Scans before it searches: the last results may be older than the network.
 Answer LookUpAfresh(const std::string& name, const std::optional<Address>& address) {
   Ring<Network> ring;
   if (MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, ring.head()) < 0) return {-1, {}};

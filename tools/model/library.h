@@ -36,7 +36,7 @@ std::vector<KnownNetwork> AllKnown(const std::string& name);
 // Fails when there is no adapter.
 void RequireAdapter();
 
-// Fails when the user has switched the radio off, or nobody knows.
+// Fails when the user has switched the radio off, or when that cannot be told.
 void RequireRadio();
 
 // The settings section of the adapter that is plugged in, or nothing when none has been announced.
@@ -45,14 +45,13 @@ std::string AdapterModelOrNone();
 // The same; fails when there is none.
 std::string AdapterModel();
 
-// What became of a call that went wrong, when the library says that it was the adapter.
+// The failure of a call when no adapter is plugged in.
 Failure NoAdapter();
 
-// The failure of a call for which the library gave no reason of interest; what it reported follows on request. Who is
-// not root is told to be.
+// The failure of a call for which the program knows no exit status of its own. A user who is not root is advised to be.
 Failure Failed(const std::string& what, const std::string& advice = "-v shows what the library reports");
 
-// Copies a text that must fit; what it is called is for the failure.
+// Copies a text into a field; fails when it does not fit. `what` names it in the failure.
 template <std::size_t kSize>
 void SetText(char (&field)[kSize], std::string_view text, std::string_view what) {
   if (text.size() >= kSize || text.find('\n') != text.npos || text.find('\0') != text.npos || text.ends_with('\r')) {

@@ -16,7 +16,7 @@ inline constexpr char kApSettingsLine[] = "\t%s=%s\n";
 // What the appliance's model can do.
 inline constexpr char kModelFacts[] = "/etc.defaults/meroinfo.conf";
 
-// The supplicant's pid file, which goes with it, and what talks to it.
+// The supplicant's pid file, which is removed when it ends, and the program that sends it requests.
 inline constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
 inline constexpr char kSupplicantClient[] = "/usr/sbin/wpa_cli";
 

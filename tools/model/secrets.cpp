@@ -20,7 +20,7 @@ Failure Unusable(const std::string& what) {
   return {Exit::kSecretRefused, what, "give the secret as one line"};
 }
 
-// Waits for input. False when the program was stopped meanwhile and goes on.
+// Waits for input. False when the program was stopped meanwhile, and has been continued.
 bool WaitForInput(int fd, const Signals& signals) {
   pollfd waited[] = {{fd, POLLIN, 0}, {signals.fd(), POLLIN, 0}};
   while (::poll(waited, std::size(waited), -1) < 0 && errno == EINTR) continue;
@@ -57,7 +57,7 @@ std::string ReadFile(const std::string& path) {
   return Checked(ReadAll(file.get(), path), path);
 }
 
-// Keeps what is typed from being shown, from Begin() until it dies.
+// Keeps the terminal from showing what is typed, from Begin() until this holder ends.
 class Silence {
  public:
   explicit Silence(int terminal) : terminal_(terminal), before_() {
@@ -66,7 +66,7 @@ class Silence {
   Silence(const Silence&) = delete;
   Silence& operator=(const Silence&) = delete;
   ~Silence() {
-    // In the background it is no longer this program's, and asking for it would stop the program.
+    // A program in the background no longer owns the terminal; changing it would stop the program.
     if (::tcgetpgrp(terminal_) == ::getpgrp()) ::tcsetattr(terminal_, TCSAFLUSH, &before_);
   }
 
@@ -94,7 +94,7 @@ std::string ReadLine(int terminal) {
 std::string Prompt(int terminal, const std::string& prompt) {
   const Signals signals({SIGCONT});
   const Silence silence(terminal);
-  // The shell in which a program is stopped makes the terminal show again what is typed.
+  // When the program is stopped, the shell makes the terminal show again what is typed, so each round begins anew.
   do {
     silence.Begin();
     Say(terminal, prompt + ": ");
@@ -108,7 +108,7 @@ std::string Prompt(int terminal, const std::string& prompt) {
 
 std::optional<std::string> ReadSecret(const SecretSource& source, const std::string& prompt) {
   if (!source.file.empty()) return ReadFile(source.file);
-  // On a terminal it would be shown while it is typed.
+  // A standard input that is a terminal is not read: it would show the secret while it is typed. The prompt does not.
   if (source.standardInput && ::isatty(STDIN_FILENO) == 0)
     return Checked(ReadAll(STDIN_FILENO, "the standard input"), "the standard input");
   const Descriptor terminal(::open("/dev/tty", O_RDWR | O_CLOEXEC));

@@ -15,8 +15,8 @@ struct SecretSource {
   bool isGiven() const { return !file.empty() || standardInput; }
 };
 
-// The secret from its source, or from the terminal by a prompt; nothing when there is neither. One line end behind it
-// is no part of it.
+// The secret from its source, or from the terminal by a prompt; nothing when there is neither. The line end behind a
+// secret does not belong to it.
 std::optional<std::string> ReadSecret(const SecretSource& source, const std::string& prompt);
 
 // Puts a secret into a network that needs one; from a prompt when no source is given.

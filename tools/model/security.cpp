@@ -11,12 +11,12 @@ namespace {
 
 constexpr int kBothCiphers = WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES;
 
-// A name that is not empty is one that a network can be given.
+// A protection. One with a name can be given on the command line.
 struct Security {
   WIRELESS_AUTH auth;
   std::string_view text;
   std::string_view name;
-  int encrypt;  // what comes with the name
+  int encrypt;  // the ciphers of a network that is given this name
   bool secret;
   bool user;
 };

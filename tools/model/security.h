@@ -13,11 +13,11 @@ std::string SecurityText(WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt);
 bool NeedsSecret(WIRELESS_AUTH auth);
 bool NeedsUser(WIRELESS_AUTH auth);
 
-// Sets the protection that people call `name`: open, wep, wpa, wpa2, wpa-eap, wpa2-eap; false when there is none.
+// Sets the protection that is called `name`, one of kSecurityNames; false when none is.
 bool SetSecurity(WIRELESS_NETWORK& network, std::string_view name);
 inline constexpr char kSecurityNames[] = "open, wep, wpa, wpa2, wpa-eap, wpa2-eap";
 
-// Fail, with what would do, when a secret is none.
+// Fail, with advice, when a secret is not valid.
 void RequireWepKey(std::string_view key);
 void RequirePassphrase(std::string_view passphrase);
 void RequireSecretFor(WIRELESS_AUTH auth, std::string_view secret);

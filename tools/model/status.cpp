@@ -30,7 +30,7 @@ constexpr State kStates[] = {
     {"monitor", "monitoring", WIRELESS_STATUS_MONITOR, Tone::kFair},
 };
 
-// For the library it has no connection whose state could be known.
+// The library gives no state for an adapter that is an access point, since that has no connection.
 constexpr State kAccessPoint = {"access-point", "an access point (see `merowireless ap status`)",
                                 WIRELESS_STATUS_UNKNOWN, Tone::kGood};
 
@@ -57,7 +57,7 @@ Value StandardOf(const Status& status) {
   return status.isConnected() ? Value(MEROWirelessProtocolStringGet(status.protocol)) : nullptr;
 }
 
-// A network that is joined as it was saved: no scan has told its standard.
+// The standard is unknown when a network was joined as it was saved: only a scan tells it.
 Shown ShowStandard(const Status& status, bool) {
   if (!status.isConnected() || status.protocol == WIRELESS_PROTO_UNKNOWN) return {"-", Tone::kFaint};
   return {MEROWirelessProtocolStringGet(status.protocol)};
@@ -89,7 +89,7 @@ std::string DottedText(const sockaddr* address) {
 
 void ReadAddress(Status& status) {
   ifaddrs* first = nullptr;
-  if (::getifaddrs(&first) < 0) return;  // then none is known
+  if (::getifaddrs(&first) < 0) return;  // the address stays unknown
   const std::unique_ptr<ifaddrs, void (*)(ifaddrs*)> list(first, ::freeifaddrs);
   for (const ifaddrs* each = first; each != nullptr; each = each->ifa_next) {
     if (each->ifa_addr == nullptr || each->ifa_addr->sa_family != AF_INET || status.interface != each->ifa_name)
@@ -100,7 +100,7 @@ void ReadAddress(Status& status) {
   }
 }
 
-// One answer about the connection, unless there is none.
+// Asks the library one thing about the connection; without an answer `answer` stays as it is.
 template <class Answer>
 void Ask(WIRELESS_REQUEST request, Answer WIRELESS_INFO::*member, Answer& answer) {
   WIRELESS_INFO info{};

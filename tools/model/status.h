@@ -11,7 +11,7 @@
 struct Status {
   WIRELESS_STATUS state = WIRELESS_STATUS_UNKNOWN;
   std::string interface;
-  std::string name;  // what follows is empty or unknown unless there is a connection
+  std::string name;  // name, auth and protocol are those of the connection, if there is one
   WIRELESS_AUTH auth = WIRELESS_AUTH_UNKNOWN;
   WIRELESS_PROTOCOL protocol = WIRELESS_PROTO_UNKNOWN;
   WIRELESS_OPMODE mode = WIRELESS_OPMODE_UNKNOWN;

@@ -34,14 +34,14 @@ Json JsonOf(const Table& table, std::size_t row) {
   return record;
 }
 
-// A code of UTF-16, as JSON writes it out.
+// A code unit of UTF-16 as JSON escapes it.
 std::string WrittenOut(char32_t code) {
   char szCode[sizeof "\\u001b"];
   std::snprintf(szCode, sizeof szCode, "\\u%04x", static_cast<unsigned int>(code & 0xFFFF));
   return szCode;
 }
 
-// Only within strings can a document hold what is not shown.
+// A character of a document. Those that are escaped can only stand within its strings, so \u is right for them.
 std::string InDocument(const Character& character) {
   constexpr char32_t kPairs = 0x10000;
   if (character.shown) return std::string(character.bytes);
@@ -50,14 +50,14 @@ std::string InDocument(const Character& character) {
   return WrittenOut(0xD800 + (code >> 10)) + WrittenOut(0xDC00 + (code & 0x3FF));
 }
 
-// Names are bytes: what is no UTF-8 in them is replaced, and stands in full in a field of its own.
+// Names are bytes. Those that are no UTF-8 are replaced here; the field name_hex has such a name in full.
 void PutDocument(const Json& document, bool utf8) {
   Put(Rewritten(document.dump(-1, ' ', false, Json::error_handler_t::replace), utf8, InDocument) + "\n");
 }
 
 // ---- Porcelain: one record a line, its fields between tabs ----
 
-// As the %b of printf reads it.
+// A character of a line, escaped so that the %b of printf gives it back.
 std::string InLine(const Character& character) {
   if (character.bytes == "\t") return "\\t";
   if (character.bytes == "\n") return "\\n";
@@ -110,7 +110,7 @@ std::string_view ColourOf(Tone tone) {
   return "";
 }
 
-// The columns that people are not shown go.
+// Removes the columns without a title, which are for machines alone.
 void LeaveWhatIsShown(Table& table) {
   for (std::size_t i = table.columns.size(); i-- > 0;) {
     if (!table.columns[i].title.empty()) continue;
@@ -130,7 +130,7 @@ std::vector<std::size_t> WidthsOf(const Table& table, bool utf8) {
   return widths;
 }
 
-// Takes from the elastic columns what a table is too wide.
+// Makes the elastic columns narrower until the table fits the terminal.
 void Squeeze(const Table& table, std::vector<std::size_t>& widths, std::size_t room) {
   const std::size_t total = std::accumulate(widths.begin(), widths.end(), kGap * (widths.size() - 1));
   if (room == 0 || total <= room) return;

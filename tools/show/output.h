@@ -22,7 +22,7 @@ enum class Tone { kPlain, kGood, kFair, kBad, kFaint };
 
 enum class Layout { kLeft, kRight, kElastic };  // an elastic column is cut when a table is too wide
 
-// What a field holds, for machines. Nothing is null in JSON and empty in a line.
+// The value of a field, for machines. A field without one is null in JSON and empty in a porcelain line.
 using Value = std::variant<std::nullptr_t, bool, std::int64_t, std::string>;
 
 struct Shown {
@@ -64,7 +64,7 @@ class Output {
   Form form() const { return form_; }
   const Terminal& terminal() const { return terminal_; }
 
-  // Many records, or for people the sentence that there are none.
+  // Many records. When there are none, people get the sentence `none`.
   template <class Record>
   void List(std::string_view name, std::span<const Field<Record>> fields, const std::vector<Record>& records,
             std::string_view none) const {
@@ -85,7 +85,7 @@ class Output {
     One(name, fields, record);
   }
 
-  // Many records, as above.
+  // Many records; people get a sentence instead.
   template <class Record>
   void ListDone(const std::string& sentence, std::string_view name, std::span<const Field<Record>> fields,
                 const std::vector<Record>& records) const {
@@ -93,10 +93,10 @@ class Output {
     List(name, fields, records, "");
   }
 
-  // Something was done that leaves nothing to say to machines.
+  // A command was done that has no records to show.
   void Done(const std::string& sentence) const;
 
-  // The same for a failure, in JSON alone; the sentence for people goes to the standard error output.
+  // A command failed. This is for JSON alone; people read the failure on the standard error output.
   void Failed(const Failure& failure) const;
 
   // A name from the air, for a sentence.
@@ -118,7 +118,8 @@ class Output {
     return table;
   }
 
-  // What machines read does not depend on the locale. A terminal may take the bytes of UTF-8 for other characters.
+  // Output for machines is the same in every locale. On a terminal it is not: one that is not UTF-8 may take its bytes
+  // for control characters.
   bool MachinesSeeUtf8() const { return terminal_.width == 0 || terminal_.utf8; }
 
   Shown Show(const Value& value) const;

@@ -1,4 +1,4 @@
-// The line that says what takes so long.
+// The line that tells what the program waits for.
 #include "show/progress.h"
 
 #include <cstdio>

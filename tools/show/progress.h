@@ -1,4 +1,4 @@
-// The line that says what takes so long.
+// The line that tells what the program waits for, and how long it has waited.
 #ifndef MERO_TOOLS_PROGRESS_H
 #define MERO_TOOLS_PROGRESS_H
 
@@ -18,7 +18,7 @@ class Progress {
 
   void Update();
 
-  // Makes room for other lines.
+  // Takes the line back, before others are written.
   void Clear();
 
  private:

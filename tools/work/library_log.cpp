@@ -1,4 +1,4 @@
-// What the library reports.
+// The lines that the library reports.
 #include "work/library_log.h"
 
 #include <syslog.h>
@@ -52,7 +52,7 @@ void SendTo(std::function<void(std::string_view)> take) {
 
 }  // namespace library_log
 
-// The libraries come upon these before libc's.
+// The dynamic linker finds these before libc's.
 extern "C" void syslog(int priority, const char* szFormat, ...) {
   va_list values;
   va_start(values, szFormat);
@@ -60,7 +60,7 @@ extern "C" void syslog(int priority, const char* szFormat, ...) {
   va_end(values);
 }
 
-// What syslog() becomes in a library that is built with _FORTIFY_SOURCE.
+// A library that is built with _FORTIFY_SOURCE calls this instead of syslog().
 // NOLINTNEXTLINE(bugprone-reserved-identifier)
 extern "C" void __syslog_chk(int priority, int, const char* szFormat, ...) {
   va_list values;

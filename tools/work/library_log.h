@@ -1,5 +1,5 @@
-// What the library reports. It speaks to the system log, whose function this program has one of its own of: each line
-// is kept and passed on.
+// The lines that the library reports. It calls syslog(), which this program replaces by a function of its own: that
+// keeps each line and passes it on to the system log.
 #ifndef MERO_TOOLS_LIBRARY_LOG_H
 #define MERO_TOOLS_LIBRARY_LOG_H
 
@@ -17,10 +17,10 @@ const std::deque<std::string>& Lines();
 // asked for.
 void Keep(std::string_view line);
 
-// Shows the lines as they come.
+// Shows each line from now on, as Keep() gets it.
 void ShowLines();
 
-// Gives the lines of this process to `take` from now on.
+// From now on, what the library reports in this process goes to `take` instead of Keep().
 void SendTo(std::function<void(std::string_view line)> take);
 
 }  // namespace library_log

@@ -7,7 +7,7 @@
 #include <unistd.h>
 
 extern "C" {
-#include <sys/pidfd.h>  // says nothing of the language of its functions
+#include <sys/pidfd.h>  // does not declare its functions extern "C"
 }
 
 #include <algorithm>
@@ -52,7 +52,7 @@ pid_t Start(const std::function<void()>& act) {
 
 // Waits until a child has ended, for so long at most.
 bool EndsWithin(pid_t pid, milliseconds time) {
-  const Descriptor process(::pidfd_open(pid, 0));  // without one the time passes, and the child is taken to live
+  const Descriptor process(::pidfd_open(pid, 0));  // without it, poll() just waits, and the child counts as alive
   pollfd ended{process.get(), POLLIN, 0};
   if (::poll(&ended, 1, static_cast<int>(time.count())) == 0) return false;
   return ::waitpid(pid, nullptr, 0) == pid;

@@ -9,7 +9,7 @@
 
 namespace {
 
-// An event tells something by how it begins and ends; names from the air stand between.
+// Events are recognised by how they begin and end. Names from the air stand between, and are not looked at.
 struct Clue {
   std::string_view start;
   std::string_view end;
@@ -20,7 +20,7 @@ constexpr Clue kClues[] = {
     {"CTRL-EVENT-SSID-TEMP-DISABLED", "reason=WRONG_KEY", Verdict::kSecretRefused},
     {"WPA: 4-Way Handshake failed", "pre-shared key may be incorrect", Verdict::kSecretRefused},
     {"CTRL-EVENT-EAP-FAILURE", "", Verdict::kSecretRefused},
-    {"CTRL-EVENT-AUTH-REJECT", "status_code=15", Verdict::kSecretRefused},  // it failed WEP's challenge
+    {"CTRL-EVENT-AUTH-REJECT", "status_code=15", Verdict::kSecretRefused},  // the answer to WEP's challenge was wrong
     {"CTRL-EVENT-AUTH-REJECT", "", Verdict::kRefused},
     {"CTRL-EVENT-ASSOC-REJECT", "", Verdict::kRefused},
     {"CTRL-EVENT-NETWORK-NOT-FOUND", "", Verdict::kNotFound},
@@ -28,7 +28,7 @@ constexpr Clue kClues[] = {
 
 constexpr std::string_view kLeaving = "CTRL-EVENT-TERMINATING";
 
-// An event without how much it matters, such as "<3>".
+// An event without its priority, such as "<3>".
 std::string_view WithoutLevel(std::string_view event) {
   if (event.starts_with('<')) event.remove_prefix(std::min(event.find('>'), event.size() - 1) + 1);
   return event;
@@ -52,7 +52,7 @@ Verdict VerdictOf(std::string_view event) {
 
 SupplicantListener::SupplicantListener(std::string path) : path_(std::move(path)) {}
 
-// The answers come to an address that the kernel makes up, so that no file is left behind.
+// The kernel chooses the address to which the answers come, so that no file is left behind.
 bool SupplicantListener::Attach() {
   sockaddr_un address{};
   address.sun_family = AF_UNIX;

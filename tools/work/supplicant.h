@@ -9,18 +9,18 @@
 #include "base/descriptor.h"
 #include "work/listener.h"
 
-// Why a join came to nothing, the more telling the greater.
+// Why a join failed. The greater value tells more.
 enum class Verdict {
   kNone,
   kNotFound,      // no such network in range
-  kRefused,       // the access point would not have this station
-  kSecretRefused  // it would not have this secret
+  kRefused,       // the access point refuses this station
+  kSecretRefused  // it refuses the secret
 };
 
 // The verdict of one event, such as "<3>CTRL-EVENT-NETWORK-NOT-FOUND".
 Verdict VerdictOf(std::string_view event);
 
-// Listens to the control socket of the supplicant, which may come, go and come again while it is listened to.
+// Listens to the control socket of the supplicant. Supplicants may come and go meanwhile.
 class SupplicantListener final : public Listener {
  public:
   explicit SupplicantListener(std::string path);
@@ -33,7 +33,7 @@ class SupplicantListener final : public Listener {
 
   void Receive() override;
 
-  // The most telling one so far.
+  // The greatest so far.
   Verdict verdict() const { return verdict_; }
 
  private:

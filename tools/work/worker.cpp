@@ -36,8 +36,8 @@ struct Pipe {
   Descriptor writer;
 };
 
-// What the worker's commands print on their standard error output, in memory: whoever writes there neither waits nor
-// breaks. Daemons may keep the descriptor, so it takes nothing more when this holder ends.
+// A file in memory for what commands print on their standard error output, so that writing neither blocks nor fails.
+// Daemons may keep the descriptor; the file is sealed when this holder ends, so that they cannot fill memory.
 class Errors {
  public:
   Errors() : fd_(Require(::memfd_create("errors", MFD_CLOEXEC | MFD_ALLOW_SEALING), "memfd_create")) {}
@@ -47,7 +47,7 @@ class Errors {
 
   int fd() const { return fd_.get(); }
 
-  // Leaves the offset alone, which is the writers'.
+  // Opens the file anew, since the offset of this descriptor is the writers'.
   void Show() const {
     std::ifstream text("/proc/self/fd/" + std::to_string(fd_.get()));
     for (std::string line; std::getline(text, line);) Remark(Harmless(line, false));
@@ -57,7 +57,7 @@ class Errors {
   Descriptor fd_;
 };
 
-// Commands inherit the worker's standard descriptors.
+// Sets the standard descriptors, which commands inherit.
 void Redirect(int errors) {
   const int nowhere = Require(::open("/dev/null", O_RDWR | O_CLOEXEC), "/dev/null");
   Require(::dup2(nowhere, STDIN_FILENO), "dup2");
@@ -69,7 +69,7 @@ bool Exists(const char* szPath) {
   return szPath != nullptr && ::access(szPath, F_OK) == 0;
 }
 
-// A call that does not come to its end, for whatever reason, ends with its Worker, and is undone.
+// Runs a call. One that has given no result when its Worker ends is ended and undone.
 class Worker {
  public:
   Worker(const Task& task, const std::function<std::string()>& call)
