@@ -2,7 +2,6 @@
 #include <algorithm>
 #include <sstream>
 
-#include "commands.h"
 #include "running.h"
 
 using testing::HasSubstr;
@@ -78,19 +77,15 @@ std::size_t WidthOf(std::string_view line) {
 }
 
 TEST_F(CommandLine, HasHelpThatFitsATerminal) {
-  std::vector<std::vector<std::string>> commands = {
-      {}, {"ap", "show"}, {"ap", "set"}, {"ap", "enable"}, {"ap", "disable"}, {"ap", "status"}};
-  for (const char* szCommand : kCommands) commands.push_back({szCommand});
+  std::vector<std::vector<std::string>> commands = {{}};
+  for (const std::string& command : CommandsOf()) commands.push_back({command});
+  for (const std::string& command : CommandsOf({"ap"})) commands.push_back({"ap", command});
+  EXPECT_THAT(commands, testing::IsSupersetOf<std::vector<std::string>>({{"scan"}, {"ap", "set"}}));
   for (std::vector<std::string>& words : commands) {
     words.emplace_back("--help");
     std::istringstream help(Tool(words).out);
     for (std::string line; std::getline(help, line);) EXPECT_LE(WidthOf(line), 80U) << line;
   }
-}
-
-TEST_F(CommandLine, HasEveryCommandInItsHelp) {
-  const std::string help = Tool({"--help"}).out;
-  for (const char* szCommand : kCommands) EXPECT_THAT(help, HasSubstr("\n  " + std::string(szCommand) + " "));
 }
 
 }  // namespace

@@ -15,6 +15,7 @@
 #include <cstring>
 #include <fstream>
 #include <iterator>
+#include <sstream>
 #include <utility>
 
 #include "app/run.h"
@@ -126,6 +127,18 @@ Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short col
 
 Ran CommandOnTerminal(const std::vector<std::string>& command, const Surroundings& surroundings, const Typing& typing) {
   return OnTerminal([&] { RunCommandHere(command, surroundings); }, 80, typing);
+}
+
+std::vector<std::string> CommandsOf(std::vector<std::string> command) {
+  command.emplace_back("--help");
+  std::istringstream help(Tool(command).out);
+  std::vector<std::string> commands;
+  bool listed = false;
+  for (std::string line; std::getline(help, line);) {
+    if (listed && line.starts_with("  ")) commands.push_back(line.substr(2, line.find(' ', 2) - 2));
+    listed = listed || line == "Subcommands:";
+  }
+  return commands;
 }
 
 StartedTool::StartedTool(const std::vector<std::string>& arguments, const Surroundings& surroundings)

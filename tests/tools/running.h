@@ -38,6 +38,9 @@ Ran ToolOnTerminal(const std::vector<std::string>& arguments, unsigned short col
 // The same with another program.
 Ran CommandOnTerminal(const std::vector<std::string>& command, const Surroundings& surroundings, const Typing& typing);
 
+// The commands that the help of a command lists, or that of the program.
+std::vector<std::string> CommandsOf(std::vector<std::string> command = {});
+
 // A run that is not waited for.
 class StartedTool {
  public:
