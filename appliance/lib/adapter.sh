@@ -1,9 +1,9 @@
-# The wireless adapter: which it is, and what it is to be used for.
+# The wireless adapter: its interface, its name, and whether it is used as an access point.
 # shellcheck shell=sh
 # shellcheck disable=SC2154  # what the other parts set
 
-# The first one by name, but for the guests' interface, which is a second one on the same radio; false when there is
-# none.
+# adapter: prints the first wireless interface by name; false when there is none. The guests' interface does not count,
+# since it is a second one on the same radio.
 adapter() {
 	for phy in /sys/class/net/*/phy80211; do
 		interface=${phy%/phy80211} interface=${interface##*/}
@@ -24,7 +24,7 @@ note_adapter() { # INTERFACE
 	END
 }
 
-# A USB adapter has a name, mostly; others are known by their numbers, or by what drives them.
+# Most USB adapters have a name. Other adapters are known by the numbers of vendor and model, or by their driver.
 section_of() { # INTERFACE
 	device=$(readlink -f "/sys/class/net/$1/device") || fail "cannot tell which adapter $1 is"
 	for file in "$device/../product" "$device/product"; do
@@ -63,7 +63,7 @@ can_be_access_point() { # INTERFACE
 		END { exit !found }'
 }
 
-# access_point_is INTERFACE yes|no: whether an access point has been set up there, and is to run or not.
+# access_point_is INTERFACE yes|no: whether an access point has been set up there and is switched on (yes) or off (no).
 access_point_is() {
 	ask check "/etc/hostapd/hostapd-$1.info" enable "$2"
 }

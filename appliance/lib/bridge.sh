@@ -22,9 +22,9 @@ is_there() { # INTERFACE
 	[ -e "/sys/class/net/$1" ]
 }
 
-# make_bridge BRIDGE [undoable]: makes the bridge with its address and its first member, if that one is wired; a wireless
-# member comes in when its access point starts. Without its first member the bridge is made all the same, and that is a
-# failure. A new bridge that is undoable has noted what give_wire_back needs.
+# make_bridge BRIDGE [undoable]: makes the bridge with its address and its first member, if that one is wired; a
+# wireless member comes in when its access point starts. Without its first member the bridge is made all the same, and
+# that is a failure. A new bridge that is undoable has noted what give_wire_back needs.
 make_bridge() {
 	ask bridge "$1" hardware-address member static address mask || fail "$scripts/ifcfg-$1 describes no bridge"
 	{
@@ -67,14 +67,14 @@ make_bridge_of_boot() {
 	fi
 }
 
-# waits_for_access_point BRIDGE: whether it is there for an access point alone that has been switched off.
+# waits_for_access_point BRIDGE: whether the bridge exists for an access point alone, and that one is switched off.
 waits_for_access_point() {
 	member=$(script_value PRIMARY "$1") || exit 1
 	[ -n "$member" ] && [ -e "/etc/hostapd/hostapd-$member.info" ] && ! is_enabled "/etc/hostapd/hostapd-$member.info"
 }
 
-# is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and no copy that somebody keeps beside it. The
-# file says so by its DEVICE; without one, what follows a dot is a VLAN's number.
+# is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and not a backup copy of a file. The DEVICE in
+# the file decides. In a file without DEVICE, a name with a dot has to be a VLAN's, with a number behind the dot.
 is_file_of_interface() {
 	is_name "$1" || return 1
 	device=$(script_value DEVICE "$1") || exit 1
@@ -104,7 +104,7 @@ is_wireless() { # INTERFACE
 	[ -e "/sys/class/net/$1/phy80211" ] || [ -e "/sys/class/net/$1/wireless" ]
 }
 
-# A member has no addresses of its own: the bridge has them.
+# A member of a bridge has no addresses: the bridge has them.
 join_bridge() { # INTERFACE BRIDGE
 	end_lease "$1"
 	attempt "cannot bring $1 into $2" ip link set dev "$1" master "$2"
@@ -112,7 +112,7 @@ join_bridge() { # INTERFACE BRIDGE
 	attempt "cannot bring $1 up" ip link set dev "$1" up
 }
 
-# move_routes BRIDGE TEXT: the way out that its first member had is the bridge's now.
+# move_routes BRIDGE TEXT: gives the bridge the default routes that its first member had, a line each.
 move_routes() {
 	while read -r line; do
 		[ -n "$line" ] || continue
@@ -123,8 +123,8 @@ move_routes() {
 	END
 }
 
-# note_wire INTERFACE BRIDGE: what an interface has by itself that becomes the first member of a new bridge, in case the
-# bridge comes to nothing.
+# note_wire INTERFACE BRIDGE: notes the addresses, the routes and the lease of an interface before it becomes the first
+# member of a new bridge. give_wire_back restores them if the start fails.
 note_wire() {
 	leased=''
 	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || leased=yes
@@ -137,7 +137,7 @@ forget_wire() { # BRIDGE [FILE]
 	remove_files "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes" "${2-}"
 }
 
-# give_wire_back BRIDGE: the first member is by itself again, as it was, and the bridge is gone.
+# give_wire_back BRIDGE: removes the bridge, and gives its first member back what note_wire has noted.
 give_wire_back() {
 	read -r wire leased <"$state/wire-$1" || cannot_read "$state/wire-$1"
 	end_dnsmasq "$1"
@@ -148,7 +148,8 @@ give_wire_back() {
 	forget_wire "$1"
 }
 
-# set_address INTERFACE ADDRESS/MASK: the only one. What has it already keeps the routes that go with it.
+# set_address INTERFACE ADDRESS/MASK: sets the interface's only address. An interface that has it already keeps it, and
+# so the routes that depend on it.
 set_address() {
 	end_lease "$1"
 	attempt "cannot give $1 the address $2" ip address replace "$2" broadcast + dev "$1"
@@ -170,7 +171,7 @@ lease_address() { # INTERFACE
 		-T 2 -s /usr/mero/sbin/udhcpc.lease
 }
 
-# end_lease INTERFACE: ends the client, and gives back what one has leased, also one that ended by itself.
+# end_lease INTERFACE: ends the DHCP client, and gives its lease back, also that of a client that had ended by itself.
 end_lease() {
 	end_daemon busybox "$(lease_pid "$1")"
 	[ ! -x /usr/mero/sbin/udhcpc.lease ] || /usr/mero/sbin/udhcpc.lease left "$1" ||
@@ -183,7 +184,8 @@ lease_pid() { # INTERFACE
 
 # ---- The bridge of an access point --------------------------------------------------------------------------------
 
-# The bridge that an access point is in is noted: its interface's file may not tell any more when it is to be left.
+# A note says which bridge an access point was put into: when the access point ends, its interface's file may already
+# name another bridge, or none.
 bridge_note() { # INTERFACE
 	printf '%s/bridge-%s' "$state" "$1"
 }
@@ -203,7 +205,8 @@ forget_bridge() { # INTERFACE
 	remove_files "$(bridge_note "$1")"
 }
 
-# bridge_of INTERFACE: the bridge that its access point was put into; without a note, the one that it is in.
+# bridge_of INTERFACE: prints the bridge that its access point was put into. Without a note, that is the bridge that the
+# interface is a member of.
 bridge_of() {
 	note=$(bridge_note "$1")
 	if [ -s "$note" ]; then

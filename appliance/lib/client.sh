@@ -1,15 +1,15 @@
 # The other use of a wireless interface: a station of somebody else's access point.
 # shellcheck shell=sh
 
-# end_client INTERFACE: ends what joins networks and leases addresses there.
+# end_client INTERFACE: ends the supplicant and the DHCP client, and removes the addresses.
 end_client() {
 	end_daemon wpa_supplicant /var/run/wpa_supplicant.pid
 	end_lease "$1"
 	remove_addresses "$1"
 }
 
-# An interface that is a client's is as it is when it has just been plugged in: without addresses, down, and of the
-# kind "managed". One that was pulled is nobody's.
+# An interface for client use is in the state of a freshly plugged one: without addresses, down, and of the type
+# "managed". Nothing is done for an adapter that was pulled.
 
 take_down() { # INTERFACE
 	is_there "$1" || return 0

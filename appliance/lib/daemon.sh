@@ -1,7 +1,7 @@
-# Daemons, by their pid files: the processes that a machine lists may not include them.
+# Daemons, by their pid files.
 # shellcheck shell=sh
 
-# daemon_of NAME PIDFILE: the process of a pid file, if it is still one of that name, and has not ended.
+# daemon_of NAME PIDFILE: prints the process of a pid file, if that process still runs and has that name.
 daemon_of() {
 	pid=''
 	[ -s "$2" ] && read -r pid <"$2"
@@ -24,7 +24,7 @@ is_daemon() { # NAME PID
 	esac
 }
 
-# announce_daemon PIDFILE: an empty pid file stands for a daemon that is being started, and has not written it yet.
+# announce_daemon PIDFILE: makes an empty pid file, which stands for a daemon that starts and has not written it yet.
 announce_daemon() {
 	put "$1" </dev/null
 }

@@ -2,7 +2,7 @@
 # shellcheck shell=sh
 # shellcheck disable=SC2154  # what the other parts set
 
-# serve_addresses BRIDGE: starts the server, or ends it, as its files say.
+# serve_addresses BRIDGE: ends the server, and starts it anew if its .info file enables it.
 serve_addresses() {
 	end_dnsmasq "$1"
 	is_enabled "/etc/dhcpd/dhcpd-$1-$1.info" || return 0
@@ -23,7 +23,7 @@ serve_guest_addresses() {
 	start_dnsmasq "$guest_bridge" "$state/dnsmasq-$guest_bridge.conf"
 }
 
-# Where something else answers names, addresses are given out all the same.
+# If another program of the machine has the port for names, the server gives out addresses only.
 start_dnsmasq() { # BRIDGE CONFIGURATION
 	said=$(run_dnsmasq "$1" "$2" 2>&1) && return
 	case $said in
@@ -35,7 +35,7 @@ start_dnsmasq() { # BRIDGE CONFIGURATION
 	esac
 }
 
-# Asking around whether an address is free would keep every client waiting for 3 s.
+# --no-ping: a ping to see whether an address is free would keep every client waiting for 3 s.
 run_dnsmasq() { # BRIDGE CONFIGURATION [OPTION...]
 	bridge=$1 file=$2
 	shift 2

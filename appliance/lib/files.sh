@@ -1,4 +1,4 @@
-# What the files say, and where they are.
+# Paths, reading of settings, and writing of files.
 # shellcheck shell=sh
 # shellcheck disable=SC2034  # the other parts use them
 
@@ -9,8 +9,9 @@ state=/var/run/rc.network
 newline='
 '
 
-# ask REQUEST...: what settings hold, in $answer, as the library reads them. False when something is missing, or not as
-# checked. Settings that cannot be read end the script: an empty answer is neither on nor off.
+# ask REQUEST...: asks mero-settings, which reads as the library does, and puts what it prints into $answer. False when
+# a value is missing, or a check has failed. Settings that cannot be read end the script, since "no answer" must not be
+# taken for "off"; so the answer is a variable, and not the output of a subshell.
 ask() {
 	answer=$("$settings_reader" "$@")
 	case $? in
@@ -20,7 +21,7 @@ ask() {
 	esac
 }
 
-# says_yes REQUEST...: the same for something that is yes or no; false when it is missing.
+# says_yes REQUEST...: whether the one answer to a request is "yes"; a missing value is a no.
 says_yes() {
 	ask "$@" || return 1
 	case $answer in
@@ -30,17 +31,17 @@ says_yes() {
 	esac
 }
 
-# value_of KEY FILE: what a key/value file holds for a key, without quotes; empty when there is neither.
+# value_of KEY FILE: prints a key's value in a key/value file, without quotes; nothing when there is no key, or no file.
 value_of() {
 	if ask file "$2" "$1"; then printf '%s' "$answer"; fi
 }
 
-# is_enabled FILE: whether a key/value file switches on what it is about.
+# is_enabled FILE: whether a key/value file has enable="yes".
 is_enabled() {
 	ask check "$1" enable yes
 }
 
-# setting KEY: of the access point, for the adapter that is plugged in.
+# setting KEY: prints a setting of the access point, for the adapter that is plugged in.
 setting() {
 	ask access-point "$1" || fail "cannot read the setting $1"
 	printf '%s' "$answer"
@@ -65,9 +66,9 @@ remove_files() {
 	attempt "cannot remove $1" rm -f "$@"
 }
 
-# put FILE [MODE]: replaces a file by what it reads. Nobody sees a half of it, and nobody but root the whole, unless the
-# mode says so. Anybody may have put something in its place, also in /tmp: that is neither followed nor written to, and
-# the new file is made under a name that nobody can foresee.
+# put FILE [MODE]: replaces a file by the standard input, in one step. The mode is 600 by default. In a directory like
+# /tmp anybody may have put a link or a file in the way: that is neither followed nor written to, and the new file is
+# made under a name that nobody can foresee.
 put() {
 	new=$(mktemp "$1.XXXXXXXXXX" 2>&1) || fail "cannot write $1: $new"
 	{ cat >"$new" && chmod "${2:-600}" "$new"; } || give_up "$new" "cannot write $1"
@@ -80,7 +81,7 @@ give_up() { # NEW-FILE TEXT
 	fail "$2"
 }
 
-# set_aside PATH: what stands in the way is kept, under another name.
+# set_aside PATH: renames a file or directory that is in the way, so that nothing of it is lost.
 set_aside() {
 	aside=$(mktemp -u "$1.foreign-XXXXXX") || fail "cannot move $1 aside"
 	attempt "cannot move $1 aside" mv -T "$1" "$aside"

@@ -1,11 +1,11 @@
-# What passes between the networks: address translation for bridges that have it, and what guests may reach.
+# Traffic between the networks: address translation for NAT bridges, and the networks that guests may reach.
 # shellcheck shell=sh
 # shellcheck disable=SC2154  # what the other parts set
 
 forwarding=/proc/sys/net/ipv4/ip_forward
 forwarding_before=$state/ip_forward
 
-# What is noted first is whether traffic was passed on before: while that stands, rules may stand too.
+# The forwarding switch is noted before anything else is done: while the note exists, there may be rules to remove.
 set_firewall() { # BRIDGE
 	if ! is_nat "$1" && [ -z "$guests" ]; then
 		clear_firewall
@@ -24,8 +24,8 @@ set_firewall() { # BRIDGE
 	echo 1 >"$forwarding" || fail 'cannot pass traffic on between networks'
 }
 
-# Without rules that could stand, nothing is asked of nft, which may not be there. Somebody else may have traffic passed
-# on as well.
+# Without the note there are no rules, and nft is not run: it may not be installed. The forwarding switch gets its
+# former value back, since others may need it on.
 clear_firewall() {
 	[ -e "$forwarding_before" ] || return 0
 	read -r before <"$forwarding_before" || cannot_read "$forwarding_before"
@@ -34,8 +34,8 @@ clear_firewall() {
 	remove_files "$forwarding_before"
 }
 
-# set_rules TEXT: replaces all rules by the text's in one step, and prints what nft says. The table is added first, since
-# a missing one cannot be deleted.
+# set_rules TEXT: replaces all rules by the text's in one step, and prints what nft says. The table is added first,
+# since a missing one cannot be deleted.
 set_rules() {
 	nft -f - 2>&1 <<-END
 		add table inet mero_ap
@@ -64,15 +64,15 @@ translation() { # BRIDGE SUBNET
 	}"
 }
 
-# subnet_of BRIDGE: its network as ADDRESS/BITS, which the kernel knows by now.
+# subnet_of BRIDGE: prints its network as ADDRESS/BITS. The bridge has its address by now, so the kernel has the route.
 subnet_of() {
 	networks=$(ip -4 route show dev "$1" proto kernel scope link) || fail "cannot tell the network of $1"
 	[ -n "$networks" ] || fail "$1 has no address, and so no network to translate"
 	printf '%s' "${networks%% *}"
 }
 
-# Guests get addresses and names, and an answer to a ping. What else of the appliance, of the networks around it, and of
-# those beyond they reach is set.
+# Guests always get addresses, names, and an answer to a ping. Settings decide whether they reach the rest of the
+# appliance, the local networks, and the internet.
 guest_rules() {
 	local_networks=$(local_networks) || exit 1
 	lan=$(verdict guest_net_lan_block) || exit 1
@@ -103,7 +103,7 @@ guest_rules() {
 		}"
 }
 
-# Private networks, and whatever the appliance is on itself.
+# local_networks: prints the private networks, and those that the appliance has an address in.
 local_networks() {
 	networks=$(ip -4 route show proto kernel scope link) || fail 'cannot tell the networks around the appliance'
 	printf 10.0.0.0/8,100.64.0.0/10,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16

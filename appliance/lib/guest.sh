@@ -8,7 +8,8 @@ guest_address=10.1.15.1
 guest_subnet=10.1.15.0/24
 guest_range=10.1.15.2,10.1.15.254,255.255.255.0,86400
 
-# Whether a start has guests. It asks once: the hour may change between their rules and their network.
+# Whether a start includes the guest network: "yes" or empty. It is decided once for each start, since the scheduled
+# hour may change between the setting of the guests' rules and the start of their network.
 guests=''
 
 decide_on_guests() { # INTERFACE
@@ -23,12 +24,12 @@ guest_is_on() {
 		! is_off_now guest_net_sched_enable guest_net_sched
 }
 
-# Without an address of its own, the guest network gets the one behind the radio's.
+# An empty "bssid=" is left out: the daemon then gives the guest network the address that follows the radio's own.
 guest_configuration() { # INTERFACE
 	sed '/^bssid=$/d' "/etc/hostapd/hostapd-$1-guest.conf" || cannot_read "/etc/hostapd/hostapd-$1-guest.conf"
 }
 
-# set_guest_bridge: the bridge is there if the start has guests, and only then.
+# set_guest_bridge: makes the bridge for a start with guests, and removes it for one without.
 set_guest_bridge() {
 	if [ -n "$guests" ]; then make_guest_bridge; else remove_guest_bridge; fi
 }

@@ -21,7 +21,7 @@ start_hostapd() { # INTERFACE
 	daemon_of hostapd "$(hostapd_pid "$1")" >/dev/null || fail "the access point on $1 has not noted its process"
 }
 
-# Strangers fill the log, a line for each frame: it ends at 1 MiB.
+# Anyone in range can make the daemon log a line with each frame, so the log is limited to 1 MiB.
 run_hostapd() ( # INTERFACE CONFIGURATION LOG
 	trap '' XFSZ
 	ulimit -f 2048
@@ -33,7 +33,7 @@ end_hostapd() { # INTERFACE
 	end_stray_hostapd "$1"
 }
 
-# end_stray_hostapd INTERFACE: one whose pid file does not tell it, as when the disk was full.
+# end_stray_hostapd INTERFACE: ends a daemon that its pid file does not name, as after a start with a full disk.
 end_stray_hostapd() {
 	for process in /proc/[0-9]*; do
 		if is_daemon hostapd "${process#/proc/}" && is_ours "$process" &&
@@ -53,7 +53,7 @@ belongings_of() { # PROCESS
 	stat -Lc %d:%i "$1/root" "$1/ns/net" 2>/dev/null
 }
 
-# forget_configuration INTERFACE: it holds secrets, and so does a half that was being written.
+# forget_configuration INTERFACE: removes the daemon's files, which hold secrets, and half-written ones.
 forget_configuration() {
 	remove_files "$state/hostapd-$1.conf" "$state/hostapd-$1.conf".* "$state/hostapd-$1.log" "$state/hostapd-$1.log".*
 }
@@ -62,8 +62,8 @@ hostapd_pid() { # INTERFACE
 	printf '%s/hostapd-%s.pid' "$state" "$1"
 }
 
-# What the daemon reads: the main network's file and, while it is on, the guest network's; without what the card cannot
-# do, since a daemon that is told to use that does not start.
+# Writes the daemon's configuration: the main network's file and, for a start with guests, the guest network's. Features
+# that the card lacks are left out, since the daemon does not start with them.
 write_configuration() { # INTERFACE FILE
 	host=/etc/hostapd/hostapd-$1-host.conf
 	[ -s "$host" ] || fail "$host is missing or empty"
@@ -80,8 +80,8 @@ write_configuration() { # INTERFACE FILE
 	END
 }
 
-# expect_protection TEXT: a network that is to be protected, and would be open for want of a key or of a version, is not
-# put on the air.
+# expect_protection TEXT: ends the script when the configuration of a network asks for protection, but has no key or no
+# version of WPA: the daemon would run such a network as an open one.
 expect_protection() {
 	printf '%s\n' "$1" | awk '
 		function judge() { if ((wep && !key) || (secret && !wpa)) open = 1; wep = key = secret = wpa = 0 }
@@ -98,7 +98,8 @@ band_of() { # CONFIGURATION
 	if [ "$mode" = a ]; then echo 2; else echo 1; fi
 }
 
-# what_is_unable INTERFACE BAND: what takes the card's lacks out of a configuration, for sed.
+# what_is_unable INTERFACE BAND: prints a program for sed that takes the features that the card lacks out of a
+# configuration.
 what_is_unable() {
 	bits=$(ht_capabilities "$1" "$2") || exit 1
 	if [ -z "$bits" ]; then
@@ -116,7 +117,7 @@ lacks() { # BITS BIT PATTERN
 	[ $(($1 & $2)) -ne 0 ] || echo "/^ht_capab=/s/$3//"
 }
 
-# What the card can do under 802.11n in a band, as its bits; empty for a card without.
+# Prints the card's 802.11n capabilities in a band, as the number that the driver gives; nothing for a card without.
 ht_capabilities() { # INTERFACE BAND
 	phy=$(cat "/sys/class/net/$1/phy80211/name") || fail "$1 is no wireless interface"
 	said=$(iw phy "$phy" info) || fail "cannot tell the capabilities of $1"
@@ -137,7 +138,7 @@ make_named_files() { # CONFIGURATION
 	END
 }
 
-# The daemon is in the background before it has chosen a channel.
+# The daemon goes into the background before it has chosen a channel, so its start alone does not say that it works.
 await_access_point() { # INTERFACE LOG
 	tries=300
 	while [ $tries -gt 0 ]; do
@@ -154,7 +155,7 @@ await_access_point() { # INTERFACE LOG
 	fail "the access point on $1 does not come up: $reason"
 }
 
-# reason_in LOG [TEXT]: the line in which a daemon says what went wrong, without its time.
+# reason_in LOG [TEXT]: prints the line in which a daemon gives the reason of its failure, without the time.
 reason_in() {
 	{
 		cat "$1"

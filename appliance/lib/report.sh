@@ -1,14 +1,14 @@
-# Failures: told where people and programs look for them, and the end of the script.
+# Messages on standard error and in the system log, and the end of a script that fails.
 # shellcheck shell=sh
 
-# fail TEXT: ends the script.
+# fail TEXT: reports a failure, and ends the script.
 fail() {
 	printf '%s: %s\n' "${0##*/}" "$1" >&2
 	logger -t "${0##*/}" -p daemon.err -- "$1"
 	exit 1
 }
 
-# warn TEXT: tells of what does not keep the rest from working.
+# warn TEXT: reports something that does not keep the rest from working.
 warn() {
 	printf '%s: %s\n' "${0##*/}" "$1" >&2
 	logger -t "${0##*/}" -p daemon.warning -- "$1"
@@ -21,7 +21,7 @@ attempt() {
 	said=$("$@" 2>&1) || fail "$complaint: ${said:-$1 ended with status $?}"
 }
 
-# is_name TEXT: whether an interface may be called so, and it may be put into paths and rules.
+# is_name TEXT: whether it is a name of an interface that can safely stand in paths and rules.
 is_name() {
 	case $1 in
 	'' | *[!A-Za-z0-9_.-]* | .* | -* | ????????????????*) return 1 ;;

@@ -2,8 +2,8 @@
 # shellcheck shell=sh
 # shellcheck disable=SC2154  # what the other parts set
 
-# is_off_now SWITCH-KEY SCHEDULE-KEY: whether a schedule is followed, and has its network off the air. It has a digit for
-# each hour of a week, from Sunday's first on: 0 for off.
+# is_off_now SWITCH-KEY SCHEDULE-KEY: whether the schedule is switched on, and keeps its network off the air at this
+# hour. A schedule has a digit for each hour of the week, beginning with Sunday's first: 0 is off.
 is_off_now() {
 	is_on "$1" || return 1
 	hours=$(setting "$2") || exit 1
@@ -20,7 +20,8 @@ apply_main_schedule() { # INTERFACE
 	attempt "cannot switch $1 $turn" ip link set dev "$1" "$turn"
 }
 
-# What a schedule has begun, and not come to the end of, is noted: meanwhile nothing is on the air that could tell.
+# A note stands while the schedule starts an access point anew. If the start fails, nothing is on the air any more, and
+# the note makes the next hour try again.
 lateness() { # INTERFACE
 	printf '%s/late-%s' "$state" "$1"
 }
@@ -38,7 +39,7 @@ forget_lateness() { # INTERFACE
 }
 
 # guest_is_late INTERFACE: whether the guest network is on the air and should not be, or the other way round. The daemon
-# can neither take up nor give up a network while it runs.
+# cannot add or remove a network while it runs, so it has to be started anew then.
 guest_is_late() {
 	if guest_is_on "$1"; then ! is_there "$guest_interface"; else is_there "$guest_interface"; fi
 }

@@ -1,11 +1,12 @@
-# The directory of what runs. It is root's alone: what stands in it is believed, and its lock keeps other runs waiting.
+# The state directory: notes, pid files and configurations of what runs. Only root may write to it, since the scripts
+# trust its files, and since whoever holds its lock keeps all other runs waiting.
 # shellcheck shell=sh
 # shellcheck disable=SC2154  # what the other parts set
 
 lock=$state/lock
 
-# own_state: the directory is there, root's, and holds nothing that anybody else has made or may open, whatever stood
-# there before.
+# own_state: makes sure that the directory exists and is root's, and that no other user has made, or may open, a file in
+# it. Whatever else stood in its place is moved aside.
 own_state() {
 	[ -e "$state" ] || [ -L "$state" ] || make_state
 	owner=$(stat -c '%u %F' "$state") || fail "cannot tell whose $state is"
@@ -21,7 +22,8 @@ make_state() {
 	attempt "cannot make $state" mkdir -p -m 700 "$state"
 }
 
-# Root's are plain files of one name each. A lock that was open to others may be held by them for ever.
+# Everything but plain files of root's with one name each is removed, and so is a lock that others may open: they may
+# already hold it, for ever.
 remove_foreign_entries() {
 	foreign=$(foreign_entries) || fail "cannot tell what of $state is root's"
 	[ -n "$foreign" ] || return 0
@@ -37,8 +39,8 @@ foreign_entries() { # WHAT-ELSE-TO-DO-WITH-THEM...
 		-printf '%f ' "$@"
 }
 
-# A server gives its pid file to the user that it runs as. Those of servers that run with them are root's here, as their
-# start makes them, and were not always.
+# A DHCP server gives its pid file to the user that it runs as, and a start gives the file back to root. Starts of
+# former versions did not: this does it for servers that still run, so that their pid files are not removed.
 adopt_pid_files() {
 	for file in "$state"/dnsmasq-*.pid; do
 		server=$(daemon_of dnsmasq "$file") || continue
@@ -48,8 +50,8 @@ adopt_pid_files() {
 	done
 }
 
-# lock_state: waits until no other run holds the lock, and keeps it open as descriptor 9. Whoever runs the commands
-# closes that for them: daemons must not hold the lock.
+# lock_state: waits until no other run holds the lock, and keeps it open as descriptor 9. Commands are run with 9
+# closed, since a daemon that they start must not hold the lock.
 lock_state() {
 	waited_in_vain=75 # no status of flock's own
 	umask 077
