@@ -100,12 +100,7 @@ TEST_F(ACard, KeepsTheAddressThatItHasAndTheRoutesThatGoWithIt) {
   EXPECT_THAT(Shell("ip route show default"), HasSubstr("via 10.9.0.1 dev net0"));
 }
 
-TEST_F(ACard, SaysWhatKeepsItFromAnAddress) {
-  std::filesystem::create_directory("/var/run/udhcpc-net0.pid");
-  EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), -1);
-  ExpectFailure(ERR_BAD_PARAMETERS, "Failed to end the DHCP client of net0: Invalid argument");
-  std::filesystem::remove("/var/run/udhcpc-net0.pid");
-
+TEST_F(ACard, WhoseScriptHasNoDirectoryIsReported) {
   WriteFile("/etc/sysconfig", "no directory");
   EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), -1);
   ExpectFailure(ERR_FILE_NOT_FOUND, "Failed to make /etc/sysconfig/network-scripts: Not a directory");
