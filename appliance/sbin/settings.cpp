@@ -12,8 +12,8 @@
 #include <string>
 #include <string_view>
 
+#include "common/ap_settings.h"
 #include "common/text.h"
-#include "lib/obsolete/ap_settings.h"
 #include "lib/obsolete/paths.h"
 #include "platform.h"
 #include "wireless.h"
@@ -90,7 +90,7 @@ std::optional<MERO_AP_CONF> ReadAccessPoint() {
 
 // The row of a key; never that of a secret, since those have a table of their own.
 const Setting& SettingOf(std::string_view key) {
-  for (const auto& [turn, setting] : kApSettings) {
+  for (const auto& [turn, setting] : kSettingRows) {
     const bool read = setting.szKey != nullptr && setting.kind != SettingKind::kTextOnlyWritten;
     if (read && setting.szKey == key) return setting;
   }
@@ -100,11 +100,10 @@ const Setting& SettingOf(std::string_view key) {
 // Without a section a setting is what it is in a section that lacks it. The record has other defaults then, which would
 // let guests into the LAN.
 void AddSetting(Answers& answers, const Setting& setting, const std::optional<MERO_AP_CONF>& conf) {
-  const char* field = conf ? reinterpret_cast<const char*>(&*conf) + setting.offset : nullptr;
-  if (setting.kind == SettingKind::kText) return answers.Add(field != nullptr ? field : setting.szMissing);
-
-  int value = setting.missing;
-  if (field != nullptr) std::memcpy(&value, field, sizeof value);
+  if (setting.kind == SettingKind::kText) {
+    return answers.Add(conf ? reinterpret_cast<const char*>(&*conf) + setting.offset : setting.szMissing);
+  }
+  const int value = conf ? NumberIn(&*conf, setting) : setting.missing;
   if (setting.kind == SettingKind::kSwitch) return answers.AddYesNo(value != FALSE);
   answers.Add(std::to_string(value));
 }

@@ -2,7 +2,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "ap_settings.h"
+#include "common/ap_settings.h"
 #include "common/log.h"
 #include "common/text.h"
 #include "holders.h"
@@ -32,33 +32,30 @@ int GetSwitchValue(const PPLIBSZHASH pHash, const char* key, int defValue) {
 // the guest network, which is bare here.
 void SetDefaultAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
   MERO_AP_CONF conf{};
-  conf.txpower = 10;
-  conf.blWifiUnblock = TRUE;
   CopyText(conf.szSecName, szSecName);
-  CopyText(conf.wifiSchedConf.szWifiSched, kAlwaysOn);
-
-  MERO_HOSTAP_CONF& hostapConf = conf.hostapConf;
-  CopyText(hostapConf.szSSID, "Corvanta");
-  CopyText(hostapConf.szBridge, "lbr0");
-  hostapConf.hwMode = AP_MODE_80211G;
-  hostapConf.ieee80211n = 1;
-  hostapConf.wirelessWidth = AP_FREQ_ALL;
-  hostapConf.maxStation = 256;
-  hostapConf.wmm = 1;
+  for (const auto& [turn, setting] : kSettingRows) {
+    if (setting.kind == SettingKind::kMainSecrets) break;
+    if (setting.kind != SettingKind::kText) {
+      PutNumber(&conf, setting, setting.missing);
+    } else {
+      CopyText(reinterpret_cast<char*>(&conf) + setting.offset, setting.size, setting.szMissing);
+    }
+  }
+  CopyText(conf.hostapConf.szSSID, kUnsavedSsid);
+  CopyText(conf.hostapConf.szBridge, kUnsavedBridge);
   *pConf = conf;  // all at once, since the name may be the record's own
 }
 
 // Takes one setting of a key from the section into its field of a record.
 void Take(PPLIBSZHASH pshHash, const char* szKey, const Setting& setting, void* record) {
-  char* field = static_cast<char*>(record) + setting.offset;
-  const auto put = [field](int value) { std::memcpy(field, &value, sizeof value); };
   switch (setting.kind) {
     case SettingKind::kSwitch:
-      return put(GetSwitchValue(pshHash, szKey, setting.missing));
+      return PutNumber(record, setting, GetSwitchValue(pshHash, szKey, setting.missing));
     case SettingKind::kInteger:
-      return put(GetIntegerValue(pshHash, szKey, setting.missing));
+      return PutNumber(record, setting, GetIntegerValue(pshHash, szKey, setting.missing));
     case SettingKind::kText:
-      return CopyText(field, setting.size, GetStringValue(pshHash, szKey, setting.szMissing));
+      return CopyText(static_cast<char*>(record) + setting.offset, setting.size,
+                      GetStringValue(pshHash, szKey, setting.szMissing));
     case SettingKind::kTextOnlyWritten:
     case SettingKind::kMainSecrets:
     case SettingKind::kGuestSecrets:

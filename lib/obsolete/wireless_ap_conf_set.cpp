@@ -1,9 +1,8 @@
 // Saves the access-point settings.
 #include <cstdio>
-#include <cstring>
 #include <optional>
 
-#include "ap_settings.h"
+#include "common/ap_settings.h"
 #include "common/log.h"
 #include "holders.h"
 #include "paths.h"
@@ -40,19 +39,16 @@ const char* TextOfSwitch(int value) {
 // Puts the setting of a key, from its field of a record, into the hash. A pair that finds no memory there makes the
 // hash one that cannot be written.
 void Put(PPLIBSZHASH* ppshHash, const char* szKey, const Setting& setting, const void* record) {
-  const char* field = static_cast<const char*>(record) + setting.offset;
-  int value = 0;
   char szInteger[1024];
   switch (setting.kind) {
     case SettingKind::kSwitch:
-      std::memcpy(&value, field, sizeof value);
-      return (void)PLIBCSzHashSetValue(ppshHash, szKey, TextOfSwitch(value));
+      return (void)PLIBCSzHashSetValue(ppshHash, szKey, TextOfSwitch(NumberIn(record, setting)));
     case SettingKind::kInteger:
-      std::memcpy(&value, field, sizeof value);
-      return (void)PLIBCSzHashSetValue(ppshHash, szKey, ConvertIntegerToString(value, szInteger, sizeof szInteger));
+      return (void)PLIBCSzHashSetValue(ppshHash, szKey,
+                                       ConvertIntegerToString(NumberIn(record, setting), szInteger, sizeof szInteger));
     case SettingKind::kText:
     case SettingKind::kTextOnlyWritten:
-      return (void)PLIBCSzHashSetValue(ppshHash, szKey, field);
+      return (void)PLIBCSzHashSetValue(ppshHash, szKey, static_cast<const char*>(record) + setting.offset);
     case SettingKind::kMainSecrets:
     case SettingKind::kGuestSecrets:
       return;
@@ -71,7 +67,7 @@ BOOL setEncryptionConf(PPLIBSZHASH* ppshHash, const MERO_AP_ENCRYPT encryption,
 }
 
 void PutSwitches(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
-  for (const auto& [turn, setting] : kApSettings) {
+  for (const auto& [turn, setting] : kSettingRows) {
     if (setting.kind == SettingKind::kSwitch) Put(ppshHash, setting.szKey, setting, pConf);
   }
 }
@@ -80,7 +76,7 @@ void PutSwitches(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
 bool PutTheRest(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
   MERO_HOSTAP_CONF& main = pConf->hostapConf;
   MERO_HOSTAP_GUEST_NET& guest = main.guestNet;
-  for (const auto& [turn, setting] : kApSettings) {
+  for (const auto& [turn, setting] : kSettingRows) {
     if (setting.kind == SettingKind::kSwitch) continue;
     BOOL blDone = TRUE;
     if (setting.kind == SettingKind::kMainSecrets) {

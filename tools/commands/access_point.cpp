@@ -4,6 +4,7 @@
 #include <algorithm>
 
 #include "base/signals.h"
+#include "common/ap_settings.h"
 #include "model/ap_settings.h"
 #include "model/library.h"
 #include "model/library_lines.h"
@@ -11,20 +12,19 @@
 
 namespace {
 
-// For an adapter without settings the library gives defaults for the main network alone. These are the defaults of the
-// guest network: those that the library takes where settings say nothing about guests.
+// A record that nothing was saved for knows of no guests; they get what a section has that says nothing of them. A name
+// is not made up for them.
 void SetGuestDefaults(ApConf& conf) {
-  constexpr int kStations = 256;
-  conf.hostapConf.guestNet.maxStation = kStations;
-  conf.hostapConf.guestNet.blAPIsolate = TRUE;
-  conf.guestNetAccessRule.blLanBlock = TRUE;
-  conf.guestNetAccessRule.blAllowHttp = TRUE;
-  std::ranges::copy(conf.wifiSchedConf.szWifiSched, conf.guestNetSchedConf.szWifiSched);
+  for (const auto& [turn, setting] : kSettingRows) {
+    const bool isNumber = setting.kind == SettingKind::kInteger;
+    if (isNumber && NumberIn(&conf, setting) == 0) PutNumber(&conf, setting, setting.missing);
+  }
+  SetText(conf.guestNetSchedConf.szWifiSched, kAlwaysOn, "the schedule");
 }
 
 // `radio off` may have saved settings that hold the switch alone, and so no bridge.
 void SetBridgeDefault(ApConf& conf) {
-  if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, "lbr0", "the bridge");
+  if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, kUnsavedBridge, "the bridge");
 }
 
 // Reads the settings of the adapter's model; false, with the defaults, when none were saved.

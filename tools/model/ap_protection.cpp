@@ -2,6 +2,7 @@
 #include "model/ap_protection.h"
 
 #include "base/choices.h"
+#include "common/ap_settings.h"
 #include "model/library.h"
 #include "model/security.h"
 
@@ -38,16 +39,12 @@ void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, 
   const Protection& protection = RowOf<Protection>(kProtections, text, szOption);
   if (encryption != protection.encryption) info = {};
   encryption = protection.encryption;
-  if (encryption == AP_ENCRYPT_WPA_PSK) {
-    info.wpaPskInfo.wpaType = protection.wpaType;
-    if (info.wpaPskInfo.encryptType == 0) info.wpaPskInfo.encryptType = TYPE_CCMP;
-  }
-  if (encryption == AP_ENCRYPT_WPA_EAP) {
-    constexpr int kRadiusPort = 1812;
-    info.wpaEapInfo.wpaType = protection.wpaType;
-    if (info.wpaEapInfo.encryptType == 0) info.wpaEapInfo.encryptType = TYPE_CCMP;
-    if (info.wpaEapInfo.authPort == 0) info.wpaEapInfo.authPort = kRadiusPort;
-  }
+  ForEachSecret(encryption, FALSE, [&](const char*, const Setting& setting) {
+    const bool isNumber = setting.kind == SettingKind::kInteger;
+    if (isNumber && NumberIn(&info, setting) == 0) PutNumber(&info, setting, setting.missing);
+  });
+  if (encryption == AP_ENCRYPT_WPA_PSK) info.wpaPskInfo.wpaType = protection.wpaType;
+  if (encryption == AP_ENCRYPT_WPA_EAP) info.wpaEapInfo.wpaType = protection.wpaType;
 }
 
 std::string ProtectionText(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {

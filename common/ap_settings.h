@@ -1,12 +1,14 @@
-// The keys of the access-point settings, stated once for the unit that reads them and the one that writes them. The
-// rows stand in the order in which they are written; each says at which turn it is read.
-#ifndef MERO_LIB_AP_SETTINGS_H
-#define MERO_LIB_AP_SETTINGS_H
+// The access point's settings: their keys in the file, their fields in the record, and their defaults. Whoever reads,
+// writes, shows or sets them walks these rows. They stand in the order in which they are written; each says at which
+// turn it is read. The main network's come first, up to its secrets.
+#ifndef MERO_COMMON_AP_SETTINGS_H
+#define MERO_COMMON_AP_SETTINGS_H
 
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
+#include <cstring>
 #include <iterator>
 
 #include "wireless.h"
@@ -31,6 +33,11 @@ struct Setting {
 
 inline constexpr char kGuestPrefix[] = "guest_net_";
 
+// What a record that nothing was saved for has otherwise than a section that lacks the key. All that belongs to the
+// guest network is 0 or empty there.
+inline constexpr char kUnsavedSsid[] = "Corvanta";
+inline constexpr char kUnsavedBridge[] = "lbr0";
+
 // The hours of a week, all of them on.
 inline constexpr char kAlwaysOn[] =
     "111111111111111111111111111111111111111111111111111111111111111111111111111111111111"
@@ -42,12 +49,12 @@ static_assert(sizeof kAlwaysOn == sizeof(MERO_WIFI_SCHED_CONF::szWifiSched));
 #define AP_FIELD(member) SETTING_FIELD(MERO_AP_CONF, member)
 #define SECRET_FIELD(member) SETTING_FIELD(MERO_HOSTAP_ENCRYPT_INFO, member)
 
-struct ApSetting {
+struct SettingRow {
   uint8_t turn;  // at which it is read; 0 for what is only written
   Setting setting;
 };
 
-inline constexpr ApSetting kApSettings[] = {
+inline constexpr SettingRow kSettingRows[] = {
     {1, {"enable", SettingKind::kSwitch, FALSE, AP_FIELD(blEnable)}},
     {2, {"unblock", SettingKind::kSwitch, TRUE, AP_FIELD(blWifiUnblock)}},
     {3, {"txpower", SettingKind::kInteger, 10, AP_FIELD(txpower)}},
@@ -80,10 +87,21 @@ inline constexpr ApSetting kApSettings[] = {
     {28, {"guest_net_sched_enable", SettingKind::kInteger, 0, AP_FIELD(guestNetSchedConf.wifiSchedEnabled)}},
 };
 
+// A number or switch in a record, and in what an encryption needs.
+inline int NumberIn(const void* record, const Setting& setting) {
+  int value = 0;
+  std::memcpy(&value, static_cast<const char*>(record) + setting.offset, sizeof value);
+  return value;
+}
+
+inline void PutNumber(void* record, const Setting& setting, int value) {
+  std::memcpy(static_cast<char*>(record) + setting.offset, &value, sizeof value);
+}
+
 // How many rows are read at a turn.
 constexpr auto RowsAtTurn(int turn) {
-  return std::count_if(std::begin(kApSettings), std::end(kApSettings),
-                       [=](const ApSetting& row) { return row.turn == turn; });
+  return std::count_if(std::begin(kSettingRows), std::end(kSettingRows),
+                       [=](const SettingRow& row) { return row.turn == turn; });
 }
 
 // How many turns there are: they count from 1 on, with one row each.
@@ -92,14 +110,14 @@ consteval int CountTurns() {
   while (RowsAtTurn(turns + 1) == 1) ++turns;
   return turns;
 }
-static_assert(CountTurns() + RowsAtTurn(0) == std::size(kApSettings), "each turn is one row's");
+static_assert(CountTurns() + RowsAtTurn(0) == std::size(kSettingRows), "each turn is one row's");
 
 // Calls `visit(setting)` for each row that is read, turn by turn.
 template <class Visit>
 void ForEachRead(Visit visit) {
   for (int turn = 1; turn <= CountTurns(); ++turn) {
-    const auto isNext = [=](const ApSetting& row) { return row.turn == turn; };
-    visit(std::find_if(std::begin(kApSettings), std::end(kApSettings), isNext)->setting);
+    const auto isNext = [=](const SettingRow& row) { return row.turn == turn; };
+    visit(std::find_if(std::begin(kSettingRows), std::end(kSettingRows), isNext)->setting);
   }
 }
 
@@ -137,4 +155,4 @@ void ForEachSecret(MERO_AP_ENCRYPT encryption, BOOL blGuestNet, Visit visit) {
   }
 }
 
-#endif  // MERO_LIB_AP_SETTINGS_H
+#endif  // MERO_COMMON_AP_SETTINGS_H
