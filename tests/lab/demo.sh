@@ -158,7 +158,7 @@ heading 'Another appliance becomes an access point'
 doing 'switching it on' appliance shelf
 doing 'noting its adapter, as the hot-plug script does' plug_in shelf
 doing "saving its settings: MEROWirelessSetAPConfig" on shelf mero-call ap-save ssid='Shelf 7' channel=11 \
-  encryption=2 wpa=2 cipher=2 passphrase='among old books'
+  encryption=2 wpa=2 wpa_encrypt_type=2 wpa_passphrase='among old books'
 doing 'bridge, addresses, hostapd and a DHCP server: MEROWirelessAPEnable' on shelf mero-call ap-enable
 remark "$(ip -n shelf -brief -4 address show lbr0 | xargs)"
 remark "$(ip netns exec shelf iw dev wlan0 info | awk '$1 ~ /^(ssid|type|channel)$/' | xargs)"

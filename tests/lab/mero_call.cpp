@@ -20,6 +20,7 @@
 #include <string>
 #include <string_view>
 
+#include "common/ap_settings.h"
 #include "platform.h"
 #include "wireless.h"
 
@@ -64,10 +65,14 @@ int Number(std::string_view text) {
   return number;
 }
 
-template <std::size_t size>
-void SetText(char (&field)[size], std::string_view text) {
+void SetText(char* field, std::size_t size, std::string_view text) {
   if (text.size() >= size) throw WrongCall("too long: " + std::string(text));
   *std::copy(text.begin(), text.end(), field) = '\0';
+}
+
+template <std::size_t size>
+void SetText(char (&field)[size], std::string_view text) {
+  SetText(field, size, text);
 }
 
 using Address = unsigned char[6];
@@ -200,100 +205,47 @@ constexpr Field<Config> kConfigFields[] = {
      [](Config& of, std::string_view text) { of.atime = Number(text); }},
 };
 
-// Settings of an access point: numbers and switches as the settings file has them, texts as they are.
+// Settings of an access point, by their keys in the settings file; numbers and switches are numbers, texts as they are.
 using Settings = MERO_AP_CONF;
 
-// A member of the settings, as a field.
-#define NUMBER(key, member)                                                                                     \
-  {                                                                                                             \
-    key, [](const Settings& of) { return std::to_string(+(of.member)); },                                       \
-        [](Settings& of, std::string_view text) { of.member = static_cast<decltype(of.member)>(Number(text)); } \
-  }
-#define TEXT(key, member)                                                     \
-  {                                                                           \
-    key, [](const Settings& of) -> std::string { return of.member; },         \
-        [](Settings& of, std::string_view text) { SetText(of.member, text); } \
-  }
-
-constexpr Field<Settings> kSettingsFields[] = {
-    NUMBER("enable", blEnable),
-    NUMBER("unblock", blWifiUnblock),
-    TEXT("ssid", hostapConf.szSSID),
-    TEXT("bridge", hostapConf.szBridge),
-    NUMBER("hidden", hostapConf.hideSSID),
-    NUMBER("hw_mode", hostapConf.hwMode),
-    NUMBER("channel", hostapConf.channel),
-    NUMBER("ieee80211n", hostapConf.ieee80211n),
-    NUMBER("width", hostapConf.wirelessWidth),
-    NUMBER("stations", hostapConf.maxStation),
-    NUMBER("wmm", hostapConf.wmm),
-    NUMBER("guest", hostapConf.guestNet.blEnable),
-    TEXT("guest_ssid", hostapConf.guestNet.szSSID),
-    TEXT("guest_bssid", hostapConf.guestNet.szBSSID),
-    NUMBER("guest_hidden", hostapConf.guestNet.hideSSID),
-    NUMBER("guest_stations", hostapConf.guestNet.maxStation),
-    NUMBER("guest_isolate", hostapConf.guestNet.blAPIsolate),
-    NUMBER("guest_lan_block", guestNetAccessRule.blLanBlock),
-    NUMBER("guest_access_ds", guestNetAccessRule.blAccessDS),
-    NUMBER("guest_internet_block", guestNetAccessRule.blInternetBlock),
-    NUMBER("guest_allow_http", guestNetAccessRule.blAllowHttp),
-    TEXT("sched", wifiSchedConf.szWifiSched),
-    NUMBER("sched_enabled", wifiSchedConf.wifiSchedEnabled),
-    TEXT("guest_sched", guestNetSchedConf.szWifiSched),
-    NUMBER("guest_sched_enabled", guestNetSchedConf.wifiSchedEnabled),
-    // What another encryption needed says nothing to a new one.
-    {"encryption", [](const Settings& of) { return std::to_string(of.hostapConf.encryption); },
-     [](Settings& of, std::string_view text) {
-       of.hostapConf.encryption = static_cast<MERO_AP_ENCRYPT>(Number(text));
-       of.hostapConf.encryptInfo = {};
-     }},
-    {"guest_encryption", [](const Settings& of) { return std::to_string(of.hostapConf.guestNet.encryption); },
-     [](Settings& of, std::string_view text) {
-       of.hostapConf.guestNet.encryption = static_cast<MERO_AP_ENCRYPT>(Number(text));
-       of.hostapConf.guestNet.encryptInfo = {};
-     }},
-};
-
-// What an encryption needs; for those who set it, behind the encryption itself.
-constexpr Field<Settings> kWepFields[] = {
-    TEXT("wep_key", hostapConf.encryptInfo.szWepPwd),
-};
-constexpr Field<Settings> kPskFields[] = {
-    TEXT("passphrase", hostapConf.encryptInfo.wpaPskInfo.szPassPhrase),
-    NUMBER("wpa", hostapConf.encryptInfo.wpaPskInfo.wpaType),
-    NUMBER("cipher", hostapConf.encryptInfo.wpaPskInfo.encryptType),
-};
-constexpr Field<Settings> kEapFields[] = {
-    NUMBER("wpa", hostapConf.encryptInfo.wpaEapInfo.wpaType),
-    NUMBER("cipher", hostapConf.encryptInfo.wpaEapInfo.encryptType),
-    TEXT("radius", hostapConf.encryptInfo.wpaEapInfo.szAuthIP),
-    NUMBER("radius_port", hostapConf.encryptInfo.wpaEapInfo.authPort),
-    TEXT("radius_secret", hostapConf.encryptInfo.wpaEapInfo.szAuthSharedSecret),
-};
-constexpr Field<Settings> kGuestPskFields[] = {
-    TEXT("guest_passphrase", hostapConf.guestNet.encryptInfo.wpaPskInfo.szPassPhrase),
-    NUMBER("guest_wpa", hostapConf.guestNet.encryptInfo.wpaPskInfo.wpaType),
-    NUMBER("guest_cipher", hostapConf.guestNet.encryptInfo.wpaPskInfo.encryptType),
-};
-#undef NUMBER
-#undef TEXT
-
-std::span<const Field<Settings>> SecretFieldsOf(const Settings& settings) {
-  switch (settings.hostapConf.encryption) {
-    case AP_ENCRYPT_WEP:
-      return kWepFields;
-    case AP_ENCRYPT_WPA_PSK:
-      return kPskFields;
-    case AP_ENCRYPT_WPA_EAP:
-      return kEapFields;
-    default:
-      return {};
+// Calls `visit(szKey, setting, record)` for each setting, with the record that has its field: the settings themselves,
+// or what an encryption of theirs needs.
+template <class Visit>
+void ForEachSetting(Settings& settings, Visit visit) {
+  MERO_HOSTAP_CONF& main = settings.hostapConf;
+  const auto visit_secrets = [&](auto& network, BOOL blGuestNet) {
+    ForEachSecret(network.encryption, blGuestNet, [&](const char* szKey, const Setting& setting) {
+      visit(szKey, setting, reinterpret_cast<char*>(&network.encryptInfo));
+    });
+  };
+  for (const auto& [turn, setting] : kSettingRows) {
+    if (setting.kind == SettingKind::kMainSecrets) {
+      visit_secrets(main, FALSE);
+    } else if (setting.kind == SettingKind::kGuestSecrets) {
+      visit_secrets(main.guestNet, TRUE);
+    } else {
+      visit(setting.szKey, setting, reinterpret_cast<char*>(&settings));
+    }
   }
 }
 
-std::span<const Field<Settings>> GuestSecretFieldsOf(const Settings& settings) {
-  if (settings.hostapConf.guestNet.encryption != AP_ENCRYPT_WPA_PSK) return {};
-  return kGuestPskFields;
+bool IsText(const Setting& setting) {
+  return setting.kind == SettingKind::kText || setting.kind == SettingKind::kTextOnlyWritten;
+}
+
+// Sets one that the settings have; what an encryption needs, behind the encryption itself.
+bool SetSetting(Settings& settings, std::string_view key, std::string_view value) {
+  bool found = false;
+  ForEachSetting(settings, [&](std::string_view known, const Setting& setting, char* record) {
+    if (known != key) return;
+    found = true;
+    IsText(setting) ? SetText(record + setting.offset, setting.size, value) : PutNumber(record, setting, Number(value));
+  });
+  // What another encryption needed says nothing to a new one.
+  MERO_HOSTAP_CONF& main = settings.hostapConf;
+  if (key == "encryption") main.encryptInfo = {};
+  if (key == "guest_net_encryption") main.guestNet.encryptInfo = {};
+  return found;
 }
 
 template <class Record>
@@ -320,11 +272,13 @@ void Print(const Network& network) {
   std::puts(Pairs<Network>(network, kNetworkFields).c_str());
 }
 
-void Print(const Settings& settings) {
-  std::string pairs = Pairs<Settings>(settings, kSettingsFields);
-  for (const auto fields : {SecretFieldsOf(settings), GuestSecretFieldsOf(settings)}) {
-    if (!fields.empty()) pairs.append(" ").append(Pairs<Settings>(settings, fields));
-  }
+void Print(Settings& settings) {
+  std::string pairs;
+  ForEachSetting(settings, [&](const char* szKey, const Setting& setting, const char* record) {
+    const std::string value =
+        IsText(setting) ? Quoted(record + setting.offset) : std::to_string(NumberIn(record, setting));
+    pairs.append(pairs.empty() ? "" : " ").append(szKey).append("=").append(value);
+  });
   std::puts(pairs.c_str());
 }
 
@@ -489,11 +443,7 @@ int ApSave(Arguments arguments) {
   Settings settings{};
   (void)ReadSettings(settings);
   settings.blEnable = TRUE;
-  SetAll(arguments, [&](std::string_view key, std::string_view value) {
-    return Set<Settings>(settings, kSettingsFields, key, value) ||
-           Set<Settings>(settings, SecretFieldsOf(settings), key, value) ||
-           Set<Settings>(settings, GuestSecretFieldsOf(settings), key, value);
-  });
+  SetAll(arguments, [&](std::string_view key, std::string_view value) { return SetSetting(settings, key, value); });
   return Told(MEROWirelessSetAPConfig(&settings));
 }
 

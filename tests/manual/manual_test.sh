@@ -148,7 +148,7 @@ described_options() {
       print command
     }
     command != "" || /^\.It/ {
-      while (match($0, /Fl -?[a-z]([a-z-]*[a-z])?/)) {
+      while (match($0, /Fl -?[a-z]([a-z0-9-]*[a-z0-9])?/)) {
         print command ": -" substr($0, RSTART + 3, RLENGTH - 3)
         $0 = substr($0, RSTART + RLENGTH)
         if (command == "") while (match($0, /^ , -?[a-z]+/)) {

@@ -37,20 +37,21 @@ class AccessPoint : public ToolTest {
 TEST_F(AccessPoint, IsShownWithoutItsSecrets) {
   const Ran ran = Tool({"ap", "show"});
   EXPECT_EQ(ran.status, 0);
-  EXPECT_THAT(ran.out, testing::StartsWith("access point           off\n"
-                                           "name                   Office\n"
-                                           "security               wpa2\n"
-                                           "cipher                 aes\n"
-                                           "RADIUS server          -\n"
-                                           "band                   2.4 GHz\n"
-                                           "mode                   gn\n"
-                                           "channel                6\n"
-                                           "width                  20 and 40 MHz\n"));
+  EXPECT_THAT(ran.out, testing::StartsWith("enable                           off\n"
+                                           "ssid                             Office\n"
+                                           "encryption                       wpa2\n"
+                                           "wpa_encrypt_type                 aes\n"
+                                           "auth_server_addr                 -\n"
+                                           "auth_server_port                 -\n"
+                                           "band                             2.4 GHz\n"
+                                           "hw_mode                          gn\n"
+                                           "channel                          6\n"
+                                           "ieee80211n_wireless_width        20 and 40 MHz\n"));
   for (const char* form : {"-v", "--json", "--porcelain"}) {
     EXPECT_THAT(Tool({"ap", "show", form}).out, Not(HasSubstr("sesame"))) << form;
     EXPECT_THAT(Tool({"ap", "show", form, "--show-secrets"}).out, HasSubstr("open sesame")) << form;
   }
-  EXPECT_THAT(Tool({"ap", "show", "--json"}).out, HasSubstr(R"("has_secret":true,"guest_has_secret":false}})"));
+  EXPECT_THAT(Tool({"ap", "show", "--json"}).out, HasSubstr(R"("has_secret":true,"guest_net_has_secret":false}})"));
 }
 
 TEST_F(AccessPoint, KeepsItsSwitchAndOtherSettingsWhenOneIsChanged) {
@@ -73,7 +74,7 @@ TEST_F(AccessPoint, WithoutSettingsKeepsItsGuestsFromWhatIsNotTheirs) {
   RecordSaves([](const MERO_AP_CONF& of) {
     return std::to_string(of.guestNetAccessRule.blLanBlock) + std::to_string(of.hostapConf.guestNet.blAPIsolate);
   });
-  EXPECT_EQ(Tool({"ap", "set", "--guest", "yes", "--guest-ssid", "Guests"}).status, 0);
+  EXPECT_EQ(Tool({"ap", "set", "--guest-net-enable", "yes", "--guest-net-ssid", "Guests"}).status, 0);
   EXPECT_EQ(library::Calls()[1], "on: 11");
 }
 
@@ -85,7 +86,7 @@ TEST_F(AccessPoint, ThatIsEnabledIsSavedOnce) {
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig"));
 }
 
-TEST_F(AccessPoint, TakesAllSettingsByTheNamesThatPeopleHaveForThem) {
+TEST_F(AccessPoint, TakesAllSettingsByTheOptionsThatTheirKeysMake) {
   std::string week;
   for (int day = 0; day < 7; ++day) week += "000000001111111111110000\n";
   WriteText("/tmp/week", week);
@@ -106,11 +107,14 @@ TEST_F(AccessPoint, TakesAllSettingsByTheNamesThatPeopleHaveForThem) {
   });
   WriteText("/tmp/main-key", "main secret\n");
   WriteText("/tmp/guest-key", "guest secret\n");
-  const Ran ran = Tool(Words(
-      "ap set --band 5 --mode an --channel 44 --width 40 --security mixed --cipher both --key-file /tmp/main-key"
-      " --hidden yes --max-stations 12 --wmm no --tx-power 20 --schedule /tmp/week --guest yes --guest-security wpa2"
-      " --guest-key-file /tmp/guest-key --guest-isolated yes --guest-lan yes --guest-internet no --guest-appliance yes"
-      " --guest-web no --bridge br7"));
+  const Ran ran =
+      Tool(Words("ap set --band 5 --hw-mode an --channel 44 --ieee80211n-wireless-width 40 --encryption mixed "
+                 "--wpa-encrypt-type both --key-file /tmp/main-key"
+                 " --ignore-broadcast-ssid yes --max-num-sta 12 --wmm-enabled no --txpower 20 --wifi-sched /tmp/week "
+                 "--guest-net-enable yes --guest-net-encryption wpa2"
+                 " --guest-net-key-file /tmp/guest-key --ap-isolate yes --guest-net-lan-block no "
+                 "--guest-net-internet-block yes --guest-net-access-ds yes"
+                 " --guest-net-allow-http no --bridge br7"));
   EXPECT_EQ(ran.status, 0) << ran.err;
   EXPECT_EQ(library::Calls()[1],
             "on: 1 1 44 2 2 3 3 1 12 0 20 1 1 2 1 0 1 1 0 br7 main secret guest secret 000000001111");
@@ -121,10 +125,10 @@ TEST_F(AccessPoint, HasNoGuestsWhereTheModelHasNone) {
     EXPECT_EQ(std::string(szPath) + " " + szKey + " " + szExpected, "/etc.defaults/meroinfo.conf support_pci_wifi yes");
     return 0;
   };
-  const Ran ran = Tool({"ap", "set", "--guest", "yes", "--guest-ssid", "Guests"});
+  const Ran ran = Tool({"ap", "set", "--guest-net-enable", "yes", "--guest-net-ssid", "Guests"});
   EXPECT_EQ(ran.status, 1);
   EXPECT_THAT(ran.err, HasSubstr("this appliance has no guest network"));
-  EXPECT_EQ(Tool({"ap", "set", "--guest", "no"}).status, 0);
+  EXPECT_EQ(Tool({"ap", "set", "--guest-net-enable", "no"}).status, 0);
 }
 
 TEST_F(AccessPoint, RefusesSettingsThatCannotBe) {
@@ -135,25 +139,26 @@ TEST_F(AccessPoint, RefusesSettingsThatCannotBe) {
       {{"--channel", "36"}, 2},
       {{"--band", "5", "--channel", "6"}, 2},
       {{"--band", "6"}, 2},
-      {{"--mode", "an", "--channel", "36"}, 2},
-      {{"--band", "5", "--mode", "gn", "--channel", "6"}, 2},
+      {{"--hw-mode", "an", "--channel", "36"}, 2},
+      {{"--band", "5", "--hw-mode", "gn", "--channel", "6"}, 2},
       {{"--channel", "eleven"}, 2},
       {{"--ssid", ""}, 2},
       {{"--ssid", std::string(33, 'x')}, 2},
-      {{"--security", "wpa3"}, 2},
-      {{"--security", "wep"}, 2},
-      {{"--security", "eap"}, 2},
-      {{"--security", "open", "--cipher", "aes"}, 2},
-      {{"--radius-server", "10.0.0.1"}, 2},
+      {{"--encryption", "wpa3"}, 2},
+      {{"--encryption", "wep"}, 2},
+      {{"--encryption", "eap"}, 2},
+      {{"--encryption", "open", "--wpa-encrypt-type", "aes"}, 2},
+      {{"--auth-server-addr", "10.0.0.1"}, 2},
+      {{"--auth-server-port", "1812"}, 2},
       {{"--key-file", "/tmp/short"}, 5},
-      {{"--hidden", "perhaps"}, 2},
-      {{"--max-stations", "0"}, 2},
+      {{"--ignore-broadcast-ssid", "perhaps"}, 2},
+      {{"--max-num-sta", "0"}, 2},
       {{"--bridge", "../x"}, 2},
       {{"--bridge", "a-name-of-sixteen"}, 2},
-      {{"--schedule", "/tmp/week"}, 2},
-      {{"--guest", "yes", "--guest-security", "wpa2"}, 2},
-      {{"--guest-security", "eap"}, 2},
-      {{"--guest-key-file", "/tmp/short"}, 2},
+      {{"--wifi-sched", "/tmp/week"}, 2},
+      {{"--guest-net-enable", "yes", "--guest-net-encryption", "wpa2"}, 2},
+      {{"--guest-net-encryption", "eap"}, 2},
+      {{"--guest-net-key-file", "/tmp/short"}, 2},
   };
   for (const auto& [options, status] : wrong) {
     std::vector<std::string> arguments{"ap", "set"};

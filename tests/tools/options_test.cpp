@@ -56,7 +56,7 @@ TEST_F(CommandLine, ThatIsWrongIsNotRepeatedSinceItMayHoldASecret) {
                                                        {"radio", "open-sesame"},
                                                        {"watch", "--count", "open-sesame"},
                                                        {"gateway", "open-sesame"},
-                                                       {"ap", "set", "--hidden", "open-sesame"}};
+                                                       {"ap", "set", "--wmm-enabled", "open-sesame"}};
   for (const auto& arguments : wrong) {
     const Ran ran = Tool(arguments);
     EXPECT_EQ(ran.status, 2) << testing::PrintToString(arguments);
@@ -68,7 +68,7 @@ TEST_F(CommandLine, ExplainsItselfOnRequest) {
   const Ran ran = Tool({"--help"});
   EXPECT_EQ(ran.status, 0);
   EXPECT_THAT(ran.out, HasSubstr("5 secret refused"));
-  EXPECT_THAT(Tool({"ap", "set", "--help"}).out, HasSubstr("--channel VALUE"));
+  EXPECT_THAT(Tool({"ap", "set", "--help"}).out, HasSubstr("--channel N|auto"));
 }
 
 // Columns, where every byte but the continuation of a character is one.

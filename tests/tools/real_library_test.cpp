@@ -124,15 +124,15 @@ TEST(InstalledProgram, KeepsTheAccessPointsSettings) {
   AnnounceAdapter();
   EXPECT_EQ(Tool("radio on").status, 0);
   ASSERT_EQ(std::system("printf 'open sesame\\n' >/tmp/secret"), 0);
-  EXPECT_EQ(Tool("ap set --ssid Office --security wpa2 --key-file /tmp/secret --channel 11").status, 0);
+  EXPECT_EQ(Tool("ap set --ssid Office --encryption wpa2 --key-file /tmp/secret --channel 11").status, 0);
   EXPECT_THAT(
       ReadText("/usr/mero/etc/wireless_ap.conf"),
       AllOf(HasSubstr("[Example Stick]"), HasSubstr("\tenable=no\n"), HasSubstr("\tssid=Office\n"),
             HasSubstr("\tbridge=lbr0\n"), HasSubstr("\twpa_passphrase=open sesame\n"), HasSubstr("\tchannel=11\n")));
-  EXPECT_EQ(Tool("ap set --hidden yes").status, 0);
+  EXPECT_EQ(Tool("ap set --ignore-broadcast-ssid yes").status, 0);
   EXPECT_THAT(Tool("ap show --json --show-secrets").out,
-              AllOf(HasSubstr(R"("enabled":false,"ssid":"Office","security":"wpa2","cipher":"aes")"),
-                    HasSubstr(R"("hidden":true)"), HasSubstr(R"("secret":"open sesame")")));
+              AllOf(HasSubstr(R"("enable":false,"ssid":"Office","encryption":"wpa2","wpa_encrypt_type":"aes")"),
+                    HasSubstr(R"("ignore_broadcast_ssid":true)"), HasSubstr(R"("secret":"open sesame")")));
 }
 
 // The files and directories that have been written or made on this machine, each behind its mode, or alone.
@@ -151,7 +151,7 @@ std::string WrittenWithUmask(const std::string& mask) {
   const std::string tool = "umask " + mask + "; LC_ALL=C.UTF-8 " MERO_TOOL " ";
   for (const char* szArguments :
        {"save Home --bssid 00:11:22:33:44:55 --security wpa2 --key-file /tmp/secret",
-        "ap set --ssid Office --security wpa2 --key-file /tmp/secret", "radio off", "disconnect", "forget Home"}) {
+        "ap set --ssid Office --encryption wpa2 --key-file /tmp/secret", "radio off", "disconnect", "forget Home"}) {
     EXPECT_EQ(std::system((tool + szArguments + " >/dev/null").c_str()), 0) << szArguments;
   }
   const std::string written = Written("%m %p");

@@ -42,7 +42,7 @@ TEST_F(Secrets, OfTheAccessPointAreAskedForWhenThereIsNone) {
   library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF saved) {
     return library::Record(saved->hostapConf.encryptInfo.wpaPskInfo.szPassPhrase), TRUE;
   };
-  const Ran ran = ToolOnTerminal({"ap", "set", "--security", "wpa2"}, 80, {},
+  const Ran ran = ToolOnTerminal({"ap", "set", "--encryption", "wpa2"}, 80, {},
                                  {.prompt = "secret of Office: ", .text = "open sesame\n"});
   EXPECT_EQ(ran.status, 0) << ran.out;
   EXPECT_THAT(ran.out, Not(HasSubstr("sesame")));

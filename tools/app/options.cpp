@@ -193,16 +193,16 @@ void AddApCommands(Commands& commands, CLI::App& app) {
       *ap, "set", "Change settings; the others stay",
       [](CLI::App& command, ApChanges& values) {
         for (const ApSetting& setting : ApSettings()) {
-          if (setting.szOption == nullptr) continue;
-          const std::string option = setting.szOption;
+          if (!setting.hasOption()) continue;
+          const auto key = setting.field.key;
           command
               .add_option_function<std::string>(
-                  "--" + option, [&values, option](const std::string& text) { values.settings[option] = text; },
+                  "--" + OptionOf(key), [&values, key](const std::string& text) { values.settings[key] = text; },
                   setting.szHelp)
-              ->option_text("VALUE");
+              ->option_text(setting.szValue);
         }
         DescribeSecret(command, values.secret);
-        command.add_option("--guest-key-file", values.guestKeyFile, "read the guest network's secret from FILE")
+        command.add_option("--guest-net-key-file", values.guestKeyFile, "read the guest network's secret from FILE")
             ->option_text("FILE");
       },
       SetAp);

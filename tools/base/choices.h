@@ -19,10 +19,10 @@ std::string Choices(std::span<const Row> rows) {
 }
 
 template <class Row>
-const Row& RowOf(std::span<const Row> rows, const std::string& text, const char* szOption) {
+const Row& RowOf(std::span<const Row> rows, const std::string& text, std::string_view option) {
   const auto found = std::ranges::find(rows, text, &Row::text);
   if (found == rows.end()) {
-    throw Wrong("--" + std::string(szOption) + " cannot be this", "it is one of " + Choices(rows));
+    throw Wrong("--" + std::string(option) + " cannot be this", "it is one of " + Choices(rows));
   }
   return *found;
 }
@@ -38,14 +38,14 @@ inline std::string NameOf(std::span<const Name> names, int value) {
   return found != names.end() ? std::string(found->text) : std::to_string(value);
 }
 
-inline int ValueOf(std::span<const Name> names, const std::string& text, const char* szOption) {
-  return RowOf(names, text, szOption).value;
+inline int ValueOf(std::span<const Name> names, const std::string& text, std::string_view option) {
+  return RowOf(names, text, option).value;
 }
 
-inline int NumberOf(const std::string& text, int least, int greatest, const char* szOption) {
+inline int NumberOf(const std::string& text, int least, int greatest, std::string_view option) {
   const auto number = ParseNumber(text);
   if (number && *number >= least && *number <= greatest) return *number;
-  throw Wrong("--" + std::string(szOption) + " cannot be this",
+  throw Wrong("--" + std::string(option) + " cannot be this",
               "it is a number from " + std::to_string(least) + " to " + std::to_string(greatest));
 }
 

@@ -78,8 +78,7 @@ void ApplySecrets(const Program& program, ApConf& conf, const ApChanges& changes
 
 void ApplySettings(ApConf& conf, const ApChanges& changes) {
   for (const ApSetting& setting : ApSettings()) {
-    if (setting.szOption == nullptr) continue;
-    const auto change = changes.settings.find(setting.szOption);
+    const auto change = changes.settings.find(setting.field.key);
     if (change != changes.settings.end()) setting.set(conf, change->second);
   }
 }

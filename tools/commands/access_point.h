@@ -4,12 +4,13 @@
 
 #include <map>
 #include <string>
+#include <string_view>
 
 #include "model/secrets.h"
 #include "work/program.h"
 
 struct ApChanges {
-  std::map<std::string, std::string> settings;  // by option, as ApSettings() has them
+  std::map<std::string_view, std::string> settings;  // by key, as ApSettings() has them
   SecretSource secret;
   std::string guestKeyFile;
 };

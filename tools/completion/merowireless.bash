@@ -13,60 +13,58 @@ _merowireless_names() {
   done < <(merowireless --porcelain known 2>/dev/null </dev/null)
 }
 
-# What the value of an option may be; fails for options that take none.
-_merowireless_values() { # OPTION COMMAND
-  case $1 in
-    --security)
-      if [[ $2 == ap* ]]; then
-        echo 'open wep wpa wpa2 mixed eap'
-      else
-        echo 'open wep wpa wpa2 wpa-eap wpa2-eap'
-      fi
-      ;;
-    --guest-security) echo 'open wep wpa wpa2 mixed' ;;
-    --cipher | --guest-cipher) echo 'tkip aes both' ;;
-    --band) echo '2.4 5' ;;
-    --mode) echo 'b g bn gn n a an' ;;
-    --width) echo '20 40 both' ;;
-    --channel) echo 'auto' ;;
-    --ip) echo 'DHCP none' ;;
-    --hidden | --wmm | --guest | --guest-hidden | --guest-isolated | --guest-lan | --guest-internet | \
-      --guest-appliance | --guest-web) echo 'yes no' ;;
-    --ssid | --guest-ssid | --max-stations | --guest-max-stations | --tx-power | --bridge | --radius-server | --mask | \
-      --gateway | --bssid | --user | --count) ;;
-    *) return 1 ;;
-  esac
+# The help of the program or a command says all that may follow.
+_merowireless_help() { # [COMMAND]
+  # shellcheck disable=SC2086  # a command is one word or two
+  merowireless $1 --help 2>/dev/null </dev/null
+}
+
+# What the help that it reads has under a heading, a row each: a name, and what it takes.
+_merowireless_listed() { # HEADING
+  local heading line
+  while IFS= read -r line; do
+    if [[ $line == [A-Z]*: ]]; then
+      heading=$line
+    elif [[ $heading == "$1:" && $line =~ ^'  '([^ ]+)(' '([^ ]+))? ]]; then
+      echo "${BASH_REMATCH[1]##*,} ${BASH_REMATCH[3]}"
+    fi
+  done
+}
+
+# The names alone, but for that of --help, which every command has.
+_merowireless_names_listed() { # HEADING
+  local name _
+  while read -r name _; do [[ $name == --help ]] || echo "$name"; done < <(_merowireless_listed "$1")
+}
+
+# What the value of an option may be, by the help that it reads; fails for options that take none.
+_merowireless_takes() { # OPTION
+  local option takes
+  while read -r option takes; do
+    [[ $option != "$1" || ! $takes || $takes == Excludes: ]] || echo "$takes"
+  done < <(_merowireless_listed Options) | grep .
+}
+
+# The words among what may be given; others stand for what they say.
+_merowireless_choices() { # TAKES
+  local word
+  for word in ${1//[][|]/ }; do
+    case $word in
+      NAME | ADDRESS | FILE | N | A.B.C.D) ;;
+      *) echo "$word" ;;
+    esac
+  done
 }
 
 # What may stand at some place of a command.
-_merowireless_words() { # COMMAND CURRENT-WORD
-  local secret='--key-file --key-stdin'
+_merowireless_words() { # COMMAND ITS-HELP CURRENT-WORD
+  local _ takes
   # Options of all commands are offered once one is begun.
-  [[ $2 != -* ]] || echo '--json --porcelain --verbose --help'
-  case $1 in
-    '') echo 'scan known save forget connect autoconnect disconnect status watch address gateway adhoc ap mode radio' ;;
-    scan) echo '--renew' ;;
-    known) echo '--by-time --show-secrets' ;;
-    save) echo "$secret --ip --mask --gateway --security --bssid" ;;
-    connect)
-      echo "$secret --user --any-ap --no-address"
-      _merowireless_names
-      ;;
-    forget) _merowireless_names ;;
-    watch) echo '--count' ;;
-    address) echo 'DHCP --mask' ;;
-    adhoc) echo "$secret --wep" ;;
-    ap) echo 'show set enable disable status' ;;
-    'ap show') echo '--show-secrets' ;;
-    'ap set')
-      echo "$secret --ssid --security --cipher --radius-server --band --mode --channel --width --hidden" \
-        '--max-stations --wmm --tx-power --bridge --schedule --guest --guest-ssid --guest-security --guest-cipher' \
-        '--guest-hidden --guest-max-stations --guest-isolated --guest-lan --guest-internet --guest-appliance' \
-        '--guest-web --guest-schedule --guest-key-file'
-      ;;
-    mode) echo 'ap client' ;;
-    radio) echo 'on off' ;;
-  esac
+  [[ $3 != -* ]] || { _merowireless_help | _merowireless_names_listed Options && echo --help; }
+  _merowireless_names_listed Subcommands <<<"$2"
+  [[ ! $1 ]] || _merowireless_names_listed Options <<<"$2"
+  while read -r _ takes; do _merowireless_choices "$takes"; done < <(_merowireless_listed Positionals <<<"$2")
+  [[ $1 != @(connect|forget) ]] || _merowireless_names
 }
 
 # Writes how the words that it reads go on after a beginning that has been typed, which may have opened quotes.
@@ -105,19 +103,19 @@ _merowireless() { # PROGRAM REPLACED, which is the end of the current word: bash
     esac
   done
 
-  local current=${words[-1]} option=${words[-2]} value=${words[-1]} offered
+  local current=${words[-1]} option=${words[-2]} value=${words[-1]} help takes offered
   [[ $current != --*=* ]] || option=${current%%=*} value=${current#*=}
-  case $option in
-    --key-file | --guest-key-file | --schedule | --guest-schedule)
+  help=$(_merowireless_help "$command")
+  if takes=$(_merowireless_takes "$option" <<<"$help"); then
+    if [[ $takes == FILE* ]]; then
       COMPREPLY=()
       compopt -o default # the names of files
       return
-      ;;
-  esac
-  if offered=$(_merowireless_values "$option" "$command"); then
+    fi
+    offered=$(_merowireless_choices "$takes")
     current=$value
   else
-    offered=$(_merowireless_words "$command" "$current")
+    offered=$(_merowireless_words "$command" "$help" "$current")
   fi
   mapfile -t COMPREPLY < <(compgen -W "$offered" -- "$current" | _merowireless_rest "${current%"$2"}")
 }

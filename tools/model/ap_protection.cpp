@@ -35,8 +35,8 @@ int* CipherOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info) {
 
 // The details are a union: those of another encryption mean nothing to this one and are cleared.
 void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
-                   const char* szOption) {
-  const Protection& protection = RowOf<Protection>(kProtections, text, szOption);
+                   std::string_view option) {
+  const Protection& protection = RowOf<Protection>(kProtections, text, option);
   if (encryption != protection.encryption) info = {};
   encryption = protection.encryption;
   ForEachSecret(encryption, FALSE, [&](const char*, const Setting& setting) {
@@ -62,10 +62,10 @@ Value CipherValue(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO info) {
 }
 
 void SetCipher(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
-               const char* szOption) {
+               std::string_view option) {
   int* cipher = CipherOf(encryption, info);
-  if (cipher == nullptr) throw Wrong("only WPA has a choice of ciphers", "add --security wpa2");
-  *cipher = ValueOf(kCiphers, text, szOption);
+  if (cipher == nullptr) throw Wrong("only WPA has a choice of ciphers", "add --encryption wpa2");
+  *cipher = ValueOf(kCiphers, text, option);
 }
 
 const char* SecretOf(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {
@@ -97,7 +97,7 @@ void SetSecretOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, con
     case AP_ENCRYPT_MAX:
       break;
   }
-  throw Wrong("an open network has no secret", "add --security wpa2");
+  throw Wrong("an open network has no secret", "add --encryption wpa2");
 }
 
 bool LacksSecret(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {

@@ -3,6 +3,7 @@
 #define MERO_TOOLS_AP_PROTECTION_H
 
 #include <string>
+#include <string_view>
 
 #include "show/output.h"
 #include "wireless.h"
@@ -10,12 +11,12 @@
 // Sets the protection that is called `text`: open, wep, wpa, wpa2, mixed or eap. The secret stays when it is of the
 // same kind.
 void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
-                   const char* szOption);
+                   std::string_view option);
 std::string ProtectionText(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info);
 
 // tkip, aes or both; nothing where there is no choice.
 void SetCipher(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
-               const char* szOption);
+               std::string_view option);
 Value CipherValue(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO info);
 
 // The secret: a WEP key, a passphrase, or the one shared with the RADIUS server. Setting one fails when it is not

@@ -1,4 +1,4 @@
-// The access point's settings by the names that people have for them.
+// The access point's settings, as they are shown and set.
 #include "model/ap_settings.h"
 
 #include <algorithm>
@@ -6,8 +6,10 @@
 #include <cstring>
 #include <fstream>
 #include <iterator>
+#include <stdexcept>
 
 #include "base/choices.h"
+#include "common/ap_settings.h"
 #include "model/ap_protection.h"
 #include "model/library.h"
 #include "model/paths.h"
@@ -17,7 +19,7 @@ namespace {
 // ---- Tables of names ----
 
 constexpr Name kWidths[] = {{"20", AP_FREQ_20_MHZ}, {"40", AP_FREQ_40_MHZ}, {"both", AP_FREQ_ALL}};
-constexpr Name kSwitch[] = {{"yes", TRUE}, {"no", FALSE}};
+constexpr Name kYesNo[] = {{"yes", TRUE}, {"no", FALSE}};
 
 // The access-point daemon is given one of the modes b, g and a, and 802.11n as a switch of its own.
 struct Mode {
@@ -34,10 +36,6 @@ constexpr Mode kModes[] = {
 constexpr int k5GHzChannels[] = {36,  40,  44,  48,  52,  56,  60,  64,  100, 104, 108, 112, 116,
                                  120, 124, 128, 132, 136, 140, 144, 149, 153, 157, 161, 165};
 
-BOOL SwitchOf(const std::string& text, const char* szOption) {
-  return ValueOf(kSwitch, text, szOption) != 0 ? TRUE : FALSE;
-}
-
 // ---- Names, modes, protection ----
 
 const Mode* ModeOf(const ApConf& conf) {
@@ -52,7 +50,7 @@ bool Is5GHz(const ApConf& conf) {
 }
 
 void SetMode(ApConf& conf, const std::string& text) {
-  const Mode& mode = RowOf<Mode>(kModes, text, "mode");
+  const Mode& mode = RowOf<Mode>(kModes, text, "hw-mode");
   if ((mode.hwMode == AP_MODE_80211A) != Is5GHz(conf)) {
     throw Wrong("this is no mode of the " + std::string(Is5GHz(conf) ? "5" : "2.4") + " GHz band",
                 std::string("add --band ") + (Is5GHz(conf) ? "2.4" : "5") + ", or use another mode");
@@ -91,27 +89,36 @@ bool HasEap(const ApConf& conf) {
   return conf.hostapConf.encryption == AP_ENCRYPT_WPA_EAP;
 }
 
-Value RadiusServer(const ApConf& conf) {
-  if (!HasEap(conf)) return nullptr;
-  return Value(std::string(conf.hostapConf.encryptInfo.wpaEapInfo.szAuthIP) + ":" +
-               std::to_string(conf.hostapConf.encryptInfo.wpaEapInfo.authPort));
+MERO_HOSTAP_WPA_EAP_INFO& Eap(ApConf& conf) {
+  if (!HasEap(conf)) throw Wrong("only EAP has a RADIUS server", "add --encryption eap");
+  return conf.hostapConf.encryptInfo.wpaEapInfo;
 }
 
-void SetRadiusServer(ApConf& conf, const std::string& text) {
-  if (!HasEap(conf)) throw Wrong("only EAP has a RADIUS server", "add --security eap");
-  const std::size_t colon = text.find(':');
-  const std::string address = text.substr(0, colon);
-  if (!IsIpAddress(address)) throw Wrong("the RADIUS server's address is none", "give A.B.C.D or A.B.C.D:PORT");
-  auto& eap = conf.hostapConf.encryptInfo.wpaEapInfo;
-  SetText(eap.szAuthIP, address, "the RADIUS server");
-  if (colon != text.npos) eap.authPort = NumberOf(text.substr(colon + 1), 1, 65535, "radius-server");
+Value RadiusAddress(const ApConf& conf) {
+  return HasEap(conf) ? Value(conf.hostapConf.encryptInfo.wpaEapInfo.szAuthIP) : nullptr;
+}
+
+void SetRadiusAddress(ApConf& conf, const std::string& text) {
+  auto& eap = Eap(conf);
+  if (!IsIpAddress(text)) throw Wrong("the RADIUS server's address is none", "give A.B.C.D");
+  SetText(eap.szAuthIP, text, "the RADIUS server");
+}
+
+Value RadiusPort(const ApConf& conf) {
+  return HasEap(conf) ? Value(int64_t{conf.hostapConf.encryptInfo.wpaEapInfo.authPort}) : nullptr;
+}
+
+void SetRadiusPort(ApConf& conf, const std::string& text) {
+  constexpr int kLastPort = 65535;
+  Eap(conf).authPort = NumberOf(text, 1, kLastPort, "auth-server-port");
 }
 
 // ---- Bridges and schedules ----
 
 void SetBridge(ApConf& conf, const std::string& text) {
   const bool plain = std::ranges::all_of(text, [](unsigned char c) { return std::isgraph(c) != 0 && c != '/'; });
-  if (text.empty() || !plain || text == "." || text == "..") throw Wrong("this is no bridge's name", "such as lbr0");
+  if (text.empty() || !plain || text == "." || text == "..")
+    throw Wrong("this is no bridge's name", "such as " + std::string(kUnsavedBridge));
   SetText(conf.hostapConf.szBridge, text, "the bridge");
 }
 
@@ -148,10 +155,6 @@ Shown ShowSwitch(bool on) {
   return on ? Shown{"on", Tone::kGood} : Shown{"off", Tone::kFair};
 }
 
-Value YesNo(int value) {
-  return value != 0;
-}
-
 MERO_HOSTAP_GUEST_NET& Guest(ApConf& conf) {
   return conf.hostapConf.guestNet;
 }
@@ -162,180 +165,173 @@ const MERO_HOSTAP_GUEST_NET& Guest(const ApConf& conf) {
 
 // Without a built-in card the library writes no guest network and reports nothing.
 void SetGuest(ApConf& conf, const std::string& text) {
-  Guest(conf).blEnable = SwitchOf(text, "guest");
+  Guest(conf).blEnable = ValueOf(kYesNo, text, "guest-net-enable") != 0 ? TRUE : FALSE;
   if (Guest(conf).blEnable == FALSE || PLIBCFileCheckKeyValue(kModelFacts, "support_pci_wifi", "yes", 0) != 0) return;
   throw Failure(Exit::kFailed, "this appliance has no guest network",
                 "it takes a built-in card, of which " + std::string(kModelFacts) + " says support_pci_wifi=\"yes\"");
+}
+
+// ---- Settings that are one number of the record ----
+
+// A key of the settings file, for a template.
+struct Key {
+  template <std::size_t kSize>
+  consteval Key(const char (&literal)[kSize]) {
+    std::ranges::copy(literal, text);
+  }
+
+  char text[40]{};
+};
+
+// The library's row of a key; one that the library does not know is no constant.
+consteval const Setting& RowOfKey(std::string_view key) {
+  for (const SettingRow& row : kSettingRows) {
+    if (row.setting.szKey != nullptr && row.setting.szKey == key) return row.setting;
+  }
+  throw std::invalid_argument("no such key");
+}
+
+template <Key kKey>
+inline constexpr const Setting& kRow = RowOfKey(kKey.text);
+
+template <Key kKey>
+constexpr ApSetting Switch(const char* szHelp) {
+  return {{kKey.text, kKey.text, [](const ApConf& of) { return Value(NumberIn(&of, kRow<kKey>) != 0); }},
+          "yes|no",
+          szHelp,
+          [](ApConf& of, const std::string& text) {
+            PutNumber(&of, kRow<kKey>, ValueOf(kYesNo, text, OptionOf(kKey.text)));
+          }};
+}
+
+template <Key kKey, int kLeast, int kGreatest>
+constexpr ApSetting Number(const char* szHelp) {
+  return {{kKey.text, kKey.text, [](const ApConf& of) { return Value(int64_t{NumberIn(&of, kRow<kKey>)}); }},
+          "N",
+          szHelp,
+          [](ApConf& of, const std::string& text) {
+            PutNumber(&of, kRow<kKey>, NumberOf(text, kLeast, kGreatest, OptionOf(kKey.text)));
+          }};
+}
+
+// A field whose title is its key.
+constexpr Field<ApConf> Told(const char* szKey, Value (*value)(const ApConf&),
+                             Shown (*shown)(const ApConf&, bool utf8) = nullptr) {
+  return {szKey, szKey, value, Layout::kLeft, shown};
 }
 
 constexpr int kMostStations = 2007;  // as many as an access point can tell apart
 
 // Later rows build on earlier ones: --band sets a channel that --channel replaces, and a cipher is one of its
 // protection.
-const ApSetting kSettings[] = {
-    {{"enabled", "access point", [](const ApConf& of) { return YesNo(of.blEnable); }, Layout::kLeft,
-      [](const ApConf& of, bool) { return ShowSwitch(of.blEnable != FALSE); }}},
-    {{"ssid", "name", [](const ApConf& of) { return Value(of.hostapConf.szSSID); }},
-     "ssid",
-     "the network's name",
+constexpr ApSetting kSettings[] = {
+    {Told(
+        "enable", [](const ApConf& of) { return Value(of.blEnable != FALSE); },
+        [](const ApConf& of, bool) { return ShowSwitch(of.blEnable != FALSE); })},
+    {Told("ssid", [](const ApConf& of) { return Value(of.hostapConf.szSSID); }), "NAME", "the network's name",
      [](ApConf& of, const std::string& text) { SetNetworkName(of.hostapConf.szSSID, text); }},
-    {{"security", "security",
-      [](const ApConf& of) { return Value(ProtectionText(of.hostapConf.encryption, of.hostapConf.encryptInfo)); }},
-     "security",
-     "open, wep, wpa, wpa2, mixed or eap",
+    {Told("encryption",
+          [](const ApConf& of) { return Value(ProtectionText(of.hostapConf.encryption, of.hostapConf.encryptInfo)); }),
+     "open|wep|wpa|wpa2|mixed|eap", "how the network is protected",
      [](ApConf& of, const std::string& text) {
-       SetProtection(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "security");
+       SetProtection(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "encryption");
      }},
-    {{"cipher", "cipher",
-      [](const ApConf& of) { return CipherValue(of.hostapConf.encryption, of.hostapConf.encryptInfo); }},
-     "cipher",
-     "of WPA: tkip, aes or both",
+    {Told("wpa_encrypt_type",
+          [](const ApConf& of) { return CipherValue(of.hostapConf.encryption, of.hostapConf.encryptInfo); }),
+     "tkip|aes|both", "the ciphers of WPA",
      [](ApConf& of, const std::string& text) {
-       SetCipher(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "cipher");
+       SetCipher(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "wpa-encrypt-type");
      }},
-    {{"radius_server", "RADIUS server", RadiusServer},
-     "radius-server",
-     "of EAP: A.B.C.D or A.B.C.D:PORT",
-     SetRadiusServer},
-    {{"band", "band", [](const ApConf& of) { return Value(Is5GHz(of) ? "5" : "2.4"); }, Layout::kLeft,
-      [](const ApConf& of, bool) { return Shown{Is5GHz(of) ? "5 GHz" : "2.4 GHz"}; }},
-     "band",
-     "2.4 or 5",
-     SetBand},
-    {{"mode", "mode",
-      [](const ApConf& of) { return ModeOf(of) != nullptr ? Value(std::string(ModeOf(of)->text)) : nullptr; }},
-     "mode",
-     "b, g, bn, gn, n, a or an",
-     SetMode},
-    {{"channel", "channel", [](const ApConf& of) { return Value(int64_t{of.hostapConf.channel}); }, Layout::kLeft,
-      [](const ApConf& of, bool) {
-        return Shown{of.hostapConf.channel == 0 ? "auto" : std::to_string(of.hostapConf.channel)};
-      }},
-     "channel",
-     "a number or auto",
-     SetChannel},
-    {{"width", "width", [](const ApConf& of) { return Value(NameOf(kWidths, of.hostapConf.wirelessWidth)); },
-      Layout::kLeft,
-      [](const ApConf& of, bool) {
-        return Shown{of.hostapConf.wirelessWidth == AP_FREQ_ALL
-                         ? "20 and 40 MHz"
-                         : NameOf(kWidths, of.hostapConf.wirelessWidth) + " MHz"};
-      }},
-     "width",
-     "20, 40 or both (MHz)",
-     [](ApConf& of, const std::string& text) { of.hostapConf.wirelessWidth = ValueOf(kWidths, text, "width"); }},
-    {{"hidden", "hidden", [](const ApConf& of) { return YesNo(of.hostapConf.hideSSID); }},
-     "hidden",
-     "yes keeps the name out of the beacons",
-     [](ApConf& of, const std::string& text) { of.hostapConf.hideSSID = SwitchOf(text, "hidden"); }},
-    {{"max_stations", "stations", [](const ApConf& of) { return Value(int64_t{of.hostapConf.maxStation}); }},
-     "max-stations",
-     "the most clients at a time",
+    {Told("auth_server_addr", RadiusAddress), "A.B.C.D", "the RADIUS server of EAP", SetRadiusAddress},
+    {Told("auth_server_port", RadiusPort), "N", "its port", SetRadiusPort},
+    {Told(
+         "band", [](const ApConf& of) { return Value(Is5GHz(of) ? "5" : "2.4"); },
+         [](const ApConf& of, bool) { return Shown{Is5GHz(of) ? "5 GHz" : "2.4 GHz"}; }),
+     "2.4|5", "the band of --hw-mode, in GHz", SetBand},
+    {Told("hw_mode",
+          [](const ApConf& of) { return ModeOf(of) != nullptr ? Value(std::string(ModeOf(of)->text)) : nullptr; }),
+     "b|g|bn|gn|n|a|an", "the radio standard", SetMode},
+    {Told(
+         "channel", [](const ApConf& of) { return Value(int64_t{of.hostapConf.channel}); },
+         [](const ApConf& of, bool) {
+           return Shown{of.hostapConf.channel == 0 ? "auto" : std::to_string(of.hostapConf.channel)};
+         }),
+     "N|auto", "the channel", SetChannel},
+    {Told(
+         "ieee80211n_wireless_width",
+         [](const ApConf& of) { return Value(NameOf(kWidths, of.hostapConf.wirelessWidth)); },
+         [](const ApConf& of, bool) {
+           return Shown{of.hostapConf.wirelessWidth == AP_FREQ_ALL
+                            ? "20 and 40 MHz"
+                            : NameOf(kWidths, of.hostapConf.wirelessWidth) + " MHz"};
+         }),
+     "20|40|both", "the channel's width, in MHz",
      [](ApConf& of, const std::string& text) {
-       of.hostapConf.maxStation = NumberOf(text, 1, kMostStations, "max-stations");
+       of.hostapConf.wirelessWidth = ValueOf(kWidths, text, "ieee80211n-wireless-width");
      }},
-    {{"wmm", "WMM", [](const ApConf& of) { return YesNo(of.hostapConf.wmm); }},
-     "wmm",
-     "yes gives speech and pictures precedence",
-     [](ApConf& of, const std::string& text) { of.hostapConf.wmm = SwitchOf(text, "wmm"); }},
-    {{"tx_power", "power", [](const ApConf& of) { return Value(int64_t{of.txpower}); }},
-     "tx-power",
-     "0 to 30; kept for other programs, nothing sets it",
-     [](ApConf& of, const std::string& text) { of.txpower = NumberOf(text, 0, 30, "tx-power"); }},
-    {{"bridge", "bridge", [](const ApConf& of) { return Value(of.hostapConf.szBridge); }},
-     "bridge",
-     "the bridge that the access point joins",
-     SetBridge},
-    {{"schedule", "on the air", [](const ApConf& of) { return ScheduleValue(of.wifiSchedConf); }, Layout::kLeft,
-      [](const ApConf& of, bool) { return ShowSchedule(of.wifiSchedConf); }},
-     "schedule",
-     "a file of 7 lines of 24 zeros and ones, or off",
+    Switch<"ignore_broadcast_ssid">("yes keeps the name out of the beacons"),
+    Number<"max_num_sta", 1, kMostStations>("the most clients at a time"),
+    Switch<"wmm_enabled">("yes gives speech and pictures precedence"),
+    Number<"txpower", 0, 30>("0 to 30; kept for other programs, nothing sets it"),
+    {Told("bridge", [](const ApConf& of) { return Value(of.hostapConf.szBridge); }), "NAME",
+     "the bridge that the access point joins", SetBridge},
+    {Told(
+         "wifi_sched", [](const ApConf& of) { return ScheduleValue(of.wifiSchedConf); },
+         [](const ApConf& of, bool) { return ShowSchedule(of.wifiSchedConf); }),
+     "FILE|off", "a file of 7 lines of 24 zeros and ones",
      [](ApConf& of, const std::string& text) { SetSchedule(of.wifiSchedConf, text); }},
-    {{"guest_enabled", "guest network", [](const ApConf& of) { return YesNo(Guest(of).blEnable); }, Layout::kLeft,
-      [](const ApConf& of, bool) { return ShowSwitch(Guest(of).blEnable != FALSE); }},
-     "guest",
-     "yes puts the guest network up beside the main one",
-     SetGuest},
-    {{"guest_ssid", "guest name", [](const ApConf& of) { return Value(Guest(of).szSSID); }},
-     "guest-ssid",
+    {Told(
+         "guest_net_enable", [](const ApConf& of) { return Value(Guest(of).blEnable != FALSE); },
+         [](const ApConf& of, bool) { return ShowSwitch(Guest(of).blEnable != FALSE); }),
+     "yes|no", "yes puts up the guest network beside the main one", SetGuest},
+    {Told("guest_net_ssid", [](const ApConf& of) { return Value(Guest(of).szSSID); }), "NAME",
      "the guest network's name",
      [](ApConf& of, const std::string& text) { SetNetworkName(Guest(of).szSSID, text, "the guest network's name"); }},
-    {{"guest_security", "guest security",
-      [](const ApConf& of) { return Value(ProtectionText(Guest(of).encryption, Guest(of).encryptInfo)); }},
-     "guest-security",
-     "open, wep, wpa, wpa2 or mixed",
+    {Told("guest_net_encryption",
+          [](const ApConf& of) { return Value(ProtectionText(Guest(of).encryption, Guest(of).encryptInfo)); }),
+     "open|wep|wpa|wpa2|mixed", "how the guest network is protected",
      [](ApConf& of, const std::string& text) {
        if (text == "eap") throw Wrong("a guest network cannot have EAP", "use wpa2");
-       SetProtection(Guest(of).encryption, Guest(of).encryptInfo, text, "guest-security");
+       SetProtection(Guest(of).encryption, Guest(of).encryptInfo, text, "guest-net-encryption");
      }},
-    {{"guest_cipher", "guest cipher",
-      [](const ApConf& of) { return CipherValue(Guest(of).encryption, Guest(of).encryptInfo); }},
-     "guest-cipher",
-     "of WPA: tkip, aes or both",
+    {Told("guest_net_wpa_encrypt_type",
+          [](const ApConf& of) { return CipherValue(Guest(of).encryption, Guest(of).encryptInfo); }),
+     "tkip|aes|both", "the ciphers of its WPA",
      [](ApConf& of, const std::string& text) {
-       SetCipher(Guest(of).encryption, Guest(of).encryptInfo, text, "guest-cipher");
+       SetCipher(Guest(of).encryption, Guest(of).encryptInfo, text, "guest-net-wpa-encrypt-type");
      }},
-    {{"guest_hidden", "guest hidden", [](const ApConf& of) { return YesNo(Guest(of).hideSSID); }},
-     "guest-hidden",
-     "yes keeps its name out of the beacons",
-     [](ApConf& of, const std::string& text) { Guest(of).hideSSID = SwitchOf(text, "guest-hidden"); }},
-    {{"guest_max_stations", "guest stations", [](const ApConf& of) { return Value(int64_t{Guest(of).maxStation}); }},
-     "guest-max-stations",
-     "the most guests at a time",
-     [](ApConf& of, const std::string& text) {
-       Guest(of).maxStation = NumberOf(text, 1, kMostStations, "guest-max-stations");
-     }},
-    {{"guest_isolated", "guests apart", [](const ApConf& of) { return YesNo(Guest(of).blAPIsolate); }},
-     "guest-isolated",
-     "yes keeps guests from each other",
-     [](ApConf& of, const std::string& text) { Guest(of).blAPIsolate = SwitchOf(text, "guest-isolated"); }},
-    {{"guest_lan", "guests: LAN", [](const ApConf& of) { return Value(of.guestNetAccessRule.blLanBlock == FALSE); }},
-     "guest-lan",
-     "yes lets guests reach the appliance's own network",
-     [](ApConf& of, const std::string& text) {
-       of.guestNetAccessRule.blLanBlock = SwitchOf(text, "guest-lan") == FALSE ? TRUE : FALSE;
-     }},
-    {{"guest_internet", "guests: internet",
-      [](const ApConf& of) { return Value(of.guestNetAccessRule.blInternetBlock == FALSE); }},
-     "guest-internet",
-     "yes lets guests reach the internet",
-     [](ApConf& of, const std::string& text) {
-       of.guestNetAccessRule.blInternetBlock = SwitchOf(text, "guest-internet") == FALSE ? TRUE : FALSE;
-     }},
-    {{"guest_appliance", "guests: appliance", [](const ApConf& of) { return YesNo(of.guestNetAccessRule.blAccessDS); }},
-     "guest-appliance",
-     "yes lets guests reach the appliance itself",
-     [](ApConf& of, const std::string& text) { of.guestNetAccessRule.blAccessDS = SwitchOf(text, "guest-appliance"); }},
-    {{"guest_web", "guests: its web pages", [](const ApConf& of) { return YesNo(of.guestNetAccessRule.blAllowHttp); }},
-     "guest-web",
-     "yes lets guests reach the appliance's web pages",
-     [](ApConf& of, const std::string& text) { of.guestNetAccessRule.blAllowHttp = SwitchOf(text, "guest-web"); }},
-    {{"guest_schedule", "guests on the air", [](const ApConf& of) { return ScheduleValue(of.guestNetSchedConf); },
-      Layout::kLeft, [](const ApConf& of, bool) { return ShowSchedule(of.guestNetSchedConf); }},
-     "guest-schedule",
-     "as --schedule",
+    Switch<"guest_net_ignore_broadcast_ssid">("yes keeps its name out of the beacons"),
+    Number<"guest_net_max_num_sta", 1, kMostStations>("the most guests at a time"),
+    Switch<"ap_isolate">("yes keeps guests from each other"),
+    Switch<"guest_net_lan_block">("yes keeps guests out of the appliance's network"),
+    Switch<"guest_net_internet_block">("yes keeps guests out of the internet"),
+    Switch<"guest_net_access_ds">("yes lets guests reach the appliance itself"),
+    Switch<"guest_net_allow_http">("yes lets guests reach the appliance's web pages"),
+    {Told(
+         "guest_net_sched", [](const ApConf& of) { return ScheduleValue(of.guestNetSchedConf); },
+         [](const ApConf& of, bool) { return ShowSchedule(of.guestNetSchedConf); }),
+     "FILE|off", "as --wifi-sched",
      [](ApConf& of, const std::string& text) { SetSchedule(of.guestNetSchedConf, text); }},
     {{"has_secret", "",
       [](const ApConf& of) { return Value(*SecretOf(of.hostapConf.encryption, of.hostapConf.encryptInfo) != '\0'); }}},
-    {{"guest_has_secret", "",
+    {{"guest_net_has_secret", "",
       [](const ApConf& of) { return Value(*SecretOf(Guest(of).encryption, Guest(of).encryptInfo) != '\0'); }}},
-    {{.key = "secret",
-      .title = "secret",
-      .value = [](const ApConf& of) { return Value(SecretOf(of.hostapConf.encryption, of.hostapConf.encryptInfo)); }},
-     nullptr,
-     nullptr,
-     nullptr,
-     Show::kOnRequest},
-    {{.key = "guest_secret",
-      .title = "guest secret",
-      .value = [](const ApConf& of) { return Value(SecretOf(Guest(of).encryption, Guest(of).encryptInfo)); }},
-     nullptr,
-     nullptr,
-     nullptr,
-     Show::kOnRequest},
+    {.field =
+         Told("secret",
+              [](const ApConf& of) { return Value(SecretOf(of.hostapConf.encryption, of.hostapConf.encryptInfo)); }),
+     .show = Show::kOnRequest},
+    {.field = Told("guest_net_secret",
+                   [](const ApConf& of) { return Value(SecretOf(Guest(of).encryption, Guest(of).encryptInfo)); }),
+     .show = Show::kOnRequest},
 };
 
 }  // namespace
+
+std::string OptionOf(std::string_view key) {
+  std::string option(key);
+  std::ranges::replace(option, '_', '-');
+  return option;
+}
 
 std::span<const ApSetting> ApSettings() {
   return kSettings;
@@ -364,15 +360,16 @@ bool LacksSecret(const ApConf& conf) {
 void RequireComplete(const ApConf& conf) {
   const MERO_HOSTAP_CONF& main = conf.hostapConf;
   if (main.szSSID[0] == '\0') throw Wrong("the access point has no name", "add --ssid NAME");
-  if (main.szBridge[0] == '\0') throw Wrong("the access point has no bridge", "add --bridge lbr0");
+  if (main.szBridge[0] == '\0')
+    throw Wrong("the access point has no bridge", "add --bridge " + std::string(kUnsavedBridge));
   if (LacksSecret(conf)) throw Wrong("this security needs a secret", "add --key-file or --key-stdin");
   if (HasEap(conf) && main.encryptInfo.wpaEapInfo.szAuthIP[0] == '\0') {
-    throw Wrong("EAP needs a RADIUS server", "add --radius-server A.B.C.D");
+    throw Wrong("EAP needs a RADIUS server", "add --auth-server-addr A.B.C.D");
   }
   RequireChannel(conf);
   if (main.guestNet.blEnable == FALSE) return;
-  if (main.guestNet.szSSID[0] == '\0') throw Wrong("the guest network has no name", "add --guest-ssid NAME");
+  if (main.guestNet.szSSID[0] == '\0') throw Wrong("the guest network has no name", "add --guest-net-ssid NAME");
   if (LacksSecret(main.guestNet.encryption, main.guestNet.encryptInfo)) {
-    throw Wrong("the guest network's security needs a secret", "add --guest-key-file FILE");
+    throw Wrong("the guest network's security needs a secret", "add --guest-net-key-file FILE");
   }
 }

@@ -1,4 +1,4 @@
-// The access point's settings by the names that people have for them.
+// The access point's settings, as they are shown and set.
 #ifndef MERO_TOOLS_AP_SETTINGS_H
 #define MERO_TOOLS_AP_SETTINGS_H
 
@@ -14,14 +14,19 @@ using ApConf = MERO_AP_CONF;
 
 enum class Show { kAlways, kOnRequest };  // secrets are shown on request
 
-// One setting: how it is shown and, where it has an option, how it is set.
+// One setting, by its key in the settings file: how it is shown and, where it has an option, how it is set.
 struct ApSetting {
   Field<ApConf> field;
-  const char* szOption = nullptr;  // without its dashes
+  const char* szValue = nullptr;  // what its option takes: words, and in capitals what stands for others
   const char* szHelp = nullptr;
   void (*set)(ApConf&, const std::string& text) = nullptr;  // fails with advice
   Show show = Show::kAlways;
+
+  bool hasOption() const { return set != nullptr; }
 };
+
+// The option that sets a key, without its dashes: the key, with hyphens.
+std::string OptionOf(std::string_view key);
 
 // In the order in which they are shown and set; the secrets come last.
 std::span<const ApSetting> ApSettings();

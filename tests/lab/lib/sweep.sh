@@ -10,9 +10,11 @@ swept_access_point() {
   inside "$1" mkdir -p /etc.defaults
   inside "$1" tee /etc.defaults/meroinfo.conf >/dev/null <<<'support_pci_wifi="yes"'
   plug_in "$1"
-  serves "$1" ssid=home encryption=2 passphrase='deux croissants' wpa=2 cipher=2 channel=6 width=1 \
-    guest=1 guest_ssid=visitors guest_encryption=2 guest_passphrase='come on in' guest_wpa=2 guest_cipher=2 \
-    guest_lan_block=1 guest_access_ds=1 guest_internet_block=1 guest_allow_http=0
+  serves "$1" ssid=home encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 channel=6 \
+    ieee80211n_wireless_width=1 \
+    guest_net_enable=1 guest_net_ssid=visitors guest_net_encryption=2 guest_net_wpa_passphrase='come on in' \
+    guest_net_wpa=2 guest_net_wpa_encrypt_type=2 \
+    guest_net_lan_block=1 guest_net_access_ds=1 guest_net_internet_block=1 guest_net_allow_http=0
   inside "$1" mkdir /run/sweep
   inside "$1" tee /run/sweep/sweep <"$LAB/guest/sweep" >/dev/null
   inside "$1" bash /run/sweep/sweep prepare

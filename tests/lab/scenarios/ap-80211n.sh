@@ -23,14 +23,14 @@ guest_uses_80211n() {
 open=(auth=OPEN encrypt=NONE)
 
 say '-- 20 MHz on 2.4 GHz'
-serves nas ssid=n encryption=0 hw_mode=12 ieee80211n=1 width=1 channel=6
+serves nas ssid=n encryption=0 hw_mode=12 ieee80211n=1 ieee80211n_wireless_width=1 channel=6
 expect_channel 6 20
 guest_of nas guest essid=n "${open[@]}"
 guest_uses_80211n || fail 'the station is not sent to by 802.11n'
 leaves guest
 
 say '-- 40 MHz on 2.4 GHz'
-serves nas width=3
+serves nas ieee80211n_wireless_width=3
 expect_channel 6 40
 on nas grep ^ht_capab= /run/rc.network/hostapd-wlan0.conf
 expect_output <<<'ht_capab=[SHORT-GI-20][SHORT-GI-40][HT40-]'
@@ -38,13 +38,13 @@ guest_of nas guest essid=n "${open[@]}"
 leaves guest
 
 say '-- 40 MHz on 5 GHz'
-serves nas ssid=five encryption=2 passphrase='deux croissants' wpa=2 cipher=2 hw_mode=1 channel=36
+serves nas ssid=five encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 hw_mode=1 channel=36
 expect_channel 36 40
 guest_of nas guest essid=five auth=WPA2PSK encrypt=AES key='deux croissants'
 leaves guest
 
 say '-- 802.11n alone, with one station at most'
-serves nas ssid=n encryption=0 hw_mode=8 channel=1 width=1 stations=1
+serves nas ssid=n encryption=0 hw_mode=8 channel=1 ieee80211n_wireless_width=1 max_num_sta=1
 expect_channel 1 20
 guest_of nas guest essid=n "${open[@]}"
 refused late essid=n bssid="$(address_of nas)" "${open[@]}"
@@ -53,13 +53,13 @@ expect_station nas guest
 leaves guest
 
 say '-- no 802.11n'
-serves nas ssid=g hw_mode=4 ieee80211n=0 stations=256
+serves nas ssid=g hw_mode=4 ieee80211n=0 max_num_sta=256
 guest_of nas guest essid=g "${open[@]}"
 ! guest_uses_80211n || fail 'the station is sent to by 802.11n'
 leaves guest
 
 say '-- a channel of its own choice, with what width it has room for'
-serves nas ssid=any channel=0 ieee80211n=1 width=3
+serves nas ssid=any channel=0 ieee80211n=1 ieee80211n_wireless_width=3
 expect_channel '[1-9]*' '[24]0'
 guest_of nas guest essid=any "${open[@]}"
 leaves guest

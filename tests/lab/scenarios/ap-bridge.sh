@@ -8,7 +8,8 @@ serve office 192.168.7 eth0
 plug_in nas
 
 say '-- on the air'
-serves nas ssid=office encryption=2 passphrase='deux croissants' wpa=2 cipher=2 bridge=br0 width=1
+serves nas ssid=office encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 bridge=br0 \
+  ieee80211n_wireless_width=1
 expect_file nas /etc/sysconfig/network-scripts/ifcfg-br0 <<'END'
 DEVICE=br0
 NAT=no

@@ -6,7 +6,8 @@ appliance guest
 radius_server nas
 plug_in nas
 
-serves nas ssid=campus encryption=3 wpa=2 cipher=2 radius=127.0.0.1 radius_port=1812 radius_secret='between us' width=1
+serves nas ssid=campus encryption=3 wpa=2 wpa_encrypt_type=2 auth_server_addr=127.0.0.1 auth_server_port=1812 \
+  auth_server_shared_secret='between us' ieee80211n_wireless_width=1
 campus=(essid=campus auth=WPA2EAP encrypt=AES)
 
 say '-- PEAP'

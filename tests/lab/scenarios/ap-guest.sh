@@ -51,9 +51,11 @@ expect_does_not_read() {  # NAME PORT
 }
 
 say '-- guests reach the internet, not the LAN, and nothing of the appliance but its pages'
-serves nas ssid=home encryption=2 passphrase='deux croissants' wpa=2 cipher=2 channel=6 width=1 \
-  guest=1 guest_ssid=visitors guest_encryption=2 guest_passphrase='come on in' guest_wpa=2 guest_cipher=2 \
-  guest_stations=2 guest_isolate=1 guest_lan_block=1 guest_access_ds=0 guest_internet_block=0 guest_allow_http=1
+serves nas ssid=home encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 channel=6 \
+  ieee80211n_wireless_width=1 guest_net_enable=1 guest_net_ssid=visitors guest_net_encryption=2 \
+  guest_net_wpa_passphrase='come on in' guest_net_wpa=2 guest_net_wpa_encrypt_type=2 \
+  guest_net_max_num_sta=2 ap_isolate=1 guest_net_lan_block=1 guest_net_access_ds=0 guest_net_internet_block=0 \
+  guest_net_allow_http=1
 visits guest
 expect_reachable guest 203.0.113.1
 expect_unreachable guest 192.168.7.1
@@ -78,24 +80,24 @@ leaves other
 say '-- off the air for this hour, while the main network stays, and the other way round'
 never=$(printf '%0168d' 0)
 always=${never//0/1}
-on nas mero-call ap-save guest_sched="$never" guest_sched_enabled=1
+on nas mero-call ap-save guest_net_sched="$never" guest_net_sched_enable=1
 on nas /etc/rc.network schedule wlan0
 within 2 no_station nas guest || fail 'the guest is still there'
 within 5 on_air wlan0 || fail 'the main network alone should be on the air'
 leaves guest
-on nas mero-call ap-save guest_sched="$always" sched="$never" sched_enabled=1
+on nas mero-call ap-save guest_net_sched="$always" wifi_sched="$never" wifi_sched_enabled=1
 on nas /etc/rc.network schedule wlan0
 within 5 on_air gwlan || fail 'the guest network alone should be on the air'
 visits guest
 leaves guest
-on nas mero-call ap-save sched="$always"
+on nas mero-call ap-save wifi_sched="$always"
 on nas /etc/rc.network schedule wlan0
 within 5 on_air gwlan wlan0 || fail 'both networks should be on the air'
 guest_of nas other essid=home auth=WPA2PSK encrypt=AES key='deux croissants'
 leaves other
 
 say '-- the other way round: the LAN and all of the appliance, but not the internet'
-serves nas guest_lan_block=0 guest_access_ds=1 guest_internet_block=1 guest_allow_http=0 guest_isolate=0
+serves nas guest_net_lan_block=0 guest_net_access_ds=1 guest_net_internet_block=1 guest_net_allow_http=0 ap_isolate=0
 visits guest
 expect_reachable guest 192.168.7.1
 expect_unreachable guest 203.0.113.1
@@ -103,7 +105,7 @@ expect_reads guest 8080
 leaves guest
 
 say '-- without it'
-serves nas guest=0
+serves nas guest_net_enable=0
 fails_on nas test -e /sys/class/net/gwlan
 fails_on nas test -e /sys/class/net/gbr
 on nas mero-call ap-disable

@@ -8,7 +8,8 @@ appliance guest
 plug_in nas
 
 say '-- WPA2'
-serves nas ssid='My NAS' encryption=2 passphrase='deux $croissants' wpa=2 cipher=2 channel=6 width=1
+serves nas ssid='My NAS' encryption=2 wpa_passphrase='deux $croissants' wpa=2 wpa_encrypt_type=2 channel=6 \
+  ieee80211n_wireless_width=1
 guest_of nas guest essid='My NAS' auth=WPA2PSK encrypt=AES key='deux $croissants'
 expect_mode nas /etc/hostapd/hostapd-wlan0-host.conf 600
 expect_mode nas /usr/mero/etc/wireless_ap.conf 600
@@ -26,24 +27,24 @@ leaves guest
 
 # The daemon that still runs is replaced each time.
 say '-- WPA'
-serves nas ssid=old encryption=2 passphrase='the old printer' wpa=1 cipher=1 ieee80211n=0
+serves nas ssid=old encryption=2 wpa_passphrase='the old printer' wpa=1 wpa_encrypt_type=1 ieee80211n=0
 guest_of nas guest essid=old auth=WPAPSK encrypt=TKIP key='the old printer'
 leaves guest
 
 say '-- WPA and WPA2'
-serves nas ssid=both encryption=2 passphrase='any old key' wpa=3 cipher=3
+serves nas ssid=both encryption=2 wpa_passphrase='any old key' wpa=3 wpa_encrypt_type=3
 guest_of nas guest essid=both auth=WPAPSK encrypt=TKIP key='any old key'
 leaves guest
 guest_of nas guest essid=both auth=WPA2PSK encrypt=AES key='any old key'
 leaves guest
 
 say '-- WEP'
-serves nas ssid=wired encryption=1 wep_key='t&r$e'
+serves nas ssid=wired encryption=1 wep_key0='t&r$e'
 guest_of nas guest essid=wired auth=SHARED encrypt=WEP key='t&r$e'
 leaves guest
 
 say '-- open, and it keeps its name out of its beacons'
-serves nas ssid=square encryption=0 hidden=1
+serves nas ssid=square encryption=0 ignore_broadcast_ssid=1
 on guest mero-call scan renew
 expect_no_line 'essid=square'
 guest_of nas guest essid=square auth=OPEN encrypt=NONE

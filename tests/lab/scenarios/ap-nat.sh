@@ -21,7 +21,8 @@ fi
 expect_processes nas </dev/null
 
 say '-- to a third network and back'
-serves nas ssid=cafe encryption=2 passphrase='deux croissants' wpa=2 cipher=2 width=1 channel=6
+serves nas ssid=cafe encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 \
+  ieee80211n_wireless_width=1 channel=6
 guest_of nas guest "${key[@]}"
 expect_default_route guest 10.1.14.1
 expect_reachable guest 203.0.113.1

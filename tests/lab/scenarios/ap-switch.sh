@@ -22,7 +22,8 @@ expect_line result=1
 within 2 no_station cafe nas || fail 'it is still a client'
 expect_processes nas </dev/null
 expect_same 'the addresses of nas' '' "$(addresses_of nas)"
-serves nas ssid=home encryption=2 passphrase='deux croissants' wpa=2 cipher=2 channel=6 width=1
+serves nas ssid=home encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 channel=6 \
+  ieee80211n_wireless_width=1
 guest_of nas guest "${home[@]}"
 leaves guest
 
@@ -64,15 +65,15 @@ fails_to_start() {
 # The program saves neither.
 if through_functions; then
   say '-- a passphrase that is too short'
-  on nas mero-call ap-save passphrase=short
+  on nas mero-call ap-save wpa_passphrase=short
   fails_to_start 'invalid WPA passphrase length'
 
   say '-- a channel that there is not'
-  on nas mero-call ap-save passphrase='deux croissants' channel=99
+  on nas mero-call ap-save wpa_passphrase='deux croissants' channel=99
   fails_to_start 'the access point on wlan0'
 else
   say '-- a passphrase that is too short, and a channel that there is not'
-  fails_on nas mero-call ap-save passphrase=short
+  fails_on nas mero-call ap-save wpa_passphrase=short
   expect_line result=0
   expect_same 'the status for channel 99' 2 "$(inside nas mero-call ap-save channel=99 >/dev/null && echo 0 || echo $?)"
 fi

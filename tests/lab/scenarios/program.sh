@@ -75,7 +75,7 @@ ends_with 6 connect cafe
 on nas merowireless radio on
 
 say '-- an access point, which gives way to a client and comes back with the mode'
-on nas merowireless ap set --ssid office --security wpa2 --key-file /var/lib/right.key --channel 11
+on nas merowireless ap set --ssid office --encryption wpa2 --key-file /var/lib/right.key --channel 11
 on nas merowireless ap enable
 expect_nothing_inherited nas
 on nas merowireless ap status --porcelain
