@@ -21,6 +21,9 @@ struct NumberKey {
   size_t size;
   int missing;              // what the field is when a section lacks the key
   const char* szWith = "";  // what else has to stand in the section
+
+  bool isOfASectionWithoutLines() const { return *szWith == '\0'; }
+  bool isOfGuests() const { return std::string(szKey).starts_with("guest_net_") || std::string(szKey) == "ap_isolate"; }
 };
 
 struct TextKey {
@@ -79,6 +82,43 @@ inline const TextKey kTextKeys[] = {
     {"guest_net_wpa_passphrase", FIELD(hostapConf.guestNet.encryptInfo.wpaPskInfo.szPassPhrase), "",
      "\tguest_net_encryption=2\n"},
 };
+
+// With a RADIUS server, and guests with a passphrase.
+inline constexpr const char* kKeysInReadingOrder[] = {"enable",
+                                                      "unblock",
+                                                      "txpower",
+                                                      "ssid",
+                                                      "bridge",
+                                                      "wifi_sched",
+                                                      "wifi_sched_enabled",
+                                                      "ignore_broadcast_ssid",
+                                                      "hw_mode",
+                                                      "channel",
+                                                      "ieee80211n",
+                                                      "ieee80211n_wireless_width",
+                                                      "encryption",
+                                                      "max_num_sta",
+                                                      "wmm_enabled",
+                                                      "wpa",
+                                                      "wpa_encrypt_type",
+                                                      "auth_server_addr",
+                                                      "auth_server_port",
+                                                      "auth_server_shared_secret",
+                                                      "guest_net_enable",
+                                                      "guest_net_ssid",
+                                                      "guest_net_ignore_broadcast_ssid",
+                                                      "guest_net_max_num_sta",
+                                                      "ap_isolate",
+                                                      "guest_net_encryption",
+                                                      "guest_net_lan_block",
+                                                      "guest_net_access_ds",
+                                                      "guest_net_internet_block",
+                                                      "guest_net_allow_http",
+                                                      "guest_net_sched",
+                                                      "guest_net_sched_enable",
+                                                      "guest_net_wpa_passphrase",
+                                                      "guest_net_wpa",
+                                                      "guest_net_wpa_encrypt_type"};
 
 inline int NumberIn(const MERO_AP_CONF& conf, const NumberKey& key) {
   int value = 0;

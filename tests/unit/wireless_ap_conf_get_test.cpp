@@ -18,33 +18,29 @@ const std::string kAsksForHash = "PLIBCSzHashAlloc(1024)";
 const std::string kReadsSection = "PLIBCFileGetSection(" + kSettings + ", " + kModel + ", &)";
 const std::string kFreesHash = "PLIBCSzHashFree(&)";
 
-// What a record holds when nothing could be read.
+// What a record holds when nothing could be read: no guests at all.
 MERO_AP_CONF DefaultSettings() {
   MERO_AP_CONF conf{};
-  conf.txpower = 10;
-  std::strcpy(conf.szSecName, "RT-5370");
+  std::strcpy(conf.szSecName, kModel.c_str());
   conf.blWifiUnblock = TRUE;
+  for (const NumberKey& key : kNumberKeys) {
+    if (key.isOfASectionWithoutLines() && !key.isOfGuests()) PutNumber(conf, key, key.missing);
+  }
   std::strcpy(conf.wifiSchedConf.szWifiSched, kEveryHour.c_str());
   std::strcpy(conf.hostapConf.szSSID, "Corvanta");
   std::strcpy(conf.hostapConf.szBridge, "lbr0");
-  conf.hostapConf.hwMode = AP_MODE_80211G;
-  conf.hostapConf.ieee80211n = 1;
-  conf.hostapConf.wirelessWidth = AP_FREQ_ALL;
-  conf.hostapConf.maxStation = 256;
-  conf.hostapConf.wmm = 1;
   return conf;
 }
 
 // What a section stands for that has no lines.
 MERO_AP_CONF BareSettings() {
-  MERO_AP_CONF conf = DefaultSettings();
-  conf.hostapConf.szSSID[0] = '\0';
-  conf.hostapConf.szBridge[0] = '\0';
-  std::strcpy(conf.hostapConf.guestNet.szSSID, "HarborstoreGuest");
-  conf.hostapConf.guestNet.maxStation = 256;
-  conf.hostapConf.guestNet.blAPIsolate = TRUE;
-  std::strcpy(conf.guestNetSchedConf.szWifiSched, kEveryHour.c_str());
-  conf.guestNetAccessRule = {TRUE, FALSE, FALSE, TRUE};
+  MERO_AP_CONF conf{};
+  std::strcpy(conf.szSecName, kModel.c_str());
+  conf.blWifiUnblock = TRUE;
+  for (const NumberKey& key : kNumberKeys) {
+    if (key.isOfASectionWithoutLines()) PutNumber(conf, key, key.missing);
+  }
+  for (const TextKey& key : kTextKeys) PutText(conf, key, key.missing);
   return conf;
 }
 
@@ -91,47 +87,10 @@ TEST_F(ApSettings, AreReadOnceAndTheHashIsReleased) {
 
 // Keys came in the order in which they are written.
 TEST_F(ApSettings, AreTakenInTheirOwnOrder) {
-  const auto keys = [](const std::vector<std::string>& names) {
-    std::vector<std::string> calls;
-    for (const std::string& name : names) calls.push_back("PLIBCSzHashGetValue(&, " + name + ")");
-    return calls;
-  };
+  std::vector<std::string> calls;
+  for (const char* szKey : kKeysInReadingOrder) calls.push_back("PLIBCSzHashGetValue(&, " + std::string(szKey) + ")");
   ReadLines("\tenable=yes\n\tencryption=3\n\tguest_net_encryption=2\n");
-  EXPECT_EQ(fake::EffectsOf({"PLIBCSzHashGetValue"}), keys({"enable",
-                                                            "unblock",
-                                                            "txpower",
-                                                            "ssid",
-                                                            "bridge",
-                                                            "wifi_sched",
-                                                            "wifi_sched_enabled",
-                                                            "ignore_broadcast_ssid",
-                                                            "hw_mode",
-                                                            "channel",
-                                                            "ieee80211n",
-                                                            "ieee80211n_wireless_width",
-                                                            "encryption",
-                                                            "max_num_sta",
-                                                            "wmm_enabled",
-                                                            "wpa",
-                                                            "wpa_encrypt_type",
-                                                            "auth_server_addr",
-                                                            "auth_server_port",
-                                                            "auth_server_shared_secret",
-                                                            "guest_net_enable",
-                                                            "guest_net_ssid",
-                                                            "guest_net_ignore_broadcast_ssid",
-                                                            "guest_net_max_num_sta",
-                                                            "ap_isolate",
-                                                            "guest_net_encryption",
-                                                            "guest_net_lan_block",
-                                                            "guest_net_access_ds",
-                                                            "guest_net_internet_block",
-                                                            "guest_net_allow_http",
-                                                            "guest_net_sched",
-                                                            "guest_net_sched_enable",
-                                                            "guest_net_wpa_passphrase",
-                                                            "guest_net_wpa",
-                                                            "guest_net_wpa_encrypt_type"}));
+  EXPECT_EQ(fake::EffectsOf({"PLIBCSzHashGetValue"}), calls);
 }
 
 TEST_F(ApSettings, AreTheDefaultsAndNothingIsReadWithoutAFile) {
