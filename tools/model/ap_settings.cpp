@@ -184,7 +184,7 @@ struct Key {
 };
 
 // The library's row of a key; one that the library does not know is no constant.
-consteval const Setting& RowOfKey(std::string_view key) {
+constexpr const Setting& RowOfKey(std::string_view key) {
   for (const SettingRow& row : kSettingRows) {
     if (row.setting.szKey != nullptr && row.setting.szKey == key) return row.setting;
   }
