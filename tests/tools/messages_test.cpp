@@ -39,7 +39,9 @@ void AsItIs() {}
 // What the library's join reports, which fails then.
 template <const char* kReport>
 void JoinReports() {
-  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return library::Report(kReport), -1; };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    return library::Report("wireless_network_connect", kReport), -1;
+  };
 }
 
 class Messages : public ToolTest {};
@@ -81,7 +83,7 @@ TEST_F(Messages, TellOfNetworksWhyTheyAreNotListed) {
       {[] {
          library::MEROWirelessNetworkScan = [](WIRELESS_SCAN, WIRELESS_LIST* head) {
            head->q_forw = head->q_back = head;
-           return library::Report("Failed to activate network interface wlan0"), -1;
+           return library::Report("wireless_network_scan", "Failed to activate network interface wlan0"), -1;
          };
        },
        {"scan"},
@@ -122,7 +124,9 @@ TEST_F(Messages, TellOfAConnectionWhyItIsNotMade) {
        "nobody knows whether the radio may be used"},
       {[] {
          library::Known({WIRELESS_NETWORK_CONFIG{}});
-         library::MEROWirelessAutoConnect = [] { return library::Report("Failed to set interface configuration"), -1; };
+         library::MEROWirelessAutoConnect = [] {
+           return library::Report("wireless_auto_connect", "Failed to set interface configuration"), -1;
+         };
        },
        {"autoconnect"},
        "a network was joined, but its address could not be set"},
@@ -213,13 +217,17 @@ TEST_F(Messages, TellOfAnAccessPointWhyItIsNotEnabled) {
       {AsItIs, {"ap", "enable"}, "no access point has been set up for this adapter"},
       {[] {
          AnOffice();
-         library::MEROWirelessAPEnable = [] { return library::Report("Another ap construction is going"), FALSE; };
+         library::MEROWirelessAPEnable = [] {
+           return library::Report("wireless_ap_enable", "Another ap construction is going"), FALSE;
+         };
        },
        {"ap", "enable"},
        "an access point is being set up already, or an attempt was cut off"},
       {[] {
          AnOffice();
-         library::MEROWirelessAPEnable = [] { return library::Report("Failed to restart /etc/rc.network"), FALSE; };
+         library::MEROWirelessAPEnable = [] {
+           return library::Report("wireless_ap_enable", "Failed to restart /etc/rc.network"), FALSE;
+         };
        },
        {"ap", "enable"},
        "the network start script failed, and the access point is disabled"},
