@@ -5,8 +5,8 @@
 #include <set>
 #include <sstream>
 
-#include "ap_settings.h"
 #include "common/ap_settings.h"
+#include "model/ap_settings.h"
 #include "running.h"
 #include "tests/unit/ap_settings.h"
 
