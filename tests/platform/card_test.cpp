@@ -201,15 +201,6 @@ TEST_F(ACard, ThatKeepsAnAddressWhenItIsDisconnectedIsReported) {
   ExpectFailure(ERR_UNKNOWN, "Failed to remove the addresses of net0: No buffer space available");
 }
 
-TEST_F(ACard, ThatKeepsItsDhcpClientIsReported) {
-  const std::filesystem::path pidFile = "/var/run/udhcpc-net0.pid";
-  std::filesystem::create_directory(pidFile);
-  EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), -1);
-  ExpectFailure(ERR_BAD_PARAMETERS, "Failed to end the DHCP client of net0: Invalid argument");
-  EXPECT_EQ(interface_.addresses(), "");
-  std::filesystem::remove(pidFile);
-}
-
 TEST_F(ACard, ThatIsNotThereIsReported) {
   NETINFO netInfo = Static("10.9.0.2", "255.255.255.0");
   for (const char* szName : {"none0", "", "fifteen-letters"}) {
