@@ -3,6 +3,7 @@
 
 #include <climits>
 
+#include "hostile_texts.h"
 #include "listing.h"
 #include "unit_test.h"
 
@@ -245,8 +246,10 @@ TEST_F(Scan, RunsTheListingTool) {
   EXPECT_EQ(ReadText("/tmp/words"), "<wlan0><scanning>\n<wlan0><scanning><mero>\n<wlan0><scanning><mero>\n");
 }
 
+// What a shell had created stood for nothing, since it was empty; and what the machine had there failed the test.
 TEST_F(Scan, PassesAnyInterfaceNameOnAsOneInertWord) {
   InstallTool();
+  ForgetCalls();
   for (const char* szName : {"a b",
                              "$(touch /tmp/x)",
                              "`touch /tmp/x`",
@@ -275,7 +278,7 @@ TEST_F(Scan, PassesAnyInterfaceNameOnAsOneInertWord) {
     EXPECT_EQ(ReadText("/tmp/words"),
               word + "<scanning>\n" + word + "<scanning><mero>\n" + word + "<scanning><mero>\n");
     EXPECT_EQ(ring_.Records().size(), 1u) << szName;
-    EXPECT_EQ(ReadText("/tmp/x"), "");
+    EXPECT_FALSE(HasIntruder()) << szName;
     ring_.Clear();
   }
 }
