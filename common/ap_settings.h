@@ -25,10 +25,10 @@ enum class SettingKind : uint8_t {
 struct Setting {
   const char* szKey;
   SettingKind kind;
-  int missing;                      // what the field is when a section lacks the key
+  int missing;                      // the value of the field when a section lacks the key
   uint16_t offset;                  // of the field in the record
   uint16_t size;                    // of the field, for texts
-  const char* szMissing = nullptr;  // what a text is when a section lacks the key
+  const char* szMissing = nullptr;  // the text when a section lacks the key
 };
 
 inline constexpr char kGuestPrefix[] = "guest_net_";
@@ -50,7 +50,7 @@ static_assert(sizeof kAlwaysOn == sizeof(MERO_WIFI_SCHED_CONF::szWifiSched));
 #define SECRET_FIELD(member) SETTING_FIELD(MERO_HOSTAP_ENCRYPT_INFO, member)
 
 struct SettingRow {
-  uint8_t turn;  // at which it is read; 0 for what is only written
+  uint8_t turn;  // its place in the order of reading, from 1; 0 when it is only written
   Setting setting;
 };
 
@@ -98,13 +98,13 @@ inline void PutNumber(void* record, const Setting& setting, int value) {
   std::memcpy(static_cast<char*>(record) + setting.offset, &value, sizeof value);
 }
 
-// How many rows are read at a turn.
+// The number of rows with this turn.
 constexpr auto RowsAtTurn(int turn) {
   return std::count_if(std::begin(kSettingRows), std::end(kSettingRows),
                        [=](const SettingRow& row) { return row.turn == turn; });
 }
 
-// How many turns there are: they count from 1 on, with one row each.
+// The number of turns, when they run from 1 on with one row each; else less.
 consteval int CountTurns() {
   int turns = 0;
   while (RowsAtTurn(turns + 1) == 1) ++turns;
@@ -121,7 +121,7 @@ void ForEachRead(Visit visit) {
   }
 }
 
-// What an encryption needs, with the fields of the union's member that belongs to it.
+// The keys that an encryption needs, with the fields of its member of the union.
 struct SecretSetting {
   MERO_AP_ENCRYPT encryption;
   Setting setting;

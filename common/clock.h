@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <limits>
 
-// The 32-bit time nearest to `seconds`: from 2038 on the greatest, never a wrapped one.
+// The 32-bit time nearest to `seconds`. From 2038 on that is the greatest one; it never wraps around.
 constexpr int32_t SaturatedTime(int64_t seconds) {
   constexpr int64_t kLeast = std::numeric_limits<int32_t>::min();
   constexpr int64_t kGreatest = std::numeric_limits<int32_t>::max();

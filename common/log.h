@@ -6,7 +6,7 @@
 
 #include <cstddef>
 
-// The bare name of a source file, "wireless_conf_set" of "wireless_conf_set.cpp".
+// The name of a source file without its ending: "wireless_conf_set" for "wireless_conf_set.cpp".
 template <size_t kSize>
 struct UnitName {
   char text[kSize] = {};

@@ -34,7 +34,7 @@ constexpr std::string_view Slice(std::string_view text, size_t begin, size_t end
   return {text.data() + begin, end - begin};
 }
 
-// White space and letters as ASCII has them: the caller's locale has no say in what is in a file or on the air.
+// White space and letters of ASCII: the caller's locale must not change how files and names on the air are read.
 constexpr bool IsSpace(char c) {
   return c == ' ' || (c >= '\t' && c <= '\r');
 }

@@ -1,10 +1,10 @@
-// The caller's umask, which is to have no say in the modes of what is made on its behalf.
+// Files get the same modes whatever the caller's umask.
 #ifndef MERO_COMMON_UMASK_H
 #define MERO_COMMON_UMASK_H
 
 #include <sys/stat.h>
 
-// The umask of this process, and of the programs that it starts, for as long as the holder lives.
+// Sets the umask of this process, and so of the programs that it starts, until the holder ends.
 class Umask {
  public:
   explicit Umask(mode_t mask) : before_(::umask(mask)) {}
@@ -16,7 +16,7 @@ class Umask {
   mode_t before_;
 };
 
-// What programs have that nobody wants anything particular of: only the owner may write.
+// The ordinary umask: only the owner may write.
 inline constexpr mode_t kOrdinaryUmask = S_IWGRP | S_IWOTH;
 
 #endif  // MERO_COMMON_UMASK_H

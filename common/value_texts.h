@@ -9,7 +9,7 @@
 
 using ValueTexts = std::span<const WIRELESS_LITERAL_MAPPING>;
 
-// The text of a value; that of the table's first row, the unknown, when no row has the value.
+// The text of a value; when no row has the value, the text of the first row, which stands for "unknown".
 constexpr const char* TextOf(ValueTexts texts, int32_t value) {
   for (const WIRELESS_LITERAL_MAPPING& text : texts) {
     if (text.type.value == value) return text.str;
@@ -17,7 +17,7 @@ constexpr const char* TextOf(ValueTexts texts, int32_t value) {
   return texts.front().str;
 }
 
-// The value of a text, in any case of its ASCII letters; that of the first row when no row has the text.
+// The value of a text, ignoring the case of ASCII letters; when no row has the text, the value of the first row.
 inline int32_t ValueOf(ValueTexts texts, const char* szText) {
   if (szText != nullptr) {
     for (const WIRELESS_LITERAL_MAPPING& text : texts) {

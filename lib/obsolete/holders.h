@@ -1,4 +1,4 @@
-// What holds the resources of the platform and of libc, and the only place that releases them.
+// The holders of resources of the platform and of libc. Only they release resources.
 #ifndef MERO_LIB_HOLDERS_H
 #define MERO_LIB_HOLDERS_H
 
@@ -15,10 +15,10 @@
 #include "platform.h"
 #include "shell_words.h"
 
-// What texts hashes and lists are made room for at first.
+// The room, in bytes, that hashes and lists have for texts at first.
 inline constexpr int kSizeHint = 1024;
 
-// A text hash. Setting values may move it, so that it is passed on by the address of its pointer.
+// A text hash. Setting a value may move it: pass the address of its pointer on, not the pointer.
 class Hash {
  public:
   Hash() : pshHash_(PLIBCSzHashAlloc(kSizeHint)) {}
@@ -54,7 +54,7 @@ class List {
   PPLIBSZLIST pslList_;
 };
 
-// A zero-filled record that a list is to take.
+// A zero-filled record, until it stands in a list.
 struct FreeRecord {
   void operator()(void* record) const { std::free(record); }
 };
@@ -66,7 +66,7 @@ RecordHolder<Record> NewRecord() {
   return RecordHolder<Record>(static_cast<Record*>(std::calloc(1, sizeof(Record))));
 }
 
-// Keeps a stream from the commands that are run while it is open. One without a descriptor has nothing to keep.
+// Makes a stream one that no command inherits which is run while it is open. A stream in memory has no descriptor.
 inline void CloseOnExec(FILE* pfStream) {
   if (pfStream != nullptr && ::fileno(pfStream) >= 0) (void)::fcntl(::fileno(pfStream), F_SETFD, FD_CLOEXEC);
 }
@@ -94,7 +94,7 @@ class Pipe {
 // A file that is written from its beginning.
 class NewFile {
  public:
-  // Who may read a file that is created, whatever the caller's umask; one that exists keeps its mode.
+  // The readers of a file that is created, whatever the caller's umask. A file that exists keeps its mode.
   enum Readers : mode_t { kSecret = 0600, kForAll = 0644 };
 
   NewFile(const char* szPath, Readers readers) {
@@ -105,8 +105,8 @@ class NewFile {
     Take(fd);
   }
 
-  // One of a name that nobody can foresee, for a directory into which anyone may put files: `szTemplate` ends with
-  // "XXXXXX", which it gives way to. Where it cannot be written to, it is not left behind.
+  // A new file with a name that nobody can foresee, for a directory into which anyone may put files. `szTemplate` ends
+  // with "XXXXXX", which mkostemp() replaces. A file that cannot be written to is not left behind.
   static NewFile Unforeseen(char* szTemplate, Readers readers) {
     const int fd = ::mkostemp(szTemplate, O_CLOEXEC);
     if (fd >= 0) (void)::fchmod(fd, readers);
@@ -115,7 +115,7 @@ class NewFile {
   NewFile(const NewFile&) = delete;
   NewFile& operator=(const NewFile&) = delete;
   ~NewFile() {
-    if (pfFile_ != nullptr) (void)std::fclose(pfFile_);  // given up half written, after a failure
+    if (pfFile_ != nullptr) (void)std::fclose(pfFile_);  // after a failure, when the file is given up half written
   }
 
   explicit operator bool() const { return pfFile_ != nullptr; }
@@ -142,8 +142,8 @@ class NewFile {
   FILE* pfFile_ = nullptr;
 };
 
-// The marker file of work that is under way. Gone at the end of every attempt, also of one that is refused because it
-// was there.
+// The marker file of work that is under way. The end of every attempt removes it, even of an attempt that was refused
+// because the marker was there.
 class Marker {
  public:
   explicit Marker(const char* szPath) : szPath_(szPath) {}
@@ -152,7 +152,7 @@ class Marker {
   ~Marker() { (void)PLIBCSysUnlink(szPath_); }
 
   bool exists() const { return PLIBCFileExist(szPath_) != 0; }
-  void Create() const { (void)PLIBCFileTouch(szPath_); }  // a guard that cannot be put up does not keep from the work
+  void Create() const { (void)PLIBCFileTouch(szPath_); }  // work goes on without a marker that cannot be made
 
  private:
   const char* szPath_;

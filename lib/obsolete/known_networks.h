@@ -1,10 +1,10 @@
-// Listing the known networks, which two units do in the same steps.
+// Listing the known networks, for two units that do it in the same steps.
 #ifndef MERO_LIB_KNOWN_NETWORKS_H
 #define MERO_LIB_KNOWN_NETWORKS_H
 
 #include "wireless.h"
 
-// The unit that lists, and the line its report of a record that found no memory is known by.
+// The unit that lists, and the line number that its report "out of memory" is known by.
 struct ListingUnit {
   const char* szName;
   int lineOfRecordAlloc;

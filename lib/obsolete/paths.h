@@ -7,7 +7,7 @@
 // The access-point settings, one section an adapter model.
 inline constexpr char kApSettingsPath[] = "/usr/mero/etc/wireless_ap.conf";
 
-// What the platform tells about the adapter that is plugged in; "PRODUCT" names its settings section.
+// The file that describes the adapter that is plugged in; its "PRODUCT" names the settings section.
 inline constexpr char kAdapterInfoPath[] = "/tmp/wireless.info";
 inline constexpr char kProductKey[] = "PRODUCT";
 
@@ -17,17 +17,17 @@ inline constexpr char kApMarkerPath[] = "/var/tmp/.wireless_ap_connecting";
 // The appliance's network start script: "start" or "restart", the wireless interface, the bridge.
 inline constexpr char kNetworkScriptPath[] = "/etc/rc.network";
 
-// What the access-point daemon of an interface, and that of its guest network, is configured by; and whether either is
-// switched on.
+// The configuration of the access-point daemon of an interface, and of its guest network, and the files that say
+// whether they are switched on.
 inline constexpr char kHostapdHostFormat[] = "/etc/hostapd/hostapd-%s-host.conf";
 inline constexpr char kHostapdGuestFormat[] = "/etc/hostapd/hostapd-%s-guest.conf";
 inline constexpr char kHostapdGuestInfoFormat[] = "/etc/hostapd/hostapd-%s-guest.info";
 inline constexpr char kHostapdInfoFormat[] = "/etc/hostapd/hostapd-%s.info";
 
-// Whether the DHCP server of a bridge is switched on.
+// The file that says whether the DHCP server of a bridge is switched on.
 inline constexpr char kDhcpInfoFormat[] = "/etc/dhcpd/dhcpd-%1$s-%1$s.info";
 
-// What the network start script knows of an interface or a bridge.
+// The file from which the network start script knows an interface or a bridge.
 inline constexpr char kInterfaceScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
 
 // The path that one of the formats above gives for an interface or a bridge.

@@ -15,7 +15,7 @@ bool IsOrdinary(char c) {
 }  // namespace
 
 ShellWord::ShellWord(std::string_view value) {
-  constexpr std::string_view kQuoteInside = "'\\''";  // out of the quotes, a quote by itself, and in again
+  constexpr std::string_view kQuoteInside = "'\\''";  // closes the quotes, adds an escaped quote, and opens them again
   char* to = szWord_;
   const auto put = [&](std::string_view text) { to = std::copy(text.begin(), text.end(), to); };
 

@@ -1,4 +1,4 @@
-// Commands for the shell. What is put into them may come from strangers: anyone in range chooses the name of a network.
+// Commands for the shell. Values in them may come from strangers: anyone in range chooses the name of a network.
 #ifndef MERO_LIB_SHELL_WORDS_H
 #define MERO_LIB_SHELL_WORDS_H
 
@@ -10,21 +10,21 @@
 
 #include "common/umask.h"
 
-// A value as one word of a command: as it is when all its characters are ordinary, else quoted, so that the shell
-// passes it on unchanged.
+// A value as one word of a command, which the shell passes on unchanged: quoted, unless all its characters are
+// ordinary.
 class ShellWord {
  public:
   explicit ShellWord(std::string_view value);
 
-  // The word; longer than any command when the value was, so that no command is run with a part of it.
+  // The word. When the value was longer than any command, so is the word: no command is run with a part of a value.
   const char* c_str() const { return szWord_; }
 
  private:
-  // The longest command is 1024 bytes; a value that would fill it quoted needs four times as much.
+  // The longest command is 1024 bytes. Quoting makes a value of that size at most four times as long.
   char szWord_[4 * 1024 + 3];
 };
 
-// A value inside a word that the command has in double quotes, escaped where the shell would not pass it on unchanged.
+// A value for a word that stands in double quotes in the command: characters that the shell would change are escaped.
 class ShellQuoted {
  public:
   explicit ShellQuoted(std::string_view value);
@@ -35,7 +35,7 @@ class ShellQuoted {
   char szText_[2 * 1024 + 1];  // longer than any command when the value was
 };
 
-// A command of at most kSize - 1 bytes. One that is longer is cut in its text, for messages, and never run.
+// A command of at most kSize - 1 bytes. A longer one is never run; its text is cut, and serves for messages.
 template <size_t kSize>
 class Command {
  public:

@@ -1,4 +1,4 @@
-// The forms in which a WEP key is given, told apart by its length alone.
+// The forms of a WEP key. Its length alone tells which form it has.
 #ifndef MERO_LIB_WEP_KEY_H
 #define MERO_LIB_WEP_KEY_H
 

@@ -18,7 +18,7 @@ bool IsSupported(const char* szIfName, const WIRELESS_NETWORK& network) {
   return LOG("Adhoc mode does not support encryption [%s].", MEROWirelessEncryptStringGet(network.encrypt, 0)), false;
 }
 
-// Takes the interface down, which drivers want before they change the mode, and changes it.
+// Changes the mode. Most drivers do so only while the interface is down, so it is taken down first.
 bool SetMode(const char* szIfName, WIRELESS_OPMODE opmode) {
   if (PLIBNetIfDown(szIfName) == 0) {
     return LOG("Failed to deactivate network interface [%s].", szIfName), false;
@@ -27,7 +27,7 @@ bool SetMode(const char* szIfName, WIRELESS_OPMODE opmode) {
   return true;
 }
 
-// Only a command that cannot be started is a failure; what it makes of its arguments is not looked at.
+// Only a command that cannot be started is a failure: its exit status is ignored.
 bool Run(const ConfigCommand& command) {
   if (command.Run() >= 0) return true;
   return LOG("Failed to execute '%s'", command.c_str()), false;

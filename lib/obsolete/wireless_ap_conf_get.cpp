@@ -28,8 +28,8 @@ int GetSwitchValue(const PPLIBSZHASH pHash, const char* key, int defValue) {
   return std::strcmp(szValue, "yes") == 0 ? TRUE : FALSE;
 }
 
-// What holds when there is no section. A section that lacks keys has other defaults, those of the table: above all for
-// the guest network, which is bare here.
+// The settings when there is no section. They differ from the defaults of the table, which hold for keys that a section
+// lacks: above all, the guest network is all zeros here.
 void SetDefaultAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
   MERO_AP_CONF conf{};
   CopyText(conf.szSecName, szSecName);
@@ -63,7 +63,7 @@ void Take(PPLIBSZHASH pshHash, const char* szKey, const Setting& setting, void* 
   }
 }
 
-// Reads what an encryption needs. One that is unknown needs nothing.
+// Reads the keys that an encryption needs; an unknown encryption has none.
 BOOL getEncryptionConf(PPLIBSZHASH pshHash, MERO_AP_ENCRYPT encryption, PMERO_HOSTAP_ENCRYPT_INFO pEncryptInfo,
                        BOOL blGuestNet) {
   if (blGuestNet != FALSE && encryption == AP_ENCRYPT_WPA_EAP) {

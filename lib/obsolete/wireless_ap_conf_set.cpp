@@ -20,8 +20,8 @@ char* ConvertIntegerToString(const int value, char* szValue, const size_t cbSize
   return szValue;
 }
 
-// Whether the file holds the section's header, by a search that knows no case, takes the name as a part of a regular
-// expression, and finds it anywhere in a line. 1 or 0; -1 after a report.
+// Whether the file holds the section's header. The search ignores case, takes the name as a part of a regular
+// expression, and finds it anywhere in a line, as it always has. Gives 1 or 0; -1 after a report.
 int IsSectionExist(const char* szSecName) {
   if (szSecName == nullptr) return LOG("Wrong Parameter."), -1;
   const Command<1024> command("grep -i \"\\[%s\\]\" %s", ShellQuoted(szSecName).c_str(), kApSettingsPath);
@@ -36,8 +36,8 @@ const char* TextOfSwitch(int value) {
   return value != FALSE ? "yes" : "no";
 }
 
-// Puts the setting of a key, from its field of a record, into the hash. A pair that finds no memory there makes the
-// hash one that cannot be written.
+// Puts the setting of a key, from its field of a record, into the hash. The result is not needed: when memory runs out
+// for a pair, the hash remembers it, and writing the hash fails.
 void Put(PPLIBSZHASH* ppshHash, const char* szKey, const Setting& setting, const void* record) {
   char szInteger[1024];
   switch (setting.kind) {
@@ -72,7 +72,7 @@ void PutSwitches(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
   }
 }
 
-// Puts what an access point is that is switched on; false when one of its encryptions is refused.
+// Puts all settings of an access point that is switched on; false when one of its encryptions is refused.
 bool PutTheRest(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
   MERO_HOSTAP_CONF& main = pConf->hostapConf;
   MERO_HOSTAP_GUEST_NET& guest = main.guestNet;
@@ -91,7 +91,7 @@ bool PutTheRest(PPLIBSZHASH* ppshHash, PMERO_AP_CONF pConf) {
   return true;
 }
 
-// Whether the section is there to be replaced; the file is made for it if need be. None after a failure.
+// Whether the section exists, and is to be replaced. Creates the file when it is missing. No value after a failure.
 std::optional<bool> FindSection(const char* szSecName) {
   if (PLIBCFileExist(kApSettingsPath) != 0) {
     const int exists = IsSectionExist(szSecName);

@@ -16,7 +16,7 @@ bool KeepFromBoot(const char* szPath) {
   return LOG("Failed to set file[%s].", szPath), false;
 }
 
-// Another member takes the place of the first. The bridge's real members change when the network is restarted.
+// Names another member as the bridge's first. This changes the file alone; the kernel's bridge changes at the restart.
 void PassPrimaryOn(const char* szPath, PPLIBSZLIST slaves, int leaving) {
   (void)PLIBCSzListRemove(slaves, leaving);
   (void)PLIBCFileSetKeyValue(szPath, "PRIMARY", PLIBCSzListGet(slaves, 0), kLineFormat);  // has reported
@@ -42,7 +42,7 @@ BOOL RemoveBridgeSlaveInMasterConfig(const char* szBridge, const char* szSlave) 
   return TRUE;
 }
 
-// Takes the interface out of its bridge, whose name it gives; the name stays empty when there is none.
+// Takes the interface out of its bridge, and gives the name of the bridge; an empty name when it is in none.
 void LeaveBridge(const char* szScript, const char* szIfName, char* szBridge, size_t cbSize) {
   if (PLIBCFileGetKeyValue(szScript, "BRIDGE", szBridge, cbSize, 0) <= 0) return;
   (void)RemoveBridgeSlaveInMasterConfig(szBridge, szIfName);  // has reported; the interface leaves all the same

@@ -41,7 +41,7 @@ bool HasValidRange(const NETINFO& netInfo) {
          IsInSubnet(netInfo, stored.szRangeEnd);
 }
 
-// The addresses behind the bridge's own: those before it are left out.
+// The range from the address after the bridge's own to the end of its subnet. The lower addresses are not given out.
 bool ComputeRange(const NETINFO& netInfo, MERO_DHCPD_CONF& conf) {
   in_addr ip;
   in_addr mask;

@@ -9,18 +9,18 @@
 
 namespace {
 
-// What to do about a saved network that was looked for in the air.
+// The next step for a saved network, after a look at the networks in range.
 enum class Verdict { kTry, kPassOver, kLookAgain };
 
-// A network that is not seen may hide its name, or be out of range: it is tried when its security is known. One whose
-// protocol was never seen is looked for once more, as long as nobody has `lookedAgain`.
+// A network that was not seen may hide its name, or be out of range: it is tried when its security is known. When its
+// protocol was never seen, there is one more look, unless this call has `lookedAgain` already.
 Verdict JudgeUnseen(const WIRELESS_NETWORK& saved, bool lookedAgain) {
   if (saved.auth == WIRELESS_AUTH_UNKNOWN || saved.encrypt == WIRELESS_ENCRYPT_UNKNOWN) return Verdict::kPassOver;
   if (saved.protocol == WIRELESS_PROTO_UNKNOWN && !lookedAgain) return Verdict::kLookAgain;
   return Verdict::kTry;
 }
 
-// Looks a saved network up. One that is seen takes on all that the scan tells of it.
+// Looks a saved network up. When it is in range, its record takes over everything that the scan found.
 Verdict LookUp(WIRELESS_NETWORK& saved, bool lookedAgain) {
   WIRELESS_NETWORK seen{};
   const char* szBssid = reinterpret_cast<const char*>(saved.bssid);
@@ -38,7 +38,7 @@ int ConnectAP(const char* szIfName, WIRELESS_NETWORK_CONFIG* pNetConfig) {
     return LOG("Failed to enumerate wireless network configurations"), -1;
   }
 
-  bool lookedAgain = false;  // one more look is granted in the whole call, to the first network that asks for it
+  bool lookedAgain = false;  // the whole call has one second look, for the first network that needs it
   for (WIRELESS_LIST* node = head.q_forw; node != &head; node = node->q_forw) {
     WIRELESS_NETWORK_CONFIG& config = RecordOf<WIRELESS_NETWORK_CONFIG>(*node);
     Verdict verdict = LookUp(config.network, lookedAgain);

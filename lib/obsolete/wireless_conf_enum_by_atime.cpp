@@ -9,14 +9,14 @@
 
 namespace {
 
-// A record of the ring. Sorted apart from the records, which lie far from one another in memory.
+// A record as it is sorted. Sorting these is faster than sorting the records, which lie far apart in memory.
 struct Place {
   int32_t time;
-  uint32_t number;  // in the file; networks saved in the same second keep its order
+  uint32_t number;  // the position in the file: networks saved in the same second keep that order
   WIRELESS_LIST* node;
 };
 
-// The order of two places, as qsort() wants it.
+// Compares two places, for qsort().
 int Compare(const void* a, const void* b) {
   const auto& [timeA, numberA, nodeA] = *static_cast<const Place*>(a);
   const auto& [timeB, numberB, nodeB] = *static_cast<const Place*>(b);
@@ -68,6 +68,6 @@ void SortBySaveTime(WIRELESS_LIST& head) {
 
 int MEROWirelessConfEnumByAtime(WIRELESS_LIST* pHead) {
   const int result = ListKnownNetworks({"wireless_conf_enum_by_atime", 48}, pHead);
-  if (pHead != nullptr) SortBySaveTime(*pHead);  // what was listed before a failure is the caller's, in order
+  if (pHead != nullptr) SortBySaveTime(*pHead);  // after a failure too: the caller gets the records listed until then
   return result;
 }

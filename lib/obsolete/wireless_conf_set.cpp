@@ -14,7 +14,7 @@ namespace {
 
 constexpr char kLineFormat[] = "\t%s=%s\n";
 
-// Reads what is saved of the network already into the hash, or creates the file. Greater than 0 when the section
+// Reads the network's saved section, if any, into the hash, or creates the file. Greater than 0 when the section
 // exists, 0 when it does not, negative after a report.
 int ReadSaved(const char* szSection, Hash& hash) {
   if (PLIBCFileExist(kKnownNetworksPath) == 0) {
@@ -30,8 +30,8 @@ int ReadSaved(const char* szSection, Hash& hash) {
   return exists;
 }
 
-// Puts the network into the hash, in the order in which it is to stand in the file. A pair that finds no memory there
-// makes the hash one that cannot be written.
+// Puts the network into the hash, in the order of the file. The results are not needed: when memory runs out for a
+// pair, the hash remembers it, and writing the hash fails.
 void Fill(Hash& hash, const WIRELESS_NETWORK_CONFIG& config, const char* szBssid) {
   char szTime[1024] = {};
   std::snprintf(szTime, sizeof szTime, "%lld", static_cast<long long>(SaturatedTime(std::time(nullptr))));

@@ -19,8 +19,8 @@ constexpr char kPskPath[] = "/etc/hostapd.psk";
 constexpr char kControlDirectory[] = "/var/run/hostapd";
 constexpr char kModelPath[] = "/etc.defaults/meroinfo.conf";
 
-// A configuration that is written line by line. A value that would end its line and begin one of its own is refused:
-// names and secrets may come from anybody.
+// A configuration that is written line by line. A value with a line feed is refused, since it would add a line of its
+// own, and names and secrets may come from anybody.
 class Conf {
  public:
   Conf(const InterfacePath& path, NewFile::Readers readers) : path_(path), file_(path.c_str(), readers) {}
@@ -60,7 +60,7 @@ void WriteStationLimit(Conf& conf, int maxStation) {
   if (maxStation > 0) conf.Number("max_num_sta", maxStation);
 }
 
-// The ciphers of a type; no lines for what is none.
+// The ciphers of a type; no lines when the type is unknown.
 void WpaEncryptionTypeSet(Conf& file, MERO_AP_WPA_ENCRYPT_TYPE type) {
   const char* szCiphers = nullptr;
   switch (type) {
@@ -79,7 +79,7 @@ void WpaEncryptionTypeSet(Conf& file, MERO_AP_WPA_ENCRYPT_TYPE type) {
   file.Text("rsn_pairwise", szCiphers);
 }
 
-// A key of a wrong length is left out, and the network cannot be joined.
+// A key of a wrong length is left out: no station can join then.
 void WriteWep(Conf& file, const char* szKey) {
   file.Number("auth_algs", 3);
   file.Number("wep_default_key", 0);
@@ -130,8 +130,8 @@ void WriteHead(Conf& file, const char* szIfName, const MERO_HOSTAP_CONF& conf) {
   file.Number("channel", conf.channel);
 }
 
-// Where the second channel of 40 MHz lies. The rule of 5 GHz holds for 802.11a alone; a mode that combines it with
-// another falls under that of 2.4 GHz.
+// The capability that says on which side of its channel a 40 MHz network has the second one. The rule for 5 GHz holds
+// for 802.11a alone; a mode that combines it with another uses the rule for 2.4 GHz.
 const char* GetHT40String(const int hwMode, const int channel) {
   if (hwMode != AP_MODE_80211A) return channel <= 5 ? "[HT40+]" : "[HT40-]";
   switch (channel) {
@@ -150,7 +150,7 @@ const char* GetHT40String(const int hwMode, const int channel) {
   }
 }
 
-// What the card is to do under 802.11n. The modes that are left when 802.11n has been said.
+// Writes the 802.11n lines, when 802.11n is switched on. Gives the modes that the line "hw_mode" has to name still.
 int WriteHighThroughput(Conf& file, const MERO_HOSTAP_CONF& conf) {
   if (conf.ieee80211n <= 0) return conf.hwMode;
   file.Number("ieee80211n", conf.ieee80211n);
@@ -164,13 +164,13 @@ int WriteHighThroughput(Conf& file, const MERO_HOSTAP_CONF& conf) {
   return conf.hwMode == AP_MODE_80211N ? conf.hwMode : conf.hwMode & kLegacyModes;
 }
 
-// 802.11n alone is refused to stations of a network whose cipher 802.11n forbids. The cipher is looked for where the
-// pre-shared key keeps it, whatever the encryption.
+// Whether the network may refuse stations without 802.11n. It may not when its cipher is one that 802.11n forbids. The
+// cipher is read from the fields of the pre-shared key, under every encryption.
 bool MayRequireHighThroughput(const MERO_HOSTAP_CONF& conf) {
   return conf.encryption != AP_ENCRYPT_WEP && conf.encryptInfo.wpaPskInfo.encryptType != TYPE_TKIP;
 }
 
-// No line for a combination of modes, nor for none.
+// Writes no line when several modes are left, or none.
 void WriteMode(Conf& file, int mode, const MERO_HOSTAP_CONF& conf) {
   switch (mode) {
     case AP_MODE_80211A:
@@ -203,7 +203,7 @@ void WriteSecurity(Conf& file, const MERO_HOSTAP_CONF& conf) {
       return WriteWpaPsk(file, conf.encryptInfo.wpaPskInfo);
     case AP_ENCRYPT_WPA_EAP:
       return WriteWpaEap(file, conf.encryptInfo.wpaEapInfo);
-    default:  // open, and whatever is no encryption
+    default:  // open, or an unknown encryption
       return file.Number("auth_algs", 1);
   }
 }
@@ -245,7 +245,7 @@ BOOL SetGuestNetAPConf(const char* szIfName, PMERO_HOSTAP_GUEST_NET pConf) {
 
 // ---- The steps ----
 
-// Ends the first daemon that is listed, without waiting for its end. To kill(), zero and less are many processes.
+// Asks the first daemon in the list to end, and does not wait. kill() would take a pid below 1 for many processes.
 void StopDaemon(const Pipe& processes) {
   int pid = 0;
   if (!processes || std::fscanf(processes.get(), " %d", &pid) != 1 || pid <= 0) return;
@@ -277,7 +277,7 @@ BOOL MEROWirelessSetHostAPConf(const char* szIfName, PMERO_HOSTAP_CONF pConf) {
   TakeDown(szIfName);
 
   const InterfacePath path(kHostapdHostFormat, szIfName);
-  (void)PLIBCSysUnlink(path.c_str());  // written anew anyway
+  (void)PLIBCSysUnlink(path.c_str());  // a failure does no harm: the file is written from its beginning
   if (!MakeDirectory()) return FALSE;
   Conf file(path, NewFile::kSecret);
   if (!file) return FALSE;

@@ -18,7 +18,7 @@ int MEROWirelessIfconfigSet(const char* szIfName, WIRELESS_NETWORK_CONFIG config
   NETINFO netInfo{};
   CopyText(netInfo.szInterface, szIfName);
   if (std::strcmp(config.szIp, "DHCP") == 0) {
-    // What is left of the record when no server answers is applied all the same.
+    // When no server answers, the record is applied nevertheless, as it is then.
     if (MEROIGetDHCPTestNetInfo(&netInfo, kDhcpSeconds) < 0) LOG("Failed to get IP from DHCP");
   } else {
     netInfo.blManual = TRUE;

@@ -35,8 +35,8 @@ BOOL CheckBssid(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   return known && pNetCfg->noneBssid == 0 ? TRUE : FALSE;
 }
 
-// Writes the line of a value, by a format with "%.*s" in it. False after a report for a value that would end its line
-// and begin one of its own: values come from strangers.
+// Writes the line of a value, by a format with "%.*s" in it. A value with a line feed is reported and gives false: it
+// would add a line of its own, and values come from strangers.
 bool WriteValue(FILE* pfConf, const char* szFormat, std::string_view value) {
   if (value.find('\n') != std::string_view::npos) {
     return LOG("A name or secret with a line feed cannot be configured."), false;
@@ -89,8 +89,8 @@ bool WriteWpaEap(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   return true;
 }
 
-// Writes what the authentication asks for, and closes the block; false after a report when there is no such
-// authentication, or a value cannot be written.
+// Writes the lines of the authentication, and closes the block. False after a report when the authentication is
+// unknown, or a value cannot be written.
 bool WriteSecurity(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   switch (config.network.auth) {
     case WIRELESS_AUTH_OPEN:
@@ -124,7 +124,7 @@ bool WriteNetwork(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
 
 BOOL SetWpaSupplicantConfig(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   if (pNetCfg == nullptr) return LOG("Bad parameters"), FALSE;
-  if (PLIBCFileExist(kSupplicantConfigPath) != 0) (void)PLIBCSysUnlink(kSupplicantConfigPath);  // written anew anyway
+  if (PLIBCFileExist(kSupplicantConfigPath) != 0) (void)PLIBCSysUnlink(kSupplicantConfigPath);  // rewritten anyway
   NewFile conf(kSupplicantConfigPath, NewFile::kSecret);
   if (!conf) return LOG("Failed to open file[%s].", kSupplicantConfigPath), FALSE;
   const bool complete = WriteNetwork(conf.get(), *pNetCfg);
@@ -162,7 +162,7 @@ BOOL CheckConnComplete() {
   return FALSE;
 }
 
-// Puts a new record into its place. What others have put there meanwhile, where anyone may, goes.
+// Puts a new record into its place, and removes what others have put there meanwhile: anyone may, in this directory.
 bool PutRecord(const char* szNew) {
   constexpr int kTries = 100;
   for (int i = 0; i < kTries; ++i) {
@@ -172,11 +172,11 @@ bool PutRecord(const char* szNew) {
   return false;
 }
 
-// Records the connection for other programs; it is recorded once there is a file for it, since a connection that is up
-// is worth more than its record.
+// Records the connection for other programs. FALSE when no file can be made for the record; a record that cannot be
+// written is only reported, since a connection that is up is worth more than its record.
 BOOL RecordConnection(const WIRELESS_NETWORK* pNetwork) {
   if (pNetwork == nullptr) return FALSE;
-  (void)PLIBCSysUnlink(kConnectionRecordPath);  // what was recorded holds no longer, whatever comes of this
+  (void)PLIBCSysUnlink(kConnectionRecordPath);  // the old record is wrong from now on
   char szNew[sizeof kConnectionRecordPath + sizeof ".XXXXXX"];
   std::snprintf(szNew, sizeof szNew, "%s.XXXXXX", kConnectionRecordPath);
   NewFile record = NewFile::Unforeseen(szNew, NewFile::kForAll);
@@ -187,7 +187,7 @@ BOOL RecordConnection(const WIRELESS_NETWORK* pNetwork) {
   std::fprintf(record.get(), "%.*s\n%d\n%d\n%d\n%s\n", static_cast<int>(essid.size()), essid.data(), pNetwork->protocol,
                pNetwork->auth, pNetwork->encrypt, MEROWirelessBssidStringGet(pNetwork->bssid, szBssid, sizeof szBssid));
   const bool written = record.Close();
-  if (!written) LOG("Failed to write file [%s]", kConnectionRecordPath);  // nothing is better than a part of it
+  if (!written) LOG("Failed to write file [%s]", kConnectionRecordPath);  // none is better than a part
   const bool put = written && PutRecord(szNew);
   if (!put) (void)::unlink(szNew);
   return put || !written ? TRUE : FALSE;

@@ -7,7 +7,7 @@
 
 namespace {
 
-// A filter that is none of the known ones matches every network.
+// An unknown filter matches every network.
 bool Matches(const WIRELESS_NETWORK& network, const char* szValue, WIRELESS_FILTER filter) {
   if (filter == WIRELESS_FILTER_ESSID) return std::strcmp(network.szEssid, szValue) == 0;
   if (filter == WIRELESS_FILTER_BSSID) return std::memcmp(network.bssid, szValue, sizeof network.bssid) == 0;

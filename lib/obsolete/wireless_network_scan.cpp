@@ -65,7 +65,7 @@ bool ParseInfo(const char* szRow, WIRELESS_NETWORK& network) {
   return true;
 }
 
-// Whether a row describes a network that is to be listed. One that hides its name is not.
+// Whether a row describes a network that is to be listed. Networks that hide their names are not listed.
 bool ParseRow(const char* szRow, WIRELESS_NETWORK& network) {
   if (std::strlen(szRow) < kLeastRow) return false;
   if (std::sscanf(szRow, " %d", &network.channel) != 1) {
@@ -79,7 +79,7 @@ bool ParseRow(const char* szRow, WIRELESS_NETWORK& network) {
   return true;
 }
 
-// Takes one reading of the adapter's results, appending to the ring. How many networks there are, -1 after a report.
+// Reads the adapter's results once, and appends them to the ring. Gives the number of networks, or -1 after a report.
 int NetworkScanParse(const char* szIfName, WIRELESS_LIST* pHead) {
   if (szIfName == nullptr || pHead == nullptr) return LOG_LINE(79, "Bad parameters"), -1;
 
@@ -103,8 +103,8 @@ int NetworkScanParse(const char* szIfName, WIRELESS_LIST* pHead) {
   return count;
 }
 
-// Takes readings until two in a row give the same number of networks, five at the most: the driver fills its results
-// in while they are read. The ring holds the last reading; how many it has, negative when that failed.
+// Reads until two readings in a row have the same number of networks, five times at most: the driver adds results
+// while they are read. The ring holds the last reading. Gives its number of networks, negative when it failed.
 int NetworkScanCheck(const char* szIfName, WIRELESS_LIST* pHead) {
   constexpr int kReadings = 5;
   int previous = 0;
@@ -126,7 +126,7 @@ int NetworkScanCheck(const char* szIfName, WIRELESS_LIST* pHead) {
   }
 }
 
-// Makes the driver scan; the ordinary listing of the tool does, and is not wanted.
+// Makes the driver scan. The tool's ordinary listing does that; its output is thrown away.
 int ScanAfresh(const char* szIfName) {
   const ListCommand command("/sbin/iwlist %s scanning > /dev/null 2>&1", ShellWord(szIfName).c_str());
   if (command.Run() >= 0) return 0;
