@@ -18,6 +18,7 @@
 #include <thread>
 
 #include "common/known_networks_file.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "platform.h"
 #include "private_machine.h"

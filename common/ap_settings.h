@@ -33,10 +33,9 @@ struct Setting {
 
 inline constexpr char kGuestPrefix[] = "guest_net_";
 
-// What a record that nothing was saved for has otherwise than a section that lacks the key. All that belongs to the
-// guest network is 0 or empty there.
+// The network's name in a record that nothing was saved for; its bridge is kNatBridge. A section that lacks these keys
+// has empty texts instead. Everything of the guest network is 0 or empty in such a record.
 inline constexpr char kUnsavedSsid[] = "Corvanta";
-inline constexpr char kUnsavedBridge[] = "lbr0";
 
 // The hours of a week, all of them on.
 inline constexpr char kAlwaysOn[] =

@@ -1,8 +1,6 @@
-// The file of known networks: one section a network, named by the address of its access point.
+// The keys of the file of known networks.
 #ifndef MERO_COMMON_KNOWN_NETWORKS_FILE_H
 #define MERO_COMMON_KNOWN_NETWORKS_FILE_H
-
-inline constexpr char kKnownNetworksPath[] = "/usr/mero/etc/wireless.conf";
 
 // The keys of a section, in the order in which they are written.
 inline constexpr char kKeySecret[] = "KEY";

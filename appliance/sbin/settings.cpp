@@ -13,8 +13,8 @@
 #include <string_view>
 
 #include "common/ap_settings.h"
+#include "common/paths.h"
 #include "common/text.h"
-#include "lib/obsolete/paths.h"
 #include "platform.h"
 #include "wireless.h"
 

@@ -3,6 +3,7 @@
 
 #include "common/known_networks_file.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "holders.h"
 #include "platform.h"
 #include "ring.h"

@@ -4,9 +4,9 @@
 
 #include "common/ap_settings.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "holders.h"
-#include "paths.h"
 #include "platform.h"
 #include "wireless.h"
 
@@ -42,7 +42,7 @@ void SetDefaultAPConfig(const char* szSecName, PMERO_AP_CONF pConf) {
     }
   }
   CopyText(conf.hostapConf.szSSID, kUnsavedSsid);
-  CopyText(conf.hostapConf.szBridge, kUnsavedBridge);
+  CopyText(conf.hostapConf.szBridge, kNatBridge);
   *pConf = conf;  // all at once, since the name may be the record's own
 }
 

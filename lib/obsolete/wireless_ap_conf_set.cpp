@@ -4,15 +4,14 @@
 
 #include "common/ap_settings.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "holders.h"
-#include "paths.h"
 #include "platform.h"
 #include "shell_words.h"
 #include "wireless.h"
 
 namespace {
 
-constexpr char kLineFormat[] = "\t%s=%s\n";
 constexpr char kEnableKey[] = "enable";
 
 char* ConvertIntegerToString(const int value, char* szValue, const size_t cbSize) {
@@ -103,7 +102,7 @@ std::optional<bool> FindSection(const char* szSecName) {
 
 // All other settings stay, so that nothing is lost when the access point is switched off.
 BOOL SaveDisabled(const char* szSecName) {
-  if (PLIBCFileSetSectionValue(kApSettingsPath, szSecName, kEnableKey, TextOfSwitch(FALSE), kLineFormat) >= 0) {
+  if (PLIBCFileSetSectionValue(kApSettingsPath, szSecName, kEnableKey, TextOfSwitch(FALSE), kSectionLineFormat) >= 0) {
     return TRUE;
   }
   return LOG("Failed to set key[%s] of sec[%s] in file[%s].", kEnableKey, szSecName, kApSettingsPath), FALSE;
@@ -111,12 +110,12 @@ BOOL SaveDisabled(const char* szSecName) {
 
 BOOL SaveSection(const char* szSecName, PPLIBSZHASH pshHash, bool exists) {
   if (exists) {
-    if (PLIBCFileSetSection(kApSettingsPath, szSecName, nullptr, pshHash, kLineFormat) > 0) return TRUE;
+    if (PLIBCFileSetSection(kApSettingsPath, szSecName, nullptr, pshHash, kSectionLineFormat) > 0) return TRUE;
     return LOG("Failed to set section: %s from %s, errno=0x%X", szSecName, kApSettingsPath,
                static_cast<unsigned>(PLIBCErrGet())),
            FALSE;
   }
-  if (PLIBCFileAddSection(kApSettingsPath, szSecName, pshHash, kLineFormat) > 0) return TRUE;
+  if (PLIBCFileAddSection(kApSettingsPath, szSecName, pshHash, kSectionLineFormat) > 0) return TRUE;
   return LOG("Failed to add section: %s from %s, errno=0x%X", szSecName, kApSettingsPath,
              static_cast<unsigned>(PLIBCErrGet())),
          FALSE;

@@ -1,6 +1,6 @@
 // Names the settings section of the adapter that is plugged in.
 #include "common/log.h"
-#include "paths.h"
+#include "common/paths.h"
 #include "platform.h"
 #include "wireless.h"
 

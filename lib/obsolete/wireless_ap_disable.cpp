@@ -2,8 +2,8 @@
 #include <net/if.h>
 
 #include "common/log.h"
+#include "common/paths.h"
 #include "holders.h"
-#include "paths.h"
 #include "platform.h"
 #include "wireless.h"
 

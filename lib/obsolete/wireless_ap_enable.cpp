@@ -5,15 +5,14 @@
 #include <cstring>
 
 #include "common/log.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "holders.h"
-#include "paths.h"
 #include "platform.h"
 #include "wireless.h"
 
 namespace {
 
-constexpr char kNatBridge[] = "lbr0";
 constexpr char kWiredInterface[] = "eth0";
 constexpr char kAddress[] = "10.1.14.1";
 constexpr char kMask[] = "255.255.255.0";
@@ -74,7 +73,8 @@ bool WriteServer(const NETINFO& netInfo, MERO_DHCPD_CONF& conf) {
 BOOL SetValidDHCPServerConfig(const NETINFO* pNetInfo) {
   if (pNetInfo == nullptr) return LOG("Wrong Parameter."), FALSE;
   if (HasValidRange(*pNetInfo)) {
-    return SwitchOn(InterfacePath(kDhcpInfoFormat, pNetInfo->szInterface).c_str(), "enable") ? TRUE : FALSE;
+    const InterfacePath info(kDhcpInfoFormat, pNetInfo->szInterface, pNetInfo->szInterface);
+    return SwitchOn(info.c_str(), "enable") ? TRUE : FALSE;
   }
   MERO_DHCPD_CONF conf{};
   return ComputeRange(*pNetInfo, conf) && WriteServer(*pNetInfo, conf) ? TRUE : FALSE;

@@ -1,5 +1,5 @@
 // Says whether an access point is being set up at this moment.
-#include "paths.h"
+#include "common/paths.h"
 #include "platform.h"
 #include "wireless.h"
 

@@ -1,8 +1,8 @@
 // Tells whether the user has switched the radio off in the access-point settings.
 #include <cstring>
 
+#include "common/paths.h"
 #include "holders.h"
-#include "paths.h"
 #include "platform.h"
 #include "wireless.h"
 

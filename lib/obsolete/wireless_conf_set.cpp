@@ -5,14 +5,13 @@
 #include "common/clock.h"
 #include "common/known_networks_file.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "holders.h"
 #include "platform.h"
 #include "wireless.h"
 
 namespace {
-
-constexpr char kLineFormat[] = "\t%s=%s\n";
 
 // Reads the network's saved section, if any, into the hash, or creates the file. Greater than 0 when the section
 // exists, 0 when it does not, negative after a report.
@@ -56,14 +55,14 @@ void Fill(Hash& hash, const WIRELESS_NETWORK_CONFIG& config, const char* szBssid
 }
 
 int Add(const char* szSection, const Hash& hash) {
-  if (PLIBCFileAddSection(kKnownNetworksPath, szSection, hash.get(), kLineFormat) > 0) return 0;
+  if (PLIBCFileAddSection(kKnownNetworksPath, szSection, hash.get(), kSectionLineFormat) > 0) return 0;
   return LOG_LINE(72, "Failed to add section: %s from %s, errno=0x%X", szSection, kKnownNetworksPath,
                   static_cast<unsigned>(PLIBCErrGet())),
          -1;
 }
 
 int Replace(const char* szSection, const Hash& hash) {
-  if (PLIBCFileSetSection(kKnownNetworksPath, szSection, nullptr, hash.get(), kLineFormat) > 0) return 0;
+  if (PLIBCFileSetSection(kKnownNetworksPath, szSection, nullptr, hash.get(), kSectionLineFormat) > 0) return 0;
   return LOG_LINE(67, "Failed to set section: %s from %s, errno=0x%X", szSection, kKnownNetworksPath,
                   static_cast<unsigned>(PLIBCErrGet())),
          -1;

@@ -3,10 +3,9 @@
 #include <cstdio>
 #include <cstring>
 
-#include "common/guest_network.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "holders.h"
-#include "paths.h"
 #include "platform.h"
 #include "shell_words.h"
 #include "wep_key.h"
@@ -14,10 +13,7 @@
 
 namespace {
 
-constexpr char kDirectory[] = "/etc/hostapd";
 constexpr char kPskPath[] = "/etc/hostapd.psk";
-constexpr char kControlDirectory[] = "/var/run/hostapd";
-constexpr char kModelPath[] = "/etc.defaults/meroinfo.conf";
 
 // A configuration that is written line by line. A value with a line feed is refused, since it would add a line of its
 // own, and names and secrets may come from anybody.
@@ -123,7 +119,7 @@ void WriteHead(Conf& file, const char* szIfName, const MERO_HOSTAP_CONF& conf) {
   file.Text("wpa_psk_file", kPskPath);
   file.Number("wps_state", 2);
   file.Number("ap_setup_locked", 1);
-  file.Text("ctrl_interface", kControlDirectory);
+  file.Text("ctrl_interface", kHostapdControlDirectory);
   file.Text("config_methods", "label display push_button keypad");
   WriteStationLimit(file, conf.maxStation);
   file.Text("bridge", conf.szBridge);
@@ -222,7 +218,7 @@ void WriteGuest(Conf& file, const MERO_HOSTAP_GUEST_NET& guest) {
   file.Text("bssid", guest.szBSSID);
   file.Text("ssid", guest.szSSID);
   file.Text("bridge", kGuestBridge);
-  file.Text("ctrl_interface", kControlDirectory);
+  file.Text("ctrl_interface", kHostapdControlDirectory);
   WriteStationLimit(file, guest.maxStation);
   if (guest.blAPIsolate != FALSE) file.Number("ap_isolate", 1);
   file.Number("ignore_broadcast_ssid", guest.hideSSID);
@@ -257,8 +253,8 @@ void TakeDown(const char* szIfName) {
 }
 
 bool MakeDirectory() {
-  if (PLIBCExec("/bin/mkdir", "-p", kDirectory, nullptr, nullptr) == 0) return true;
-  return LOG("Failed to mkdir %s", kDirectory), false;
+  if (PLIBCExec("/bin/mkdir", "-p", kHostapdDirectory, nullptr, nullptr) == 0) return true;
+  return LOG("Failed to mkdir %s", kHostapdDirectory), false;
 }
 
 // Only models with a built-in card have a guest network.

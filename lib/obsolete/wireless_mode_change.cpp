@@ -1,12 +1,13 @@
 // Switches the adapter between access-point mode and client mode.
 #include "common/log.h"
+#include "common/paths.h"
 #include "platform.h"
 #include "wireless.h"
 
 namespace {
 
 bool RunHotplugScript(const char* szMode) {
-  return PLIBCExec("/usr/mero/hotplug/usb.wireless.function", "change-mode", szMode, nullptr, nullptr) == 0;
+  return PLIBCExec(kHotPlugScriptPath, "change-mode", szMode, nullptr, nullptr) == 0;
 }
 
 }  // namespace

@@ -5,8 +5,8 @@
 #include <cstdio>
 #include <cstring>
 
-#include "common/connection_files.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "holders.h"
 #include "platform.h"
@@ -16,9 +16,7 @@
 
 namespace {
 
-constexpr char kMarkerPath[] = "/var/tmp/.wireless_connecting";
 constexpr char kSupplicantPath[] = "/usr/sbin/wpa_supplicant";
-constexpr char kSupplicantConfigPath[] = "/usr/mero/etc/wpa_supplicant.conf";
 constexpr char kSystemSettingsPath[] = "/etc/meroinfo.conf";
 constexpr char kResolverPath[] = "/etc/resolv.conf";
 
@@ -112,7 +110,7 @@ bool WriteSecurity(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
 
 bool WriteNetwork(FILE* pfConf, const WIRELESS_NETWORK_CONFIG& config) {
   char szBssid[1024] = {};
-  std::fprintf(pfConf, "ctrl_interface=/var/run/wpa_supplicant\n");
+  std::fprintf(pfConf, "ctrl_interface=%s\n", kSupplicantControlDirectory);
   std::fprintf(pfConf, "network={\n");
   if (!WriteValue(pfConf, "\tssid=\"%.*s\"\n", TextIn(config.network.szEssid))) return false;
   if (CheckBssid(&config) == TRUE) {
@@ -226,7 +224,7 @@ void PostProcessing() {
 }  // namespace
 
 int MEROWirelessNetworkConnect(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
-  const Marker marker(kMarkerPath);
+  const Marker marker(kJoinMarkerPath);
   if (MEROWirelessAdapterNum() <= 0) return LOG("There is no wireless USB adapter plugged"), -1;
   if (MEROWirelessCheckBlock() != 1) return 0;  // a radio that is switched off is nobody's failure
   if (marker.exists()) return LOG("Another connection construction is going"), -1;

@@ -1,17 +1,12 @@
 // The DHCP client of an interface.
 #include "platform/base/dhcp_client.h"
 
-#include <cstdio>
-
+#include "common/paths.h"
 #include "platform/base/daemon.h"
 #include "platform/base/program.h"
 
-DhcpClientFile::DhcpClientFile(const char* szFormat, const char* szIfName) {
-  std::snprintf(szPath_, sizeof szPath_, szFormat, szIfName);
-}
-
 Status EndDhcpClient(const char* szIfName) {
-  Status status = EndDaemon(DhcpClientFile(kDhcpClientPidFormat, szIfName).c_str(), kDhcpClientProgram);
+  Status status = EndDaemon(InterfacePath(kDhcpClientPidFormat, szIfName).c_str(), kDhcpClientProgram);
   if (!status.ok()) return status;
   const char* const argv[] = {kLeaseScript, "left", szIfName, nullptr};
   Result<int> exitStatus = RunProgram(argv, Standard::kNull);

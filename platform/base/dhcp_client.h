@@ -2,26 +2,10 @@
 #ifndef MERO_PLATFORM_DHCP_CLIENT_H
 #define MERO_PLATFORM_DHCP_CLIENT_H
 
-#include <net/if.h>
-
 #include "platform/base/result.h"
 
 inline constexpr char kDhcpClientPath[] = "/bin/busybox";
 inline constexpr char kDhcpClientProgram[] = "busybox";
-inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";  // applies a lease, and takes it back
-
-// A file of an interface's client, by a format that takes the interface's name.
-class DhcpClientFile {
- public:
-  DhcpClientFile(const char* szFormat, const char* szIfName);
-
-  const char* c_str() const { return szPath_; }
-
- private:
-  char szPath_[64];
-};
-
-inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
 
 // Ends the client of an interface, if it has one, and has the script take back what a lease has set, also when the
 // client has ended by itself. It is no failure when the script is missing: without it no lease was ever applied.

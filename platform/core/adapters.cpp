@@ -5,7 +5,7 @@
 #include <cstdio>
 #include <cstring>
 
-#include "common/guest_network.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/directory.h"
 #include "platform/base/failure.h"
@@ -13,7 +13,6 @@
 namespace {
 
 constexpr char kInterfaces[] = "/sys/class/net";
-constexpr char kInterfaceWithoutAdapter[] = "wlan0";
 
 bool HasEntry(const char* szIfName, const char* szEntry) {
   char szPath[sizeof kInterfaces + NAME_MAX + 16];
@@ -52,5 +51,5 @@ const char* MEROWirelessInterfaceGet(void) {
     // strverscmp() puts wlan2 before wlan10, as people do.
     if (s_szFirst[0] == '\0' || ::strverscmp(szIfName, s_szFirst) < 0) CopyText(s_szFirst, szIfName);
   });
-  return s_szFirst[0] != '\0' ? s_szFirst : kInterfaceWithoutAdapter;
+  return s_szFirst[0] != '\0' ? s_szFirst : kFirstAdapter;
 }

@@ -4,8 +4,8 @@
 #include <optional>
 #include <string_view>
 
-#include "common/connection_files.h"
 #include "common/log.h"
+#include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/file_read.h"
 #include "platform/base/number.h"

@@ -1,7 +1,7 @@
 // Ending the current connection.
 #include <unistd.h>
 
-#include "common/connection_files.h"
+#include "common/paths.h"
 #include "platform/base/daemon.h"
 #include "platform/base/dhcp_client.h"
 #include "platform/base/failure.h"

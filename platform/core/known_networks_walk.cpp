@@ -9,7 +9,7 @@
 #include <ctime>
 #include <new>
 
-#include "common/known_networks_file.h"
+#include "common/paths.h"
 #include "platform/base/failure.h"
 #include "platform/base/file_read.h"
 #include "platform/core/known_network.h"

@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <cstring>
 
+#include "common/paths.h"
 #include "platform/base/daemon.h"
 #include "platform/base/failure.h"
 #include "platform/base/interface.h"
@@ -23,7 +24,7 @@ constexpr int kTimedOut = 124;  // timeout(1)'s exit status when the time is up
 // Runs the client until it has a lease, or was not answered in time. It stays behind to renew the lease, or to go on
 // asking for one.
 Status Lease(const char* szIfName, int seconds) {
-  const DhcpClientFile pidFile(kDhcpClientPidFormat, szIfName);
+  const InterfacePath pidFile(kDhcpClientPidFormat, szIfName);
   char szTries[16];
   char szWait[16];
   std::snprintf(szTries, sizeof szTries, "%d", kTries);

@@ -5,6 +5,7 @@
 #include <iterator>
 #include <optional>
 
+#include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/directory.h"
 #include "platform/base/failure.h"
@@ -14,10 +15,6 @@
 #include "platform/base/number.h"
 
 namespace {
-
-constexpr char kDirectory[] = "/etc/dhcpd";
-constexpr char kConfFormat[] = "/etc/dhcpd/dhcpd-%s-%s.conf";
-constexpr char kInfoFormat[] = "/etc/dhcpd/dhcpd-%s-%s.info";
 
 constexpr char kLineFormat[] = "%s=\"%s\"\n";
 constexpr char kEnableKey[] = "enable";
@@ -79,19 +76,6 @@ void ForEachPart(const ConfLine& line, Visit visit) {
     if (part.szName != nullptr) visit(part);
   }
 }
-
-// The path of a file of the server's.
-class ServerFile {
- public:
-  ServerFile(const char* szFormat, const char* szIfName, const char* szTag) {
-    std::snprintf(szPath_, sizeof szPath_, szFormat, szIfName, szTag);
-  }
-
-  const char* c_str() const { return szPath_; }
-
- private:
-  char szPath_[sizeof kConfFormat + sizeof(MERO_DHCPD_CONF::szInterface) + sizeof(MERO_DHCPD_CONF::szTag)];
-};
 
 const char* FieldOf(const MERO_DHCPD_CONF& conf, const Part& part) {
   return reinterpret_cast<const char*>(&conf) + part.offset;
@@ -213,7 +197,7 @@ void AppendLine(Bytes& content, const ConfLine& line, const MERO_DHCPD_CONF& con
 }
 
 Status WriteConf(const char* szPath, const MERO_DHCPD_CONF& conf) {
-  if (Status status = MakeDirectory(kDirectory); !status.ok()) return status;
+  if (Status status = MakeDirectory(kDhcpDirectory); !status.ok()) return status;
   return EditFile(szPath, 0644, [&](std::string_view, Bytes& content) {
     content.Append(kHeading);
     for (const ConfLine& line : kLines) AppendLine(content, line, conf);
@@ -222,12 +206,12 @@ Status WriteConf(const char* szPath, const MERO_DHCPD_CONF& conf) {
 }
 
 bool WriteSwitch(const MERO_DHCPD_CONF& conf, bool enable) {
-  const ServerFile path(kInfoFormat, conf.szInterface, conf.szTag);
+  const InterfacePath path(kDhcpInfoFormat, conf.szInterface, conf.szTag);
   return PLIBCFileSetKeyValue(path.c_str(), kEnableKey, enable ? "yes" : "no", kLineFormat) > 0;
 }
 
 bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
-  const ServerFile path(kInfoFormat, conf.szInterface, conf.szTag);
+  const InterfacePath path(kDhcpInfoFormat, conf.szInterface, conf.szTag);
   char szAutoTime[16];
   std::snprintf(szAutoTime, sizeof szAutoTime, "%d", conf.autoTime);
   return PLIBCFileSetKeyValue(path.c_str(), kAutoTimeKey, szAutoTime, kLineFormat) > 0;
@@ -235,7 +219,7 @@ bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
 
 // The switch is written last, so that no server is switched on before its other settings are there.
 bool WriteFiles(const MERO_DHCPD_CONF& conf, bool enable) {
-  const ServerFile path(kConfFormat, conf.szInterface, conf.szTag);
+  const InterfacePath path(kDhcpConfFormat, conf.szInterface, conf.szTag);
   if (Status status = WriteConf(path.c_str(), conf); !status.ok()) {
     return FAIL(status.error(), "Failed to write %s", path.c_str()), false;
   }
@@ -366,9 +350,11 @@ bool Same(const MERO_DHCPD_CONF& a, const MERO_DHCPD_CONF& b) {
 
 // Whether the files of a record, as they are, read as the record.
 bool IsWritten(const MERO_DHCPD_CONF& conf) {
+  const InterfacePath path(kDhcpConfFormat, conf.szInterface, conf.szTag);
+  const InterfacePath info(kDhcpInfoFormat, conf.szInterface, conf.szTag);
   MERO_DHCPD_CONF written{};
-  return ReadConf(ServerFile(kConfFormat, conf.szInterface, conf.szTag).c_str(), conf.szInterface, written).ok() &&
-         ReadInfo(ServerFile(kInfoFormat, conf.szInterface, conf.szTag).c_str(), written) && Same(written, conf);
+  return ReadConf(path.c_str(), conf.szInterface, written).ok() && ReadInfo(info.c_str(), written) &&
+         Same(written, conf);
 }
 
 }  // namespace
@@ -377,12 +363,12 @@ int MERONetGetDhcpServerConf(const char* szIfName, const char* szTag, PMERO_DHCP
   if (szIfName == nullptr || szTag == nullptr || pConf == nullptr) return REFUSE_NULL(), 0;
   if (!IsInterfaceName(szIfName) || !IsTag(szTag)) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
 
-  const ServerFile path(kConfFormat, szIfName, szTag);
+  const InterfacePath path(kDhcpConfFormat, szIfName, szTag);
   MERO_DHCPD_CONF conf{};
   const Status status = ReadConf(path.c_str(), szIfName, conf);
   if (status.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
   if (!status.ok()) return FAIL(status.error(), "Failed to read %s", path.c_str()), 0;
-  if (!ReadInfo(ServerFile(kInfoFormat, szIfName, szTag).c_str(), conf)) return 0;
+  if (!ReadInfo(InterfacePath(kDhcpInfoFormat, szIfName, szTag).c_str(), conf)) return 0;
   CopyText(conf.szTag, szTag);
   *pConf = conf;
   return 1;

@@ -1,15 +1,12 @@
 // The network-script file of an interface or a bridge.
 #include "platform/sdk/network_script.h"
 
-#include <cstdio>
-
 #include "platform/base/directory.h"
 #include "platform/base/failure.h"
 
 namespace {
 
-constexpr const char* kDirectories[] = {"/etc/sysconfig", "/etc/sysconfig/network-scripts"};
-constexpr char kPathFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
+constexpr const char* kDirectories[] = {"/etc/sysconfig", kInterfaceScriptDirectory};
 constexpr char kLineFormat[] = "%s=%s\n";
 
 // A stock machine has no such directories.
@@ -24,22 +21,18 @@ bool MakeDirectories() {
 
 }  // namespace
 
-NetworkScript::NetworkScript(const char* szIfName) {
-  std::snprintf(szPath_, sizeof szPath_, kPathFormat, szIfName);
-}
-
 bool NetworkScript::exists() const {
-  return PLIBCFileExist(szPath_) != 0;
+  return PLIBCFileExist(path_.c_str()) != 0;
 }
 
 void NetworkScript::Get(const char* szKey, char* szValue, size_t cbValue) const {
-  if (PLIBCFileGetKeyValue(szPath_, szKey, szValue, cbValue, 0) <= 0) szValue[0] = '\0';
+  if (PLIBCFileGetKeyValue(path_.c_str(), szKey, szValue, cbValue, 0) <= 0) szValue[0] = '\0';
 }
 
 void NetworkScript::Set(const char* szKey, const char* szValue) {
-  written_ = written_ && MakeDirectories() && PLIBCFileSetKeyValue(szPath_, szKey, szValue, kLineFormat) > 0;
+  written_ = written_ && MakeDirectories() && PLIBCFileSetKeyValue(path_.c_str(), szKey, szValue, kLineFormat) > 0;
 }
 
 void NetworkScript::Remove(const char* szKey) {
-  written_ = written_ && PLIBCFileRemoveKey(szPath_, szKey) >= 0;
+  written_ = written_ && PLIBCFileRemoveKey(path_.c_str(), szKey) >= 0;
 }

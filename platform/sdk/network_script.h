@@ -2,14 +2,14 @@
 #ifndef MERO_PLATFORM_NETWORK_SCRIPT_H
 #define MERO_PLATFORM_NETWORK_SCRIPT_H
 
-#include <net/if.h>
-
 #include <cstddef>
+
+#include "common/paths.h"
 
 // Changes are made key by key; the first that fails is reported, and no other is made after it.
 class NetworkScript {
  public:
-  explicit NetworkScript(const char* szIfName);
+  explicit NetworkScript(const char* szIfName) : path_(kInterfaceScriptFormat, szIfName) {}
 
   bool exists() const;
 
@@ -28,7 +28,7 @@ class NetworkScript {
  private:
   void Get(const char* szKey, char* szValue, size_t cbValue) const;
 
-  char szPath_[64];
+  InterfacePath path_;
   bool written_ = true;
 };
 

@@ -5,6 +5,7 @@
 #include <filesystem>
 
 #include "common/known_networks_file.h"
+#include "common/paths.h"
 #include "tests/platform/platform_test.h"
 
 namespace {

@@ -13,6 +13,7 @@
 #include <utility>
 
 #include "common/known_networks_file.h"
+#include "common/paths.h"
 #include "tests/platform/containers.h"
 #include "tests/platform/platform_test.h"
 

@@ -6,6 +6,7 @@
 #include <sstream>
 
 #include "common/ap_settings.h"
+#include "common/paths.h"
 #include "model/ap_settings.h"
 #include "running.h"
 #include "tests/unit/ap_settings.h"
@@ -164,7 +165,7 @@ TEST_F(EverySetting, TakesTheWordsThatItsHelpHas) {
 
 TEST_F(EverySetting, ThatNothingWasSavedForIsWhatTheManualSays) {
   const std::string manual = Document("docs/man/mero-wireless_ap.conf.5");
-  for (const char* szDefault : {kUnsavedSsid, kUnsavedBridge}) {
+  for (const char* szDefault : {kUnsavedSsid, kNatBridge}) {
     EXPECT_TRUE(Has(manual, "\n.Li " + std::string(szDefault) + " ,\n")) << szDefault;
   }
 }

@@ -5,10 +5,10 @@
 
 #include "base/signals.h"
 #include "common/ap_settings.h"
+#include "common/paths.h"
 #include "model/ap_settings.h"
 #include "model/library.h"
 #include "model/library_lines.h"
-#include "model/paths.h"
 
 namespace {
 
@@ -24,7 +24,7 @@ void SetGuestDefaults(ApConf& conf) {
 
 // `radio off` may have saved settings that hold the switch alone, and so no bridge.
 void SetBridgeDefault(ApConf& conf) {
-  if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, kUnsavedBridge, "the bridge");
+  if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, kNatBridge, "the bridge");
 }
 
 // Reads the settings of the adapter's model; false, with the defaults, when none were saved.
@@ -190,7 +190,7 @@ void EnableAp(const Program& program) {
   const ApConf conf = SettingsToEnable();
   RequireAdapter();
   Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
-  task.szMarker = kApMarker;
+  task.szMarker = kApMarkerPath;
   task.undo = [&] { Disable(program, conf); };
   const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
   if (start == Start::kNotSaved) throw NotSaved();

@@ -1,8 +1,8 @@
 // The commands about the adapter as a whole: radio, mode.
 #include "commands/adapter.h"
 
+#include "common/paths.h"
 #include "model/library.h"
-#include "model/paths.h"
 
 namespace {
 
@@ -39,7 +39,7 @@ void SwitchRadio(const Program& program, const std::string& state) {
   if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
   const bool on = state == "on";
   const std::string model = AdapterModel();
-  if (PLIBCFileSetSectionValue(kApSettings, model.c_str(), "unblock", on ? "yes" : "no", kApSettingsLine) < 0) {
+  if (PLIBCFileSetSectionValue(kApSettingsPath, model.c_str(), "unblock", on ? "yes" : "no", kSectionLineFormat) < 0) {
     throw Failed("the radio could not be switched", "is there room on the disk? -v shows more");
   }
   program.output.Done<Radio>(on ? "the radio is on" : "the radio is off: no network will be joined", "radio",

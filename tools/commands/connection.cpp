@@ -5,10 +5,10 @@
 #include <optional>
 #include <thread>
 
+#include "common/paths.h"
 #include "model/addressing.h"
 #include "model/library.h"
 #include "model/library_lines.h"
-#include "model/paths.h"
 #include "model/security.h"
 #include "model/status.h"
 #include "work/supplicant.h"
@@ -24,14 +24,14 @@ void LeaveNothing() {
 
 Task Joining(const Program& program, const std::string& what, SupplicantListener& listener) {
   Task task = program.Doing(what);
-  task.szMarker = kJoinMarker;
+  task.szMarker = kJoinMarkerPath;
   task.listener = &listener;
   task.undo = LeaveNothing;
   return task;
 }
 
 std::string SupplicantSocket() {
-  return std::string(kSupplicantDirectory) + MEROWirelessInterfaceGet();
+  return std::string(kSupplicantControlDirectory) + "/" + MEROWirelessInterfaceGet();
 }
 
 // Why the library gave an attempt up before it asked an access point, if it did.
@@ -86,14 +86,14 @@ Failure AutoConnectFailed(Verdict verdict) {
 // The library tells a running supplicant to end and starts the next one at once. That one gives up while the control
 // socket of the former one is still there, so the program waits for its end before it calls the library.
 void EndFormerSupplicant(const Program& program) {
-  if (PLIBCFileExist(kSupplicantPid) == 0) return;
+  if (PLIBCFileExist(kSupplicantPidPath) == 0) return;
   const bool gone = Run<bool>(program.Doing("leaving the former network"), [] {
-    if (PLIBCExec(kSupplicantClient, "terminate", nullptr, nullptr, nullptr) != 0)
+    if (PLIBCExec("/usr/sbin/wpa_cli", "terminate", nullptr, nullptr, nullptr) != 0)
       return true;  // no supplicant runs, and only the file of one is left
-    for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPid) != 0; --tries) {
+    for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPidPath) != 0; --tries) {
       std::this_thread::sleep_for(std::chrono::milliseconds(100));
     }
-    return PLIBCFileExist(kSupplicantPid) == 0;
+    return PLIBCFileExist(kSupplicantPidPath) == 0;
   });
   if (!gone) throw Failed("the former connection does not end", "`merowireless disconnect` ends it by force");
 }

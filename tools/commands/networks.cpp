@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <ctime>
 
+#include "common/paths.h"
 #include "model/library.h"
-#include "model/paths.h"
 #include "model/security.h"
 
 namespace {
@@ -149,8 +149,8 @@ void Forget(const Program& program, const std::string& name) {
                   "`merowireless known` lists those that are");
   }
   for (const KnownNetwork& network : known) {
-    if (PLIBCFileRemoveSection(kKnownNetworks, AddressText(network.network.bssid).c_str()) > 0) continue;
-    throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworks));
+    if (PLIBCFileRemoveSection(kKnownNetworksPath, AddressText(network.network.bssid).c_str()) > 0) continue;
+    throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworksPath));
   }
   program.output.ListDone<KnownNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
 }

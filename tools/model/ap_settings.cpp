@@ -10,9 +10,9 @@
 
 #include "base/choices.h"
 #include "common/ap_settings.h"
+#include "common/paths.h"
 #include "model/ap_protection.h"
 #include "model/library.h"
-#include "model/paths.h"
 
 namespace {
 
@@ -118,7 +118,7 @@ void SetRadiusPort(ApConf& conf, const std::string& text) {
 void SetBridge(ApConf& conf, const std::string& text) {
   const bool plain = std::ranges::all_of(text, [](unsigned char c) { return std::isgraph(c) != 0 && c != '/'; });
   if (text.empty() || !plain || text == "." || text == "..")
-    throw Wrong("this is no bridge's name", "such as " + std::string(kUnsavedBridge));
+    throw Wrong("this is no bridge's name", "such as " + std::string(kNatBridge));
   SetText(conf.hostapConf.szBridge, text, "the bridge");
 }
 
@@ -166,9 +166,9 @@ const MERO_HOSTAP_GUEST_NET& Guest(const ApConf& conf) {
 // Without a built-in card the library writes no guest network and reports nothing.
 void SetGuest(ApConf& conf, const std::string& text) {
   Guest(conf).blEnable = ValueOf(kYesNo, text, "guest-net-enable") != 0 ? TRUE : FALSE;
-  if (Guest(conf).blEnable == FALSE || PLIBCFileCheckKeyValue(kModelFacts, "support_pci_wifi", "yes", 0) != 0) return;
+  if (Guest(conf).blEnable == FALSE || PLIBCFileCheckKeyValue(kModelPath, "support_pci_wifi", "yes", 0) != 0) return;
   throw Failure(Exit::kFailed, "this appliance has no guest network",
-                "it takes a built-in card, of which " + std::string(kModelFacts) + " says support_pci_wifi=\"yes\"");
+                "it takes a built-in card, of which " + std::string(kModelPath) + " says support_pci_wifi=\"yes\"");
 }
 
 // ---- Settings that are one number of the record ----
@@ -361,7 +361,7 @@ void RequireComplete(const ApConf& conf) {
   const MERO_HOSTAP_CONF& main = conf.hostapConf;
   if (main.szSSID[0] == '\0') throw Wrong("the access point has no name", "add --ssid NAME");
   if (main.szBridge[0] == '\0')
-    throw Wrong("the access point has no bridge", "add --bridge " + std::string(kUnsavedBridge));
+    throw Wrong("the access point has no bridge", "add --bridge " + std::string(kNatBridge));
   if (LacksSecret(conf)) throw Wrong("this security needs a secret", "add --key-file or --key-stdin");
   if (HasEap(conf) && main.encryptInfo.wpaEapInfo.szAuthIP[0] == '\0') {
     throw Wrong("EAP needs a RADIUS server", "add --auth-server-addr A.B.C.D");

@@ -1,0 +1,102 @@
+// Where things are, and what they are called: the files, programs, directories and interfaces that more than one of the
+// library, the platform, the management program and the appliance kit knows. Each is spelled here, and nowhere else.
+// The kit's scripts cannot include this; a test compares what they say.
+#ifndef MERO_COMMON_PATHS_H
+#define MERO_COMMON_PATHS_H
+
+#include <cstdio>
+
+// ---- Settings ----
+
+// The known networks, each in a section that the address of its access point names.
+inline constexpr char kKnownNetworksPath[] = "/usr/mero/etc/wireless.conf";
+
+// The access-point settings, one section an adapter model.
+inline constexpr char kApSettingsPath[] = "/usr/mero/etc/wireless_ap.conf";
+
+// A line of a section, in both files.
+inline constexpr char kSectionLineFormat[] = "\t%s=%s\n";
+
+// What the appliance's model can do.
+inline constexpr char kModelPath[] = "/etc.defaults/meroinfo.conf";
+
+// ---- The adapter ----
+
+// The adapter that is plugged in; "PRODUCT" names its section of the access-point settings.
+inline constexpr char kAdapterInfoPath[] = "/tmp/wireless.info";
+inline constexpr char kProductKey[] = "PRODUCT";
+
+// The interface of the first adapter: the access point's, and what the client's is taken for without an adapter.
+inline constexpr char kFirstAdapter[] = "wlan0";
+
+// ---- A connection ----
+
+// Exists while a network is being joined.
+inline constexpr char kJoinMarkerPath[] = "/var/tmp/.wireless_connecting";
+
+// Five lines: name, protocol, authentication, encryption (as numbers), address of the access point.
+inline constexpr char kConnectionRecordPath[] = "/var/tmp/.wireless_current_connection";
+
+// The supplicant's configuration, its pid, and the directory in which it has a control socket for each interface.
+inline constexpr char kSupplicantConfigPath[] = "/usr/mero/etc/wpa_supplicant.conf";
+inline constexpr char kSupplicantPidPath[] = "/var/run/wpa_supplicant.pid";
+inline constexpr char kSupplicantControlDirectory[] = "/var/run/wpa_supplicant";
+
+// The pid of an interface's DHCP client, and the program that applies what the client leases and gives it back.
+inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
+inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";
+
+// ---- An access point ----
+
+// Exists while an access point is being set up.
+inline constexpr char kApMarkerPath[] = "/var/tmp/.wireless_ap_connecting";
+
+// The configuration of the access-point daemon of an interface, and of its guest network, and the files that say
+// whether they are switched on.
+inline constexpr char kHostapdDirectory[] = "/etc/hostapd";
+inline constexpr char kHostapdHostFormat[] = "/etc/hostapd/hostapd-%s-host.conf";
+inline constexpr char kHostapdGuestFormat[] = "/etc/hostapd/hostapd-%s-guest.conf";
+inline constexpr char kHostapdGuestInfoFormat[] = "/etc/hostapd/hostapd-%s-guest.info";
+inline constexpr char kHostapdInfoFormat[] = "/etc/hostapd/hostapd-%s.info";
+
+// Where the access-point daemon has a control socket for each interface.
+inline constexpr char kHostapdControlDirectory[] = "/var/run/hostapd";
+
+// The guest network's interface, a second one on the adapter's radio, and its bridge.
+inline constexpr char kGuestInterface[] = "gwlan";
+inline constexpr char kGuestBridge[] = "gbr";
+
+// The bridge that translates addresses, which an access point is in when its settings say nothing else.
+inline constexpr char kNatBridge[] = "lbr0";
+
+// What the DHCP server of an interface and a tag gives out, and whether it serves. A bridge's tag is its own name.
+inline constexpr char kDhcpDirectory[] = "/etc/dhcpd";
+inline constexpr char kDhcpConfFormat[] = "/etc/dhcpd/dhcpd-%s-%s.conf";
+inline constexpr char kDhcpInfoFormat[] = "/etc/dhcpd/dhcpd-%s-%s.info";
+
+// The file from which the network start script knows an interface or a bridge.
+inline constexpr char kInterfaceScriptDirectory[] = "/etc/sysconfig/network-scripts";
+inline constexpr char kInterfaceScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";
+
+// ---- The kit's scripts ----
+
+// Start and restart of an access point: "start" or "restart", the wireless interface, the bridge.
+inline constexpr char kNetworkScriptPath[] = "/etc/rc.network";
+
+// What the adapter is used for: "change-mode", then "ap" or "client".
+inline constexpr char kHotPlugScriptPath[] = "/usr/mero/hotplug/usb.wireless.function";
+
+// The path that one of the formats above gives for an interface or a bridge, and a tag where the format has one.
+class InterfacePath {
+ public:
+  [[gnu::noinline]] InterfacePath(const char* szFormat, const char* szIfName, const char* szTag = "") {
+    std::snprintf(szPath_, sizeof szPath_, szFormat, szIfName, szTag);
+  }
+
+  const char* c_str() const { return szPath_; }
+
+ private:
+  char szPath_[4096];
+};
+
+#endif  // MERO_COMMON_PATHS_H
