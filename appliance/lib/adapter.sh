@@ -65,9 +65,9 @@ can_be_access_point() { # INTERFACE
 
 # access_point_is INTERFACE yes|no: whether an access point has been set up there and is switched on (yes) or off (no).
 access_point_is() {
-	ask check "/etc/hostapd/hostapd-$1.info" enable "$2"
+	ask check "$hostapd_files-$1.info" enable "$2"
 }
 
 set_access_point() { # INTERFACE yes|no
-	printf 'enable="%s"\n' "$2" | put "/etc/hostapd/hostapd-$1.info"
+	printf 'enable="%s"\n' "$2" | put "$hostapd_files-$1.info"
 }

@@ -70,7 +70,7 @@ make_bridge_of_boot() {
 # waits_for_access_point BRIDGE: whether the bridge exists for an access point alone, and that one is switched off.
 waits_for_access_point() {
 	member=$(script_value PRIMARY "$1") || exit 1
-	[ -n "$member" ] && [ -e "/etc/hostapd/hostapd-$member.info" ] && ! is_enabled "/etc/hostapd/hostapd-$member.info"
+	[ -n "$member" ] && [ -e "$hostapd_files-$member.info" ] && ! is_enabled "$hostapd_files-$member.info"
 }
 
 # is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and not a backup copy of a file. The DEVICE in
@@ -164,17 +164,19 @@ remove_addresses() { # INTERFACE
 	attempt "cannot remove the addresses of $1" ip -4 address flush dev "$1"
 }
 
+lease_script=/usr/mero/sbin/udhcpc.lease
+
 # The client goes on in the background when no server has answered yet. A client that a server keeps busy is ended.
 lease_address() { # INTERFACE
 	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || return 0
 	attempt "cannot lease an address for $1" timeout -k 2 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 \
-		-T 2 -s /usr/mero/sbin/udhcpc.lease
+		-T 2 -s "$lease_script"
 }
 
 # end_lease INTERFACE: ends the DHCP client, and gives its lease back, also that of a client that had ended by itself.
 end_lease() {
 	end_daemon busybox "$(lease_pid "$1")"
-	[ ! -x /usr/mero/sbin/udhcpc.lease ] || /usr/mero/sbin/udhcpc.lease left "$1" ||
+	[ ! -x "$lease_script" ] || "$lease_script" left "$1" ||
 		warn "what $1 had leased is not all given back"
 }
 

@@ -5,9 +5,9 @@
 # serve_addresses BRIDGE: ends the server, and starts it anew if its .info file enables it.
 serve_addresses() {
 	end_dnsmasq "$1"
-	is_enabled "/etc/dhcpd/dhcpd-$1-$1.info" || return 0
+	is_enabled "$dhcp_files-$1-$1.info" || return 0
 	is_there "$1" || return 0
-	start_dnsmasq "$1" "/etc/dhcpd/dhcpd-$1-$1.conf"
+	start_dnsmasq "$1" "$dhcp_files-$1-$1.conf"
 }
 
 serve_guest_addresses() {

@@ -4,6 +4,8 @@
 
 settings_reader=/usr/mero/sbin/mero-settings
 scripts=/etc/sysconfig/network-scripts
+hostapd_files=/etc/hostapd/hostapd # with -INTERFACE-host.conf, -INTERFACE-guest.conf, -INTERFACE[-guest].info behind it
+dhcp_files=/etc/dhcpd/dhcpd # with -BRIDGE-BRIDGE.conf and -BRIDGE-BRIDGE.info behind it
 adapter_info=/tmp/wireless.info
 state=/var/run/rc.network
 newline='

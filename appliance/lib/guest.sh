@@ -19,14 +19,14 @@ decide_on_guests() { # INTERFACE
 
 # guest_is_on INTERFACE: whether there is a guest network, and it is on the air at this hour.
 guest_is_on() {
-	is_enabled "/etc/hostapd/hostapd-$1-guest.info" &&
-		[ -f "/etc/hostapd/hostapd-$1-guest.conf" ] &&
+	is_enabled "$hostapd_files-$1-guest.info" &&
+		[ -f "$hostapd_files-$1-guest.conf" ] &&
 		! is_off_now guest_net_sched_enable guest_net_sched
 }
 
 # An empty "bssid=" is left out: the daemon then gives the guest network the address that follows the radio's own.
 guest_configuration() { # INTERFACE
-	sed '/^bssid=$/d' "/etc/hostapd/hostapd-$1-guest.conf" || cannot_read "/etc/hostapd/hostapd-$1-guest.conf"
+	sed '/^bssid=$/d' "$hostapd_files-$1-guest.conf" || cannot_read "$hostapd_files-$1-guest.conf"
 }
 
 # set_guest_bridge: makes the bridge for a start with guests, and removes it for one without.

@@ -65,7 +65,7 @@ hostapd_pid() { # INTERFACE
 # Writes the daemon's configuration: the main network's file and, for a start with guests, the guest network's. Features
 # that the card lacks are left out, since the daemon does not start with them.
 write_configuration() { # INTERFACE FILE
-	host=/etc/hostapd/hostapd-$1-host.conf
+	host=$hostapd_files-$1-host.conf
 	[ -s "$host" ] || fail "$host is missing or empty"
 	band=$(band_of "$host") || exit 1
 	unable=$(what_is_unable "$1" "$band") || exit 1

@@ -1,0 +1,107 @@
+// The kit's scripts, its units and the packages' scripts know the paths that the library knows. They spell them
+// themselves, since they cannot include the libraries' header; here what they say is compared with it.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <iterator>
+#include <regex>
+#include <set>
+#include <string>
+
+#include "common/paths.h"
+#include "kit.h"
+
+namespace {
+
+using testing::HasSubstr;
+
+using Paths = std::set<std::string>;
+
+class KitPaths : public Kit {};
+
+std::string PathOf(const char* szFormat) {
+  return InterfacePath(szFormat, "if0", "if0").c_str();
+}
+
+TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
+  // What stands in the way of a function tells which path the function comes to it with.
+  const std::string asks = "ask() { printf '%s' \"$2\"; exit; }; ";
+  const std::string ends = "end_daemon() { printf '%s' \"$2\"; exit; }; ";
+  const std::string serves =
+      "end_dnsmasq() { :; }; is_enabled() { :; }; is_there() { :; }; start_dnsmasq() { printf '%s' \"$2\"; }; ";
+  const struct {
+    std::string command;
+    std::string path;
+  } rows[] = {
+      {"printf '%s' \"$adapter_info\"", kAdapterInfoPath},
+      {"printf '%s' \"$guest_interface\"", kGuestInterface},
+      {"printf '%s' \"$guest_bridge\"", kGuestBridge},
+      {"printf '%s' \"$control\"", kHostapdControlDirectory},
+      {"printf '%s' \"$scripts\"", kInterfaceScriptDirectory},
+      {asks + "script_value KEY if0", PathOf(kInterfaceScriptFormat)},
+      {asks + "access_point_is if0 yes", PathOf(kHostapdInfoFormat)},
+      {"put() { printf '%s' \"$1\"; }; set_access_point if0 yes", PathOf(kHostapdInfoFormat)},
+      {asks + "guest_is_on if0", PathOf(kHostapdGuestInfoFormat)},
+      {"sed() { printf '%s' \"$2\"; }; guest_configuration if0", PathOf(kHostapdGuestFormat)},
+      {"fail() { printf '%s' \"$host\"; exit; }; write_configuration if0 /tmp/file", PathOf(kHostapdHostFormat)},
+      {"end_dnsmasq() { :; }; " + asks + "serve_addresses if0", PathOf(kDhcpInfoFormat)},
+      {serves + "serve_addresses if0", PathOf(kDhcpConfFormat)},
+      {ends + "end_client if0", kSupplicantPidPath},
+      {ends + "end_lease if0", PathOf(kDhcpClientPidFormat)},
+      {"attempt() { eval \"printf '%s' \\\"\\${$#}\\\"\"; }; lease_address if0", kLeaseScript},
+  };
+  for (const auto& row : rows) EXPECT_EQ(Tells(row.command), row.path) << row.command;
+}
+
+// What a file says outside of comments.
+std::string TextOf(const std::string& path) {
+  return RunInShell("grep -v '^#' " APPLIANCE_KIT "/" + path).output;
+}
+
+// The absolute paths in a file, but for those of the system's own directories. /run is what /var/run leads to.
+Paths PathsIn(const std::string& path) {
+  static const std::regex pattern("/(etc|sbin|tmp|usr|var|run/(?!systemd))[^\\s'\"();}]*");
+  const std::string text = TextOf(path);
+  Paths paths;
+  for (std::sregex_iterator match(text.begin(), text.end(), pattern), end; match != end; ++match) {
+    const std::string found = match->str();
+    paths.insert(found.starts_with("/run/") ? "/var" + found : found);
+  }
+  return paths;
+}
+
+TEST_F(KitPaths, OfTheUnitsAreTheLibrarysAndTheScripts) {
+  EXPECT_EQ(PathsIn("systemd/mero-wireless.conf"), Paths{kAdapterInfoPath});
+  EXPECT_EQ(PathsIn("systemd/mero-network.service"), Paths{kNetworkScriptPath});
+  EXPECT_EQ(PathsIn("systemd/mero-wireless@.service"), Paths{kHotPlugScriptPath});
+  EXPECT_EQ(PathsIn("systemd/mero-wireless-schedule.service"), Paths{kNetworkScriptPath});
+  EXPECT_EQ(PathsIn("systemd/mero-wireless-autoconnect.service"),
+            (Paths{"/usr/bin/merowireless", Tells(std::string("hostapd_pid ") + kFirstAdapter)}));
+
+  EXPECT_THAT(TextOf("systemd/90-mero-wireless.rules"), HasSubstr("KERNEL!=\"" + std::string(kGuestInterface) + "\""));
+  EXPECT_THAT(TextOf("systemd/mero-wireless-schedule.service"), HasSubstr(" schedule " + std::string(kFirstAdapter)));
+  EXPECT_THAT(TextOf("systemd/mero-wireless-autoconnect.service"),
+              HasSubstr("BindsTo=mero-wireless@" + std::string(kFirstAdapter) + ".service"));
+}
+
+TEST_F(KitPaths, OfTheHotPlugScriptAreTheLibrarys) {
+  EXPECT_THAT(TextOf("hotplug/usb.wireless.function"), HasSubstr("\t" + std::string(kNetworkScriptPath) + " "));
+  EXPECT_THAT(RunInShell("/usr/mero/hotplug/usb.wireless.function help").output, HasSubstr(kAdapterInfoPath));
+}
+
+TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
+  const std::string record = kConnectionRecordPath;
+  EXPECT_EQ(PathsIn("../debian/libmerowireless-core1.postrm"),
+            (Paths{kJoinMarkerPath, record, record + ".??????", kApMarkerPath, kSupplicantConfigPath}));
+
+  const std::string state = Tells("printf '%s' \"$state\"");
+  const std::string leaseLock = RunInShell("sed -n 's/^lock=//p' " APPLIANCE_KIT "/sbin/udhcpc.lease").output;
+  EXPECT_EQ(PathsIn("../debian/merowireless-appliance.postrm"),
+            (Paths{"/sbin/iwlist", "/sbin/iwlist.distrib", state, leaseLock.substr(0, leaseLock.find('\n')),
+                   kAdapterInfoPath}));
+  EXPECT_EQ(PathsIn("../debian/merowireless-appliance.prerm"),
+            (Paths{state + "/hostapd-*.pid", state + "/hostapd-", kNetworkScriptPath}));
+  EXPECT_EQ(Tells("hostapd_pid if0"), state + "/hostapd-if0.pid");
+}
+
+}  // namespace
