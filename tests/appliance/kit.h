@@ -7,7 +7,8 @@
 #include <filesystem>
 #include <string>
 
-#include "shell.h"
+#include "tests/support/files.h"
+#include "tests/support/shell.h"
 
 namespace fs = std::filesystem;
 
@@ -23,8 +24,8 @@ inline Ran RunInParts(const std::string& command) {
 
 inline std::string Tells(const std::string& command) {
   const Ran ran = RunInParts(command);
-  EXPECT_EQ(ran.status, 0) << command << "\n" << ran.output;
-  return ran.output;
+  EXPECT_EQ(ran.status, 0) << command << "\n" << ran.out;
+  return ran.out;
 }
 
 class Kit : public testing::Test {
@@ -37,7 +38,7 @@ class Kit : public testing::Test {
     fs::copy(kit / "etc/rc.network", "/etc/rc.network");
     fs::create_directories("/usr/mero/sbin");
     fs::copy(SETTINGS_PROGRAM, "/usr/mero/sbin/mero-settings");
-    Write("/tmp/wireless.info", "INTERFACE=\"wlan0\"\nPRODUCT=\"RT [5370\"\n");
+    WriteText("/tmp/wireless.info", "INTERFACE=\"wlan0\"\nPRODUCT=\"RT [5370\"\n");
   }
 };
 

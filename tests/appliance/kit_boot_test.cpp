@@ -12,14 +12,14 @@ const std::string kScripts = "/etc/sysconfig/network-scripts/ifcfg-";
 class KitBoot : public Kit {
  protected:
   static void Bridge(const std::string& file, const std::string& more) {
-    Write(kScripts + file,
-          "TYPE=Bridge\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT=yes\n" + more);
+    WriteText(kScripts + file,
+              "TYPE=Bridge\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT=yes\n" + more);
   }
   static std::string Bridges() {
     return RunInShell(
                "for bridge in /sys/class/net/*/bridge; do [ ! -e $bridge ] || echo $bridge; done | cut -d / -f 5 | "
                "xargs")
-        .output;
+        .out;
   }
 };
 
@@ -31,9 +31,9 @@ TEST_F(KitBoot, MakesTheOtherBridgesWhenOneCannotBeMade) {
   Bridge("dbr", "");
   const Ran ran = RunInShell("/etc/rc.network boot");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.output, HasSubstr("rc.network: cannot give abr the address nonsense/255.255.255.0: "));
-  EXPECT_THAT(ran.output, HasSubstr("rc.network: cannot give cbr the address 01:00:00:00:00:00: "));
-  EXPECT_EQ(RunInShell("ip -brief -4 address show up | awk '$3 { print $1 }' | grep br | xargs").output, "bbr dbr\n");
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: cannot give abr the address nonsense/255.255.255.0: "));
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: cannot give cbr the address 01:00:00:00:00:00: "));
+  EXPECT_EQ(RunInShell("ip -brief -4 address show up | awk '$3 { print $1 }' | grep br | xargs").out, "bbr dbr\n");
 }
 
 // A bridge whose first member came a moment later was not made.
@@ -42,8 +42,8 @@ TEST_F(KitBoot, WaitsForAFirstMember) {
   const Ran ran = RunInShell(
       "(sleep 1; ip link add eth7 type veth peer name wire) & /etc/rc.network boot; status=$?; wait; exit $status");
   EXPECT_EQ(ran.status, 0);
-  EXPECT_EQ(ran.output, "");
-  EXPECT_EQ(RunInShell("ls /sys/class/net/abr/brif").output, "eth7\n");
+  EXPECT_EQ(ran.out, "");
+  EXPECT_EQ(RunInShell("ls /sys/class/net/abr/brif").out, "eth7\n");
 }
 
 TEST_F(KitBoot, MakesABridgeWhoseFirstMemberDoesNotCome) {
@@ -51,11 +51,11 @@ TEST_F(KitBoot, MakesABridgeWhoseFirstMemberDoesNotCome) {
   Bridge("bbr", "PRIMARY=eth8\n");
   Bridge("cbr", "");
   const Ran ran = RunInShell("start=$(date +%s); /etc/rc.network boot; echo $? after $(($(date +%s) - start))");
-  EXPECT_THAT(ran.output, HasSubstr("rc.network: there is no interface 'eth7' for the bridge abr\n"));
-  EXPECT_THAT(ran.output, HasSubstr("rc.network: there is no interface 'eth8' for the bridge bbr\n"));
-  EXPECT_THAT(ran.output, testing::ContainsRegex("\n1 after [4-8]\n"));  // 5 s in all
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: there is no interface 'eth7' for the bridge abr\n"));
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: there is no interface 'eth8' for the bridge bbr\n"));
+  EXPECT_THAT(ran.out, testing::ContainsRegex("\n1 after [4-8]\n"));  // 5 s in all
   EXPECT_EQ(Bridges(), "abr bbr cbr\n");
-  EXPECT_THAT(RunInShell("ip -brief -4 address show abr").output, HasSubstr("192.0.2.1/24"));
+  EXPECT_THAT(RunInShell("ip -brief -4 address show abr").out, HasSubstr("192.0.2.1/24"));
 }
 
 // Copies that editors and package managers leave were bridges of their own.
@@ -65,7 +65,7 @@ TEST_F(KitBoot, ReadsTheFilesOfInterfacesAlone) {
   }
   for (const char* szFile : {"br3~", "br3.bak", "br3.rpmsave", "br3.", "br3.7.orig"}) Bridge(szFile, "");
   const Ran nothing = RunInShell("/etc/rc.network boot");
-  EXPECT_EQ(nothing.output, "");
+  EXPECT_EQ(nothing.out, "");
   EXPECT_EQ(nothing.status, 0);
   EXPECT_EQ(Bridges(), "\n");
 
@@ -73,7 +73,7 @@ TEST_F(KitBoot, ReadsTheFilesOfInterfacesAlone) {
   Bridge("br5.7", "");
   Bridge("br6.lan", "DEVICE=\"br6.lan\"\n");
   Bridge("br7", "DEVICE=br7\n");
-  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").out, "");
   EXPECT_EQ(Bridges(), "br4 br5.7 br6.lan br7\n");
 }
 
@@ -83,9 +83,9 @@ TEST_F(KitBoot, TakesTheRoutesOfItsFirstMemberAlongAndNotesNothing) {
       "ip link add eth0 type veth peer name wire; ip link set eth0 up; ip link set wire up; "
       "ip address add 192.0.2.1/24 dev eth0; ip route add default via 192.0.2.254");
   Bridge("abr", "PRIMARY=eth0\n");
-  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
-  EXPECT_EQ(RunInShell("ip -4 route show default | sed 's/ *$//'").output, "default via 192.0.2.254 dev abr\n");
-  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").output, "");
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").out, "");
+  EXPECT_EQ(RunInShell("ip -4 route show default | sed 's/ *$//'").out, "default via 192.0.2.254 dev abr\n");
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").out, "");
 }
 
 }  // namespace

@@ -29,7 +29,7 @@ class KitMessage : public KitRadio {
       Mend();
       if (*step.szProgram != '\0') Break(step.szProgram, step.szCalls);
       const Ran ran = RunInParts(step.szCommand);
-      EXPECT_THAT(ran.output, HasSubstr(std::string(step.szMessage) + "\n")) << step.szCommand;
+      EXPECT_THAT(ran.out, HasSubstr(std::string(step.szMessage) + "\n")) << step.szCommand;
     }
   }
 };
@@ -54,7 +54,7 @@ TEST_F(KitMessage, OfABridgeSaysWhichStepCannotBeTaken) {
 }
 
 TEST_F(KitMessage, OfAWireSaysWhatCannotBeGivenBack) {
-  Write("/usr/mero/sbin/udhcpc.lease", "#!/bin/sh\nexit 1\n");
+  WriteScript("/usr/mero/sbin/udhcpc.lease", "exit 1\n");
   const std::string noted = "note_wire eth0 lbr0; ";
   const std::string gives = noted + "give_wire_back lbr0";
   ExpectMessages({
@@ -106,12 +106,12 @@ TEST_F(KitMessage, OfTrafficBetweenNetworksSaysWhatDoesNotPass) {
 }
 
 TEST_F(KitMessage, OfADaemonSaysWhatItDoesNotDo) {
-  const std::string pid = RunInShell("{ sleep 60 >/dev/null 2>&1 & } && echo $! | tee /tmp/pid").output;
-  EXPECT_EQ(RunInParts("kill() { :; }; sleep() { :; }; end_daemon sleep /tmp/pid").output,
+  const std::string pid = RunInShell("{ sleep 60 >/dev/null 2>&1 & } && echo $! | tee /tmp/pid").out;
+  EXPECT_EQ(RunInParts("kill() { :; }; sleep() { :; }; end_daemon sleep /tmp/pid").out,
             "sh: cannot end sleep (process " + pid.substr(0, pid.size() - 1) + ")\n");
   RunInShell("kill $(cat /tmp/pid)");
 
-  Write("/tmp/log", "1795.2: Driver does not support configured HT\n");
+  WriteText("/tmp/log", "1795.2: Driver does not support configured HT\n");
   StandIn("hostapd_cli", "echo state=DISABLED\n");
   ExpectMessages({
       {"await_access_point wlan0 /tmp/log", "", "",
@@ -149,19 +149,19 @@ TEST_F(KitMessage, OfTheStateDirectorySaysWhatCannotBeMadeOfIt) {
     RunInShell("rm -rf /run/rc.network; mkdir -p /run/rc.network/directory");
     Mend();
     Break(row.szProgram, row.szCalls);
-    EXPECT_THAT(Script("boot").output, HasSubstr("rc.network: " + std::string(row.szMessage) + "\n"));
+    EXPECT_THAT(Script("boot").out, HasSubstr("rc.network: " + std::string(row.szMessage) + "\n"));
   }
   Mend();
   StandIn("find", "");
   RunInShell("rm -rf /run/rc.network; mkdir -p -m 700 /run/rc.network/lock");
-  EXPECT_THAT(Script("boot").output, HasSubstr("rc.network: cannot open /var/run/rc.network/lock\n"));
+  EXPECT_THAT(Script("boot").out, HasSubstr("rc.network: cannot open /var/run/rc.network/lock\n"));
 }
 
 TEST_F(KitMessage, OfAnAdapterSaysThatItCannotBeAnAccessPoint) {
   RunInShell(
       "sed -i 's,/sys/class/net,/tmp/net,' /usr/mero/lib/network/adapter.sh; mkdir -p /tmp/net/wlan0/phy80211; "
       "echo phy0 >/tmp/net/wlan0/phy80211/name");
-  EXPECT_EQ(Run("/usr/mero/hotplug/usb.wireless.function change-mode ap").output,
+  EXPECT_EQ(Run("/usr/mero/hotplug/usb.wireless.function change-mode ap").out,
             "usb.wireless.function: wlan0 cannot be an access point\n");
 }
 

@@ -55,7 +55,7 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
 
 // What a file says outside of comments.
 std::string TextOf(const std::string& path) {
-  return RunInShell("grep -v '^#' " APPLIANCE_KIT "/" + path).output;
+  return RunInShell("grep -v '^#' " APPLIANCE_KIT "/" + path).out;
 }
 
 // The absolute paths in a file, but for those of the system's own directories. /run is what /var/run leads to.
@@ -86,7 +86,7 @@ TEST_F(KitPaths, OfTheUnitsAreTheLibrarysAndTheScripts) {
 
 TEST_F(KitPaths, OfTheHotPlugScriptAreTheLibrarys) {
   EXPECT_THAT(TextOf("hotplug/usb.wireless.function"), HasSubstr("\t" + std::string(kNetworkScriptPath) + " "));
-  EXPECT_THAT(RunInShell("/usr/mero/hotplug/usb.wireless.function help").output, HasSubstr(kAdapterInfoPath));
+  EXPECT_THAT(RunInShell("/usr/mero/hotplug/usb.wireless.function help").out, HasSubstr(kAdapterInfoPath));
 }
 
 TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
@@ -95,7 +95,7 @@ TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
             (Paths{kJoinMarkerPath, record, record + ".??????", kApMarkerPath, kSupplicantConfigPath}));
 
   const std::string state = Tells("printf '%s' \"$state\"");
-  const std::string leaseLock = RunInShell("sed -n 's/^lock=//p' " APPLIANCE_KIT "/sbin/udhcpc.lease").output;
+  const std::string leaseLock = RunInShell("sed -n 's/^lock=//p' " APPLIANCE_KIT "/sbin/udhcpc.lease").out;
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.postrm"),
             (Paths{"/sbin/iwlist", "/sbin/iwlist.distrib", state, leaseLock.substr(0, leaseLock.find('\n')),
                    kAdapterInfoPath}));

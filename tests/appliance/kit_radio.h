@@ -20,12 +20,12 @@ class KitRadio : public Kit {
     StandIn("ip", "exec /usr/sbin/ip \"$@\"\n");
     Install("cat", "case ${1-} in */phy80211/name) echo phy0 ;; *) exec /bin/cat \"$@\" ;; esac\n");
     RunInShell("ip link add wlan0 type veth peer name air; ip link add eth0 type veth peer name wire");
-    Write("/etc/hostapd/hostapd-wlan0-host.conf",
-          "interface=wlan0\nssid=home\nwpa=2\nwpa_passphrase=deux croissants\n");
-    Write("/etc/sysconfig/network-scripts/ifcfg-wlan0", "DEVICE=wlan0\nBRIDGE=lbr0\n");
+    WriteText("/etc/hostapd/hostapd-wlan0-host.conf",
+              "interface=wlan0\nssid=home\nwpa=2\nwpa_passphrase=deux croissants\n");
+    WriteText("/etc/sysconfig/network-scripts/ifcfg-wlan0", "DEVICE=wlan0\nBRIDGE=lbr0\n");
     SetBridge("NAT=yes");
-    Write("/etc/dhcpd/dhcpd-lbr0-lbr0.info", "enable=\"yes\"\n");
-    Write("/etc/dhcpd/dhcpd-lbr0-lbr0.conf", "interface=lbr0\n");
+    WriteText("/etc/dhcpd/dhcpd-lbr0-lbr0.info", "enable=\"yes\"\n");
+    WriteText("/etc/dhcpd/dhcpd-lbr0-lbr0.conf", "interface=lbr0\n");
   }
 
   ~KitRadio() override { RunInShell("for file in /run/rc.network/*.pid; do kill $(cat $file); done"); }
@@ -54,18 +54,18 @@ fi
   }
 
   static void SetBridge(const std::string& more) {
-    Write("/etc/sysconfig/network-scripts/ifcfg-lbr0",
-          "DEVICE=lbr0\nTYPE=Bridge\nBOOTPROTO=static\nIPADDR=10.1.14.1\nNETMASK=255.255.255.0\nONBOOT="
-          "yes\n" +
-              more + "\n");
+    WriteText("/etc/sysconfig/network-scripts/ifcfg-lbr0",
+              "DEVICE=lbr0\nTYPE=Bridge\nBOOTPROTO=static\nIPADDR=10.1.14.1\nNETMASK=255.255.255.0\nONBOOT="
+              "yes\n" +
+                  more + "\n");
   }
 
   // Breaks a program, in the calls that have this text: in all of them, or in the next one.
   static void Break(const std::string& name, const std::string& calls = "") {
-    Write("/tmp/broken." + name, "always " + calls + "\n");
+    WriteText("/tmp/broken." + name, "always " + calls + "\n");
   }
   static void BreakOnce(const std::string& name, const std::string& calls = "") {
-    Write("/tmp/broken." + name, "once " + calls + "\n");
+    WriteText("/tmp/broken." + name, "once " + calls + "\n");
   }
   static void Mend() { RunInShell("rm -f /tmp/broken.*"); }
 
@@ -79,7 +79,7 @@ fi
                "for file in /run/rc.network/*.pid; do read -r pid <$file && read -r name </proc/$pid/comm && echo "
                "$name; "
                "done 2>/dev/null")
-        .output;
+        .out;
   }
 
   // What there is of an access point; empty when there is nothing.
@@ -90,7 +90,7 @@ fi
                "/run/rc.network/bridge-* 2>/dev/null; ip -brief -4 address show dev wlan0 | awk '$3 { print $3 }'; "
                "cat /proc/sys/net/ipv4/ip_forward | grep -v 0; ip -brief link show up dev wlan0 | grep -o wlan0; "
                "[ ! -s /tmp/rules ] || grep '^table' /tmp/rules | grep -o 'mero_ap {'")
-               .output;
+               .out;
   }
 
   static std::string OnAir() { return "dnsmasq\nhostapd\n"; }

@@ -17,8 +17,7 @@ class KitRivals : public Kit {
     ::chmod("/tmp", 01777);
     fs::remove(kNote);
     for (const char* szDirectory : {"/etc", "/run", "/tmp"}) {
-      Write(std::string(szDirectory) + "/victim", "root's own\n");
-      ::chmod((std::string(szDirectory) + "/victim").c_str(), 0600);
+      WriteText(std::string(szDirectory) + "/victim", "root's own\n");
     }
   }
 
@@ -29,7 +28,7 @@ class KitRivals : public Kit {
   void TearDown() override {
     for (const char* szDirectory : {"/etc", "/run", "/tmp"}) {
       const std::string victim = std::string(szDirectory) + "/victim";
-      EXPECT_EQ(RunInShell("cat " + victim + "; stat -c '%a %u' " + victim).output, "root's own\n600 0\n") << victim;
+      EXPECT_EQ(RunInShell("cat " + victim + "; stat -c '%a %u' " + victim).out, "root's own\n600 0\n") << victim;
     }
   }
 
@@ -38,7 +37,7 @@ class KitRivals : public Kit {
   }
 
   static std::string Note() {
-    return RunInShell("stat -c '%F %a %u %h' " + kNote).output + RunInShell("cat " + kNote).output;
+    return RunInShell("stat -c '%F %a %u %h' " + kNote).out + RunInShell("cat " + kNote).out;
   }
 };
 
@@ -49,13 +48,13 @@ TEST_F(KitRivals, GetNoHoldOfTheNoteOfTheAdapter) {
          {"ln -s /etc/victim " + name, "ln -s /etc/nowhere " + name, "mkfifo -m 666 " + name,
           "echo PRODUCT=theirs >" + name + "; chmod 666 " + name, "mkdir " + name + "; echo x >" + name + "/file",
           "mkdir /tmp/theirs; ln -s /tmp/theirs " + name}) {
-      ASSERT_EQ(AsNobody(attack).output, "") << attack;
+      ASSERT_EQ(AsNobody(attack).out, "") << attack;
       const Ran ran = RunInParts("timeout 10 sh -c 'true'; echo PRODUCT=ours | put $adapter_info 644");
-      EXPECT_EQ(ran.status, 0) << attack << ran.output;
+      EXPECT_EQ(ran.status, 0) << attack << ran.out;
       EXPECT_EQ(Note(), "regular file 644 0 1\nPRODUCT=ours\n") << attack;
-      EXPECT_EQ(RunInShell("timeout 10 /usr/mero/hotplug/usb.wireless.function remove").output, "") << attack;
+      EXPECT_EQ(RunInShell("timeout 10 /usr/mero/hotplug/usb.wireless.function remove").out, "") << attack;
       EXPECT_EQ(Note(), "regular empty file 644 0 1\n") << attack;
-      EXPECT_EQ(AsNobody("ls -A /tmp/theirs 2>/dev/null").output, "") << attack;
+      EXPECT_EQ(AsNobody("ls -A /tmp/theirs 2>/dev/null").out, "") << attack;
       RunInShell("rm -rf /tmp/wireless* /tmp/theirs");
     }
   }
@@ -64,7 +63,7 @@ TEST_F(KitRivals, GetNoHoldOfTheNoteOfTheAdapter) {
 // As where the kernel lets anybody make one more name for a file of root's.
 TEST_F(KitRivals, MakeNoSecondNameOfAFileBeWrittenTo) {
   for (const std::string& name : {kNote, kNote + ".new"}) {
-    ASSERT_EQ(RunInShell("ln /tmp/victim " + name).output, "");
+    ASSERT_EQ(RunInShell("ln /tmp/victim " + name).out, "");
     EXPECT_EQ(RunInShell("/usr/mero/hotplug/usb.wireless.function remove").status, 0);
     EXPECT_EQ(Note(), "regular empty file 644 0 1\n");
     fs::remove(name);
@@ -72,28 +71,28 @@ TEST_F(KitRivals, MakeNoSecondNameOfAFileBeWrittenTo) {
 }
 
 TEST_F(KitRivals, HaveADirectoryInTheWayMovedAside) {
-  ASSERT_EQ(AsNobody("mkdir " + kNote + "; echo kept >" + kNote + "/file").output, "");
+  ASSERT_EQ(AsNobody("mkdir " + kNote + "; echo kept >" + kNote + "/file").out, "");
   const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function remove");
   EXPECT_EQ(ran.status, 0);
-  EXPECT_THAT(ran.output, HasSubstr("usb.wireless.function: /tmp/wireless.info was in the way, and is "
-                                    "/tmp/wireless.info.foreign-"));
-  EXPECT_EQ(RunInShell("cat /tmp/wireless.info.foreign-*/file").output, "kept\n");
+  EXPECT_THAT(ran.out, HasSubstr("usb.wireless.function: /tmp/wireless.info was in the way, and is "
+                                 "/tmp/wireless.info.foreign-"));
+  EXPECT_EQ(RunInShell("cat /tmp/wireless.info.foreign-*/file").out, "kept\n");
 }
 
 TEST_F(KitRivals, CannotReplaceTheNoteThatIsThereFromTheStartOn) {
-  ASSERT_EQ(AsNobody("echo PRODUCT=theirs >" + kNote).output, "");
+  ASSERT_EQ(AsNobody("echo PRODUCT=theirs >" + kNote).out, "");
   const std::string line = "systemd-tmpfiles --create --remove --boot " APPLIANCE_KIT "/systemd/mero-wireless.conf";
-  ASSERT_EQ(RunInShell(line).output, "");
+  ASSERT_EQ(RunInShell(line).out, "");
   EXPECT_EQ(Note(), "regular empty file 644 0 1\n");
   EXPECT_NE(AsNobody("rm -f " + kNote).status, 0);
   EXPECT_NE(AsNobody("ln -sf /etc/victim " + kNote).status, 0);
 
   // Nor is it cleaned up, however old.
-  Write("/tmp/age.conf", "d /tmp 1777 root root 10d\n");
+  WriteText("/tmp/age.conf", "d /tmp 1777 root root 10d\n");
   ASSERT_EQ(RunInShell("touch -d 2001-01-01 " + kNote +
                        " /tmp/other; "
                        "systemd-tmpfiles --clean /tmp/age.conf " APPLIANCE_KIT "/systemd/mero-wireless.conf")
-                .output,
+                .out,
             "");
   EXPECT_TRUE(fs::exists(kNote));
 }
@@ -102,8 +101,8 @@ TEST_F(KitRivals, CannotReplaceTheNoteThatIsThereFromTheStartOn) {
 TEST_F(KitRivals, CannotHoldUpARun) {
   for (const char* szUmask : {"000", "022", "077"}) {
     fs::remove_all(kState);
-    ASSERT_EQ(RunInShell(std::string("umask ") + szUmask + "; /etc/rc.network boot").output, "");
-    EXPECT_EQ(RunInShell("stat -c '%a %u' " + kState + " " + kState + "/lock").output, "700 0\n600 0\n") << szUmask;
+    ASSERT_EQ(RunInShell(std::string("umask ") + szUmask + "; /etc/rc.network boot").out, "");
+    EXPECT_EQ(RunInShell("stat -c '%a %u' " + kState + " " + kState + "/lock").out, "700 0\n600 0\n") << szUmask;
     EXPECT_NE(AsNobody("flock -n " + kState + "/lock true").status, 0) << szUmask;
     EXPECT_NE(AsNobody("flock -n " + kState + " true").status, 0) << szUmask;
   }
@@ -114,33 +113,32 @@ TEST_F(KitRivals, CannotHoldUpARunWithALockThatWasOpenToThem) {
        {"mkdir -m 755 /run/rc.network; touch /run/rc.network/lock",
         "mkdir -m 777 /run/rc.network; touch /run/rc.network/lock; chmod 666 /run/rc.network/lock"}) {
     fs::remove_all(kState);
-    ASSERT_EQ(RunInShell(szMade).output, "");
+    ASSERT_EQ(RunInShell(szMade).out, "");
     const Ran ran = RunInShell(
         "setpriv --reuid=65534 --regid=65534 --clear-groups flock /run/rc.network/lock sleep 30 >/dev/null 2>&1 & "
         "until ! flock -n /run/rc.network/lock true; do sleep 0.05; done; timeout 10 /etc/rc.network boot; echo $?; "
         "kill $!");
-    EXPECT_EQ(ran.output, "rc.network: removed from /var/run/rc.network what was not root's alone: lock\n0\n")
-        << szMade;
-    EXPECT_EQ(RunInShell("timeout 10 /etc/rc.network boot").output, "");
+    EXPECT_EQ(ran.out, "rc.network: removed from /var/run/rc.network what was not root's alone: lock\n0\n") << szMade;
+    EXPECT_EQ(RunInShell("timeout 10 /etc/rc.network boot").out, "");
   }
 }
 
 TEST_F(KitRivals, LeaveNothingInTheDirectoryOfWhatRuns) {
   ASSERT_EQ(RunInShell("mkdir -m 777 " + kState + "; echo 0 >" + kState + "/ip_forward; ln /run/victim " + kState +
                        "/hostapd-wlan1.log")
-                .output,
+                .out,
             "");
   ASSERT_EQ(
       AsNobody("cd " + kState +
                "; ln -s /etc/victim hostapd-wlan0.conf; mkfifo -m 666 hostapd-wlan0.log; mkdir dnsmasq-gbr.conf; "
                "echo x >dnsmasq-gbr.conf/x; echo 1 >hostapd-wlan0.pid; ln -s /etc lock; ln -s /etc/victim \"a b\"")
-          .output,
+          .out,
       "");
   const Ran ran = RunInShell("timeout 10 /etc/rc.network boot");
   EXPECT_EQ(ran.status, 0);
-  EXPECT_THAT(ran.output, HasSubstr("rc.network: removed from /var/run/rc.network what was not root's alone: "));
-  EXPECT_EQ(RunInShell("ls -A " + kState + "; stat -c %a " + kState).output, "ip_forward\nlock\n700\n");
-  EXPECT_EQ(RunInShell("timeout 10 /etc/rc.network boot").output, "");
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: removed from /var/run/rc.network what was not root's alone: "));
+  EXPECT_EQ(RunInShell("ls -A " + kState + "; stat -c %a " + kState).out, "ip_forward\nlock\n700\n");
+  EXPECT_EQ(RunInShell("timeout 10 /etc/rc.network boot").out, "");
 }
 
 // The pid files of servers that ran since before an upgrade would be gone, and nobody could end the servers.
@@ -149,26 +147,26 @@ TEST_F(KitRivals, AreNotTakenForAServerThatRuns) {
   ASSERT_EQ(
       RunInShell("mkdir -m 755 /run/rc.network; dnsmasq --conf-file=/dev/null --port=0 --user=nobody --pid-file=" +
                  pid + "; cp " + pid + " /run/rc.network/dnsmasq-other.pid; chown 65534 /run/rc.network/*")
-          .output,
+          .out,
       "");
-  EXPECT_EQ(RunInShell("/etc/rc.network boot").output,
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").out,
             "rc.network: removed from /var/run/rc.network what was not root's alone: dnsmasq-other.pid\n");
-  EXPECT_EQ(RunInShell("stat -c %u " + pid + "; read -r server <" + pid + "; kill $server").output, "0\n");
+  EXPECT_EQ(RunInShell("stat -c %u " + pid + "; read -r server <" + pid + "; kill $server").out, "0\n");
 }
 
 TEST_F(KitRivals, HaveADirectoryOfTheirOwnMovedAside) {
   for (const char* szMade : {"mkdir -m 777 /run/rc.network; chown 65534:65534 /run/rc.network",
                              "mkdir -m 777 /tmp/theirs; ln -s /tmp/theirs /run/rc.network", "mkfifo /run/rc.network",
                              "touch /run/rc.network", "ln -s /etc/nowhere /run/rc.network"}) {
-    ASSERT_EQ(RunInShell(szMade).output, "") << szMade;
+    ASSERT_EQ(RunInShell(szMade).out, "") << szMade;
     const Ran ran = RunInShell("timeout 10 /etc/rc.network boot");
     EXPECT_EQ(ran.status, 0) << szMade;
-    EXPECT_THAT(ran.output, HasSubstr("rc.network: /var/run/rc.network was in the way, and is "
-                                      "/var/run/rc.network.foreign-"))
+    EXPECT_THAT(ran.out, HasSubstr("rc.network: /var/run/rc.network was in the way, and is "
+                                   "/var/run/rc.network.foreign-"))
         << szMade;
-    EXPECT_EQ(RunInShell("stat -c '%F %a %u' " + kState + "; ls -A " + kState).output, "directory 700 0\nlock\n")
+    EXPECT_EQ(RunInShell("stat -c '%F %a %u' " + kState + "; ls -A " + kState).out, "directory 700 0\nlock\n")
         << szMade;
-    EXPECT_EQ(RunInShell("ls -A /tmp/theirs 2>/dev/null").output, "") << szMade;
+    EXPECT_EQ(RunInShell("ls -A /tmp/theirs 2>/dev/null").out, "") << szMade;
     RunInShell("rm -rf /run/rc.network* /tmp/theirs");
   }
 }

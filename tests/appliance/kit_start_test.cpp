@@ -10,13 +10,13 @@ using KitAccessPoint = KitRadio;
 
 TEST_F(KitAccessPoint, IsOnTheAirWithItsRulesAndOffWithoutALeftover) {
   const Ran started = Script("start wlan0 lbr0");
-  EXPECT_EQ(started.output, "");
+  EXPECT_EQ(started.out, "");
   EXPECT_EQ(started.status, 0);
   EXPECT_EQ(Daemons(), OnAir());
-  EXPECT_THAT(RunInShell("cat /tmp/rules").output, HasSubstr("ip saddr 10.1.14.0/24 oifname != \"lbr0\" masquerade"));
-  EXPECT_EQ(RunInShell("cat /proc/sys/net/ipv4/ip_forward").output, "1\n");
+  EXPECT_THAT(RunInShell("cat /tmp/rules").out, HasSubstr("ip saddr 10.1.14.0/24 oifname != \"lbr0\" masquerade"));
+  EXPECT_EQ(RunInShell("cat /proc/sys/net/ipv4/ip_forward").out, "1\n");
   const Ran ended = Script("restart wlan0 lbr0");
-  EXPECT_EQ(ended.output, "");
+  EXPECT_EQ(ended.out, "");
   EXPECT_EQ(ended.status, 0);
   EXPECT_EQ(Left(), "");
 }
@@ -24,7 +24,7 @@ TEST_F(KitAccessPoint, IsOnTheAirWithItsRulesAndOffWithoutALeftover) {
 // The rules came last: until then, and for good where they could not be set, anybody who joined was without them.
 TEST_F(KitAccessPoint, HasItsRulesBeforeItIsOnTheAir) {
   ASSERT_EQ(Script("start wlan0 lbr0").status, 0);
-  const std::string calls = RunInShell("grep -oE '^(nft|dnsmasq|hostapd) ' /tmp/calls | xargs").output;
+  const std::string calls = RunInShell("grep -oE '^(nft|dnsmasq|hostapd) ' /tmp/calls | xargs").out;
   EXPECT_EQ(calls, "nft dnsmasq hostapd\n");
 }
 
@@ -45,12 +45,12 @@ TEST_F(KitAccessPoint, LeavesNothingWhenAStepFails) {
   for (const bool again : {false, true}) {
     for (const auto& row : rows) {
       if (again) {
-        ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+        ASSERT_EQ(Script("start wlan0 lbr0").out, "");
       }
       BreakOnce(row.szProgram, row.szCalls);
       const Ran ran = Script("start wlan0 lbr0");
       EXPECT_EQ(ran.status, 1) << row.szProgram << row.szCalls;
-      EXPECT_EQ(ran.output, row.szReason);
+      EXPECT_EQ(ran.out, row.szReason);
       EXPECT_EQ(Left(), "") << row.szProgram << row.szCalls;
     }
   }
@@ -67,10 +67,10 @@ TEST_F(KitAccessPoint, KeepsLeasesInTheFileThatItsServerNames) {
       {"no-dhcp-leasefile=x\n", false},       {"", false},
   };
   for (const auto& row : rows) {
-    Write("/etc/dhcpd/dhcpd-lbr0-lbr0.conf", std::string("interface=lbr0\n") + row.szLine);
-    Write("/tmp/calls", "");
-    ASSERT_EQ(Script("start wlan0 lbr0").output, "") << row.szLine;
-    const std::string own = RunInShell("grep -o 'dhcp-leasefile=.*' /tmp/calls").output;
+    WriteText("/etc/dhcpd/dhcpd-lbr0-lbr0.conf", std::string("interface=lbr0\n") + row.szLine);
+    WriteText("/tmp/calls", "");
+    ASSERT_EQ(Script("start wlan0 lbr0").out, "") << row.szLine;
+    const std::string own = RunInShell("grep -o 'dhcp-leasefile=.*' /tmp/calls").out;
     EXPECT_EQ(own, row.named ? "" : "dhcp-leasefile=/var/run/rc.network/dnsmasq-lbr0.leases\n") << row.szLine;
   }
 }
@@ -80,15 +80,15 @@ TEST_F(KitAccessPoint, NeedsNoNftWithoutRules) {
   fs::remove("/tmp/bin/nft");
   fs::remove("/usr/sbin/nft");
   ASSERT_NE(RunInShell("command -v nft").status, 0);
-  EXPECT_EQ(Script("start wlan0 lbr0").output, "");
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
   EXPECT_EQ(Daemons(), OnAir());
-  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
   EXPECT_EQ(Left(), "");
 
   SetBridge("NAT=yes");
   const Ran refused = Script("start wlan0 lbr0");
   EXPECT_EQ(refused.status, 1);
-  EXPECT_THAT(refused.output, StartsWith("rc.network: cannot set the rules between networks: "));
+  EXPECT_THAT(refused.out, StartsWith("rc.network: cannot set the rules between networks: "));
   EXPECT_EQ(Daemons(), "");
 }
 
@@ -99,7 +99,7 @@ TEST_F(KitAccessPoint, SaysThatRulesStandWhichItCannotRemove) {
   for (const char* szWords : {"restart wlan0 lbr0", "restart wlan0"}) {
     const Ran ran = Script(szWords);
     EXPECT_EQ(ran.status, 1);
-    EXPECT_THAT(ran.output, StartsWith("rc.network: cannot remove the rules between networks: ")) << szWords;
+    EXPECT_THAT(ran.out, StartsWith("rc.network: cannot remove the rules between networks: ")) << szWords;
     EXPECT_EQ(Daemons(), "");
   }
   SetBridge("NAT=no");
@@ -114,58 +114,58 @@ TEST_F(KitAccessPoint, IsTakenDownWhateverStepFails) {
   } rows[] = {
       {"nft", ""}, {"ip", "link delete"}, {"ip", "address flush"}, {"ip", "wlan0 down"}, {"iw", "type managed"}};
   for (const auto& row : rows) {
-    ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+    ASSERT_EQ(Script("start wlan0 lbr0").out, "");
     Break(row.szProgram, row.szCalls);
     RunInShell("rm -f /tmp/calls");
     const Ran ran = Script("restart wlan0 lbr0");
     EXPECT_EQ(ran.status, 1) << row.szProgram << row.szCalls;
-    EXPECT_THAT(ran.output, StartsWith("rc.network: cannot ")) << row.szProgram << row.szCalls;
+    EXPECT_THAT(ran.out, StartsWith("rc.network: cannot ")) << row.szProgram << row.szCalls;
     EXPECT_EQ(Daemons(), "");
     EXPECT_FALSE(fs::exists("/run/rc.network/hostapd-wlan0.conf"));
-    const std::string calls = RunInShell("cat /tmp/calls").output;
+    const std::string calls = RunInShell("cat /tmp/calls").out;
     for (const char* szStep : {"nft -f -", "ip link delete dev lbr0", "ip -4 address flush dev wlan0",
                                "ip link set dev wlan0 down", "iw dev wlan0 set type managed"}) {
       EXPECT_THAT(calls, HasSubstr(szStep)) << row.szProgram << row.szCalls;
     }
     Mend();
-    EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+    EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
     EXPECT_EQ(Left(), "");
   }
 }
 
 // Whoever disables the access point twice, since it failed once, cannot name its bridge any more.
 TEST_F(KitAccessPoint, IsTakenDownWithItsBridgeWhenNobodyNamesThat) {
-  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   Break("ip", "link delete");
   EXPECT_EQ(Script("restart wlan0 lbr0").status, 1);
   EXPECT_TRUE(fs::exists("/sys/class/net/lbr0"));
   Mend();
-  EXPECT_EQ(Script("restart wlan0 ''").output, "");
+  EXPECT_EQ(Script("restart wlan0 ''").out, "");
   EXPECT_EQ(Left(), "");
 }
 
 TEST_F(KitAccessPoint, IsTakenOutOfTheBridgeThatTheKernelHasItIn) {
-  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
-  ASSERT_EQ(RunInShell("rm /run/rc.network/bridge-wlan0; ip link set dev wlan0 master lbr0").output, "");
-  EXPECT_EQ(Script("restart wlan0").output, "");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  ASSERT_EQ(RunInShell("rm /run/rc.network/bridge-wlan0; ip link set dev wlan0 master lbr0").out, "");
+  EXPECT_EQ(Script("restart wlan0").out, "");
   EXPECT_EQ(Left(), "");
 }
 
 TEST_F(KitAccessPoint, LeavesABridgeThatIsNoneOfTheFilesAsItIs) {
-  ASSERT_EQ(RunInShell("ip link add other type bridge && ip link set dev wlan0 master other").output, "");
-  EXPECT_EQ(Script("restart wlan0").output, "");
+  ASSERT_EQ(RunInShell("ip link add other type bridge && ip link set dev wlan0 master other").out, "");
+  EXPECT_EQ(Script("restart wlan0").out, "");
   EXPECT_TRUE(fs::exists("/sys/class/net/other"));
 }
 
 TEST_F(KitAccessPoint, LeavesNothingInTheBridgeThatItMovesFrom) {
-  Write("/etc/sysconfig/network-scripts/ifcfg-abr0",
-        "DEVICE=abr0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT="
-        "yes\n");
-  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
-  ASSERT_EQ(Script("start wlan0 abr0").output, "");
+  WriteText("/etc/sysconfig/network-scripts/ifcfg-abr0",
+            "DEVICE=abr0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT="
+            "yes\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  ASSERT_EQ(Script("start wlan0 abr0").out, "");
   EXPECT_FALSE(fs::exists("/sys/class/net/lbr0"));
   EXPECT_EQ(Daemons(), "hostapd\n");
-  EXPECT_EQ(Script("restart wlan0 ''").output, "");
+  EXPECT_EQ(Script("restart wlan0 ''").out, "");
   EXPECT_TRUE(fs::exists("/sys/class/net/abr0/brif/eth0"));
 }
 
@@ -187,8 +187,8 @@ TEST_F(KitAccessPoint, LeavesNothingWhenASignalEndsItsStart) {
       const Ran ran = Run("bash -c 'set -m; /etc/rc.network start wlan0 lbr0 & until grep -q \"^" + where +
                           " \" /tmp/calls 2>/dev/null; do sleep 0.02; done; kill -s " + row.szSignal + " -- " + szWhom +
                           "; wait $!; echo status $?'");
-      EXPECT_THAT(ran.output, HasSubstr("status 1\n")) << row.szSignal << szWhom << where;
-      EXPECT_THAT(ran.output, HasSubstr("rc.network: ")) << row.szSignal << szWhom << where;
+      EXPECT_THAT(ran.out, HasSubstr("status 1\n")) << row.szSignal << szWhom << where;
+      EXPECT_THAT(ran.out, HasSubstr("rc.network: ")) << row.szSignal << szWhom << where;
       EXPECT_EQ(Left(), "") << row.szSignal << szWhom << where;
     }
   }
@@ -196,49 +196,49 @@ TEST_F(KitAccessPoint, LeavesNothingWhenASignalEndsItsStart) {
 
 // Guests came on the air when their hour struck between their rules, which there were none of yet, and their network.
 TEST_F(KitAccessPoint, AsksOnceWhetherThereAreGuests) {
-  Write("/usr/mero/etc/wireless_ap.conf",
-        "[RT [5370]\n\tguest_net_sched_enable=1\n\tguest_net_sched=0" + std::string(167, '1') + "\n");
-  Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
-  Write("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  WriteText("/usr/mero/etc/wireless_ap.conf",
+            "[RT [5370]\n\tguest_net_sched_enable=1\n\tguest_net_sched=0" + std::string(167, '1') + "\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
   Install("date", "if [ -e /tmp/struck ]; then echo 0 01; else >/tmp/struck; echo 0 00; fi\n");
-  EXPECT_EQ(Script("start wlan0 lbr0").output, "");
-  EXPECT_EQ(RunInShell("grep -c gwlan /run/rc.network/hostapd-wlan0.conf").output, "0\n");
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(RunInShell("grep -c gwlan /run/rc.network/hostapd-wlan0.conf").out, "0\n");
 
-  EXPECT_EQ(Script("start wlan0 lbr0").output, "");
-  EXPECT_EQ(RunInShell("grep -c gwlan /run/rc.network/hostapd-wlan0.conf").output, "1\n");
-  EXPECT_THAT(RunInShell("cat /tmp/rules").output, HasSubstr("chain guest-forward"));
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(RunInShell("grep -c gwlan /run/rc.network/hostapd-wlan0.conf").out, "1\n");
+  EXPECT_THAT(RunInShell("cat /tmp/rules").out, HasSubstr("chain guest-forward"));
   EXPECT_TRUE(fs::exists("/sys/class/net/gbr"));
-  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
   EXPECT_EQ(Left(), "");
 }
 
 // The access point was off from the hour on in which its start for the guests had failed.
 TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
-  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
-  Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
-  Write("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
   BreakOnce("nft");
-  EXPECT_EQ(Script("schedule wlan0").output, "rc.network: cannot set the rules between networks: nft is broken\n");
+  EXPECT_EQ(Script("schedule wlan0").out, "rc.network: cannot set the rules between networks: nft is broken\n");
   EXPECT_EQ(Daemons(), "");
-  EXPECT_EQ(Script("schedule wlan0").output, "");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
   EXPECT_EQ(Daemons(), "dnsmasq\ndnsmasq\nhostapd\n");
-  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+  EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
 
   // One that is ended meanwhile stays off.
-  ASSERT_EQ(Script("start wlan0 lbr0").output, "");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   BreakOnce("nft");
   EXPECT_EQ(Script("schedule wlan0").status, 1);
-  EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
-  EXPECT_EQ(Script("schedule wlan0").output, "");
+  EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
   EXPECT_EQ(Left(), "");
 }
 
 // What was made had the mode that the caller's umask left it.
 TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
-  Write("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nwpa_psk_file=/etc/hostapd.psk\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nwpa_psk_file=/etc/hostapd.psk\n");
   for (const char* szUmask : {"000", "077", "022"}) {
-    EXPECT_EQ(Run(std::string("sh -c 'umask ") + szUmask + "; /etc/rc.network start wlan0 lbr0'").output, "");
-    EXPECT_EQ(RunInShell("stat -Lc '%a %n' /run/rc.network /run/rc.network/* /etc/hostapd.psk").output,
+    EXPECT_EQ(Run(std::string("sh -c 'umask ") + szUmask + "; /etc/rc.network start wlan0 lbr0'").out, "");
+    EXPECT_EQ(RunInShell("stat -Lc '%a %n' /run/rc.network /run/rc.network/* /etc/hostapd.psk").out,
               "700 /run/rc.network\n"
               "600 /run/rc.network/bridge-wlan0\n"
               "644 /run/rc.network/dnsmasq-lbr0.pid\n"
@@ -249,7 +249,7 @@ TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
               "600 /run/rc.network/lock\n"
               "600 /etc/hostapd.psk\n")
         << szUmask;
-    EXPECT_EQ(Script("restart wlan0 lbr0").output, "");
+    EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
     RunInShell("rm -rf /run/rc.network /etc/hostapd.psk");
   }
 }
@@ -258,24 +258,24 @@ TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
 TEST_F(KitAccessPoint, IsNotOnTheAirOpenWhenItIsToBeProtected) {
   const std::string host = "/etc/hostapd/hostapd-wlan0-host.conf";
   const std::string guest = "/etc/hostapd/hostapd-wlan0-guest.conf";
-  Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
   const std::string open = "interface=wlan0\nssid=home\nauth_algs=1\n";
   const std::string openGuests = "bss=gwlan\nssid=visitors\n";
   for (const char* szLacking : {"auth_algs=3\nwep_default_key=0\n", "wpa=0\nwpa_key_mgmt=WPA-PSK\nwpa_passphrase=x\n",
                                 "wpa=4\nwpa_passphrase=x\n", "wpa=0\nwpa_key_mgmt=WPA-EAP\n"}) {
     for (const bool ofGuests : {false, true}) {
-      Write(host, ofGuests ? open : "interface=wlan0\nssid=home\n" + std::string(szLacking));
-      Write(guest, openGuests + (ofGuests ? szLacking : ""));
+      WriteText(host, ofGuests ? open : "interface=wlan0\nssid=home\n" + std::string(szLacking));
+      WriteText(guest, openGuests + (ofGuests ? szLacking : ""));
       const Ran ran = Script("start wlan0 lbr0");
       EXPECT_EQ(ran.status, 1) << szLacking;
-      EXPECT_THAT(ran.output, HasSubstr("a network would be open that is to be protected")) << szLacking;
+      EXPECT_THAT(ran.out, HasSubstr("a network would be open that is to be protected")) << szLacking;
       EXPECT_EQ(Left(), "") << szLacking;
     }
   }
   for (const char* szGood :
        {"", "wep_default_key=0\nwep_key0=\"abcde\"\n", "wpa=3\nwpa_passphrase=deux croissants\n"}) {
-    Write(host, open + szGood);
-    Write(guest, openGuests + szGood);
+    WriteText(host, open + szGood);
+    WriteText(guest, openGuests + szGood);
     EXPECT_EQ(Script("start wlan0 lbr0").status, 0) << szGood;
   }
 }
@@ -288,7 +288,7 @@ TEST_F(KitAccessPoint, IsEndedAlsoWhenItsPidFileIsEmpty) {
           "(exec -a \"hostapd $1\" /tmp/daemons/hostapd 60) >/dev/null 2>&1 &\necho $! | tee /tmp/started >$file\n");
   RunInShell("sed -i '1s|.*|#!/bin/bash|' /tmp/bin/hostapd");
   EXPECT_EQ(Script("start wlan0 lbr0").status, 0);
-  Write("/run/rc.network/hostapd-wlan0.pid", "");
+  WriteText("/run/rc.network/hostapd-wlan0.pid", "");
   Script("restart wlan0 lbr0");
   EXPECT_NE(RunInShell("grep -v Z /proc/$(cat /tmp/started)/stat").status, 0);
   EXPECT_EQ(Left(), "");
@@ -303,16 +303,16 @@ TEST_F(KitAccessPoint, IsNotEndedByAnotherNetworksScript) {
   EXPECT_EQ(other.status, 0);
   EXPECT_EQ(Script("start wlan0 lbr0").status, 0);
   EXPECT_EQ(Script("restart wlan0 lbr0").status, 0);
-  EXPECT_EQ(RunInShell("grep -c '^State:.S' /proc/$(cat /tmp/other)/status; kill $(cat /tmp/other)").output, "1\n");
+  EXPECT_EQ(RunInShell("grep -c '^State:.S' /proc/$(cat /tmp/other)/status; kill $(cat /tmp/other)").out, "1\n");
 }
 
 // The bridge of an access point that had been switched off came up at every boot.
 TEST_F(KitAccessPoint, HasNoBridgeAtBootWhileItIsSwitchedOff) {
   SetBridge("NAT=yes\nPRIMARY=wlan0");
-  Write("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
   EXPECT_EQ(Script("boot").status, 0);
   EXPECT_FALSE(fs::exists("/sys/class/net/lbr0"));
-  Write("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
   EXPECT_EQ(Script("boot").status, 0);
   EXPECT_TRUE(fs::exists("/sys/class/net/lbr0"));
 }
@@ -332,7 +332,7 @@ TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhenItsDaemonHasEnded) {
 TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhicheverNoteCouldNotBeRemoved) {
   StandIn("rm", "exec /bin/rm \"$@\"\n");
   for (const char* szNote : {"wire-lbr0", "late-wlan0"}) {
-    Write("/run/rc.network/late-wlan0", "");
+    WriteText("/run/rc.network/late-wlan0", "");
     BreakOnce("rm", szNote);
     EXPECT_EQ(Script("schedule wlan0").status, 1) << szNote;
     EXPECT_EQ(Daemons(), "") << szNote;
@@ -345,8 +345,8 @@ TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhicheverNoteCouldNotBeRemoved)
 // In another language the state directory was taken for somebody else's, at every run.
 TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
   const std::string german = "LC_ALL=C.UTF-8 LANGUAGE=de PATH=/tmp/bin:$PATH /etc/rc.network ";
-  EXPECT_EQ(RunInShell(german + "start wlan0 lbr0").output, "");
-  EXPECT_EQ(RunInShell(german + "restart wlan0 lbr0").output, "");
+  EXPECT_EQ(RunInShell(german + "start wlan0 lbr0").out, "");
+  EXPECT_EQ(RunInShell(german + "restart wlan0 lbr0").out, "");
   EXPECT_EQ(Left(), "");
 }
 
@@ -355,29 +355,29 @@ TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
 TEST_F(KitAccessPoint, LeavesTheWireAsItWasWhenItFailsAndTakesItsRoutesAlongWhenItDoesNot) {
   ASSERT_EQ(RunInShell("ip address add 192.0.2.9/24 dev eth0; ip link set eth0 up; ip link set wire up; "
                        "ip route add default via 192.0.2.1 metric 7; ip route add 198.51.100.0/24 via 192.0.2.2")
-                .output,
+                .out,
             "");
   const std::string ways = "ip -4 -brief address show up | grep -v ^lo; ip -4 route";
-  const std::string before = RunInShell(ways).output;
-  Write(
+  const std::string before = RunInShell(ways).out;
+  WriteText(
       "/etc/sysconfig/network-scripts/ifcfg-br0",
       "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.9\nNETMASK=255.255.255.0\nONBOOT=yes\n");
   Break("hostapd");
   const Ran failed = Script("start wlan0 br0");
   EXPECT_EQ(failed.status, 1);
-  EXPECT_THAT(failed.output, StartsWith("rc.network: cannot start the access point on wlan0"));
-  EXPECT_EQ(RunInShell(ways).output, before);
+  EXPECT_THAT(failed.out, StartsWith("rc.network: cannot start the access point on wlan0"));
+  EXPECT_EQ(RunInShell(ways).out, before);
   EXPECT_FALSE(fs::exists("/sys/class/net/br0"));
-  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").output, "");
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").out, "");
 
   Mend();
-  EXPECT_EQ(Script("start wlan0 br0").output, "");
-  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").output, "192.0.2.9/24\n");
-  EXPECT_THAT(RunInShell("ip -4 route").output, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
-  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").output, "");
+  EXPECT_EQ(Script("start wlan0 br0").out, "");
+  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").out, "192.0.2.9/24\n");
+  EXPECT_THAT(RunInShell("ip -4 route").out, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").out, "");
   Break("hostapd");
   EXPECT_EQ(Script("start wlan0 br0").status, 1);
-  EXPECT_THAT(RunInShell("ip -4 route").output, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_THAT(RunInShell("ip -4 route").out, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
 }
 
 }  // namespace

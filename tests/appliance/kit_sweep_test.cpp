@@ -21,14 +21,14 @@ constexpr int kParts = 3;
 class KitSweep : public KitRadio, public testing::WithParamInterface<int> {
  protected:
   KitSweep() {
-    Write("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
-    Write("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
-    Write("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+    WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
+    WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+    WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
     // Other rules than the usual ones.
-    Write("/usr/mero/etc/wireless_ap.conf",
-          "[RT [5370]\n\tguest_net_internet_block=1\n\tguest_net_access_ds=1\n\tguest_net_sched_enable=1\n"
-          "\tguest_net_sched=0" +
-              std::string(167, '1') + "\n");
+    WriteText("/usr/mero/etc/wireless_ap.conf",
+              "[RT [5370]\n\tguest_net_internet_block=1\n\tguest_net_access_ds=1\n\tguest_net_sched_enable=1\n"
+              "\tguest_net_sched=0" +
+                  std::string(167, '1') + "\n");
     Install("sleep", "exec /usr/bin/sleep 0.01\n");
     Install("date", "read -r hour </tmp/hour; echo 0 $hour\n");
     StandIn("hostapd", Daemon("hostapd", "-P") +
@@ -36,8 +36,7 @@ class KitSweep : public KitRadio, public testing::WithParamInterface<int> {
                            "grep -q ^bss=gwlan /run/rc.network/hostapd-wlan0.conf || exit 0\n"
                            "/usr/sbin/ip link add gwlan type veth peer name gair\n");
     fs::create_directories("/tmp/counted");
-    Write("/tmp/counted/tool", R"(#!/bin/sh
-name=${0##*/} n=0
+    WriteScript("/tmp/counted/tool", R"(name=${0##*/} n=0
 case $PATH in
 /tmp/counted:*) ;;
 *) exec "/tmp/uncounted/$name" "$@" ;; # outside of the sweep
@@ -53,7 +52,6 @@ if [ $n -eq $turn ]; then
 fi
 exec "$name" "$@"
 )");
-    ::chmod("/tmp/counted/tool", 0755);
     for (const char* szTool : kTools) fs::create_symlink("tool", std::string("/tmp/counted/") + szTool);
     // The scripts name it by its path.
     fs::create_directories("/tmp/uncounted");
@@ -63,7 +61,7 @@ exec "$name" "$@"
     Hour("01");
   }
 
-  static void Hour(const char* szHour) { Write("/tmp/hour", std::string(szHour) + "\n"); }
+  static void Hour(const char* szHour) { WriteText("/tmp/hour", std::string(szHour) + "\n"); }
 
   // Everything that a start makes, and leaves, but for the guests' interface, which is the daemon's own.
   static std::string State() {
@@ -75,18 +73,18 @@ exec "$name" "$@"
                "/tmp/wireless.info; "
                "stat -c '%n %a %u' /run/rc.network /run/rc.network/* /tmp/wireless* /etc/hostapd/* | grep "
                "-v 'leases\\|lock'")
-               .output;
+               .out;
   }
 
   static Ran RunWithTurn(int turn, const std::string& words) {
-    Write("/tmp/count", "");
-    Write("/tmp/turn", std::to_string(turn) + "\n");
+    WriteText("/tmp/count", "");
+    WriteText("/tmp/turn", std::to_string(turn) + "\n");
     fs::remove("/tmp/failed");
     return RunInShell("PATH=/tmp/counted:$PATH " + words);
   }
 
-  static std::string Failed() { return RunInShell("cat /tmp/failed 2>/dev/null").output; }
-  static bool Reached(int turn) { return std::stoi(RunInShell("wc -l </tmp/count").output) >= turn; }
+  static std::string Failed() { return RunInShell("cat /tmp/failed 2>/dev/null").out; }
+  static bool Reached(int turn) { return std::stoi(RunInShell("wc -l </tmp/count").out) >= turn; }
 
   // The sweep of a command that leads from one state to another, with a failure to one of the states that are whole.
   // From each of those the command is seen to mend it, once: the state is the same. How many failures there were.
@@ -102,25 +100,25 @@ exec "$name" "$@"
       const std::string failed = Failed();
       state = State();
       if (failed.empty()) {
-        EXPECT_EQ(ran.status, 0) << ran.output;
-        EXPECT_EQ(state, to) << "turn " << turn << "\n" << ran.output;
+        EXPECT_EQ(ran.status, 0) << ran.out;
+        EXPECT_EQ(state, to) << "turn " << turn << "\n" << ran.out;
         if (HasFailure() || !Reached(turn)) return failures;
         continue;
       }
       ++failures;
       if (ran.status == 0) {
-        EXPECT_EQ(state, to) << failed << ran.output;
+        EXPECT_EQ(state, to) << failed << ran.out;
         continue;
       }
-      EXPECT_NE(ran.output, "") << failed;
-      EXPECT_TRUE(std::find(whole.begin(), whole.end(), state) != whole.end()) << failed << ran.output << state;
+      EXPECT_NE(ran.out, "") << failed;
+      EXPECT_TRUE(std::find(whole.begin(), whole.end(), state) != whole.end()) << failed << ran.out << state;
       if (HasFailure()) return failures;
       if (std::find(mended.begin(), mended.end(), state) != mended.end()) continue;
       mended.push_back(state);
       const Ran again = Run(words);
-      EXPECT_EQ(again.status, 0) << failed << again.output;
+      EXPECT_EQ(again.status, 0) << failed << again.out;
       state = State();
-      EXPECT_EQ(state, to) << failed << again.output;
+      EXPECT_EQ(state, to) << failed << again.out;
     }
   }
 };
@@ -133,12 +131,12 @@ class KitSweepOfAccessPoint : public KitSweep {
  protected:
   KitSweepOfAccessPoint() {
     Hour("00");
-    EXPECT_EQ(Run(kStart).output, "");
+    EXPECT_EQ(Run(kStart).out, "");
     main_ = State();
     Hour("01");
-    EXPECT_EQ(Run(kStart).output, "");
+    EXPECT_EQ(Run(kStart).out, "");
     on_ = State();
-    EXPECT_EQ(Run(kRestart).output, "");
+    EXPECT_EQ(Run(kRestart).out, "");
     off_ = State();
   }
 
@@ -178,15 +176,15 @@ TEST_P(KitSweepOfAccessPoint, RemovalOfItsAdapter) {
   const std::string remove = "/usr/mero/hotplug/usb.wireless.function remove";
   const auto pull = [] {
     RunInShell("ip link show wlan0 || ip link add wlan0 type veth peer name air");
-    Write("/tmp/wireless.info", "PRODUCT=\"RT [5370\"\n");
+    WriteText("/tmp/wireless.info", "PRODUCT=\"RT [5370\"\n");
     Run(kStart);
     RunInShell("ip link delete wlan0");
   };
   pull();
   const std::string pulled = State();
-  EXPECT_EQ(Run(kRestart).output, "");
+  EXPECT_EQ(Run(kRestart).out, "");
   const std::string ended = State();  // and still noted
-  EXPECT_EQ(Run(remove).output, "");
+  EXPECT_EQ(Run(remove).out, "");
   const std::string removed = State();
   const int failures = Sweep(remove, pulled, pull, removed, {ended, removed});
   std::printf("%d commands failed\n", failures);
@@ -194,10 +192,10 @@ TEST_P(KitSweepOfAccessPoint, RemovalOfItsAdapter) {
 }
 
 TEST_P(KitSweep, Boot) {
-  Write("/etc/sysconfig/network-scripts/ifcfg-abr0",
-        "TYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT=yes\n");
+  WriteText("/etc/sysconfig/network-scripts/ifcfg-abr0",
+            "TYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT=yes\n");
   const std::string boot = "/etc/rc.network boot";
-  ASSERT_EQ(Run(boot).output, "");
+  ASSERT_EQ(Run(boot).out, "");
   const std::string up = State();
   int failures = 0;
   for (int turn = GetParam(); turn == GetParam() || Reached(turn - kParts); turn += kParts) {
@@ -206,14 +204,14 @@ TEST_P(KitSweep, Boot) {
     if (Failed().empty()) continue;
     ++failures;
     if (ran.status == 0) {
-      EXPECT_EQ(State(), up) << Failed() << ran.output;
+      EXPECT_EQ(State(), up) << Failed() << ran.out;
       continue;
     }
-    EXPECT_NE(ran.output, "") << Failed();
+    EXPECT_NE(ran.out, "") << Failed();
     // Of two bridges, one at most is not as it should be, unless nothing was begun.
-    const std::string made = RunInShell("ip -brief -4 address show up | grep -cE '^[al]br0 .*/24'").output;
-    EXPECT_TRUE(made == "1\n" || made == "2\n" || !fs::exists("/sys/class/net/abr0")) << Failed() << ran.output << made;
-    EXPECT_EQ(Run(boot).output, "") << Failed();
+    const std::string made = RunInShell("ip -brief -4 address show up | grep -cE '^[al]br0 .*/24'").out;
+    EXPECT_TRUE(made == "1\n" || made == "2\n" || !fs::exists("/sys/class/net/abr0")) << Failed() << ran.out << made;
+    EXPECT_EQ(Run(boot).out, "") << Failed();
     EXPECT_EQ(State(), up) << Failed();
   }
   std::printf("%d commands failed\n", failures);

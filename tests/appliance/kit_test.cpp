@@ -3,7 +3,6 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <sys/stat.h>
 
 #include <filesystem>
 #include <string>
@@ -21,7 +20,7 @@ TEST_F(Kit, TakesNamesOfInterfacesOnly) {
   for (const char* szBad : {"../x", "a b", "a/b", ".", "..", "-x", "1234567890123456", "a;b", "a\nb"}) {
     const Ran ran = RunInParts("expect_name '" + std::string(szBad) + "'");
     EXPECT_EQ(ran.status, 1) << szBad;
-    EXPECT_THAT(ran.output, HasSubstr("is no name of an interface"));
+    EXPECT_THAT(ran.out, HasSubstr("is no name of an interface"));
   }
 }
 
@@ -38,7 +37,7 @@ TEST_F(Kit, LeavesOutWhatTheCardCannotDo) {
       {"", ""},  // no 802.11n at all
   };
   for (const auto& row : rows) {
-    Write("/tmp/conf", "ieee80211n=1\nht_capab=" + all + "\nrequire_ht=1\n");
+    WriteText("/tmp/conf", "ieee80211n=1\nht_capab=" + all + "\nrequire_ht=1\n");
     const std::string card = "ht_capabilities() { echo " + std::string(row.szBits) + "; }; ";
     EXPECT_EQ(Tells(card + "sed \"$(what_is_unable wlan0 1)\" /tmp/conf"), row.left) << row.szBits;
   }
@@ -66,17 +65,17 @@ TEST_F(Kit, FindsTheLineInWhichADaemonSaysWhy) {
       {"only this\n\n", "only this\n"},
   };
   for (const auto& row : rows) {
-    Write("/tmp/log", row.szLog);
+    WriteText("/tmp/log", row.szLog);
     EXPECT_EQ(Tells("reason_in /tmp/log"), row.szReason);
   }
-  Write("/tmp/log", "");
+  WriteText("/tmp/log", "");
   EXPECT_EQ(Tells("reason_in /tmp/log 'hostapd: unable to do it'"), "hostapd: unable to do it\n");
 }
 
 TEST_F(Kit, FollowsAScheduleByTheHourOfTheWeek) {
   const auto is_off = [](const std::string& hours, const char* szSwitch, const char* szDay, const char* szHour) {
-    Write("/usr/mero/etc/wireless_ap.conf",
-          std::string("[RT [5370]\n\twifi_sched=") + hours + "\n\twifi_sched_enabled=" + szSwitch);
+    WriteText("/usr/mero/etc/wireless_ap.conf",
+              std::string("[RT [5370]\n\twifi_sched=") + hours + "\n\twifi_sched_enabled=" + szSwitch);
     Install("date", std::string("echo ") + szDay + " " + szHour + "\n");
     return RunInParts("is_off_now wifi_sched_enabled wifi_sched").status == 0;
   };
@@ -105,7 +104,7 @@ TEST_F(Kit, EndsADaemonOnlyWhenItIsStillTheOneOfItsPidFile) {
   EXPECT_EQ(Tells(runs + "end_daemon sleep /tmp/pid; ! kill -0 $running 2>/dev/null"), "");
   EXPECT_FALSE(fs::exists("/tmp/pid"));
   for (const char* szText : {"", "no number\n", "-1\n", "999999999\n"}) {
-    Write("/tmp/pid", szText);
+    WriteText("/tmp/pid", szText);
     EXPECT_EQ(Tells("end_daemon sleep /tmp/pid"), "") << szText;
   }
   EXPECT_EQ(Tells("end_daemon sleep /tmp/missing"), "");
@@ -113,18 +112,16 @@ TEST_F(Kit, EndsADaemonOnlyWhenItIsStillTheOneOfItsPidFile) {
 
 TEST_F(Kit, ReplacesAFileThatOnlyRootMayRead) {
   EXPECT_EQ(Tells("echo secret | put /tmp/secret"), "");
-  struct stat status;
-  ASSERT_EQ(::stat("/tmp/secret", &status), 0);
-  EXPECT_EQ(status.st_mode & 0777, 0600u);
+  EXPECT_EQ(ModeOf("/tmp/secret"), 0600u);
   const Ran ran = RunInParts("echo secret | put /tmp/missing/secret");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.output, HasSubstr("cannot write /tmp/missing/secret"));
+  EXPECT_THAT(ran.out, HasSubstr("cannot write /tmp/missing/secret"));
 }
 
 TEST_F(Kit, GivesGuestsTheRulesThatAreSet) {
   Install("ip", "echo '198.51.100.0/24 dev eth0'\n");
   const auto rules = [](const std::string& settings) {
-    Write("/usr/mero/etc/wireless_ap.conf", "[RT [5370]\n" + settings);
+    WriteText("/usr/mero/etc/wireless_ap.conf", "[RT [5370]\n" + settings);
     return Tells("guest_rules");
   };
   const std::string usual = rules("");
@@ -141,21 +138,21 @@ TEST_F(Kit, GivesGuestsTheRulesThatAreSet) {
 }
 
 TEST_F(Kit, MakesTheBridgesThatComeUpAtBoot) {
-  ASSERT_EQ(RunInShell("ip link add eth0 type veth peer name eth1 && ip address add 192.0.2.9/24 dev eth0").output, "");
+  ASSERT_EQ(RunInShell("ip link add eth0 type veth peer name eth1 && ip address add 192.0.2.9/24 dev eth0").out, "");
   const std::string scripts = "/etc/sysconfig/network-scripts/ifcfg-";
-  Write(scripts + "br0",
-        "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\n"
-        "ONBOOT=yes\nHWADDR=02:00:00:00:00:07\n");
-  Write(scripts + "br1", "DEVICE=br1\nTYPE=Bridge\nBOOTPROTO=static\nONBOOT=no\n");
-  Write(scripts + "eth1", "DEVICE=eth1\nONBOOT=yes\n");
+  WriteText(scripts + "br0",
+            "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\n"
+            "ONBOOT=yes\nHWADDR=02:00:00:00:00:07\n");
+  WriteText(scripts + "br1", "DEVICE=br1\nTYPE=Bridge\nBOOTPROTO=static\nONBOOT=no\n");
+  WriteText(scripts + "eth1", "DEVICE=eth1\nONBOOT=yes\n");
   for (int round = 0; round < 2; ++round) {
     const Ran ran = RunInShell("/etc/rc.network boot");
-    EXPECT_EQ(ran.status, 0) << ran.output;
-    EXPECT_EQ(ran.output, "");
-    EXPECT_EQ(RunInShell("ls /sys/class/net/br0/brif").output, "eth0\n");
-    EXPECT_EQ(RunInShell("ip -brief -4 address show br0 | awk '{ print $1, $3 }'").output, "br0 192.0.2.1/24\n");
-    EXPECT_EQ(RunInShell("ip -brief link show br0 | awk '{ print $3 }'").output, "02:00:00:00:00:07\n");
-    EXPECT_EQ(RunInShell("ip -brief -4 address show eth0 | awk '{ print $3 }'").output, "");
+    EXPECT_EQ(ran.status, 0) << ran.out;
+    EXPECT_EQ(ran.out, "");
+    EXPECT_EQ(RunInShell("ls /sys/class/net/br0/brif").out, "eth0\n");
+    EXPECT_EQ(RunInShell("ip -brief -4 address show br0 | awk '{ print $1, $3 }'").out, "br0 192.0.2.1/24\n");
+    EXPECT_EQ(RunInShell("ip -brief link show br0 | awk '{ print $3 }'").out, "02:00:00:00:00:07\n");
+    EXPECT_EQ(RunInShell("ip -brief -4 address show eth0 | awk '{ print $3 }'").out, "");
     EXPECT_FALSE(fs::exists("/sys/class/net/br1"));
   }
 }
@@ -166,24 +163,24 @@ TEST_F(Kit, KeepsTheRoutesOfABridgeThatIsThereAlready) {
   const std::string text = "DEVICE=br0\nTYPE=Bridge\nBOOTPROTO=static\nNETMASK=255.255.255.0\nONBOOT=yes\nIPADDR=";
   const std::string routes = "ip -4 route show dev br0 | sed 's/ *$//'";
   const std::string addresses = "ip -brief -4 address show br0 | awk '{ $1 = $2 = \"\"; print $0 }'";
-  Write(file, text + "192.0.2.1\n");
-  ASSERT_EQ(RunInShell("/etc/rc.network boot").output, "");
-  ASSERT_EQ(RunInShell("ip route add default via 192.0.2.254").output, "");
-  const std::string before = RunInShell(routes).output;
+  WriteText(file, text + "192.0.2.1\n");
+  ASSERT_EQ(RunInShell("/etc/rc.network boot").out, "");
+  ASSERT_EQ(RunInShell("ip route add default via 192.0.2.254").out, "");
+  const std::string before = RunInShell(routes).out;
   ASSERT_THAT(before, StartsWith("default via 192.0.2.254"));
 
-  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
-  EXPECT_EQ(RunInShell(routes).output, before);
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").out, "");
+  EXPECT_EQ(RunInShell(routes).out, before);
 
   // Another address than the file's goes, whichever was there first.
   for (const char* szOther : {"192.0.2.7/24", "192.0.2.1/16", "198.51.100.1/24"}) {
-    ASSERT_EQ(RunInShell(std::string("ip address add dev br0 ") + szOther).output, "");
-    EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
-    EXPECT_EQ(RunInShell(addresses).output, "  192.0.2.1/24\n") << szOther;
+    ASSERT_EQ(RunInShell(std::string("ip address add dev br0 ") + szOther).out, "");
+    EXPECT_EQ(RunInShell("/etc/rc.network boot").out, "");
+    EXPECT_EQ(RunInShell(addresses).out, "  192.0.2.1/24\n") << szOther;
   }
-  Write(file, text + "192.0.2.2\n");
-  EXPECT_EQ(RunInShell("/etc/rc.network boot").output, "");
-  EXPECT_EQ(RunInShell(addresses).output, "  192.0.2.2/24\n");
+  WriteText(file, text + "192.0.2.2\n");
+  EXPECT_EQ(RunInShell("/etc/rc.network boot").out, "");
+  EXPECT_EQ(RunInShell(addresses).out, "  192.0.2.2/24\n");
 }
 
 TEST_F(Kit, SaysWhyABridgeCannotBeMade) {
@@ -196,10 +193,10 @@ TEST_F(Kit, SaysWhyABridgeCannotBeMade) {
       {"BOOTPROTO=static\nHWADDR=01:00:00:00:00:00\n", "cannot give br0 the address 01:00:00:00:00:00"},
   };
   for (const auto& row : rows) {
-    Write(scripts + "br0", std::string("DEVICE=br0\nTYPE=Bridge\nONBOOT=yes\n") + row.szText);
+    WriteText(scripts + "br0", std::string("DEVICE=br0\nTYPE=Bridge\nONBOOT=yes\n") + row.szText);
     const Ran ran = RunInShell("/etc/rc.network boot");
     EXPECT_EQ(ran.status, 1);
-    EXPECT_THAT(ran.output, StartsWith("rc.network: " + std::string(row.szReason)));
+    EXPECT_THAT(ran.out, StartsWith("rc.network: " + std::string(row.szReason)));
   }
 }
 
@@ -208,12 +205,12 @@ TEST_F(Kit, RefusesWrongWordsWithItsUsage) {
        {"", "start", "start wlan0", "start wlan0 lbr0 more", "restart", "boot wlan0", "schedule", "begin wlan0 lbr0"}) {
     const Ran ran = RunInShell("/etc/rc.network " + std::string(szWords));
     EXPECT_EQ(ran.status, 2) << szWords;
-    EXPECT_THAT(ran.output, StartsWith("usage: rc.network start INTERFACE BRIDGE")) << szWords;
+    EXPECT_THAT(ran.out, StartsWith("usage: rc.network start INTERFACE BRIDGE")) << szWords;
   }
   for (const char* szWords : {"", "change-mode", "change-mode both", "add wlan0", "plug"}) {
     const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function " + std::string(szWords));
     EXPECT_EQ(ran.status, 2) << szWords;
-    EXPECT_THAT(ran.output, StartsWith("usage: usb.wireless.function add")) << szWords;
+    EXPECT_THAT(ran.out, StartsWith("usage: usb.wireless.function add")) << szWords;
   }
 }
 
@@ -223,11 +220,11 @@ TEST_F(Kit, TellsItsUsageWithoutAnythingElse) {
   for (const char* szWord : {"help", "-h", "--help"}) {
     const Ran ran = RunInShell(std::string("PATH=/tmp/bin:$PATH /etc/rc.network ") + szWord);
     EXPECT_EQ(ran.status, 0) << szWord;
-    EXPECT_THAT(ran.output, StartsWith("usage: rc.network start INTERFACE BRIDGE")) << szWord;
+    EXPECT_THAT(ran.out, StartsWith("usage: rc.network start INTERFACE BRIDGE")) << szWord;
   }
   const Ran ran = RunInShell("PATH=/tmp/bin:$PATH /etc/rc.network boot");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.output, HasSubstr("rc.network: cannot make /var/run/rc.network"));
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: cannot make /var/run/rc.network"));
 }
 
 TEST_F(Kit, SaysThatAnotherRunTakesTooLong) {
@@ -236,8 +233,8 @@ TEST_F(Kit, SaysThatAnotherRunTakesTooLong) {
   const std::string locked = "PATH=/tmp/bin:$PATH; /etc/rc.network boot; exec 9>/var/run/rc.network/lock; ";
   const Ran late = RunInShell(locked + "/usr/bin/flock 9; /etc/rc.network boot 9>&-");
   EXPECT_EQ(late.status, 1);
-  EXPECT_EQ(late.output, "rc.network: another run takes too long, and holds /var/run/rc.network/lock\n");
-  EXPECT_EQ(RunInShell("cat /tmp/logged").output,
+  EXPECT_EQ(late.out, "rc.network: another run takes too long, and holds /var/run/rc.network/lock\n");
+  EXPECT_EQ(RunInShell("cat /tmp/logged").out,
             "-t rc.network -p daemon.err -- another run takes too long, and holds /var/run/rc.network/lock\n");
   EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH; /etc/rc.network boot").status, 0);
 }
@@ -246,11 +243,11 @@ TEST_F(Kit, SaysThatThereIsNoAdapter) {
   for (const char* szWords : {"add", "change-mode ap", "change-mode client"}) {
     const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function " + std::string(szWords));
     EXPECT_EQ(ran.status, 1) << szWords;
-    EXPECT_EQ(ran.output, "usb.wireless.function: no adapter is plugged in\n") << szWords;
+    EXPECT_EQ(ran.out, "usb.wireless.function: no adapter is plugged in\n") << szWords;
   }
   const Ran ran = RunInShell("/etc/rc.network start wlan0 lbr0");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_EQ(ran.output, "rc.network: there is no interface 'wlan0'\n");
+  EXPECT_EQ(ran.out, "rc.network: there is no interface 'wlan0'\n");
 }
 
 // With guests on the air, the adapter was taken to be their interface: changing to client mode left the main network on
@@ -269,8 +266,8 @@ TEST_F(Kit, TakesNoGuestsInterfaceForTheAdapter) {
 
 TEST_F(Kit, ForgetsAnAdapterThatWasPulled) {
   const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function remove");
-  EXPECT_EQ(ran.status, 0) << ran.output;
-  EXPECT_EQ(RunInShell("stat -c '%s %a' /tmp/wireless.info").output, "0 644\n");
+  EXPECT_EQ(ran.status, 0) << ran.out;
+  EXPECT_EQ(RunInShell("stat -c '%s %a' /tmp/wireless.info").out, "0 644\n");
 }
 
 }  // namespace

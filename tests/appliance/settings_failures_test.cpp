@@ -44,9 +44,9 @@ void ExpectEveryQuestionToEndTheScript(const std::string& why) {
   Install("ip", "case $* in *show*) ;; *) touch /tmp/addresses-are-set ;; esac\n");
   for (const std::string question : kQuestions) {
     const Ran ran = RunInParts(question + "\necho went on");
-    EXPECT_EQ(ran.status, 1) << question << " with " << why << "\n" << ran.output;
-    EXPECT_THAT(ran.output, HasSubstr("sh: cannot read settings: ")) << question << " with " << why;
-    EXPECT_THAT(ran.output, Not(HasSubstr("went on"))) << question << " with " << why;
+    EXPECT_EQ(ran.status, 1) << question << " with " << why << "\n" << ran.out;
+    EXPECT_THAT(ran.out, HasSubstr("sh: cannot read settings: ")) << question << " with " << why;
+    EXPECT_THAT(ran.out, Not(HasSubstr("went on"))) << question << " with " << why;
   }
   EXPECT_FALSE(fs::exists("/tmp/rules-are-set"));
   EXPECT_FALSE(fs::exists("/tmp/addresses-are-set"));
@@ -60,18 +60,18 @@ TEST_F(Settings, EndTheScriptWhereTheirReaderIsMissing) {
 TEST_F(Settings, EndTheScriptWhereTheirReaderFails) {
   for (const char* szFailure :
        {"exit 2", "kill -s SEGV $$", "kill -s KILL $$", "echo 1; exit 3", "echo yes; exit 126"}) {
-    Write("/usr/mero/sbin/mero-settings", "#!/bin/sh\n"s + szFailure + "\n");
+    WriteScript("/usr/mero/sbin/mero-settings", std::string(szFailure) + "\n");
     ExpectEveryQuestionToEndTheScript(szFailure);
   }
 }
 
 TEST_F(Settings, EndTheScriptWhereTheyAreNeitherOnNorOff) {
   for (const char* szAnswer : {"", "on", "\nyes"}) {
-    Write("/usr/mero/sbin/mero-settings", "#!/bin/sh\necho '"s + szAnswer + "'\n");
+    WriteScript("/usr/mero/sbin/mero-settings", "echo '"s + szAnswer + "'\n");
     for (const std::string question : {"! is_nat br0", "! comes_up_at_boot br0", "! is_on guest_net_lan_block"}) {
       const Ran ran = RunInParts(question + "\necho went on");
       EXPECT_EQ(ran.status, 1) << question;
-      EXPECT_THAT(ran.output, AllOf(HasSubstr("'"s + szAnswer + "'"), Not(HasSubstr("went on")))) << question;
+      EXPECT_THAT(ran.out, AllOf(HasSubstr("'"s + szAnswer + "'"), Not(HasSubstr("went on")))) << question;
     }
   }
 }
@@ -96,25 +96,25 @@ TEST_F(Settings, EndTheScriptWhereTheyCannotBeRead) {
     fs::create_directories(row.szPath);  // what root cannot read either
     const Ran ran = RunInParts(row.szQuestion + "\necho went on"s);
     EXPECT_EQ(ran.status, 1) << row.szQuestion;
-    EXPECT_THAT(ran.output,
+    EXPECT_THAT(ran.out,
                 AllOf(HasSubstr("mero-settings: cannot read "s + row.szPath + "; the system log has the reason\n"),
                       HasSubstr("sh: cannot read"), Not(HasSubstr("went on"))))
         << row.szQuestion;
     fs::remove_all(row.szPath);
-    Write("/tmp/wireless.info", "PRODUCT=\"RT [5370\"\n");
+    WriteText("/tmp/wireless.info", "PRODUCT=\"RT [5370\"\n");
   }
 }
 
 TEST_F(Settings, EndTheScriptsBeforeTheyActOnAnEmptyBridge) {
   const std::string script = "/etc/sysconfig/network-scripts/ifcfg-wlan0";
   fs::create_directories(script);
-  Write("/etc/hostapd/hostapd-wlan0.info", "enable=yes\n");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=yes\n");
   fs::remove("/etc/rc.network");
-  Write("/etc/rc.network", "#!/bin/sh\ntouch /tmp/ran\n");
+  WriteScript("/etc/rc.network", "touch /tmp/ran\n");
   ::chmod("/etc/rc.network", 0755);
   const Ran ran = RunInShell("/usr/mero/hotplug/usb.wireless.function remove");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.output, HasSubstr("cannot read settings: file " + script + " BRIDGE"));
+  EXPECT_THAT(ran.out, HasSubstr("cannot read settings: file " + script + " BRIDGE"));
   EXPECT_FALSE(fs::exists("/tmp/ran"));
 }
 

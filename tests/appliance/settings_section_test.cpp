@@ -57,13 +57,13 @@ TEST_F(Settings, OfEveryAdapterAreReadAsTheyWereSaved) {
       {"\n", "148f:5370"},
       {"", "148f:5370"},
   };
-  Write("/tmp/usb/idVendor", "148f\n");
-  Write("/tmp/usb/idProduct", "5370\n");
+  WriteText("/tmp/usb/idVendor", "148f\n");
+  WriteText("/tmp/usb/idProduct", "5370\n");
   Install("readlink", "[ \"$2\" = /sys/class/net/wlan7/device ] && echo /tmp/usb/device\n");
   fs::create_directories("/tmp/usb/device");
   int power = 0;
   for (const auto& row : rows) {
-    Write("/tmp/usb/product", row.product);
+    WriteText("/tmp/usb/product", row.product);
     ASSERT_EQ(Tells("note_adapter wlan7"), "") << Shortened(row.product);
 
     char szName[1024];
@@ -79,8 +79,8 @@ TEST_F(Settings, OfEveryAdapterAreReadAsTheyWereSaved) {
     EXPECT_EQ(read.txpower, power) << row.name;
     EXPECT_EQ(Tells("setting txpower"), std::to_string(power)) << row.name;
 
-    Write(kFile, row.name);
-    EXPECT_EQ(RunReader("section-name </tmp/file").output, row.name + "\n") << "it has one name only";
+    WriteText(kFile, row.name);
+    EXPECT_EQ(RunReader("section-name </tmp/file").out, row.name + "\n") << "it has one name only";
   }
   EXPECT_FALSE(fs::exists("/tmp/run"));
 }
@@ -89,8 +89,8 @@ TEST_F(Settings, OfAnAdapterWithoutANameAndNumbersAreNotMadeUp) {
   Install("readlink", "echo /tmp/none/device\n");
   const Ran ran = RunInParts("note_adapter wlan7");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.output, HasSubstr("the adapter wlan7 has neither a name nor numbers"));
-  EXPECT_THAT(RunInShell("cat /tmp/wireless.info").output, HasSubstr("RT [5370"));
+  EXPECT_THAT(ran.out, HasSubstr("the adapter wlan7 has neither a name nor numbers"));
+  EXPECT_THAT(RunInShell("cat /tmp/wireless.info").out, HasSubstr("RT [5370"));
 }
 
 // The adapter's section was made of what a command had not said, and guests got the rules of no settings.
@@ -98,8 +98,8 @@ TEST_F(Settings, OfAnAdapterThatCannotBeLookedAtAreNotMadeUp) {
   Install("readlink", "exit 1\n");
   const Ran ran = RunInParts("note_adapter wlan7");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.output, HasSubstr("cannot tell which adapter wlan7 is"));
-  EXPECT_THAT(RunInShell("cat /tmp/wireless.info").output, HasSubstr("RT [5370"));
+  EXPECT_THAT(ran.out, HasSubstr("cannot tell which adapter wlan7 is"));
+  EXPECT_THAT(RunInShell("cat /tmp/wireless.info").out, HasSubstr("RT [5370"));
 }
 
 }  // namespace

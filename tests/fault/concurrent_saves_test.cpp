@@ -109,7 +109,7 @@ TEST_F(SavesAtOnce, NeverShowAReaderAPartOfTheStore) {
   size_t least = 1;
   for (int reads = 0; crowd.busy() || reads == 0; ++reads) {
     crowd.Collect(WNOHANG);
-    const std::string text = ReadFile(kStore);
+    const std::string text = ReadText(kStore);
     size_t ends = 0;
     for (size_t at = 0; (at = text.find("\tENCRYPT=AES\n", at)) != std::string::npos; ++at) ++ends;
     size_t begins = 0;

@@ -1,10 +1,7 @@
 // Operations for which memory runs out, at each allocation that they make.
 #include "tests/fault/failing_memory.h"
 
-#include <search.h>
-
 #include <algorithm>
-#include <cstddef>
 #include <cstdlib>
 #include <filesystem>
 
@@ -12,6 +9,8 @@
 #include "tests/fault/saving.h"
 #include "tests/platform/containers.h"
 #include "tests/platform/platform_test.h"
+#include "tests/support/ring.h"
+#include "tests/support/shell.h"
 
 namespace {
 
@@ -20,14 +19,6 @@ using testing::IsEmpty;
 
 constexpr char kSettings[] = "/tmp/platform/settings";
 constexpr char kFormat[] = "\t%s=%s\n";
-
-void FreeList(WIRELESS_LIST& head) {
-  while (head.q_forw != &head) {
-    WIRELESS_LIST* node = head.q_forw;
-    ::remque(node);
-    std::free(reinterpret_cast<char*>(node) - offsetof(WIRELESS_NETWORK_CONFIG, list));
-  }
-}
 
 std::string Sections(int count) {
   std::string text;
@@ -40,14 +31,14 @@ class WithoutMemory : public PlatformTest {
   void SetUp() override {
     PlatformTest::SetUp();
     Prepare(Savings().front());
-    WriteFile(kSettings, Sections(100));
+    WriteText(kSettings, Sections(100));
   }
 
   // Runs an operation with each of its allocations failing. It must fail with `failure` and its one report, leave no
   // memory in use and the settings as they were. Ends when it makes no more allocations.
   template <class Operation>
   static void ExpectEachToFail(int failure, Operation operation) {
-    const std::string before = ReadFile(kSettings);
+    const std::string before = ReadText(kSettings);
     int n = 1;
     for (;; ++n) {
       const MemoryOutcome outcome = RunWithoutMemory(n, operation);
@@ -56,7 +47,7 @@ class WithoutMemory : public PlatformTest {
       EXPECT_EQ(outcome.result, failure) << "allocation " << n;
       EXPECT_EQ(PLIBCErrGet(), ERR_OUT_OF_MEMORY) << "allocation " << n;
       EXPECT_THAT(TakeLog(), ElementsAre(testing::Field(&LogLine::text, testing::EndsWith("Cannot allocate memory"))));
-      EXPECT_EQ(ReadFile(kSettings), before) << "allocation " << n;
+      EXPECT_EQ(ReadText(kSettings), before) << "allocation " << n;
       EXPECT_THAT(NamesIn(kDirectory), ElementsAre("settings")) << "allocation " << n;
       PLIBCErrSet(ERR_NONE);
     }
@@ -97,7 +88,7 @@ TEST_F(WithoutMemory, AHashStaysAsItWas) {
 
 // Who does not look at what setting a pair gave would have saved the rest as if it were all.
 TEST_F(WithoutMemory, AHashThatLacksAPairIsNotWritten) {
-  const std::string before = ReadFile(kSettings);
+  const std::string before = ReadText(kSettings);
   const auto lacking = [](TextHash& hash, const char* szKey) {
     const auto set = [&] { return PLIBCSzHashSetValue(hash.address(), szKey, "x"); };
     EXPECT_EQ(RunWithoutMemory(1, set).result, -1);
@@ -111,7 +102,7 @@ TEST_F(WithoutMemory, AHashThatLacksAPairIsNotWritten) {
     ExpectFailure(ERR_OUT_OF_MEMORY, "/tmp/platform/settings is not written: a pair of [new] found no memory");
     EXPECT_EQ(PLIBCFileSetSection(kSettings, "7", nullptr, hash.get(), kFormat), -1) << szKey;
     ExpectFailure(ERR_OUT_OF_MEMORY, "/tmp/platform/settings is not written: a pair of [7] found no memory");
-    EXPECT_EQ(ReadFile(kSettings), before) << szKey;
+    EXPECT_EQ(ReadText(kSettings), before) << szKey;
   }
 }
 
@@ -142,7 +133,7 @@ TEST_F(WithoutMemory, SettingsAreNotReadAndOutputsStay) {
 }
 
 TEST_F(WithoutMemory, AListOfSectionsIsAsItWas) {
-  WriteFile(kFile, "[first]\n");
+  WriteText(kFile, "[first]\n");
   TextList list;
   ASSERT_EQ(PLIBCFileEnumSection(kFile, list.address()), 1);
   ASSERT_EQ(PLIBCSysUnlink(kFile), 0);
@@ -162,17 +153,17 @@ TEST_F(WithoutMemory, AListOfSectionsIsAsItWas) {
 }
 
 TEST_F(WithoutMemory, SettingsStayAsTheyWere) {
-  const std::string before = ReadFile(kSettings);
+  const std::string before = ReadText(kSettings);
   const TextHash hash{{"A", "1"}, {"B", "2"}};
   // Each succeeds in the end, so that it is undone for the next.
   ExpectEachToFail(-1, [] { return PLIBCFileSetKeyValue(kSettings, "KEY", "value", kFormat); });
-  WriteFile(kSettings, before);
+  WriteText(kSettings, before);
   ExpectEachToFail(-1, [] { return PLIBCFileRemoveKey(kSettings, "KEY"); });
-  WriteFile(kSettings, before);
+  WriteText(kSettings, before);
   ExpectEachToFail(-1, [&] { return PLIBCFileAddSection(kSettings, "new", hash.get(), kFormat); });
-  WriteFile(kSettings, before);
+  WriteText(kSettings, before);
   ExpectEachToFail(-1, [&] { return PLIBCFileSetSection(kSettings, "7", "new", hash.get(), kFormat); });
-  WriteFile(kSettings, before);
+  WriteText(kSettings, before);
   ExpectEachToFail(-1, [] { return PLIBCFileSetSectionValue(kSettings, "7", "NEW", "value", kFormat); });
 }
 
@@ -191,7 +182,7 @@ TEST_F(WithoutMemory, AWalkOverTheKnownNetworksGoesOnAndKeepsNothing) {
     for (const std::string& section : sections) read += MEROWirelessConfGet(section.c_str(), &config) == 0 ? 1 : 0;
     return read;
   };
-  LetTheStoreSettle();
+  LetSettle(kStore);
   int n = 1;
   for (;; ++n) {
     const MemoryOutcome outcome = RunWithoutMemory(n, walk);
@@ -219,12 +210,7 @@ TEST_F(WithoutMemory, NoAdapterIsSeen) {
 }
 
 TEST_F(WithoutMemory, AListOfABridgesMembersIsAsItWas) {
-  const auto shell = [](const char* szCommand) {
-    ASSERT_EQ(PLIBCExec("/bin/sh", "-c", szCommand, nullptr, nullptr), 0) << szCommand;
-  };
-  shell(
-      "export PATH=/usr/sbin:/usr/bin:/sbin:/bin; ip link add br7 type bridge && ip link add net1 type veth &&"
-      " ip link set master br7 net1");
+  Shell("ip link add br7 type bridge && ip link add net1 type veth && ip link set master br7 net1");
   ExpectEachToFail(-1, [] {
     PPLIBSZLIST list = PLIBCSzListAlloc(0);
     const int result = list != nullptr ? PLIBNetBridgeSlaveEnum("br7", &list) : -1;
@@ -232,7 +218,7 @@ TEST_F(WithoutMemory, AListOfABridgesMembersIsAsItWas) {
     PLIBCSzListFree(list);
     return result;
   });
-  shell("export PATH=/usr/sbin:/usr/bin:/sbin:/bin; ip link delete net1 && ip link delete br7");
+  Shell("ip link delete net1 && ip link delete br7");
 }
 
 TEST_F(WithoutMemory, TheFilesOfADhcpServerAreNeitherWrittenNorRead) {
@@ -284,12 +270,12 @@ TEST_F(WithoutMemory, WhatWasListedBeforeIsTheCallersAndTheRestIsReported) {
     SCOPED_TRACE(listing.szUnit);
     int failures = 0;
     for (int n = 1;; ++n) {
-      WIRELESS_LIST head;
+      Ring<WIRELESS_NETWORK_CONFIG> ring;
       int listed = 0;
       const MemoryOutcome outcome = RunWithoutMemory(n, [&] {
-        const int result = listing.run(&head);
-        for (const WIRELESS_LIST* node = head.q_forw; node != &head; node = node->q_forw) ++listed;
-        FreeList(head);
+        const int result = listing.run(ring.head());
+        ring.ForEach([&](const WIRELESS_NETWORK_CONFIG&) { ++listed; });
+        ring.Clear();
         return result;
       });
       EXPECT_EQ(outcome.blocksLeft, 0) << "allocation " << n;

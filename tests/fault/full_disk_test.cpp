@@ -15,8 +15,8 @@ class AFullDisk : public PlatformTest {
   // Fills what is left of the disk, and gives the store as it is then.
   static std::string Fill() {
     const auto left = std::filesystem::space(kStoreDirectory).available;
-    WriteFile("/usr/mero/etc/ballast", std::string(left, 'x'));
-    return ReadFile(kStore);
+    WriteText("/usr/mero/etc/ballast", std::string(left, 'x'));
+    return ReadText(kStore);
   }
 
   static int Save(const WIRELESS_NETWORK_CONFIG& network) { return MEROWirelessConfSet(&network); }
@@ -30,7 +30,7 @@ TEST_F(AFullDisk, LetsNoKnownNetworkBeSavedAndKeepsWhatIsThere) {
   EXPECT_THAT(TakeLog(), ElementsAre(Says(kReason), SaysAt("wireless_conf_set", 67,
                                                            "Failed to set section: " + SectionOf(2) +
                                                                " from /usr/mero/etc/wireless.conf, errno=0x500")));
-  EXPECT_EQ(ReadFile(kStore), before);
+  EXPECT_EQ(ReadText(kStore), before);
   EXPECT_THAT(NamesIn(kStoreDirectory), ElementsAre("ballast", "wireless.conf"));
 }
 
@@ -42,7 +42,7 @@ TEST_F(AFullDisk, LetsNoOtherNetworkBeSavedAndKeepsWhatIsThere) {
   EXPECT_THAT(TakeLog(), ElementsAre(Says(kReason), SaysAt("wireless_conf_set", 72,
                                                            "Failed to add section: " + SectionOf(4) +
                                                                " from /usr/mero/etc/wireless.conf, errno=0x500")));
-  EXPECT_EQ(ReadFile(kStore), before);
+  EXPECT_EQ(ReadText(kStore), before);
   EXPECT_THAT(NamesIn(kStoreDirectory), ElementsAre("ballast", "wireless.conf"));
 }
 
@@ -62,14 +62,14 @@ TEST_F(AFullDisk, FillsUpWithoutLosingANetwork) {
   std::string before;
   int saved = 0;
   while (Save(NetworkOf(saved)) == 0) {
-    before = ReadFile(kStore);
+    before = ReadText(kStore);
     ++saved;
     ASSERT_LT(saved, 1000);
   }
   EXPECT_GT(saved, 10);
   EXPECT_EQ(TakeLog().size(), 2u);
   EXPECT_EQ(PLIBCErrGet(), ERR_NO_SPACE);
-  EXPECT_EQ(ReadFile(kStore), before);
+  EXPECT_EQ(ReadText(kStore), before);
   EXPECT_THAT(NamesIn(kStoreDirectory), ElementsAre("wireless.conf"));
 }
 

@@ -17,32 +17,32 @@ class ARival : public PlatformTest {
 };
 
 TEST_F(ARival, ThatMakesAFileDoesNotHaveItEmptiedByTouchingIt) {
-  WriteFile(kFile, "content");
+  WriteText(kFile, "content");
   const Outcome outcome = RunBeforeRival("access", [] { return PLIBCFileTouch(kFile); });
   EXPECT_TRUE(outcome.reached);
   EXPECT_EQ(outcome.result, 0);
-  EXPECT_EQ(ReadFile(kFile), "content");
+  EXPECT_EQ(ReadText(kFile), "content");
 }
 
 // Whoever may write to the directory could lead the new content, secrets included, to a file of theirs.
 TEST_F(ARival, ThatPutsALinkInTheWayOfAChangeHasNothingWrittenThroughIt) {
-  WriteFile(kFile, "KEY=old\n");
-  WriteFile("/tmp/platform/victim", "as was");
+  WriteText(kFile, "KEY=old\n");
+  WriteText("/tmp/platform/victim", "as was");
   std::filesystem::create_symlink("victim", "/tmp/platform/.file.new");
   const Outcome outcome = RunBeforeRival("unlink", [] { return PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"); });
   EXPECT_TRUE(outcome.reached);
   EXPECT_EQ(outcome.result, -1);
-  EXPECT_EQ(ReadFile("/tmp/platform/victim"), "as was");
-  EXPECT_EQ(ReadFile(kFile), "KEY=old\n");
+  EXPECT_EQ(ReadText("/tmp/platform/victim"), "as was");
+  EXPECT_EQ(ReadText(kFile), "KEY=old\n");
 }
 
 TEST_F(ARival, ThatMakesAFileHasItsKeysKept) {
-  WriteFile(kFile, "RIVAL=kept\n");
+  WriteText(kFile, "RIVAL=kept\n");
   const Outcome outcome =
       RunBeforeRival("readlink", [] { return PLIBCFileSetKeyValue(kFile, "KEY", "new", "%s=%s\n"); });
   EXPECT_TRUE(outcome.reached);
   EXPECT_EQ(outcome.result, 1);
-  EXPECT_EQ(ReadFile(kFile), "RIVAL=kept\nKEY=new\n");
+  EXPECT_EQ(ReadText(kFile), "RIVAL=kept\nKEY=new\n");
 }
 
 }  // namespace

@@ -3,10 +3,8 @@
 
 #include <gtest/gtest.h>
 
-#include <chrono>
 #include <filesystem>
 #include <regex>
-#include <thread>
 
 #include "common/text.h"
 #include "tests/platform/platform_test.h"
@@ -33,7 +31,7 @@ std::string SectionOf(int number) {
 
 std::string StoredText() {
   if (!fs::exists(kStore)) return "(none)";
-  return std::regex_replace(ReadFile(kStore), std::regex("ACCESS_TIME=[0-9]+"), "ACCESS_TIME=");
+  return std::regex_replace(ReadText(kStore), std::regex("ACCESS_TIME=[0-9]+"), "ACCESS_TIME=");
 }
 
 std::vector<Saving> Savings() {
@@ -51,9 +49,4 @@ void Prepare(const Saving& saving) {
     ASSERT_EQ(MEROWirelessConfSet(&config), 0);
     ASSERT_EQ(PLIBCFileSetSectionValue(kStore, SectionOf(number).c_str(), "OTHER", "kept", "\t%s=%s\n"), 0);
   }
-}
-
-void LetTheStoreSettle() {
-  using std::chrono_literals::operator""ms;
-  while (fs::file_time_type::clock::now() - fs::last_write_time(kStore) < 100ms) std::this_thread::sleep_for(5ms);
 }

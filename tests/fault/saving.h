@@ -40,7 +40,4 @@ std::vector<Saving> Savings();
 // nothing else in its directory.
 void Prepare(const Saving& saving);
 
-// Waits until a change of the store from now on is bound to show in the times of its file.
-void LetTheStoreSettle();
-
 #endif  // MERO_TESTS_FAULT_SAVING_H

@@ -2,13 +2,13 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/mount.h>
-#include <sys/stat.h>
 
 #include <filesystem>
 #include <string>
 #include <vector>
 
-#include "shell.h"
+#include "tests/support/files.h"
+#include "tests/support/shell.h"
 
 namespace fs = std::filesystem;
 
@@ -35,7 +35,7 @@ Ran Script(const std::string& name, const std::string& arguments) {
 
 // What dpkg has of the scripts when the packages are removed, in its order.
 Ran Remove(const std::string& how = "remove") {
-  Ran all = {0, ""};
+  Ran all = {.status = 0, .out = "", .err = ""};
   const std::vector<std::string> scripts =
       how == "remove"
           ? std::vector<std::string>{"merowireless-appliance.prerm remove", "merowireless-appliance.postrm remove",
@@ -43,14 +43,10 @@ Ran Remove(const std::string& how = "remove") {
           : std::vector<std::string>{"merowireless-appliance.postrm purge", "libmerowireless-core1.postrm purge"};
   for (const std::string& script : scripts) {
     const Ran ran = Script(script.substr(0, script.find(' ')), script.substr(script.find(' ')));
-    EXPECT_EQ(ran.status, 0) << script << "\n" << ran.output;
-    all.output += ran.output;
+    EXPECT_EQ(ran.status, 0) << script << "\n" << ran.out;
+    all.out += ran.out;
   }
   return all;
-}
-
-bool IsThere(const std::string& path) {
-  return fs::symlink_status(path).type() != fs::file_type::not_found;
 }
 
 class PackageScripts : public testing::Test {
@@ -68,25 +64,24 @@ class PackageScripts : public testing::Test {
 
   static void SetStartScript(const std::string& script) {
     fs::remove(kStart);
-    Write(kStart, "#!/bin/sh\n" + script);
-    ::chmod(kStart, 0755);
+    WriteScript(kStart, script);
   }
 
-  static std::string Told(const std::string& path) { return RunInShell("cat " + path).output; }
+  static std::string Told(const std::string& path) { return RunInShell("cat " + path).out; }
 };
 
 TEST_F(PackageScripts, LeaveNothingOfWhatRan) {
-  for (const std::string& path : kPublic) Write(path, "");
-  Write(std::string(kState) + "/lock", "");
-  Write(kConnection, "");
+  for (const std::string& path : kPublic) WriteText(path, "");
+  WriteText(std::string(kState) + "/lock", "");
+  WriteText(kConnection, "");
   fs::create_directory(kLeaseLock);
-  EXPECT_EQ(Remove().output, "");
-  for (const std::string& path : kPublic) EXPECT_FALSE(IsThere(path)) << path;
-  EXPECT_FALSE(IsThere(kState));
-  EXPECT_FALSE(IsThere(kLeaseLock));
-  EXPECT_TRUE(IsThere(kConnection));
-  EXPECT_EQ(Remove("purge").output, "");
-  EXPECT_FALSE(IsThere(kConnection));
+  EXPECT_EQ(Remove().out, "");
+  for (const std::string& path : kPublic) EXPECT_FALSE(Exists(path)) << path;
+  EXPECT_FALSE(Exists(kState));
+  EXPECT_FALSE(Exists(kLeaseLock));
+  EXPECT_TRUE(Exists(kConnection));
+  EXPECT_EQ(Remove("purge").out, "");
+  EXPECT_FALSE(Exists(kConnection));
 }
 
 // A directory at one of these paths, which anyone may make there, kept the package from being removed.
@@ -101,24 +96,24 @@ TEST_F(PackageScripts, RemoveWhateverStandsThereInstead) {
       {"a link to nothing", [](const char* szPath) { fs::create_symlink("/etc/nothing", szPath); }},
       {"a fifo", [](const char* szPath) { ::mkfifo(szPath, 0600); }},
   };
-  Write("/etc/mine", "mine\n");
-  Write("/etc/ours/ours", "ours\n");
+  WriteText("/etc/mine", "mine\n");
+  WriteText("/etc/ours/ours", "ours\n");
   for (const auto& row : rows) {
     for (const std::string& path : kPublic) row.make(path.c_str());
     row.make(kState);
-    EXPECT_EQ(Remove().output, "") << row.szText;
-    for (const std::string& path : kPublic) EXPECT_FALSE(IsThere(path)) << path << ": " << row.szText;
-    EXPECT_FALSE(IsThere(kState)) << row.szText;
+    EXPECT_EQ(Remove().out, "") << row.szText;
+    for (const std::string& path : kPublic) EXPECT_FALSE(Exists(path)) << path << ": " << row.szText;
+    EXPECT_FALSE(Exists(kState)) << row.szText;
     EXPECT_EQ(Told("/etc/mine") + Told("/etc/ours/ours"), "mine\nours\n") << row.szText;
   }
 }
 
 TEST_F(PackageScripts, LeaveADirectoryOfSomebodysThings) {
-  for (const std::string& path : kPublic) Write(path + "/thesis.txt", "mine\n");
+  for (const std::string& path : kPublic) WriteText(path + "/thesis.txt", "mine\n");
   const Ran ran = Remove();
   for (const std::string& path : kPublic) {
     EXPECT_EQ(Told(path + "/thesis.txt"), "mine\n");
-    EXPECT_THAT(ran.output, HasSubstr("rm: cannot remove '" + path + "'"));
+    EXPECT_THAT(ran.out, HasSubstr("rm: cannot remove '" + path + "'"));
   }
   EXPECT_THAT(Told("/tmp/diverted"), HasSubstr("--remove"));
 }
@@ -128,29 +123,29 @@ TEST_F(PackageScripts, TellWhatCannotBeRemoved) {
   paths.emplace_back(std::string(kState) + "/lock");
   paths.emplace_back(kConnection);
   for (const std::string& path : paths) {
-    Write(path, "");
+    WriteText(path, "");
     ASSERT_EQ(::mount("/dev/null", path.c_str(), nullptr, MS_BIND, nullptr), 0);  // busy, to whoever removes it
   }
-  const std::string told = Remove().output + Remove("purge").output;
+  const std::string told = Remove().out + Remove("purge").out;
   for (const std::string& path : paths) {
     EXPECT_THAT(told, HasSubstr("rm: cannot remove '" + path + "'"));
     ::umount(path.c_str());
   }
-  EXPECT_EQ(Remove("purge").output, "");  // once more
-  for (const std::string& path : paths) EXPECT_FALSE(IsThere(path)) << path;
+  EXPECT_EQ(Remove("purge").out, "");  // once more
+  for (const std::string& path : paths) EXPECT_FALSE(Exists(path)) << path;
 }
 
 TEST_F(PackageScripts, TellThatTheListingToolCannotBePutBack) {
   Install("dpkg-divert", "echo 'dpkg-divert: error: rename involves overwriting' >&2\nexit 2\n");
-  Write(kAdapter, "");
-  EXPECT_THAT(Remove().output, AllOf(HasSubstr("rename involves overwriting"), HasSubstr("/sbin/iwlist.distrib")));
-  EXPECT_FALSE(IsThere(kAdapter));
+  WriteText(kAdapter, "");
+  EXPECT_THAT(Remove().out, AllOf(HasSubstr("rename involves overwriting"), HasSubstr("/sbin/iwlist.distrib")));
+  EXPECT_FALSE(Exists(kAdapter));
 }
 
 TEST_F(PackageScripts, EndTheAccessPointsThatRun) {
-  Write(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-  Write(std::string(kState) + "/hostapd-wlan1.pid", "rubbish; rm -rf /\n");
-  EXPECT_EQ(Remove().output, "");
+  WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+  WriteText(std::string(kState) + "/hostapd-wlan1.pid", "rubbish; rm -rf /\n");
+  EXPECT_EQ(Remove().out, "");
   EXPECT_EQ(Told("/tmp/started"), "restart wlan0 \nrestart wlan1 \n");
 }
 
@@ -158,19 +153,19 @@ TEST_F(PackageScripts, GoOnWithoutAStartScriptThatWorks) {
   const char* const broken[] = {"exit 1\n", "fi\n", "kill -9 $$\n", "exec sleep 60\n", "cat >/dev/null; exit 1\n"};
   for (const char* szScript : broken) {
     SetStartScript(szScript);
-    Write(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-    EXPECT_THAT(Remove().output, HasSubstr("the access point on wlan0 may still run")) << szScript;
-    EXPECT_FALSE(IsThere(kState)) << szScript;
+    WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+    EXPECT_THAT(Remove().out, HasSubstr("the access point on wlan0 may still run")) << szScript;
+    EXPECT_FALSE(Exists(kState)) << szScript;
   }
   fs::remove(kStart);
-  Write(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-  EXPECT_THAT(Remove().output, HasSubstr("the access point on wlan0 may still run"));
+  WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+  EXPECT_THAT(Remove().out, HasSubstr("the access point on wlan0 may still run"));
 }
 
 TEST_F(PackageScripts, RemoveNothingInAnUpgradeNorWhenOneFails) {
   std::vector<std::string> paths = kPublic;
   paths.emplace_back(std::string(kState) + "/hostapd-wlan0.pid");
-  for (const std::string& path : paths) Write(path, "");
+  for (const std::string& path : paths) WriteText(path, "");
   const std::vector<std::pair<std::string, std::string>> steps = {
       {"prerm", "upgrade 2"},         {"prerm", "failed-upgrade 1 2"},   {"preinst", "upgrade 1 2"},
       {"postrm", "upgrade 2"},        {"postrm", "failed-upgrade 1 2"},  {"postrm", "abort-upgrade 1 2"},
@@ -183,7 +178,7 @@ TEST_F(PackageScripts, RemoveNothingInAnUpgradeNorWhenOneFails) {
   for (const char* szArguments : {"upgrade 2", "failed-upgrade 1 2", "abort-upgrade 1 2"}) {
     EXPECT_EQ(Script("libmerowireless-core1.postrm", szArguments).status, 0) << szArguments;
   }
-  for (const std::string& path : paths) EXPECT_TRUE(IsThere(path)) << path;
+  for (const std::string& path : paths) EXPECT_TRUE(Exists(path)) << path;
   EXPECT_EQ(Told("/tmp/started 2>/dev/null"), "");
   EXPECT_THAT(Told("/tmp/diverted"), Not(HasSubstr("--remove")));
 }
@@ -196,7 +191,7 @@ TEST_F(PackageScripts, TellOfAdaptersAgainWhenARemovalIsBrokenOff) {
 }
 
 TEST_F(PackageScripts, UndoAnInstallationThatFails) {
-  Write(std::string(kAdapter) + "/thesis.txt", "mine\n");
+  WriteText(std::string(kAdapter) + "/thesis.txt", "mine\n");
   EXPECT_EQ(Script("merowireless-appliance.preinst", "install").status, 0);
   EXPECT_EQ(Script("merowireless-appliance.postrm", "abort-install").status, 0);
   EXPECT_THAT(Told("/tmp/diverted"), AllOf(HasSubstr("--add"), HasSubstr("--remove")));

@@ -42,7 +42,7 @@ TEST_F(KernelBridge, ListsItsMembersInOrder) {
 TEST_F(KernelBridge, AppendsToWhatTheListHolds) {
   const NetworkInterface interfaces[] = {NetworkInterface("net2"), NetworkInterface("net1")};
   for (const char* szMember : {"net1", "net2"}) Shell(std::string("ip link set master br7 ") + szMember);
-  WriteFile(kFile, "[zebra]\n[apple]\n");
+  WriteText(kFile, "[zebra]\n[apple]\n");
   TextList list;
   ASSERT_EQ(PLIBCFileEnumSection(kFile, list.address()), 2);
   EXPECT_EQ(PLIBNetBridgeSlaveEnum("br7", list.address()), 2);

@@ -83,13 +83,13 @@ class BridgeConfiguration : public PlatformTest {
 
   static void WriteScript(std::string_view content) {
     std::filesystem::create_directories(kScripts);
-    WriteFile(kScript, content);
+    WriteText(kScript, content);
   }
 };
 
 TEST_F(BridgeConfiguration, OfANatBridgeIsWrittenAsTheStartScriptReadsIt) {
   EXPECT_EQ(Set(NatBridge()), 0);
-  EXPECT_EQ(ReadFile(kScript),
+  EXPECT_EQ(ReadText(kScript),
             "DEVICE=lbr0\nNAT=yes\nPRIMARY=wlan0\nBOOTPROTO=static\nIPADDR=10.1.14.1\nNETMASK=255.255.255.0\n"
             "ONBOOT=yes\nHWADDR=02:00:00:AB:CD:EF\nTYPE=Bridge\n");
   EXPECT_EQ(ModeOf(kScript), 0644u);
@@ -98,7 +98,7 @@ TEST_F(BridgeConfiguration, OfANatBridgeIsWrittenAsTheStartScriptReadsIt) {
 
 TEST_F(BridgeConfiguration, OfAPlainBridgeLeavesOutWhatIsEmpty) {
   EXPECT_EQ(Set(PlainBridge()), 0);
-  EXPECT_EQ(ReadFile("/etc/sysconfig/network-scripts/ifcfg-br0"),
+  EXPECT_EQ(ReadText("/etc/sysconfig/network-scripts/ifcfg-br0"),
             "DEVICE=br0\nNAT=no\nPRIMARY=eth0\nBOOTPROTO=dhcp\nONBOOT=yes\nTYPE=Bridge\n");
   ExpectSame(Get("br0"), PlainBridge());
 }
@@ -162,7 +162,7 @@ TEST_F(BridgeConfiguration, KeepsWhatOthersHaveWritten) {
   Bridge bridge = NatBridge();
   std::memset(bridge.netInfo.rgbMac, 0, sizeof bridge.netInfo.rgbMac);
   EXPECT_EQ(Set(bridge), 0);
-  EXPECT_EQ(ReadFile(kScript),
+  EXPECT_EQ(ReadText(kScript),
             "# the lower bridge\nDEVICE=lbr0\nMTU=1400\n\nTYPE=Bridge\nSTP=on\nNAT=yes\nPRIMARY=wlan0\n"
             "BOOTPROTO=static\nIPADDR=10.1.14.1\nNETMASK=255.255.255.0\nONBOOT=yes\n");
   EXPECT_EQ(ModeOf(kScript), 0600u);
@@ -205,7 +205,7 @@ TEST_F(BridgeConfiguration, IsOnlyThereWhenTheFileSaysSo) {
 
 TEST_F(BridgeConfiguration, IsNoneOfANameThatLeadsElsewhere) {
   WriteScript("TYPE=Bridge\n");
-  WriteFile("/etc/sysconfig/lbr0", "TYPE=Bridge\n");
+  WriteText("/etc/sysconfig/lbr0", "TYPE=Bridge\n");
   std::filesystem::create_directories(std::string(kScripts) + "/ifcfg-x");
   for (const char* szName : {"", ".", "..", "x/../../lbr0", "x/../ifcfg-lbr0", "lbr0/", "lbr0 ", "l br0", "lbr0\n",
                              "lbr0:1", "a-name-of-sixteen"}) {
@@ -259,7 +259,7 @@ TEST_F(BridgeConfiguration, IsRefusedWhenTheFirstMemberCannotBeOne) {
 // A file that was written half would leave a bridge that nobody asked for.
 TEST_F(BridgeConfiguration, StaysWholeWhenAnAddressIsRefused) {
   EXPECT_EQ(Set(NatBridge()), 0);
-  const std::string before = ReadFile(kScript);
+  const std::string before = ReadText(kScript);
   for (const char* szJunk :
        {"10.1.14.1\nNAT=no", " 10.1.14.1", "10.1.14.1 ", "\"10.1.14.1\"", "'", "$(reboot)", "a;b", "#", "\x01", "\\"}) {
     Bridge bridge = PlainBridge();
@@ -271,7 +271,7 @@ TEST_F(BridgeConfiguration, StaysWholeWhenAnAddressIsRefused) {
     CopyText(bridge.netInfo.szMask, szJunk);
     ExpectRefused(bridge, "'' and '" + std::string(szJunk) + "' are no address and mask for lbr0");
   }
-  EXPECT_EQ(ReadFile(kScript), before);
+  EXPECT_EQ(ReadText(kScript), before);
 }
 
 TEST_F(BridgeConfiguration, IsRefusedWhenATextDoesNotEnd) {
@@ -299,7 +299,7 @@ TEST_F(BridgeConfiguration, IsRefusedWhenATextDoesNotEnd) {
 }
 
 TEST_F(BridgeConfiguration, IsNotWrittenWhereThereIsNoRoomForFiles) {
-  WriteFile("/etc/sysconfig", "");
+  WriteText("/etc/sysconfig", "");
   EXPECT_EQ(Set(NatBridge()), -1);
   ExpectFailure(ERR_FILE_NOT_FOUND, "Failed to make /etc/sysconfig/network-scripts: Not a directory");
   std::filesystem::remove("/etc/sysconfig");

@@ -101,7 +101,7 @@ TEST_F(ACard, KeepsTheAddressThatItHasAndTheRoutesThatGoWithIt) {
 }
 
 TEST_F(ACard, WhoseScriptHasNoDirectoryIsReported) {
-  WriteFile("/etc/sysconfig", "no directory");
+  WriteText("/etc/sysconfig", "no directory");
   EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), -1);
   ExpectFailure(ERR_FILE_NOT_FOUND, "Failed to make /etc/sysconfig/network-scripts: Not a directory");
   std::filesystem::remove("/etc/sysconfig");
@@ -133,7 +133,7 @@ TEST_F(ACard, IsBroughtUpAndNotedDown) {
   Shell("ip link set net0 down");
   EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), 0);
   EXPECT_EQ(interface_.flags() & 1u, 1u);
-  EXPECT_EQ(ReadFile(kScript), "DEVICE=net0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
+  EXPECT_EQ(ReadText(kScript), "DEVICE=net0\nBOOTPROTO=static\nIPADDR=10.9.0.2\nNETMASK=255.255.255.0\n");
 }
 
 TEST_F(ACard, IsNotedDownInDirectoriesOfTheSameModeWhateverTheUmask) {

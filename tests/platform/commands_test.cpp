@@ -22,7 +22,7 @@ class Command : public PlatformTest {
   // Writes a script that appends what it is to show to kOutput.
   void SetUp() override {
     PlatformTest::SetUp();
-    WriteFile(kFile, "#!/bin/sh\nfor a; do printf '<%s>' \"$a\"; done >>/tmp/platform/output\n", 0700);
+    WriteText(kFile, "#!/bin/sh\nfor a; do printf '<%s>' \"$a\"; done >>/tmp/platform/output\n", 0700);
   }
 
   static int Shell(const char* szCommand) { return PLIBCExec("/bin/sh", "-c", szCommand, nullptr, nullptr); }
@@ -36,7 +36,7 @@ TEST_F(Command, GivesTheProgramsExitStatus) {
 
 TEST_F(Command, HasFinishedWhenTheCallReturns) {
   EXPECT_EQ(Shell("sleep 0.1; echo finished >/tmp/platform/output"), 0);
-  EXPECT_EQ(ReadFile(kOutput), "finished\n");
+  EXPECT_EQ(ReadText(kOutput), "finished\n");
 }
 
 TEST_F(Command, GetsUpToFourArgumentsEndedByTheFirstNull) {
@@ -51,7 +51,7 @@ TEST_F(Command, GetsUpToFourArgumentsEndedByTheFirstNull) {
   };
   for (const auto& [args, szShown] : rows) {
     EXPECT_EQ(PLIBCExec(kFile, args[0], args[1], args[2], args[3]), 0);
-    EXPECT_EQ(ReadFile(kOutput), szShown);
+    EXPECT_EQ(ReadText(kOutput), szShown);
     EXPECT_EQ(PLIBCSysUnlink(kOutput), 0);
   }
 }
@@ -60,7 +60,7 @@ TEST_F(Command, GetsItsArgumentsUnchangedWhateverTheyMeanToAShell) {
   for (const char* szArgument : {"$(touch /tmp/platform/missing)", "`id`", "a;b", "a b", "*", "~", "\"'\\", "|", "&",
                                  "<x", ">x", "#", "!", "a\nb", "\t", "%s", "-rf", "\xFF\xFE", "${HOME}"}) {
     EXPECT_EQ(PLIBCExec(kFile, szArgument, nullptr, nullptr, nullptr), 0);
-    EXPECT_EQ(ReadFile(kOutput), "<" + std::string(szArgument) + ">");
+    EXPECT_EQ(ReadText(kOutput), "<" + std::string(szArgument) + ">");
     EXPECT_EQ(PLIBCSysUnlink(kOutput), 0);
   }
   EXPECT_EQ(PLIBCFileExist(kMissing), 0);
@@ -80,7 +80,7 @@ TEST_F(Command, InheritsTheStandardDescriptorsAndNothingElse) {
   ASSERT_EQ(::dup2(output, STDOUT_FILENO), STDOUT_FILENO);
   EXPECT_EQ(PLIBCExec("/bin/ls", "/proc/self/fd", nullptr, nullptr, nullptr), 0);
   ASSERT_EQ(::dup2(stdOut, STDOUT_FILENO), STDOUT_FILENO);
-  EXPECT_EQ(ReadFile(kOutput), "0\n1\n2\n3\n");  // 3 is the listing itself
+  EXPECT_EQ(ReadText(kOutput), "0\n1\n2\n3\n");  // 3 is the listing itself
 }
 
 TEST_F(Command, StartsWithAllSignalsAsIfNobodyHadTouchedThem) {
@@ -105,7 +105,7 @@ TEST_F(Command, HasAnOrdinaryUmaskAndTheCallerKeepsItsOwn) {
     const mode_t before = ::umask(mask);
     EXPECT_EQ(Shell("umask >/tmp/platform/output"), 0);
     EXPECT_EQ(::umask(before), mask);
-    EXPECT_EQ(ReadFile(kOutput), "0022\n") << mask;
+    EXPECT_EQ(ReadText(kOutput), "0022\n") << mask;
   }
 }
 
@@ -130,8 +130,8 @@ TEST_F(Command, LeavesOtherChildrenToTheCaller) {
 }
 
 TEST_F(Command, ThatCannotBeRunIsReported) {
-  WriteFile("/tmp/platform/plain", "exit 0\n", 0600);
-  WriteFile("/tmp/platform/junk", "no program", 0700);
+  WriteText("/tmp/platform/plain", "exit 0\n", 0600);
+  WriteText("/tmp/platform/junk", "no program", 0700);
   const struct {
     const char* szPath;
     const char* szReason;

@@ -104,7 +104,7 @@ TEST_F(CurrentConnection, HasTheStatusThatTheDriverGives) {
 // Every question about an access point's own connection was reported as a failure.
 TEST_F(CurrentConnection, IsNoneForAnAccessPointAndThatIsNoFailure) {
   ASSERT_EQ(PLIBNetIfUp("wlan3"), 1);
-  WriteFile(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
+  WriteText(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
   for (const unsigned mode : {+WIRELESS_OPMODE_MASTER, +WIRELESS_OPMODE_REPEATER, +WIRELESS_OPMODE_SECONDEARY, 7}) {
     driver_.mode = mode;
     EXPECT_EQ(Ask(REQUEST_STATUS).status, WIRELESS_STATUS_DISCONNECTED) << mode;
@@ -172,7 +172,7 @@ TEST_F(CurrentConnection, HasProtocolAndAuthenticationFromTheRecordOfItsAccessPo
       {"", WIRELESS_PROTO_UNKNOWN, WIRELESS_AUTH_UNKNOWN},
   };
   for (const auto& row : rows) {
-    WriteFile(kRecord, row.record);
+    WriteText(kRecord, row.record);
     EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, row.protocol) << row.record;
     EXPECT_EQ(Ask(REQUEST_AUTH).auth, row.auth) << row.record;
   }
@@ -184,7 +184,7 @@ TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationWithoutARecord) {
 }
 
 TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationFromARecordOfSomebodyElses) {
-  WriteFile(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
+  WriteText(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
   ASSERT_EQ(::chmod("/var/tmp", 01777), 0);
   ASSERT_EQ(::chown(kRecord, 65534, 65534), 0);
   EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, WIRELESS_PROTO_UNKNOWN);
@@ -193,7 +193,7 @@ TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationFromARecordOfSomebodyEls
 }
 
 TEST_F(CurrentConnection, HasNoProtocolAndAuthenticationWhenThereIsNone) {
-  WriteFile(kRecord, "home\n10\n5\n8\n00:00:00:00:00:00\n");
+  WriteText(kRecord, "home\n10\n5\n8\n00:00:00:00:00:00\n");
   driver_.accessPoint = {};
   EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, WIRELESS_PROTO_UNKNOWN);
   EXPECT_EQ(Ask(REQUEST_AUTH).auth, WIRELESS_AUTH_UNKNOWN);

@@ -1,6 +1,5 @@
 // Leasing an address: the script that applies a lease and gives it back, and the client that runs it.
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -14,6 +13,7 @@
 #include "tests/platform/network_interfaces.h"
 #include "tests/platform/platform_test.h"
 #include "tests/platform/simulated_radio.h"
+#include "tests/support/processes.h"
 
 namespace {
 
@@ -34,16 +34,15 @@ class ALease : public PlatformTest {
     PlatformTest::SetUp();
     fs::create_directories("/usr/mero/sbin");
     fs::copy_file(APPLIANCE_KIT "/sbin/udhcpc.lease", kScript, fs::copy_options::overwrite_existing);
-    WriteFile("/tmp/platform/logger", "#!/bin/sh\necho \"$@\" >>/tmp/platform/logged\n", 0755);
-    WriteFile(kLogged, "");
+    WriteScript("/tmp/platform/logger", "echo \"$@\" >>/tmp/platform/logged\n");
+    WriteText(kLogged, "");
     fs::remove(kResolver);
     Shell("ip link set net0 up && ip link set eth5 up");
   }
 
   // Runs the script; its exit status.
   static int Run(const std::vector<const char*>& words, const Lease& lease = {}, mode_t mask = 022) {
-    const pid_t pid = ::fork();
-    if (pid == 0) {
+    return RunInChild([&] {
       ::umask(mask);
       ::clearenv();
       ::setenv("PATH", "/tmp/platform:/usr/sbin:/usr/bin:/sbin:/bin", 1);
@@ -53,11 +52,8 @@ class ALease : public PlatformTest {
       argv.push_back(nullptr);
       (void)!::freopen("/dev/null", "w", stderr);
       ::execv(kScript, argv.data());
-      ::_exit(127);
-    }
-    int state = 0;
-    EXPECT_EQ(::waitpid(pid, &state, 0), pid);
-    return WIFEXITED(state) ? WEXITSTATUS(state) : -1;
+      return 127;
+    });
   }
 
   // A lease of net0 with an address in 10.1.0.0/24, and what else is said.
@@ -88,27 +84,27 @@ class ALease : public PlatformTest {
   }
 
   static void ExpectLogged(const std::string& text) {
-    EXPECT_THAT(ReadFile(kLogged), HasSubstr("-t udhcpc.lease -p daemon.err -- " + text));
-    WriteFile(kLogged, "");
+    EXPECT_THAT(ReadText(kLogged), HasSubstr("-t udhcpc.lease -p daemon.err -- " + text));
+    WriteText(kLogged, "");
   }
 
-  static void ExpectNothingLogged() { EXPECT_EQ(ReadFile(kLogged), ""); }
+  static void ExpectNothingLogged() { EXPECT_EQ(ReadText(kLogged), ""); }
 
   const NetworkInterface interface_{"net0"};
   const NetworkInterface wired_{"eth5"};
 };
 
 TEST_F(ALease, IsAppliedAndGivenBack) {
-  WriteFile(kResolver, "nameserver 192.0.2.1\n", 0644);
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
   EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2 10.1.0.3", "domain=home.example", "broadcast=10.1.0.255"}), 0);
   EXPECT_EQ(interface_.addresses(), "10.1.0.7/24 ");
   EXPECT_EQ(DefaultRoutes(), "default via 10.1.0.1 dev net0 metric " + MetricOf("net0") + "\n");
-  EXPECT_EQ(ReadFile(kResolver),
+  EXPECT_EQ(ReadText(kResolver),
             "nameserver 192.0.2.1\n" + Block("search home.example\nnameserver 10.1.0.2\nnameserver 10.1.0.3\n"));
 
   EXPECT_EQ(Run({"left", "net0"}), 0);
   EXPECT_EQ(DefaultRoutes(), "");
-  EXPECT_EQ(ReadFile(kResolver), "nameserver 192.0.2.1\n");
+  EXPECT_EQ(ReadText(kResolver), "nameserver 192.0.2.1\n");
   EXPECT_EQ(interface_.addresses(), "10.1.0.7/24 ");
   ExpectNothingLogged();
 }
@@ -118,16 +114,16 @@ TEST_F(ALease, IsGivenBackWithTheAddressesWhenTheClientBeginsAnew) {
   EXPECT_EQ(Run({"deconfig"}, {"interface=net0"}), 0);
   EXPECT_EQ(interface_.addresses(), "");
   EXPECT_EQ(DefaultRoutes(), "");
-  EXPECT_EQ(ReadFile(kResolver), "");
+  EXPECT_EQ(ReadText(kResolver), "");
   ExpectNothingLogged();
 }
 
 TEST_F(ALease, ChangesNothingWhenAServerDoesNotAnswer) {
   EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2"}), 0);
-  const std::string before = ReadFile(kResolver) + DefaultRoutes();
+  const std::string before = ReadText(kResolver) + DefaultRoutes();
   EXPECT_EQ(Run({"leasefail"}, {"interface=net0"}), 0);
   EXPECT_EQ(Run({"nak"}, {"interface=net0"}), 0);
-  EXPECT_EQ(ReadFile(kResolver) + DefaultRoutes(), before);
+  EXPECT_EQ(ReadText(kResolver) + DefaultRoutes(), before);
 }
 
 // Joining a network took the way out of the house away from the wire, and the name servers with it.
@@ -162,7 +158,7 @@ TEST_F(ALease, OfAWirelessInterfaceRoutesBehindThatOfAWire) {
   for (const char* szMark : {"phy80211", "wireless"}) {
     const std::string index = IndexOf("net0");
     const ShownInterfaces shown({{"net0", szMark}, {"eth5", ""}});
-    WriteFile("/sys/class/net/net0/ifindex", index + "\n");
+    WriteText("/sys/class/net/net0/ifindex", index + "\n");
     EXPECT_EQ(Bound({"router=10.1.0.1"}), 0);
     EXPECT_EQ(DefaultRoutes(), "default via 10.1.0.1 dev net0 metric " + MetricOf("net0", 3000) + "\n");
     EXPECT_EQ(Run({"left", "net0"}), 0);
@@ -202,45 +198,45 @@ TEST_F(ALease, LeavesAllElseInTheResolversFileAsItIs) {
            std::string("# By the DHCP client of net0, until it leaves the network:\nnameserver 192.0.2.1\n"),
            std::string("# (end of what the DHCP client of net0 has added)\n"),
        }) {
-    WriteFile(kResolver, text, 0644);
+    WriteText(kResolver, text, 0644);
     EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
     std::string with = text + (text.empty() || text.ends_with('\n') ? "" : "\n") + Block("nameserver 10.1.0.2\n");
     if (!text.empty() && !text.ends_with('\n')) with.pop_back();
-    EXPECT_EQ(ReadFile(kResolver), with) << text;
+    EXPECT_EQ(ReadText(kResolver), with) << text;
     EXPECT_EQ(Run({"renew"}, Usual({"dns=10.1.0.3"})), 0);
-    EXPECT_THAT(ReadFile(kResolver), HasSubstr("10.1.0.3"));
-    EXPECT_THAT(ReadFile(kResolver), Not(HasSubstr("10.1.0.2")));
+    EXPECT_THAT(ReadText(kResolver), HasSubstr("10.1.0.3"));
+    EXPECT_THAT(ReadText(kResolver), Not(HasSubstr("10.1.0.2")));
     EXPECT_EQ(Run({"left", "net0"}), 0);
-    EXPECT_EQ(ReadFile(kResolver), text);
+    EXPECT_EQ(ReadText(kResolver), text);
   }
   ExpectNothingLogged();
 }
 
 TEST_F(ALease, PutsItsBlockAtTheEndAgainWhenSomebodyHasWrittenBehindIt) {
-  WriteFile(kResolver, "", 0644);
+  WriteText(kResolver, "", 0644);
   EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
   Shell("echo nameserver 192.0.2.1 >>/etc/resolv.conf");
   EXPECT_EQ(Run({"renew"}, Usual({"dns=10.1.0.2"})), 0);
-  EXPECT_EQ(ReadFile(kResolver), "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n"));
+  EXPECT_EQ(ReadText(kResolver), "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n"));
 }
 
 TEST_F(ALease, NamesADomainOnlyWhereThereIsNone) {
   for (const char* szText : {"search work.example\n", "nameserver 192.0.2.1\ndomain\twork.example\n"}) {
-    WriteFile(kResolver, szText, 0644);
+    WriteText(kResolver, szText, 0644);
     EXPECT_EQ(Bound({"dns=10.1.0.2", "domain=home.example"}), 0);
-    EXPECT_EQ(ReadFile(kResolver), szText + Block("nameserver 10.1.0.2\n"));
+    EXPECT_EQ(ReadText(kResolver), szText + Block("nameserver 10.1.0.2\n"));
     EXPECT_EQ(Run({"left", "net0"}), 0);
   }
 }
 
 TEST_F(ALease, NamesNoMoreServersThanTheLibraryAsks) {
   EXPECT_EQ(Bound({"dns=10.1.0.1 10.1.0.2 10.1.0.3 10.1.0.4"}), 0);
-  EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.0.1\nnameserver 10.1.0.2\nnameserver 10.1.0.3\n"));
+  EXPECT_EQ(ReadText(kResolver), Block("nameserver 10.1.0.1\nnameserver 10.1.0.2\nnameserver 10.1.0.3\n"));
 }
 
 TEST_F(ALease, KeepsTheModeAndTheOwnerOfTheResolversFileWhateverTheUmask) {
   for (const mode_t mask : {0, 077}) {
-    WriteFile(kResolver, "nameserver 192.0.2.1\n", 0664);
+    WriteText(kResolver, "nameserver 192.0.2.1\n", 0664);
     ASSERT_EQ(::chown(kResolver, 3, 4), 0);
     EXPECT_EQ(Run({"bound"}, Usual({"dns=10.1.0.2"}), mask), 0);
     for (int round = 0; round < 2; ++round) {
@@ -256,17 +252,17 @@ TEST_F(ALease, KeepsTheModeAndTheOwnerOfTheResolversFileWhateverTheUmask) {
     EXPECT_EQ(ModeOf(kResolver), 0644u) << mask;
     EXPECT_EQ(Run({"left", "net0"}, {}, mask), 0);
     EXPECT_EQ(ModeOf(kResolver), 0644u) << mask;
-    EXPECT_EQ(ReadFile(kResolver), "");
+    EXPECT_EQ(ReadText(kResolver), "");
   }
 }
 
 TEST_F(ALease, ReplacesTheTargetOfALinkInItsOwnDirectory) {
   fs::create_directory("/tmp/platform/resolver");
-  WriteFile("/tmp/platform/resolver/conf", "nameserver 192.0.2.1\n", 0644);
+  WriteText("/tmp/platform/resolver/conf", "nameserver 192.0.2.1\n", 0644);
   fs::create_symlink("/tmp/platform/resolver/conf", kResolver);
   EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
   EXPECT_TRUE(fs::is_symlink(kResolver));
-  EXPECT_EQ(ReadFile("/tmp/platform/resolver/conf"), "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n"));
+  EXPECT_EQ(ReadText("/tmp/platform/resolver/conf"), "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n"));
   EXPECT_THAT(NamesIn("/tmp/platform/resolver"), testing::ElementsAre("conf"));
 }
 
@@ -281,7 +277,7 @@ TEST_F(ALease, LeavesAFileAloneThatItHasNothingToSayIn) {
   fs::remove(kResolver);
   EXPECT_EQ(Run({"left", "net0"}), 0);
   EXPECT_FALSE(fs::exists(kResolver));
-  WriteFile(kResolver, "nameserver 192.0.2.1\n", 0644);
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
   const auto before = fs::last_write_time(kResolver);
   EXPECT_EQ(Run({"left", "net0"}), 0);
   EXPECT_EQ(fs::last_write_time(kResolver), before);
@@ -290,7 +286,7 @@ TEST_F(ALease, LeavesAFileAloneThatItHasNothingToSayIn) {
 
 TEST_F(ALease, SaysThatTheResolversFileCannotBeChanged) {
   MemoryFileSystem files("/tmp/platform/read-only", "");
-  WriteFile("/tmp/platform/read-only/conf", "nameserver 192.0.2.1\n", 0644);
+  WriteText("/tmp/platform/read-only/conf", "nameserver 192.0.2.1\n", 0644);
   fs::create_symlink("/tmp/platform/read-only/conf", kResolver);
   files.MakeReadOnly();
   EXPECT_EQ(Bound({"dns=10.1.0.2", "router=10.1.0.1"}), 1);
@@ -314,13 +310,13 @@ TEST_F(ALease, CannotDoAnythingButSetAddresses) {
       "%s%n",
   };
   for (const std::string& text : hostile) {
-    WriteFile(kResolver, "", 0644);
+    WriteText(kResolver, "", 0644);
     EXPECT_EQ(Bound({"dns=10.1.0.2", "domain=" + text}), 0);
-    EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.0.2\n")) << text;
+    EXPECT_EQ(ReadText(kResolver), Block("nameserver 10.1.0.2\n")) << text;
     ExpectLogged("the lease of net0 has a domain that is no name\n");
 
     EXPECT_EQ(Bound({"dns=" + text + " 10.1.0.2", "router=" + text + " 10.1.0.1"}), 0);
-    EXPECT_THAT(ReadFile(kResolver), HasSubstr("nameserver 10.1.0.2\n"));
+    EXPECT_THAT(ReadText(kResolver), HasSubstr("nameserver 10.1.0.2\n"));
     EXPECT_THAT(DefaultRoutes(), HasSubstr("default via 10.1.0.1 dev net0"));
     ExpectLogged("the lease of net0 has a router that is no host's address\n");
 
@@ -331,7 +327,7 @@ TEST_F(ALease, CannotDoAnythingButSetAddresses) {
     EXPECT_EQ(Bound({"broadcast=" + text}), 0);
     EXPECT_EQ(Run({"bound"}, {"interface=" + text, "ip=10.1.0.7", "subnet=255.255.255.0"}), 1);
     EXPECT_EQ(Run({"left", text.c_str()}), 1);
-    WriteFile(kLogged, "");
+    WriteText(kLogged, "");
   }
   EXPECT_FALSE(fs::exists("/tmp/platform/made"));
   EXPECT_EQ(Shell("cat /etc/resolv.conf"), "");
@@ -342,7 +338,7 @@ TEST_F(ALease, PassesOverWhatIsNoHostsAddress) {
        {"0.0.0.0", "127.0.0.1", "224.0.0.1", "255.255.255.255", "256.1.1.1", "10.1.0", "10.1.0.1.2", "10..0.1",
         "10.1.0.1.", "10.1.0.0001", "99999999999999999999.1.1.1", "::1", "home"}) {
     EXPECT_EQ(Bound({std::string("dns=") + szText + " 10.1.0.2"}), 0);
-    EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.0.2\n")) << szText;
+    EXPECT_EQ(ReadText(kResolver), Block("nameserver 10.1.0.2\n")) << szText;
     ExpectLogged("the lease of net0 has a name server that is no host's address\n");
     EXPECT_EQ(Run({"bound"}, {"interface=net0", std::string("ip=") + szText, "subnet=255.255.255.0"}), 1);
     ExpectLogged("the lease of net0 has no address\n");
@@ -378,12 +374,12 @@ TEST_F(ALease, SaysWhichStepCannotBeTaken) {
       {"mkdir", "udhcpc.lease", "bound", "cannot make /var/run/udhcpc.lease\n"},
       {"flock", "", "bound", "another run takes too long to change /etc/resolv.conf\n"},
   };
-  WriteFile(kResolver, "nameserver 192.0.2.1\n", 0644);
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
   for (const auto& row : rows) {
     const std::string program = row.szProgram;
     ASSERT_EQ(Bound({"router=10.1.0.1"}), 0);
     fs::remove("/var/run/udhcpc.lease");
-    WriteFile("/tmp/platform/" + program,
+    WriteText("/tmp/platform/" + program,
               "#!/bin/sh\ncase $* in *'" + std::string(row.szCalls) +
                   "'*) echo broken >&2; exit 1 ;; esac\nexec /usr/bin/env PATH=/usr/sbin:/usr/bin " + program +
                   " \"$@\"\n",
@@ -397,23 +393,23 @@ TEST_F(ALease, SaysWhichStepCannotBeTaken) {
 }
 
 TEST_F(ALease, OfAnInterfaceThatIsGoneIsGivenBack) {
-  WriteFile(kResolver, "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n", "wlan9"), 0644);
+  WriteText(kResolver, "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n", "wlan9"), 0644);
   EXPECT_EQ(Run({"left", "wlan9"}), 0);
-  EXPECT_EQ(ReadFile(kResolver), "nameserver 192.0.2.1\n");
+  EXPECT_EQ(ReadText(kResolver), "nameserver 192.0.2.1\n");
   ExpectNothingLogged();
 }
 
 TEST_F(ALease, IsGivenBackWhenTheKitEndsTheClientOrFindsItDead) {
   const std::string ends = std::string("for part in report files daemon bridge; do . ") + APPLIANCE_KIT +
                            "/lib/$part.sh; done; PATH=/tmp/platform:$PATH; end_lease net0 2>&1";
-  WriteFile("/var/run/udhcpc-net0.pid", "999999999\n");
+  WriteText("/var/run/udhcpc-net0.pid", "999999999\n");
   EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2"}), 0);
   EXPECT_EQ(Shell(ends), "");
   EXPECT_EQ(DefaultRoutes(), "");
-  EXPECT_EQ(ReadFile(kResolver), "");
+  EXPECT_EQ(ReadText(kResolver), "");
   EXPECT_FALSE(fs::exists("/var/run/udhcpc-net0.pid"));
 
-  WriteFile(kScript, "#!/bin/sh\nexit 1\n", 0755);
+  WriteScript(kScript, "exit 1\n");
   EXPECT_THAT(Shell(ends), HasSubstr("what net0 had leased is not all given back\n"));
   fs::remove(kScript);
   EXPECT_EQ(Shell(ends), "");
@@ -430,7 +426,7 @@ TEST_F(ALease, LosesNothingWhenSeveralAreAppliedAtOnce) {
   }
   Shell(all + "wait");
   for (int i = 0; i < 8; ++i) {
-    EXPECT_THAT(ReadFile(kResolver), HasSubstr("nameserver 10.3." + std::to_string(i) + ".1\n"));
+    EXPECT_THAT(ReadText(kResolver), HasSubstr("nameserver 10.3." + std::to_string(i) + ".1\n"));
   }
 }
 
@@ -472,23 +468,19 @@ class ALeasingClient : public ALease {
 
   // The name servers are what is applied last.
   static bool IsAppliedWithin(int seconds) {
-    for (int i = 0; i < seconds * 20; ++i) {
-      if (fs::exists(kResolver)) return true;
-      ::usleep(50000);
-    }
-    return false;
+    return Soon([] { return fs::exists(kResolver); }, seconds);
   }
 
   static void ExpectApplied() {
     EXPECT_EQ(Addresses(), "10.1.14.77/24");
     EXPECT_EQ(DefaultRoutes(), "default via 10.1.14.2 dev wlan0 metric " + MetricOf("wlan0") + "\n");
-    EXPECT_EQ(ReadFile(kResolver), Block("nameserver 10.1.14.3\n", "wlan0"));
+    EXPECT_EQ(ReadText(kResolver), Block("nameserver 10.1.14.3\n", "wlan0"));
   }
 
   static void ExpectGivenBack() {
     EXPECT_EQ(Client(), "");
     EXPECT_EQ(DefaultRoutes(), "");
-    EXPECT_EQ(ReadFile(kResolver), "");
+    EXPECT_EQ(ReadText(kResolver), "");
   }
 };
 
@@ -574,7 +566,7 @@ TEST_F(ALeasingClient, IsEndedWithoutTheScriptThatWouldApplyALease) {
 
 // A server that offered and refused again and again kept the caller for ever.
 TEST_F(ALeasingClient, IsEndedWhenItIsKeptBusy) {
-  WriteFile(kScript, "#!/bin/sh\n[ \"$1\" = left ] || sleep 1000\n", 0755);
+  WriteScript(kScript, "[ \"$1\" = left ] || sleep 1000\n");
   NETINFO netInfo = Asker();
   EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 4), -1);
   ExpectFailure(ERR_UNKNOWN, "Failed to lease an address for wlan0: Connection timed out");
@@ -583,7 +575,7 @@ TEST_F(ALeasingClient, IsEndedWhenItIsKeptBusy) {
 
 // A name server that could not be taken out kept an interface from getting a static address.
 TEST_F(ALeasingClient, KeepsNobodyFromAnotherAddressByWhatCannotBeGivenBack) {
-  WriteFile(kScript, "#!/bin/sh\nexit 1\n", 0755);
+  WriteScript(kScript, "exit 1\n");
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   NETINFO netInfo = Asker();
   netInfo.blManual = TRUE;

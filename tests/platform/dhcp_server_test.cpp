@@ -134,13 +134,13 @@ class DhcpServerFiles : public PlatformTest {
 TEST_F(DhcpServerFiles, AreWrittenAsTheServerReadsThem) {
   const MERO_DHCPD_CONF conf = Server();
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
-  EXPECT_EQ(ReadFile(kConf), std::string(kHeading) +
+  EXPECT_EQ(ReadText(kConf), std::string(kHeading) +
                                  "interface=lbr0\n"
                                  "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0,86400s\n"
                                  "dhcp-option=option:router,10.1.14.1\n"
                                  "dhcp-option=option:dns-server,10.1.14.1\n"
                                  "dhcp-authoritative\n");
-  EXPECT_EQ(ReadFile(kInfo), "auto_time=\"30\"\nenable=\"yes\"\n");
+  EXPECT_EQ(ReadText(kInfo), "auto_time=\"30\"\nenable=\"yes\"\n");
   EXPECT_EQ(ModeOf("/etc/dhcpd"), 0755u);
   EXPECT_EQ(ModeOf(kConf), 0644u);
   EXPECT_EQ(ModeOf(kInfo), 0644u);
@@ -150,7 +150,7 @@ TEST_F(DhcpServerFiles, AreWrittenAsTheServerReadsThem) {
 TEST_F(DhcpServerFiles, HoldEveryField) {
   const MERO_DHCPD_CONF conf = FullServer();
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
-  EXPECT_EQ(ReadFile(kConf), std::string(kHeading) +
+  EXPECT_EQ(ReadText(kConf), std::string(kHeading) +
                                  "interface=lbr0\n"
                                  "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0,86400s\n"
                                  "dhcp-option=option:router,10.1.14.1\n"
@@ -231,11 +231,11 @@ TEST_F(DhcpServerFiles, SayWhetherTheServerServesByTheSwitchAlone) {
 TEST_F(DhcpServerFiles, KeepAllElseWhenTheServerIsSwitchedOff) {
   MERO_DHCPD_CONF conf = FullServer();
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
-  const std::string before = ReadFile(kConf);
+  const std::string before = ReadText(kConf);
   conf = *Find();
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 0), 1);
-  EXPECT_EQ(ReadFile(kConf), before);
-  EXPECT_EQ(ReadFile(kInfo), "auto_time=\"30\"\nenable=\"no\"\n");
+  EXPECT_EQ(ReadText(kConf), before);
+  EXPECT_EQ(ReadText(kInfo), "auto_time=\"30\"\nenable=\"no\"\n");
 }
 
 // Disabling an access point failed for ever: what was read of its bridge's server was refused on the way back.
@@ -259,16 +259,16 @@ TEST_F(DhcpServerFiles, AreLeftAloneButForTheSwitchWhenTheRecordIsGivenBackAsItW
   };
   fs::create_directory("/etc/dhcpd");
   for (const std::string& text : texts) {
-    WriteFile(kConf, text, 0640);
-    WriteFile(kInfo, "# of the appliance\nauto_time=soon\nenable=\"yes\"\n");
+    WriteText(kConf, text, 0640);
+    WriteText(kInfo, "# of the appliance\nauto_time=soon\nenable=\"yes\"\n");
     Shell(std::string("dnsmasq --test --conf-file=") + kConf + " 2>&1");
     const auto conf = Find();
     ASSERT_TRUE(conf.has_value());
     EXPECT_STREQ(conf->szRangeStart, "10.1.14.2") << text;  // or enabling would have written its own
     EXPECT_STREQ(conf->szRangeEnd, "10.1.14.254") << text;
     EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&*conf, 0), 1) << text;
-    EXPECT_EQ(ReadFile(kConf), text);
-    EXPECT_EQ(ReadFile(kInfo), "# of the appliance\nauto_time=soon\nenable=\"no\"\n");
+    EXPECT_EQ(ReadText(kConf), text);
+    EXPECT_EQ(ReadText(kInfo), "# of the appliance\nauto_time=soon\nenable=\"no\"\n");
     EXPECT_EQ(ModeOf(kConf), 0640u);
   }
 }
@@ -285,11 +285,11 @@ TEST_F(DhcpServerFiles, AreWrittenWhenTheRecordIsAnother) {
   for (const auto& change : changes) {
     MERO_DHCPD_CONF conf = FullServer();
     ASSERT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
-    WriteFile(kConf, ReadFile(kConf) + "# by hand\n");
+    WriteText(kConf, ReadText(kConf) + "# by hand\n");
     change(conf);
     EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
     ExpectSame(Find(), conf);
-    EXPECT_THAT(ReadFile(kConf), testing::Not(testing::HasSubstr("# by hand")));
+    EXPECT_THAT(ReadText(kConf), testing::Not(testing::HasSubstr("# by hand")));
   }
 }
 
@@ -297,7 +297,7 @@ TEST_F(DhcpServerFiles, HoldALeaseTimeWithoutEnd) {
   MERO_DHCPD_CONF conf = Server();
   conf.leaseTime = -1;
   ExpectTakenByTheServer(conf);
-  EXPECT_THAT(ReadFile(kConf), testing::HasSubstr("255.255.255.0,infinite\n"));
+  EXPECT_THAT(ReadText(kConf), testing::HasSubstr("255.255.255.0,infinite\n"));
   ExpectWrittenAndReadBack(conf);
 }
 
@@ -305,7 +305,7 @@ TEST_F(DhcpServerFiles, HoldBlanksAtTheEndsOfATextInQuotes) {
   MERO_DHCPD_CONF conf = Server();
   CopyText(conf.szLeaseFile, " /tmp/leases ");
   ExpectTakenByTheServer(conf);
-  EXPECT_THAT(ReadFile(kConf), testing::HasSubstr("dhcp-leasefile=\" /tmp/leases \"\n"));
+  EXPECT_THAT(ReadText(kConf), testing::HasSubstr("dhcp-leasefile=\" /tmp/leases \"\n"));
   ExpectWrittenAndReadBack(conf);
 }
 
@@ -347,16 +347,16 @@ TEST_F(DhcpServerFiles, AreAPairForEachInterfaceAndTag) {
 
 TEST_F(DhcpServerFiles, KeepWhatOthersHaveWrittenBesideTheSwitch) {
   fs::create_directory("/etc/dhcpd");
-  WriteFile(kInfo, "# of the appliance\nenable=no\nOWNER=\"net\"\n", 0640);
+  WriteText(kInfo, "# of the appliance\nenable=no\nOWNER=\"net\"\n", 0640);
   const MERO_DHCPD_CONF conf = Server();
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 1);
-  EXPECT_EQ(ReadFile(kInfo), "# of the appliance\nenable=\"yes\"\nOWNER=\"net\"\nauto_time=\"30\"\n");
+  EXPECT_EQ(ReadText(kInfo), "# of the appliance\nenable=\"yes\"\nOWNER=\"net\"\nauto_time=\"30\"\n");
   EXPECT_EQ(ModeOf(kInfo), 0640u);
 }
 
 TEST_F(DhcpServerFiles, AreReadAsFarAsTheyAreUnderstood) {
   fs::create_directory("/etc/dhcpd");
-  WriteFile(kConf,
+  WriteText(kConf,
             "# interface=none\n\nport=0\ninterface=other\ndhcp-range=1.1.1.1,2.2.2.2\n"
             "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0,86400s\ndhcp-option=option:router,10.1.14.1\n"
             "dhcp-option=option:ntp-server,9.9.9.9\ndhcp-option=option:dns-server,10.1.14.1");
@@ -386,11 +386,11 @@ TEST_F(DhcpServerFiles, AreReadAsFarAsTheyAreUnderstood) {
       {"10.1.14.255,12h", 43200},
   };
   for (const auto& [szTime, seconds] : times) {
-    WriteFile(kConf, "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0," + std::string(szTime) + "\n");
+    WriteText(kConf, "dhcp-range=10.1.14.2,10.1.14.254,255.255.255.0," + std::string(szTime) + "\n");
     EXPECT_EQ(Find()->leaseTime, seconds) << szTime;
     EXPECT_STREQ(Find()->szSubnet, "255.255.255.0");
   }
-  WriteFile(kInfo, "enable=YES\nauto_time=soon\n");
+  WriteText(kInfo, "enable=YES\nauto_time=soon\n");
   EXPECT_EQ(Find()->blEnable, FALSE);
   EXPECT_EQ(Find()->autoTime, 0);
 }
@@ -417,11 +417,11 @@ TEST_F(DhcpServerFiles, AreReadAsTheServerReadsThem) {
     for (const char* szLine : {lines[0], szRange, lines[4], lines[5], lines[6], lines[7]}) {
       text += std::string(szLine) + "\n";
     }
-    WriteFile(kConf, text);
+    WriteText(kConf, text);
     Shell(std::string("dnsmasq --test --conf-file=") + kConf + " 2>&1");
     ExpectSame(Find(), conf);
   }
-  WriteFile(kConf, "dhcp-range=10.1.14.2,10.1.14.254,12h\n");
+  WriteText(kConf, "dhcp-range=10.1.14.2,10.1.14.254,12h\n");
   Shell(std::string("dnsmasq --test --conf-file=") + kConf + " 2>&1");
   EXPECT_STREQ(Find()->szSubnet, "");
   EXPECT_EQ(Find()->leaseTime, 43200);
@@ -430,7 +430,7 @@ TEST_F(DhcpServerFiles, AreReadAsTheServerReadsThem) {
 TEST_F(DhcpServerFiles, AreReadWithTextsCutToTheFields) {
   fs::create_directory("/etc/dhcpd");
   const std::string text(10000, 'x');
-  WriteFile(kConf, "dhcp-range=" + text + "," + text + "\ndomain=" + text + "\n");
+  WriteText(kConf, "dhcp-range=" + text + "," + text + "\ndomain=" + text + "\n");
   const MERO_DHCPD_CONF conf = *Find();
   EXPECT_EQ(conf.szRangeStart, text.substr(0, sizeof conf.szRangeStart - 1));
   EXPECT_EQ(conf.szRangeEnd, text.substr(0, sizeof conf.szRangeEnd - 1));
@@ -460,7 +460,7 @@ TEST_F(DhcpServerFiles, AreNotFoundUnderOtherNames) {
 TEST_F(DhcpServerFiles, AreRefusedForATextThatALineCannotHold) {
   const MERO_DHCPD_CONF good = FullServer();
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&good, 0), 1);
-  const std::string before = ReadFile(kConf);
+  const std::string before = ReadText(kConf);
   for (const std::string& junk : {std::string("1\n2"), std::string("1\r"), std::string("\t"), std::string("\x1b"),
                                   std::string("\x7f"), std::string("\""), std::string("\\n"), std::string("a #b")}) {
     for (const Field& field : kFields) {
@@ -469,8 +469,8 @@ TEST_F(DhcpServerFiles, AreRefusedForATextThatALineCannotHold) {
       ExpectRefused(conf, "A DHCP server's " + std::string(field.szName) + " cannot be '" + junk + "'");
     }
   }
-  EXPECT_EQ(ReadFile(kConf), before);
-  EXPECT_EQ(ReadFile(kInfo), "auto_time=\"30\"\nenable=\"no\"\n");
+  EXPECT_EQ(ReadText(kConf), before);
+  EXPECT_EQ(ReadText(kInfo), "auto_time=\"30\"\nenable=\"no\"\n");
   EXPECT_THAT(NamesIn("/etc/dhcpd"), ElementsAre("dhcpd-lbr0-lbr0.conf", "dhcpd-lbr0-lbr0.info"));
 }
 
@@ -523,7 +523,7 @@ TEST_F(DhcpServerFiles, AreRefusedWithoutAnInterfaceAndATag) {
 
 TEST_F(DhcpServerFiles, AreReportedWhenTheyCannotBeWritten) {
   const MERO_DHCPD_CONF conf = Server();
-  WriteFile("/etc/dhcpd", "");
+  WriteText("/etc/dhcpd", "");
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 0);
   ExpectFailure(ERR_FILE_NOT_FOUND, std::string("Failed to write ") + kConf + ": Not a directory");
   fs::remove("/etc/dhcpd");
@@ -540,7 +540,7 @@ TEST_F(DhcpServerFiles, AreReportedWhenTheyCannotBeRead) {
   EXPECT_THAT(TakeLog(),
               ElementsAre(testing::Field(&LogLine::text, testing::StartsWith("Failed to read " + std::string(kConf)))));
   fs::remove(kConf);
-  WriteFile(kConf, "interface=lbr0\n");
+  WriteText(kConf, "interface=lbr0\n");
   fs::create_directory(kInfo);
   EXPECT_FALSE(Find().has_value());
   EXPECT_THAT(TakeLog(),
@@ -577,7 +577,7 @@ TEST_F(DhcpServerFiles, AreTakenByTheServer) {
     MERO_DHCPD_CONF conf = Server();
     change(conf);
     ExpectTakenByTheServer(conf);
-    ASSERT_FALSE(HasFailure()) << ReadFile(kConf);
+    ASSERT_FALSE(HasFailure()) << ReadText(kConf);
   }
 }
 
@@ -600,16 +600,16 @@ TEST_F(DhcpServerFiles, MakeARealServerLeaseWhatTheySay) {
     const RunningProgram server({"/usr/sbin/dnsmasq", "--conf-file=/etc/dhcpd/dhcpd-serve0-serve0.conf",
                                  "--keep-in-foreground", "--port=0", "--user=root", "--pid-file=/tmp/platform/pid",
                                  "--no-ping"});
-    WriteFile("/tmp/platform/lease",
+    WriteText("/tmp/platform/lease",
               "#!/bin/sh\n[ \"$1\" != bound ] || echo \"$ip $subnet $router $dns $domain $lease\""
               " > /tmp/platform/leased\n",
               0755);
     Shell("busybox udhcpc -i ask0 -f -n -q -B -t 20 -T 1 -s /tmp/platform/lease 2>&1");
   }
   Shell("ip link delete serve0");
-  EXPECT_EQ(ReadFile("/tmp/platform/leased"),
+  EXPECT_EQ(ReadText("/tmp/platform/leased"),
             "10.1.14.77 255.255.255.0 10.1.14.1 10.1.14.1 10.1.14.3 home.example 7200\n");
-  EXPECT_THAT(ReadFile("/tmp/platform/leases"), testing::HasSubstr(" 10.1.14.77 "));
+  EXPECT_THAT(ReadText("/tmp/platform/leases"), testing::HasSubstr(" 10.1.14.77 "));
 }
 
 }  // namespace

@@ -81,14 +81,14 @@ TEST_F(Disconnecting, SucceedsWhenThereIsNothingToEnd) {
 }
 
 TEST_F(Disconnecting, ForgetsTheConnection) {
-  WriteFile(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
+  WriteText(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   EXPECT_FALSE(fs::exists(kRecord));
 }
 
 TEST_F(Disconnecting, EndsTheSupplicant) {
   StandIn supplicant(kSupplicant);
-  WriteFile(kSupplicantPid, supplicant.pid() + "\n");
+  WriteText(kSupplicantPid, supplicant.pid() + "\n");
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   EXPECT_EQ(supplicant.endedBy(), SIGTERM);
   EXPECT_FALSE(fs::exists(kSupplicantPid));
@@ -97,8 +97,8 @@ TEST_F(Disconnecting, EndsTheSupplicant) {
 TEST_F(Disconnecting, EndsTheDhcpClientOfTheInterface) {
   StandIn client(kDhcpClient);
   StandIn other(kDhcpClient);
-  WriteFile("/var/run/udhcpc-wlan0.pid", client.pid());
-  WriteFile("/var/run/udhcpc-eth0.pid", other.pid());
+  WriteText("/var/run/udhcpc-wlan0.pid", client.pid());
+  WriteText("/var/run/udhcpc-eth0.pid", other.pid());
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   EXPECT_EQ(client.endedBy(), SIGTERM);
   EXPECT_FALSE(fs::exists("/var/run/udhcpc-wlan0.pid"));
@@ -108,7 +108,7 @@ TEST_F(Disconnecting, EndsTheDhcpClientOfTheInterface) {
 
 TEST_F(Disconnecting, KillsADaemonThatDoesNotEndInTwoSeconds) {
   StandIn supplicant(kSupplicant, StandIn::Manner::kIgnoresBeingAsked);
-  WriteFile(kSupplicantPid, supplicant.pid());
+  WriteText(kSupplicantPid, supplicant.pid());
   const auto begin = std::chrono::steady_clock::now();
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   EXPECT_GE(std::chrono::steady_clock::now() - begin, std::chrono::milliseconds(1900));
@@ -120,7 +120,7 @@ TEST_F(Disconnecting, KillsADaemonThatDoesNotEndInTwoSeconds) {
 TEST_F(Disconnecting, EndsADaemonWhoseProgramWasReplaced) {
   StandIn supplicant(kSupplicant);
   fs::remove(kSupplicant);
-  WriteFile(kSupplicantPid, supplicant.pid());
+  WriteText(kSupplicantPid, supplicant.pid());
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   EXPECT_EQ(supplicant.endedBy(), SIGTERM);
 }
@@ -129,7 +129,7 @@ TEST_F(Disconnecting, EndsADaemonWhoseProgramWasReplaced) {
 TEST_F(Disconnecting, EndsNoOtherProgram) {
   for (const char* szName : {"bystander", "my_wpa_supplicant", "wpa_supplicant2", "wpa_supplican", "busybox"}) {
     StandIn bystander(std::string(kDirectory) + "/" + szName);
-    WriteFile(kSupplicantPid, bystander.pid());
+    WriteText(kSupplicantPid, bystander.pid());
     EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
     EXPECT_TRUE(bystander.runs()) << szName;
     EXPECT_FALSE(fs::exists(kSupplicantPid)) << szName;
@@ -142,7 +142,7 @@ TEST_F(Disconnecting, EndsNobodyForAFileThatHoldsNoPid) {
        {std::string(), std::string("\n"), std::string("x"), "-" + supplicant.pid(), "+" + supplicant.pid(),
         supplicant.pid() + "x", supplicant.pid() + " 1", "x" + supplicant.pid(), std::string("0"), std::string("-1"),
         std::string("99999999999999999999")}) {
-    WriteFile(kSupplicantPid, content);
+    WriteText(kSupplicantPid, content);
     EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0) << content;
     EXPECT_TRUE(supplicant.runs()) << content;
     EXPECT_FALSE(fs::exists(kSupplicantPid)) << content;
@@ -152,8 +152,8 @@ TEST_F(Disconnecting, EndsNobodyForAFileThatHoldsNoPid) {
 TEST_F(Disconnecting, GoesOnAfterAStepThatFails) {
   fs::create_directory(kSupplicantPid);
   StandIn client(kDhcpClient);
-  WriteFile("/var/run/udhcpc-wlan0.pid", client.pid());
-  WriteFile(kRecord, "home\n");
+  WriteText("/var/run/udhcpc-wlan0.pid", client.pid());
+  WriteText(kRecord, "home\n");
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), -1);
   ExpectFailure(ERR_BAD_PARAMETERS, "Failed to end the supplicant of wlan0: Invalid argument");
   EXPECT_EQ(client.endedBy(), SIGTERM);
@@ -230,7 +230,7 @@ TEST_F(DisconnectingAnAdapter, RemovesAnAddressThatHasANameOfItsOwn) {
 TEST_F(DisconnectingAnAdapter, GoesOnWhenTheDriverRefuses) {
   driver_.refusal = EIO;
   Shell("ip address add 10.1.1.2/24 dev wlan3");
-  WriteFile(kRecord, "home\n");
+  WriteText(kRecord, "home\n");
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), -1);
   ExpectFailure(ERR_IO, "Failed to leave the network of wlan3: Input/output error");
   EXPECT_EQ(interface_.addresses(), "");

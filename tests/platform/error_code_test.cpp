@@ -37,7 +37,7 @@ TEST_F(ErrorCode, TellsThatTheDirectoryIsMissing) {
 }
 
 TEST_F(ErrorCode, TellsThatTheDirectoryIsNone) {
-  WriteFile(kFile, "");
+  WriteText(kFile, "");
   EXPECT_EQ(Touch("/tmp/platform/file/below"), -1);
   ExpectFailure(ERR_FILE_NOT_FOUND, "Failed to create /tmp/platform/file/below: Not a directory");
 }
@@ -51,7 +51,7 @@ TEST_F(ErrorCode, TellsThatWritingIsForbidden) {
 
 TEST_F(ErrorCode, TellsThatTheDiskIsFull) {
   const MemoryFileSystem disk("/tmp/platform/disk", "nr_inodes=2");
-  WriteFile("/tmp/platform/disk/last", "");
+  WriteText("/tmp/platform/disk/last", "");
   EXPECT_EQ(Touch("/tmp/platform/disk/file"), -1);
   ExpectFailure(ERR_NO_SPACE, "Failed to create /tmp/platform/disk/file: No space left on device");
 }
@@ -64,7 +64,7 @@ TEST_F(ErrorCode, TellsThatANameIsTooLong) {
 
 TEST_F(ErrorCode, TellsThatAFileIsTooLarge) {
   constexpr std::uintmax_t kMoreThanIsRead = (std::uintmax_t{64} << 20) + 1;
-  WriteFile(kFile, "KEY=value\n");
+  WriteText(kFile, "KEY=value\n");
   std::filesystem::resize_file(kFile, kMoreThanIsRead);
   char szValue[8] = "as was";
   EXPECT_EQ(PLIBCFileGetKeyValue(kFile, "KEY", szValue, sizeof szValue, 0), -1);

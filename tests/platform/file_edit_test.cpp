@@ -2,16 +2,16 @@
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
 #include <filesystem>
 #include <fstream>
 #include <functional>
-#include <thread>
+#include <set>
 
 #include "tests/platform/platform_test.h"
+#include "tests/support/processes.h"
 
 namespace {
 
@@ -72,11 +72,11 @@ class AFileThatIsChanged : public PlatformTest {};
 
 TEST_F(AFileThatIsChanged, IsReplacedAsAWholeSoThatReadersNeverSeeAPart) {
   for (const Change& change : kChanges) {
-    WriteFile(kFile, change.szBefore);
+    WriteText(kFile, change.szBefore);
     std::ifstream reader(kFile);
     ASSERT_TRUE(change.make(kFile)) << change.szName;
     EXPECT_EQ(std::string(std::istreambuf_iterator<char>(reader), {}), change.szBefore) << change.szName;
-    EXPECT_EQ(ReadFile(kFile), change.szAfter) << change.szName;
+    EXPECT_EQ(ReadText(kFile), change.szAfter) << change.szName;
     EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file")) << change.szName;
   }
 }
@@ -84,7 +84,7 @@ TEST_F(AFileThatIsChanged, IsReplacedAsAWholeSoThatReadersNeverSeeAPart) {
 TEST_F(AFileThatIsChanged, KeepsItsMode) {
   for (const mode_t mode : {0600u, 0644u, 0666u, 0640u, 0400u, 04755u}) {
     for (const Change& change : kChanges) {
-      WriteFile(kFile, change.szBefore, mode);
+      WriteText(kFile, change.szBefore, mode);
       ASSERT_TRUE(change.make(kFile)) << change.szName;
       EXPECT_EQ(ModeOf(kFile), mode) << change.szName;
     }
@@ -93,7 +93,7 @@ TEST_F(AFileThatIsChanged, KeepsItsMode) {
 
 TEST_F(AFileThatIsChanged, KeepsItsOwner) {
   for (const Change& change : kChanges) {
-    WriteFile(kFile, change.szBefore, 0640);
+    WriteText(kFile, change.szBefore, 0640);
     if (::chown(kFile, 1234, 5678) < 0) GTEST_SKIP() << "not the machine's root";
     ASSERT_TRUE(change.make(kFile)) << change.szName;
     struct stat info;
@@ -110,10 +110,10 @@ TEST_F(AFileThatIsChanged, IsReachedThroughLinksAndTheLinksStay) {
   fs::create_symlink("directory/file", "/tmp/platform/second");
   fs::create_symlink("/tmp/platform/second", "/tmp/platform/first");
   for (const Change& change : kChanges) {
-    WriteFile("/tmp/platform/real/file", change.szBefore);
+    WriteText("/tmp/platform/real/file", change.szBefore);
     ASSERT_TRUE(change.make("/tmp/platform/first")) << change.szName;
     EXPECT_TRUE(fs::is_symlink("/tmp/platform/first") && fs::is_symlink("/tmp/platform/second")) << change.szName;
-    EXPECT_EQ(ReadFile("/tmp/platform/real/file"), change.szAfter) << change.szName;
+    EXPECT_EQ(ReadText("/tmp/platform/real/file"), change.szAfter) << change.szName;
     EXPECT_THAT(NamesIn("/tmp/platform/real"), ElementsAre("file")) << change.szName;
   }
 }
@@ -123,24 +123,24 @@ TEST_F(AFileThatIsChanged, IsMadeWhereADanglingLinkPoints) {
   fs::create_symlink("real/file", "/tmp/platform/link");
   EXPECT_EQ(PLIBCFileSetKeyValue("/tmp/platform/link", "KEY", "value", "%s=%s\n"), 1);
   EXPECT_TRUE(fs::is_symlink("/tmp/platform/link"));
-  EXPECT_EQ(ReadFile("/tmp/platform/real/file"), "KEY=value\n");
+  EXPECT_EQ(ReadText("/tmp/platform/real/file"), "KEY=value\n");
 }
 
 TEST_F(AFileThatIsChanged, MayBeNamedFromTheCurrentDirectory) {
   fs::current_path(kDirectory);
   for (const Change& change : kChanges) {
-    WriteFile("file", change.szBefore);
+    WriteText("file", change.szBefore);
     ASSERT_TRUE(change.make("file")) << change.szName;
-    EXPECT_EQ(ReadFile("file"), change.szAfter) << change.szName;
+    EXPECT_EQ(ReadText("file"), change.szAfter) << change.szName;
   }
 }
 
 TEST_F(AFileThatIsChanged, IsNotDisturbedByWhatAKilledWriterLeft) {
   for (const Change& change : kChanges) {
-    WriteFile(kFile, change.szBefore);
-    WriteFile("/tmp/platform/.file.new", "half of some");
+    WriteText(kFile, change.szBefore);
+    WriteText("/tmp/platform/.file.new", "half of some");
     ASSERT_TRUE(change.make(kFile)) << change.szName;
-    EXPECT_EQ(ReadFile(kFile), change.szAfter) << change.szName;
+    EXPECT_EQ(ReadText(kFile), change.szAfter) << change.szName;
     EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file")) << change.szName;
   }
 }
@@ -148,21 +148,21 @@ TEST_F(AFileThatIsChanged, IsNotDisturbedByWhatAKilledWriterLeft) {
 // Whoever may write to the directory could lead the new content, secrets included, to a file of theirs.
 TEST_F(AFileThatIsChanged, IsNeverWrittenThroughALinkInItsWay) {
   for (const Change& change : kChanges) {
-    WriteFile(kFile, change.szBefore);
-    WriteFile("/tmp/platform/victim", "as was");
+    WriteText(kFile, change.szBefore);
+    WriteText("/tmp/platform/victim", "as was");
     fs::create_symlink("victim", "/tmp/platform/.file.new");
     ASSERT_TRUE(change.make(kFile)) << change.szName;
-    EXPECT_EQ(ReadFile("/tmp/platform/victim"), "as was") << change.szName;
-    EXPECT_EQ(ReadFile(kFile), change.szAfter) << change.szName;
+    EXPECT_EQ(ReadText("/tmp/platform/victim"), "as was") << change.szName;
+    EXPECT_EQ(ReadText(kFile), change.szAfter) << change.szName;
   }
 }
 
 TEST_F(AFileThatIsChanged, LeavesNoDescriptorOpen) {
   for (const Change& change : kChanges) {
-    WriteFile(kFile, change.szBefore);
-    const std::vector<std::string> before = NamesIn("/proc/self/fd");
+    WriteText(kFile, change.szBefore);
+    const std::set<int> before = OpenDescriptors();
     ASSERT_TRUE(change.make(kFile)) << change.szName;
-    EXPECT_EQ(NamesIn("/proc/self/fd"), before) << change.szName;
+    EXPECT_EQ(OpenDescriptors(), before) << change.szName;
   }
 }
 
@@ -207,20 +207,10 @@ class Writer {
   explicit Writer(const Rival& rival) : pid_(::fork()) {
     if (pid_ == 0) rival.Close();
     if (pid_ == 0) ::_exit(PLIBCFileSetKeyValue(kPath, "KEY", "new", "%s=%s\n") == 1 ? 0 : 1);
-    using std::chrono_literals::operator""ms;
-    bool asks = false;
-    for (int i = 0; i < 2000 && !asks; ++i) {
-      asks = AsksForLock(pid_);
-      if (!asks) std::this_thread::sleep_for(5ms);
-    }
-    EXPECT_TRUE(asks) << "process " << pid_ << " does not ask for the lock";
+    EXPECT_TRUE(Soon([this] { return AsksForLock(pid_); })) << "process " << pid_ << " does not ask for the lock";
   }
 
-  bool Succeeds() const {
-    int state = -1;
-    EXPECT_EQ(::waitpid(pid_, &state, 0), pid_);
-    return state == 0;
-  }
+  bool Succeeds() const { return StatusOf(pid_) == 0; }
 
  private:
   static constexpr char kPath[] = "/tmp/platform/file";
@@ -230,32 +220,32 @@ class Writer {
 
 // A rival that replaces the file while another waits for it must not have its change undone.
 TEST_F(AFileThatIsChanged, WaitsForAnotherWriterAndKeepsWhatThatWrote) {
-  WriteFile(kFile, "KEY=old\nRIVAL=old\n");
+  WriteText(kFile, "KEY=old\nRIVAL=old\n");
   Rival rival;
   const Writer writer(rival);
-  EXPECT_EQ(ReadFile(kFile), "KEY=old\nRIVAL=old\n");
-  WriteFile("/tmp/platform/rival", "KEY=old\nRIVAL=new\n");
+  EXPECT_EQ(ReadText(kFile), "KEY=old\nRIVAL=old\n");
+  WriteText("/tmp/platform/rival", "KEY=old\nRIVAL=new\n");
   fs::rename("/tmp/platform/rival", kFile);
   rival.GiveUp();
   EXPECT_TRUE(writer.Succeeds());
-  EXPECT_EQ(ReadFile(kFile), "KEY=new\nRIVAL=new\n");
+  EXPECT_EQ(ReadText(kFile), "KEY=new\nRIVAL=new\n");
 }
 
 // The process crashed, and left its lock.
 TEST_F(AFileThatIsChanged, IsMadeAnewWhenARivalRemovesItMeanwhile) {
-  WriteFile(kFile, "A=1\n");
+  WriteText(kFile, "A=1\n");
   Rival rival;
   const Writer writer(rival);
   fs::remove(kFile);
   rival.GiveUp();
   EXPECT_TRUE(writer.Succeeds());
-  EXPECT_EQ(ReadFile(kFile), "KEY=new\n");
+  EXPECT_EQ(ReadText(kFile), "KEY=new\n");
   EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file"));
 }
 
 TEST_F(AFileThatIsChanged, IsReportedAfterAWhileWhenARivalKeepsItsLock) {
   for (const Change& change : kChanges) {
-    WriteFile(kFile, change.szBefore);
+    WriteText(kFile, change.szBefore);
     Rival rival;
     g_naps = 0;
     g_slept = {};
@@ -265,14 +255,14 @@ TEST_F(AFileThatIsChanged, IsReportedAfterAWhileWhenARivalKeepsItsLock) {
     const std::vector<LogLine> log = TakeLog();
     ASSERT_EQ(log.size(), 1u);
     EXPECT_THAT(log[0].text, testing::EndsWith(" /tmp/platform/file: another process keeps its lock"));
-    EXPECT_EQ(ReadFile(kFile), change.szBefore) << change.szName;
+    EXPECT_EQ(ReadText(kFile), change.szBefore) << change.szName;
     g_naps = -1;
   }
 }
 
 // Each new lock was waited for anew.
 TEST_F(AFileThatIsChanged, IsNotWaitedForLongerWhenItsLockIsTakenAgainAndAgain) {
-  WriteFile(kFile, "KEY=old\n");
+  WriteText(kFile, "KEY=old\n");
   std::vector<int> locks;
   g_whileNapping = [&locks](int nap) {
     if (nap % 1000 != 1) return;
@@ -297,7 +287,7 @@ TEST_F(AFileThatIsChanged, GetsItsModeWhateverTheUmask) {
     for (const Change& change : kChanges) {
       PLIBCSysUnlink(kFile);
       if (!change.make(kFile)) continue;  // there was no key to remove
-      const bool hasSections = ReadFile(kFile).starts_with('[');
+      const bool hasSections = ReadText(kFile).starts_with('[');
       EXPECT_EQ(ModeOf(kFile), hasSections ? 0600u : 0644u) << change.szName;
       ASSERT_TRUE(change.make(kFile)) << change.szName;
       EXPECT_EQ(ModeOf(kFile), hasSections ? 0600u : 0644u) << change.szName;

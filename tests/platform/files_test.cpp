@@ -13,7 +13,7 @@ namespace fs = std::filesystem;
 class Files : public PlatformTest {};
 
 TEST_F(Files, ExistWhenTheirPathLeadsToSomething) {
-  WriteFile(kFile, "");
+  WriteText(kFile, "");
   fs::create_symlink("file", "/tmp/platform/link");
   fs::create_symlink("missing", "/tmp/platform/dangling");
   const struct {
@@ -36,20 +36,20 @@ TEST_F(Files, ExistWhenTheirPathLeadsToSomething) {
 TEST_F(Files, AreTouchedIntoBeingEmptyAndForTheOwnerAlone) {
   ::umask(0);
   EXPECT_EQ(PLIBCFileTouch(kFile), 0);
-  EXPECT_EQ(ReadFile(kFile), "");
+  EXPECT_EQ(ReadText(kFile), "");
   EXPECT_EQ(ModeOf(kFile), 0600u);
 }
 
 TEST_F(Files, KeepContentAndModeWhenTouched) {
-  WriteFile(kFile, "content", 0644);
+  WriteText(kFile, "content", 0644);
   EXPECT_EQ(PLIBCFileTouch(kFile), 0);
-  EXPECT_EQ(ReadFile(kFile), "content");
+  EXPECT_EQ(ReadText(kFile), "content");
   EXPECT_EQ(ModeOf(kFile), 0644u);
 }
 
 TEST_F(Files, ThatExistCanBeTouchedWhereNothingCanBeWritten) {
   MemoryFileSystem disk("/tmp/platform/disk", "");
-  WriteFile("/tmp/platform/disk/file", "");
+  WriteText("/tmp/platform/disk/file", "");
   disk.MakeReadOnly();
   EXPECT_EQ(PLIBCFileTouch("/tmp/platform/disk/file"), 0);
 }
@@ -60,14 +60,14 @@ TEST_F(Files, ThatCannotBeMadeAreReported) {
 }
 
 TEST_F(Files, AreUnlinkedWhetherTheyAreThereOrNot) {
-  WriteFile(kFile, "");
+  WriteText(kFile, "");
   EXPECT_EQ(PLIBCSysUnlink(kFile), 0);
   EXPECT_FALSE(fs::exists(kFile));
   EXPECT_EQ(PLIBCSysUnlink(kFile), 0);
 }
 
 TEST_F(Files, AreLeftAloneWhenALinkToThemIsUnlinked) {
-  WriteFile(kFile, "");
+  WriteText(kFile, "");
   fs::create_symlink("file", "/tmp/platform/link");
   EXPECT_EQ(PLIBCSysUnlink("/tmp/platform/link"), 0);
   EXPECT_THAT(NamesIn(kDirectory), testing::ElementsAre("file"));
@@ -80,7 +80,7 @@ TEST_F(Files, ThatAreDirectoriesAreNotUnlinked) {
 }
 
 TEST_F(Files, AndEmptyDirectoriesAreRemovedWhetherTheyAreThereOrNot) {
-  WriteFile(kFile, "");
+  WriteText(kFile, "");
   fs::create_directory("/tmp/platform/empty");
   for (const char* szPath : {kFile, "/tmp/platform/empty", kMissing}) {
     EXPECT_EQ(PLIBCSysRemove(szPath), 0) << szPath;
@@ -89,7 +89,7 @@ TEST_F(Files, AndEmptyDirectoriesAreRemovedWhetherTheyAreThereOrNot) {
 }
 
 TEST_F(Files, KeepTheirDirectoryFromBeingRemoved) {
-  WriteFile(kFile, "");
+  WriteText(kFile, "");
   EXPECT_EQ(PLIBCSysRemove(kDirectory), -1);
   ExpectFailure(ERR_UNKNOWN, "Failed to remove /tmp/platform: Directory not empty");
   EXPECT_TRUE(fs::exists(kFile));

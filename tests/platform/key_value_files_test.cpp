@@ -15,7 +15,7 @@ class KeyValueFile : public PlatformTest {
  protected:
   // The value of a key in a file of that content; "(none)" when it is not found.
   static std::string ValueIn(std::string_view content, const char* szKey) {
-    WriteFile(kFile, content);
+    WriteText(kFile, content);
     char szValue[64] = "(none)";
     const int found = PLIBCFileGetKeyValue(kFile, szKey, szValue, sizeof szValue, 0);
     EXPECT_EQ(found, std::string_view(szValue) == "(none)" ? 0 : 1) << content;
@@ -25,15 +25,15 @@ class KeyValueFile : public PlatformTest {
   // What becomes of a file of that content when a value is set.
   static std::string Set(std::string_view content, const char* szKey, const char* szValue,
                          const char* szFormat = kPlain) {
-    WriteFile(kFile, content);
+    WriteText(kFile, content);
     EXPECT_EQ(PLIBCFileSetKeyValue(kFile, szKey, szValue, szFormat), 1) << content;
-    return ReadFile(kFile);
+    return ReadText(kFile);
   }
 };
 
 TEST_F(KeyValueFile, GivesTheValueThatAShellWouldSee) {
   for (const Reading& row : ValueReadings()) {
-    WriteFile(kFile, row.text);
+    WriteText(kFile, row.text);
     std::string value(256 * 1024, '\0');
     ASSERT_EQ(PLIBCFileGetKeyValue(kFile, row.key.c_str(), value.data(), value.size(), 0), row.value ? 1 : 0)
         << Shortened(row.text);
@@ -44,7 +44,7 @@ TEST_F(KeyValueFile, GivesTheValueThatAShellWouldSee) {
 
 TEST_F(KeyValueFile, SwitchesOnWithTheExactWordAlone) {
   for (const Reading& row : SwitchReadings()) {
-    WriteFile(kFile, row.text);
+    WriteText(kFile, row.text);
     EXPECT_EQ(PLIBCFileCheckKeyValue(kFile, row.key.c_str(), "yes", 0), row.value == "yes" ? 1 : 0) << row.text;
   }
 }
@@ -64,7 +64,7 @@ TEST_F(KeyValueFile, HasNoKeyWhileItIsMissing) {
 }
 
 TEST_F(KeyValueFile, CutsAValueToTheCallersBuffer) {
-  WriteFile(kFile, "KEY=value\n");
+  WriteText(kFile, "KEY=value\n");
   const struct {
     size_t size;
     std::string_view buffer;
@@ -80,7 +80,7 @@ TEST_F(KeyValueFile, CutsAValueToTheCallersBuffer) {
 }
 
 TEST_F(KeyValueFile, HoldsAValueOnlyWhenItIsExactlyThat) {
-  WriteFile(kFile, "RUN=\"yes\"\nEMPTY=\nTWICE=yes\nTWICE=no\n");
+  WriteText(kFile, "RUN=\"yes\"\nEMPTY=\nTWICE=yes\nTWICE=no\n");
   const struct {
     const char* szKey;
     const char* szExpected;
@@ -149,10 +149,10 @@ TEST_F(KeyValueFile, StaysWhenAPairWouldNotReadBack) {
       {"[KEY", "v]", kPlain},
   };
   for (const auto& row : rows) {
-    WriteFile(kFile, "KEY=old\n");
+    WriteText(kFile, "KEY=old\n");
     EXPECT_EQ(PLIBCFileSetKeyValue(kFile, row.szKey, row.szValue, row.szFormat), -1) << row.szKey << row.szValue;
     ExpectFailure(ERR_BAD_PARAMETERS, "Failed to write /tmp/platform/file: Invalid argument");
-    EXPECT_EQ(ReadFile(kFile), "KEY=old\n") << row.szKey << row.szValue;
+    EXPECT_EQ(ReadText(kFile), "KEY=old\n") << row.szKey << row.szValue;
   }
   EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file"));
 }
@@ -162,10 +162,10 @@ TEST_F(KeyValueFile, StaysWhenTheFormatIsNoLineOfAPair) {
        {"",         "\n",          "%s\n",     "=%s\n",     "%s=%s",     "%s=%s%s\n", "%s=%s\n\n", "\n%s=%s\n",
         "%s=%d\n",  "%d=%s\n",     "%s=%n\n",  "%%s=%s\n",  "%s=%s%%\n", "%s=%s%\n",  "%s %s\n",   "#%s=%s\n",
         "%s=%5s\n", "%1$s=%2$s\n", "%s=%s#\n", "[%s=%s]\n", "x%s=%s\n",  "%s=\"%s'\n"}) {
-    WriteFile(kFile, "KEY=old\n");
+    WriteText(kFile, "KEY=old\n");
     EXPECT_EQ(PLIBCFileSetKeyValue(kFile, "KEY", "new", szFormat), -1) << szFormat;
     ExpectFailure(ERR_BAD_PARAMETERS, "Failed to write /tmp/platform/file: Invalid argument");
-    EXPECT_EQ(ReadFile(kFile), "KEY=old\n") << szFormat;
+    EXPECT_EQ(ReadText(kFile), "KEY=old\n") << szFormat;
   }
 }
 
@@ -177,7 +177,7 @@ TEST_F(KeyValueFile, IsNotMadeForAPairThatIsRefused) {
 
 TEST_F(KeyValueFile, IsMadeForEverybodyToRead) {
   EXPECT_EQ(PLIBCFileSetKeyValue(kFile, "KEY", "value", kPlain), 1);
-  EXPECT_EQ(ReadFile(kFile), "KEY=value\n");
+  EXPECT_EQ(ReadText(kFile), "KEY=value\n");
   EXPECT_EQ(ModeOf(kFile), 0644u);
 }
 
@@ -192,14 +192,14 @@ TEST_F(KeyValueFile, LosesEveryLineOfAKeyAndNoOtherByte) {
       {"A=1\r\n KEY = 'a' \r\n#KEY=b\nkey=c\n\nKEY=d\nB=2", "A=1\r\n#KEY=b\nkey=c\n\nB=2"},
   };
   for (const auto& row : rows) {
-    WriteFile(kFile, row.before);
+    WriteText(kFile, row.before);
     EXPECT_EQ(PLIBCFileRemoveKey(kFile, "KEY"), 1) << row.before;
-    EXPECT_EQ(ReadFile(kFile), row.after) << row.before;
+    EXPECT_EQ(ReadText(kFile), row.after) << row.before;
   }
 }
 
 TEST_F(KeyValueFile, IsNotReplacedWhenThereIsNoKeyToRemove) {
-  WriteFile(kFile, "A=1\n");
+  WriteText(kFile, "A=1\n");
   std::filesystem::create_hard_link(kFile, "/tmp/platform/same");
   EXPECT_EQ(PLIBCFileRemoveKey(kFile, "KEY"), 0);
   ExpectNothingFound(ERR_KEY_NOT_FOUND);

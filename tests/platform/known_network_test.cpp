@@ -27,7 +27,7 @@ class KnownNetwork : public PlatformTest {
 
   // The network of a section that holds these lines.
   static WIRELESS_NETWORK_CONFIG Of(const std::string& lines) {
-    WriteFile(kKnownNetworksPath, std::string("[") + kBssid + "]\n" + lines);
+    WriteText(kKnownNetworksPath, std::string("[") + kBssid + "]\n" + lines);
     return Get();
   }
 
@@ -57,7 +57,7 @@ TEST_F(KnownNetwork, IsReadFieldByField) {
 TEST_F(KnownNetwork, HasWhatIsNotSavedZero) {
   WIRELESS_NETWORK_CONFIG config;
   std::memset(&config, 'x', sizeof config);
-  WriteFile(kKnownNetworksPath, std::string("[") + kBssid + "]\n\tCHANNEL=6\n\tUSER=x\n\tSIGNAL=9\n\tPROTOCOL=11b\n");
+  WriteText(kKnownNetworksPath, std::string("[") + kBssid + "]\n\tCHANNEL=6\n\tUSER=x\n\tSIGNAL=9\n\tPROTOCOL=11b\n");
   ASSERT_EQ(MEROWirelessConfGet(kBssid, &config), 0);
   EXPECT_EQ(config.network.channel, 0);
   EXPECT_EQ(config.network.signal, 0);
@@ -181,7 +181,7 @@ TEST_F(KnownNetwork, HasOfARepeatedKeyTheLast) {
 }
 
 TEST_F(KnownNetwork, IsTheFirstOfSeveralSectionsOfItsName) {
-  WriteFile(kKnownNetworksPath,
+  WriteText(kKnownNetworksPath,
             "[x]\nESSID=x\n[ 00:11:22:aa:bb:cc ]\r\nESSID=first\r\n[00:11:22:AA:BB:CC]\nESSID=second\n");
   EXPECT_STREQ(Get("00:11:22:AA:BB:CC").network.szEssid, "first");
   EXPECT_STREQ(Get("00:11:22:aa:bb:cc").network.szEssid, "first");
@@ -189,7 +189,7 @@ TEST_F(KnownNetwork, IsTheFirstOfSeveralSectionsOfItsName) {
 
 TEST_F(KnownNetwork, MayStandInASectionOfAnyName) {
   for (const char* szName : {"", "two words", "a]", "[a", "\xFF\xFE", "KEY=value"}) {
-    WriteFile(kKnownNetworksPath, "[other]\nESSID=other\n[" + std::string(szName) + "]\nESSID=this\n[last]\n");
+    WriteText(kKnownNetworksPath, "[other]\nESSID=other\n[" + std::string(szName) + "]\nESSID=this\n[last]\n");
     EXPECT_STREQ(Get(szName).network.szEssid, "this") << szName;
   }
 }
@@ -202,7 +202,7 @@ TEST_F(KnownNetwork, ThatIsNotSavedIsNotFound) {
   EXPECT_EQ(MEROWirelessConfGet(kBssid, &config), -1);
   ExpectNothingFound(ERR_FILE_NOT_FOUND);
   for (const char* szContent : {"", "[00:11:22:AA:BB:CD]\nESSID=x\n", "ESSID=x\n", "00:11:22:AA:BB:CC\n"}) {
-    WriteFile(kKnownNetworksPath, szContent);
+    WriteText(kKnownNetworksPath, szContent);
     EXPECT_EQ(MEROWirelessConfGet(kBssid, &config), -1) << szContent;
     ExpectNothingFound(ERR_SECTION_NOT_FOUND);
   }

@@ -2,7 +2,6 @@
 #include <fcntl.h>
 #include <sys/inotify.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -16,10 +15,9 @@
 #include "common/paths.h"
 #include "tests/platform/containers.h"
 #include "tests/platform/platform_test.h"
+#include "tests/support/processes.h"
 
 namespace {
-
-using std::chrono_literals::operator""ms;
 
 std::string NameOf(int i) {
   return "network " + std::to_string(i);
@@ -33,14 +31,6 @@ std::string Networks(int count, const std::string& essid = "old") {
   std::string text;
   for (int i = 0; i < count; ++i) text += TextOf(i, essid);
   return text;
-}
-
-// Waits until the clock has left the file's last change far enough behind that a change from now on is bound to show.
-void LetTheFileSettle() {
-  const auto age = [] {
-    return std::filesystem::file_time_type::clock::now() - std::filesystem::last_write_time(kKnownNetworksPath);
-  };
-  while (age() < 100ms) std::this_thread::sleep_for(5ms);
 }
 
 // Counts how often a file is opened.
@@ -82,11 +72,7 @@ class Walk : public PlatformTest {
   // As another process.
   template <class Action>
   static void Elsewhere(Action action) {
-    const pid_t pid = ::fork();
-    if (pid == 0) ::_exit(action() ? 0 : 1);
-    int state = -1;
-    ASSERT_EQ(::waitpid(pid, &state, 0), pid);
-    ASSERT_EQ(state, 0);
+    ASSERT_EQ(RunInChild([&] { return action() ? 0 : 1; }), 0);
   }
 
   static bool Overwrite(off_t offset, std::string_view text) {
@@ -97,15 +83,15 @@ class Walk : public PlatformTest {
 };
 
 TEST_F(Walk, SeesEveryNetworkOnce) {
-  WriteFile(kKnownNetworksPath, Networks(100));
-  LetTheFileSettle();
+  WriteText(kKnownNetworksPath, Networks(100));
+  LetSettle(kKnownNetworksPath);
   for (int round = 0; round < 3; ++round) WalkOver(100);
 }
 
 TEST_F(Walk, ReadsTheFileOnceAndKeepsNothingOfItBehindTheLastNetwork) {
   for (const int count : {1, 2, 100}) {
-    WriteFile(kKnownNetworksPath, Networks(count));
-    LetTheFileSettle();
+    WriteText(kKnownNetworksPath, Networks(count));
+    LetSettle(kKnownNetworksPath);
     for (int round = 0; round < 3; ++round) {
       OpenCounter opens(kKnownNetworksPath);
       WalkOver(count);
@@ -120,8 +106,8 @@ TEST_F(Walk, KeepsNothingBehindTheLastNetworkOfAnyFile) {
       {"[a]\n[b\0c]\n[d]\n", 14},
   };
   for (const std::string_view content : contents) {
-    WriteFile(kKnownNetworksPath, content);
-    LetTheFileSettle();
+    WriteText(kKnownNetworksPath, content);
+    LetSettle(kKnownNetworksPath);
     for (int round = 0; round < 3; ++round) {
       TextList names;
       ASSERT_EQ(PLIBCFileEnumSection(kKnownNetworksPath, names.address()), names.get()->nItem);
@@ -137,8 +123,8 @@ TEST_F(Walk, KeepsNothingBehindTheLastNetworkOfAnyFile) {
 }
 
 TEST_F(Walk, SeesAFileThatAnotherProcessPutInPlace) {
-  WriteFile(kKnownNetworksPath, Networks(4));
-  LetTheFileSettle();
+  WriteText(kKnownNetworksPath, Networks(4));
+  LetSettle(kKnownNetworksPath);
   WalkOver(2);
   Elsewhere(
       [] { return PLIBCFileSetSectionValue(kKnownNetworksPath, NameOf(2).c_str(), "ESSID", "new", "\t%s=%s\n") == 0; });
@@ -147,8 +133,8 @@ TEST_F(Walk, SeesAFileThatAnotherProcessPutInPlace) {
 }
 
 TEST_F(Walk, SeesAnEditOfTheFileByAnotherProcess) {
-  WriteFile(kKnownNetworksPath, Networks(4));
-  LetTheFileSettle();
+  WriteText(kKnownNetworksPath, Networks(4));
+  LetSettle(kKnownNetworksPath);
   WalkOver(2);
   const auto essid = static_cast<off_t>(Networks(2).size() + TextOf(2, "").find("ESSID=") + 6);
   Elsewhere([&] { return Overwrite(essid, "new"); });
@@ -168,11 +154,11 @@ TEST_F(Walk, SeesThatALinkWasTurnedToAnotherFile) {
   do {
     std::filesystem::remove(kOld);
     std::filesystem::remove(kNew);
-    WriteFile(kOld, Networks(4, "old"));
-    WriteFile(kNew, Networks(4, "new"));
+    WriteText(kOld, Networks(4, "old"));
+    WriteText(kNew, Networks(4, "new"));
   } while (changed(kOld) != changed(kNew));
   std::filesystem::create_symlink(kOld, kKnownNetworksPath);
-  LetTheFileSettle();
+  LetSettle(kKnownNetworksPath);
   WalkOver(2);
   std::filesystem::remove(kKnownNetworksPath);
   std::filesystem::create_symlink(kNew, kKnownNetworksPath);
@@ -183,7 +169,7 @@ TEST_F(Walk, SeesThatALinkWasTurnedToAnotherFile) {
 TEST_F(Walk, SeesAnEditThatComesRightBehindAnother) {
   const auto essid = static_cast<off_t>(Networks(1).size() + TextOf(1, "").find("ESSID=") + 6);
   for (int round = 0; round < 200; ++round) {
-    WriteFile(kKnownNetworksPath, Networks(4));
+    WriteText(kKnownNetworksPath, Networks(4));
     ASSERT_EQ(EssidOf(0), "old");
     ASSERT_TRUE(Overwrite(essid, "new"));
     ASSERT_EQ(EssidOf(1), "new") << round;
@@ -191,35 +177,35 @@ TEST_F(Walk, SeesAnEditThatComesRightBehindAnother) {
 }
 
 TEST_F(Walk, SeesThatTheFileWasRemovedOrEmptied) {
-  WriteFile(kKnownNetworksPath, Networks(4));
-  LetTheFileSettle();
+  WriteText(kKnownNetworksPath, Networks(4));
+  LetSettle(kKnownNetworksPath);
   WalkOver(2);
   std::filesystem::rename(kKnownNetworksPath, "/usr/mero/etc/aside");
   EXPECT_EQ(EssidOf(2), "(none)");
   std::filesystem::rename("/usr/mero/etc/aside", kKnownNetworksPath);
   WalkOver(2);
-  WriteFile(kKnownNetworksPath, "");
+  WriteText(kKnownNetworksPath, "");
   EXPECT_EQ(EssidOf(2), "(none)");
 }
 
 TEST_F(Walk, FindsASectionWhateverItsCaseAndTheFirstOfItsName) {
-  WriteFile(kKnownNetworksPath,
+  WriteText(kKnownNetworksPath,
             TextOf(0, "old") + "[NETWORK 1]\n\tESSID=old\n" + TextOf(1, "second") + TextOf(2, "old"));
-  LetTheFileSettle();
+  LetSettle(kKnownNetworksPath);
   WalkOver(3);
 }
 
 TEST_F(Walk, FindsNetworksInAnyOrderAndNoneThatIsNotThere) {
-  WriteFile(kKnownNetworksPath, Networks(10));
-  LetTheFileSettle();
+  WriteText(kKnownNetworksPath, Networks(10));
+  LetSettle(kKnownNetworksPath);
   for (const int i : {0, 5, 3, 3, 0, 11, 9, 2, 10, 1, 9, 9, 0, 4})
     EXPECT_EQ(EssidOf(i), i < 10 ? "old" : "(none)") << i;
 }
 
 TEST_F(Walk, TakesTimeInProportionToTheNumberOfNetworks) {
   const auto seconds = [](int count) {
-    WriteFile(kKnownNetworksPath, Networks(count));
-    LetTheFileSettle();
+    WriteText(kKnownNetworksPath, Networks(count));
+    LetSettle(kKnownNetworksPath);
     double least = 1e9;
     for (int round = 0; round < 3; ++round) {
       timespec begin;

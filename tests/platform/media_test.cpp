@@ -16,13 +16,13 @@ class MediaService : public PlatformTest {
 };
 
 TEST_F(MediaService, IsToldWhatToDo) {
-  WriteFile(kScript, "#!/bin/sh\nprintf '%s ' \"$@\" >>/tmp/platform/file\n", 0755);
+  WriteText(kScript, "#!/bin/sh\nprintf '%s ' \"$@\" >>/tmp/platform/file\n", 0755);
   for (const int action : {0, 1, 2}) EXPECT_EQ(MEROMediaService(action), 0);
-  EXPECT_EQ(ReadFile(kFile), "stop start restart ");
+  EXPECT_EQ(ReadText(kFile), "stop start restart ");
 }
 
 TEST_F(MediaService, IsNotAskedForWhatItCannotDo) {
-  WriteFile(kScript, "#!/bin/sh\n: >/tmp/platform/file\n", 0755);
+  WriteText(kScript, "#!/bin/sh\n: >/tmp/platform/file\n", 0755);
   for (const int action : {-1, 3}) {
     EXPECT_EQ(MEROMediaService(action), -1);
     ExpectFailure(ERR_BAD_PARAMETERS, "There is no action " + std::to_string(action) + " of the media service");
@@ -36,7 +36,7 @@ TEST_F(MediaService, IsReportedWhenItIsMissing) {
 }
 
 TEST_F(MediaService, IsReportedWhenItFails) {
-  WriteFile(kScript, "#!/bin/sh\nexit 3\n", 0755);
+  WriteText(kScript, "#!/bin/sh\nexit 3\n", 0755);
   EXPECT_EQ(MEROMediaService(2), -1);
   ExpectFailure(ERR_NONE, "/etc/rc.mediaservice restart ended with status 3");
 }

@@ -8,16 +8,7 @@
 #include <unistd.h>
 
 #include <csignal>
-#include <cstdio>
 #include <utility>
-
-std::string Shell(const std::string& command) {
-  std::string output;
-  FILE* pipe = ::popen(("PATH=/usr/sbin:/usr/bin:/sbin:/bin; " + command).c_str(), "re");
-  for (int c; pipe != nullptr && (c = std::fgetc(pipe)) != EOF;) output += static_cast<char>(c);
-  EXPECT_TRUE(pipe != nullptr && ::pclose(pipe) == 0) << command << "\n" << output;
-  return output;
-}
 
 // One end of a virtual cable; every kernel has those, unlike dummy interfaces.
 NetworkInterface::NetworkInterface(std::string name) : name_(std::move(name)) {

@@ -8,6 +8,8 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/shell.h"
+
 // An Ethernet interface that is connected to nobody, for as long as the holder lives.
 class NetworkInterface {
  public:
@@ -24,9 +26,6 @@ class NetworkInterface {
  private:
   std::string name_;
 };
-
-// Runs a command of the shell, which must succeed, and gives its output.
-std::string Shell(const std::string& command);
 
 // A program that runs until the holder ends.
 class RunningProgram {

@@ -1,15 +1,9 @@
 // What the tests of the platform have in common.
 #include "tests/platform/platform_test.h"
 
-#include <fcntl.h>
 #include <sys/mount.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
-#include <algorithm>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 
 using testing::ElementsAre;
 using testing::IsEmpty;
@@ -39,33 +33,6 @@ void ExpectNothingFound(int code) {
 
 void ExpectNullRefused() {
   ExpectFailure(ERR_BAD_PARAMETERS, "Bad parameters");
-}
-
-void WriteFile(const std::string& path, std::string_view content, mode_t mode) {
-  const int fd = ::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, mode);
-  ASSERT_GE(fd, 0) << path;
-  ASSERT_EQ(::write(fd, content.data(), content.size()), static_cast<ssize_t>(content.size())) << path;
-  ASSERT_EQ(::fchmod(fd, mode), 0) << path;
-  ASSERT_EQ(::close(fd), 0) << path;
-}
-
-std::string ReadFile(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  EXPECT_TRUE(file.is_open()) << path;
-  return {std::istreambuf_iterator<char>(file), {}};
-}
-
-mode_t ModeOf(const std::string& path) {
-  struct stat info = {};
-  EXPECT_EQ(::lstat(path.c_str(), &info), 0) << path;
-  return info.st_mode & 07777;
-}
-
-std::vector<std::string> NamesIn(const std::string& directory) {
-  std::vector<std::string> names;
-  for (const auto& entry : std::filesystem::directory_iterator(directory)) names.push_back(entry.path().filename());
-  std::ranges::sort(names);
-  return names;
 }
 
 MemoryFileSystem::MemoryFileSystem(std::string directory, const std::string& options)

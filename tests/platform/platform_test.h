@@ -4,14 +4,13 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <sys/types.h>
 
 #include <string>
-#include <string_view>
 #include <vector>
 
 #include "platform.h"
 #include "tests/platform/system_log.h"
+#include "tests/support/files.h"
 
 // Starts with an empty directory, no error code and an empty log. Whatever is reported during a test must be expected
 // by it.
@@ -34,13 +33,6 @@ void ExpectNothingFound(int code);
 
 // The operation before was refused because of a null argument.
 void ExpectNullRefused();
-
-void WriteFile(const std::string& path, std::string_view content, mode_t mode = 0600);
-std::string ReadFile(const std::string& path);
-mode_t ModeOf(const std::string& path);
-
-// What a directory holds, in order of names.
-std::vector<std::string> NamesIn(const std::string& directory);
 
 // A file system in memory, for as long as the holder lives.
 class MemoryFileSystem {

@@ -10,7 +10,7 @@ using testing::ElementsAre;
 class SectionFile : public PlatformTest {
  protected:
   static std::vector<std::string> SectionsOf(std::string_view content) {
-    WriteFile(kFile, content);
+    WriteText(kFile, content);
     TextList list;
     const int count = PLIBCFileEnumSection(kFile, list.address());
     EXPECT_EQ(count, list.get()->nItem) << content;
@@ -51,7 +51,7 @@ TEST_F(SectionFile, HasNoSectionsWhileItIsMissing) {
 }
 
 TEST_F(SectionFile, AppendsItsSectionsToAList) {
-  WriteFile(kFile, "[b]\n[c]\n");
+  WriteText(kFile, "[b]\n[c]\n");
   TextList list;
   EXPECT_EQ(PLIBCFileEnumSection(kFile, list.address()), 2);
   EXPECT_EQ(PLIBCFileEnumSection(kFile, list.address()), 2);
@@ -60,7 +60,7 @@ TEST_F(SectionFile, AppendsItsSectionsToAList) {
 
 TEST_F(SectionFile, GivesEachValueAsExactlyTheBytesBehindTheEqualsSign) {
   for (const Reading& row : SectionReadings()) {
-    WriteFile(kFile, row.text);
+    WriteText(kFile, row.text);
     TextHash hash;
     EXPECT_EQ(PLIBCFileGetSection(kFile, "RT [5370", hash.address()), 1) << Shortened(row.text);
     EXPECT_EQ(hash[row.key.c_str()], row.value.value_or("(none)")) << Shortened(row.text);
@@ -68,7 +68,7 @@ TEST_F(SectionFile, GivesEachValueAsExactlyTheBytesBehindTheEqualsSign) {
 }
 
 TEST_F(SectionFile, GivesTheFirstOfSeveralSectionsOfOneName) {
-  WriteFile(kFile, "[a]\nFIRST=1\n[b]\n[A]\nSECOND=2\n");
+  WriteText(kFile, "[a]\nFIRST=1\n[b]\n[A]\nSECOND=2\n");
   TextHash hash;
   EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
   EXPECT_EQ(hash["FIRST"], "1");
@@ -76,14 +76,14 @@ TEST_F(SectionFile, GivesTheFirstOfSeveralSectionsOfOneName) {
 }
 
 TEST_F(SectionFile, HasKeysOfSeveralWords) {
-  WriteFile(kFile, "[a]\ntwo words=value\n");
+  WriteText(kFile, "[a]\ntwo words=value\n");
   TextHash hash;
   EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
   EXPECT_EQ(hash["two words"], "value");
 }
 
 TEST_F(SectionFile, LeavesInAHashWhatTheSectionDoesNotHold) {
-  WriteFile(kFile, "[a]\nKEY=new\n");
+  WriteText(kFile, "[a]\nKEY=new\n");
   TextHash hash{{"KEY", "old"}, {"OTHER", "kept"}};
   EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
   EXPECT_EQ(hash["KEY"], "new");
@@ -91,7 +91,7 @@ TEST_F(SectionFile, LeavesInAHashWhatTheSectionDoesNotHold) {
 }
 
 TEST_F(SectionFile, GivesAnEmptySection) {
-  WriteFile(kFile, "[a]\n[b]\nKEY=other\n");
+  WriteText(kFile, "[a]\n[b]\nKEY=other\n");
   TextHash hash;
   EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 1);
   EXPECT_EQ(hash["KEY"], "(none)");
@@ -100,7 +100,7 @@ TEST_F(SectionFile, GivesAnEmptySection) {
 TEST_F(SectionFile, HasNoSectionButThoseWithAHeader) {
   TextHash hash;
   for (const char* szContent : {"", "a\n", "[ab]\n", "[b]\nKEY=[a]\n", "#[a]\n", "[a\n", "x[a]\n"}) {
-    WriteFile(kFile, szContent);
+    WriteText(kFile, szContent);
     EXPECT_EQ(PLIBCFileGetSection(kFile, "a", hash.address()), 0) << szContent;
     ExpectNothingFound(ERR_SECTION_NOT_FOUND);
   }

@@ -11,28 +11,28 @@ constexpr char kFormat[] = "\t%s=%s\n";
 class SectionFileThatIsWritten : public PlatformTest {
  protected:
   static std::string Add(std::string_view content, const char* szSection, const TextHash::Pairs& pairs) {
-    WriteFile(kFile, content);
+    WriteText(kFile, content);
     EXPECT_EQ(PLIBCFileAddSection(kFile, szSection, TextHash(pairs).get(), kFormat), 1) << content;
-    return ReadFile(kFile);
+    return ReadText(kFile);
   }
 
   static std::string Set(std::string_view content, const char* szSection, const TextHash::Pairs& pairs,
                          const char* szNewName = nullptr) {
-    WriteFile(kFile, content);
+    WriteText(kFile, content);
     EXPECT_EQ(PLIBCFileSetSection(kFile, szSection, szNewName, TextHash(pairs).get(), kFormat), 1) << content;
-    return ReadFile(kFile);
+    return ReadText(kFile);
   }
 
   static std::string SetValue(std::string_view content, const char* szKey, const char* szValue) {
-    WriteFile(kFile, content);
+    WriteText(kFile, content);
     EXPECT_EQ(PLIBCFileSetSectionValue(kFile, "a", szKey, szValue, kFormat), 0) << content;
-    return ReadFile(kFile);
+    return ReadText(kFile);
   }
 
   static void ExpectRefused(int result, const std::string& what) {
     EXPECT_EQ(result, -1) << what;
     ExpectFailure(ERR_BAD_PARAMETERS, "Failed to write /tmp/platform/file: Invalid argument");
-    EXPECT_EQ(ReadFile(kFile), "[a]\n\tKEY=old\n") << what;
+    EXPECT_EQ(ReadText(kFile), "[a]\n\tKEY=old\n") << what;
     EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file")) << what;
   }
 };
@@ -59,13 +59,13 @@ TEST_F(SectionFileThatIsWritten, LosesASectionAndNoOtherByte) {
       {"[a]\nK=1\n[b]\nK=[a]\n[a]\nK=2\n", "[b]\nK=[a]\n"},
   };
   for (const auto& row : rows) {
-    WriteFile(kFile, row.szBefore);
+    WriteText(kFile, row.szBefore);
     EXPECT_EQ(PLIBCFileRemoveSection(kFile, "a"), 1) << row.szBefore;
-    EXPECT_EQ(ReadFile(kFile), row.szAfter);
+    EXPECT_EQ(ReadText(kFile), row.szAfter);
   }
   EXPECT_EQ(PLIBCFileRemoveSection(kFile, "c"), 0);
   EXPECT_EQ(PLIBCErrGet(), ERR_SECTION_NOT_FOUND);
-  EXPECT_EQ(ReadFile(kFile), "[b]\nK=[a]\n");
+  EXPECT_EQ(ReadText(kFile), "[b]\nK=[a]\n");
   EXPECT_EQ(PLIBCFileRemoveSection("/tmp/platform/missing", "a"), 0);
   EXPECT_EQ(PLIBCErrGet(), ERR_FILE_NOT_FOUND);
   EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file"));
@@ -153,7 +153,7 @@ TEST_F(SectionFileThatIsWritten, IsForTheOwnerAloneWhenItIsMade) {
   EXPECT_EQ(PLIBCFileSetSection("/tmp/platform/2", "a", nullptr, hash.get(), kFormat), 1);
   EXPECT_EQ(PLIBCFileSetSectionValue("/tmp/platform/3", "a", "KEY", "v", kFormat), 0);
   for (const char* szPath : {"/tmp/platform/1", "/tmp/platform/2", "/tmp/platform/3"}) {
-    EXPECT_EQ(ReadFile(szPath), "[a]\n\tKEY=v\n");
+    EXPECT_EQ(ReadText(szPath), "[a]\n\tKEY=v\n");
     EXPECT_EQ(ModeOf(szPath), 0600u) << szPath;
   }
 }
@@ -164,7 +164,7 @@ TEST_F(SectionFileThatIsWritten, StaysWhenAPairWouldNotReadBack) {
       {";KEY", "v"},         {" KEY", "v"},     {"KEY ", "v"},     {"K\nEY", "v"}, {"[KEY", "v]"},
   };
   for (const auto& [key, value] : pairs) {
-    WriteFile(kFile, "[a]\n\tKEY=old\n");
+    WriteText(kFile, "[a]\n\tKEY=old\n");
     TextHash hash{{"GOOD", "value"}, {key, value}};
     ExpectRefused(PLIBCFileSetSectionValue(kFile, "a", key.c_str(), value.c_str(), kFormat), key + value);
     ExpectRefused(PLIBCFileAddSection(kFile, "b", hash.get(), kFormat), key + value);
@@ -175,7 +175,7 @@ TEST_F(SectionFileThatIsWritten, StaysWhenAPairWouldNotReadBack) {
 TEST_F(SectionFileThatIsWritten, StaysWhenANameWouldNotReadBack) {
   const TextHash hash{{"KEY", "v"}};
   for (const char* szName : {"two\nlines", "line\n", " begins", "ends ", "\t", "ends\r"}) {
-    WriteFile(kFile, "[a]\n\tKEY=old\n");
+    WriteText(kFile, "[a]\n\tKEY=old\n");
     ExpectRefused(PLIBCFileAddSection(kFile, szName, hash.get(), kFormat), szName);
     ExpectRefused(PLIBCFileSetSection(kFile, szName, nullptr, hash.get(), kFormat), szName);
     ExpectRefused(PLIBCFileSetSection(kFile, "a", szName, hash.get(), kFormat), szName);
@@ -187,7 +187,7 @@ TEST_F(SectionFileThatIsWritten, StaysWhenTheFormatIsNoLineOfAPair) {
   const TextHash hash{{"KEY", "v"}};
   for (const char* szFormat : {"", "%s\n", "%s=%s", "%s=%s%s\n", "%s=%s\n\n", "%s=%d\n", "%s=%n\n", "%%s=%s\n",
                                "%s=%s%\n", "#%s=%s\n", "%s= %s\n", "%s=\"%s\"\n", "[%s=%s]\n", "%s %s\n"}) {
-    WriteFile(kFile, "[a]\n\tKEY=old\n");
+    WriteText(kFile, "[a]\n\tKEY=old\n");
     ExpectRefused(PLIBCFileSetSectionValue(kFile, "a", "KEY", "v", szFormat), szFormat);
     ExpectRefused(PLIBCFileAddSection(kFile, "b", hash.get(), szFormat), szFormat);
     ExpectRefused(PLIBCFileSetSection(kFile, "a", nullptr, hash.get(), szFormat), szFormat);

@@ -7,9 +7,9 @@
 #include <csignal>
 #include <filesystem>
 
-#include "local_user.h"
 #include "tests/platform/containers.h"
 #include "tests/platform/platform_test.h"
+#include "tests/support/local_user.h"
 
 namespace {
 
@@ -28,29 +28,14 @@ class AFileThatAnyoneMayReplace : public PlatformTest {
     PlatformTest::SetUp();
     if (!HasLocalUsers()) GTEST_SKIP() << "not the machine's root";
     ASSERT_EQ(::chmod(kDirectory, 01777), 0);
-    WriteFile(kVictim, "as was");
+    WriteText(kVictim, "as was");
   }
 
-  // Has somebody else put each obstacle in the place of a file in turn, and looks at what comes of it.
-  template <class Look>
-  static void ForEachObstacle(const std::string& path, Look look) {
-    int nObstacles = 0;
-    for (const Obstacle& obstacle : Obstacles(kVictim)) {
+  static void ForEachObstacle(const std::string& path, const std::function<void()>& look) {
+    const auto clear = [] {
       for (const auto& entry : fs::directory_iterator(kDirectory)) fs::remove_all(entry.path());
-      SCOPED_TRACE(obstacle.name);
-      ASSERT_TRUE(RunAsLocalUser([&] { return obstacle.put(path); }));
-      look();
-      EXPECT_EQ(ReadFile(kVictim), "as was");
-      EXPECT_FALSE(fs::exists(kVictim + std::string(".missing")));
-      ++nObstacles;
-    }
-    EXPECT_EQ(nObstacles, 7);
-  }
-
-  static bool IsOurs(const char* szPath, mode_t mode) {
-    struct stat info;
-    return ::lstat(szPath, &info) == 0 && S_ISREG(info.st_mode) && info.st_uid == ::geteuid() && info.st_nlink == 1 &&
-           (info.st_mode & 07777) == mode;
+    };
+    ObstructEachWay(path, kVictim, clear, look);
   }
 };
 
@@ -61,14 +46,15 @@ TEST_F(AFileThatAnyoneMayReplace, IsTakenForMissingWhenItIsSomebodyElses) {
                 ElementsAre(Says("/tmp/platform/file is taken for missing: somebody else has put it there")));
   });
   fs::remove_all(kFile);
-  WriteFile(kFile, "ours");
+  WriteText(kFile, "ours");
   EXPECT_EQ(PLIBCFileExist(kFile), 1);
 }
 
 TEST_F(AFileThatAnyoneMayReplace, IsTouchedIntoOneOfOurs) {
   ForEachObstacle(kFile, [] {
     EXPECT_EQ(PLIBCFileTouch(kFile), 0);
-    EXPECT_TRUE(IsOurs(kFile, 0600));
+    EXPECT_TRUE(IsOurs(kFile));
+    EXPECT_EQ(ModeOf(kFile), 0600u);
     EXPECT_EQ(PLIBCFileExist(kFile), 1);
     TakeLog();
   });
@@ -111,10 +97,11 @@ TEST_F(AFileThatAnyoneMayReplace, IsNotChangedWhenItIsSomebodyElses) {
 TEST_F(AFileThatAnyoneMayReplace, IsChangedWhateverIsInTheWayOfItsNewContentAndOfItsLock) {
   for (const char* szName : {"/tmp/platform/.file.new", "/tmp/platform/.file.lock"}) {
     ForEachObstacle(szName, [] {
-      WriteFile(kFile, "KEY=old\n");
+      WriteText(kFile, "KEY=old\n");
       EXPECT_EQ(PLIBCFileSetKeyValue(kFile, "KEY", "new", kFormat), 1);
-      EXPECT_EQ(ReadFile(kFile), "KEY=new\n");
-      EXPECT_TRUE(IsOurs(kFile, 0600));
+      EXPECT_EQ(ReadText(kFile), "KEY=new\n");
+      EXPECT_TRUE(IsOurs(kFile));
+      EXPECT_EQ(ModeOf(kFile), 0600u);
     });
   }
 }
@@ -134,15 +121,16 @@ TEST_F(AFileThatAnyoneMayReplace, IsSomebodyElsesWhenItIsASecondNameOfAFileOfOur
   ASSERT_EQ(::link(kVictim, kFile), 0);
   EXPECT_EQ(PLIBCFileExist(kFile), 0);
   EXPECT_EQ(PLIBCFileTouch(kFile), 0);
-  EXPECT_TRUE(IsOurs(kFile, 0600));
-  EXPECT_EQ(ReadFile(kFile), "");
-  EXPECT_EQ(ReadFile(kVictim), "as was");
+  EXPECT_TRUE(IsOurs(kFile));
+  EXPECT_EQ(ModeOf(kFile), 0600u);
+  EXPECT_EQ(ReadText(kFile), "");
+  EXPECT_EQ(ReadText(kVictim), "as was");
   TakeLog();
 }
 
 // Root was kept waiting without limit, and without a word.
 TEST_F(AFileThatAnyoneMayReplace, IsNotHeldUpByALockOfWhoeverMayReadIt) {
-  WriteFile(kFile, "KEY=old\n", 0644);
+  WriteText(kFile, "KEY=old\n", 0644);
   int ready[2];
   ASSERT_EQ(::pipe(ready), 0);
   const pid_t user = ::fork();
@@ -156,14 +144,14 @@ TEST_F(AFileThatAnyoneMayReplace, IsNotHeldUpByALockOfWhoeverMayReadIt) {
   ASSERT_EQ(::read(ready[0], &answer, 1), 1);
   EXPECT_EQ(answer, 'y');
   EXPECT_EQ(PLIBCFileSetKeyValue(kFile, "KEY", "new", kFormat), 1);
-  EXPECT_EQ(ReadFile(kFile), "KEY=new\n");
+  EXPECT_EQ(ReadText(kFile), "KEY=new\n");
   ::kill(user, SIGKILL);
   ::close(ready[0]);
   ::close(ready[1]);
 }
 
 TEST_F(AFileThatAnyoneMayReplace, HasALockThatNobodyElseMayOpen) {
-  WriteFile(kFile, "KEY=old\n", 0666);
+  WriteText(kFile, "KEY=old\n", 0666);
   const mode_t before = ::umask(0);
   mode_t seen = 07777;
   const pid_t writer = ::fork();

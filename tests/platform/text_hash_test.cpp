@@ -19,7 +19,7 @@ class AHash : public PlatformTest {
   // The hash as a section, which shows its order.
   static std::string Written(const TextHash& hash) {
     EXPECT_EQ(PLIBCFileAddSection(kFile, "s", hash.get(), "%s=%s\n"), 1);
-    const std::string text = ReadFile(kFile);
+    const std::string text = ReadText(kFile);
     EXPECT_EQ(PLIBCSysUnlink(kFile), 0);
     return text;
   }

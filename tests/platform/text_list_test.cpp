@@ -13,7 +13,7 @@ class AList : public PlatformTest {
  protected:
   void SetUp() override {
     PlatformTest::SetUp();
-    WriteFile(kFile, "[b]\n[a]\n[b]\n[]\n");
+    WriteText(kFile, "[b]\n[a]\n[b]\n[]\n");
     ASSERT_EQ(PLIBCFileEnumSection(kFile, list_.address()), 4);
   }
 
@@ -65,7 +65,7 @@ TEST_F(AList, CanBeFilledAgainAfterItemsWereRemoved) {
 TEST_F(AList, GrowsBeyondAnySizeHint) {
   std::string content;
   for (int i = 0; i < 10'000; ++i) content += "[" + std::to_string(i) + "]\n";
-  WriteFile(kFile, content);
+  WriteText(kFile, content);
   for (const int cbSize : {INT_MIN, -1, 0, 1, 1024, 1 << 20, INT_MAX}) {
     PPLIBSZLIST list = PLIBCSzListAlloc(cbSize);
     ASSERT_NE(list, nullptr) << cbSize;

@@ -1,34 +1,26 @@
 // Somebody else with an account on the machine.
-#include "local_user.h"
+#include "tests/support/local_user.h"
 
-#include <fcntl.h>
 #include <grp.h>
+#include <gtest/gtest.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <fstream>
+#include <vector>
+
+#include "tests/support/files.h"
+#include "tests/support/processes.h"
 
 namespace {
 
 constexpr uid_t kNobody = 65534;
 
-bool Becomes(uid_t user) {
-  return ::setgroups(0, nullptr) == 0 && ::setgid(user) == 0 && ::setuid(user) == 0;
-}
-
-}  // namespace
-
-bool RunAsLocalUser(const std::function<bool()>& act) {
-  const pid_t pid = ::fork();
-  if (pid == 0) ::_exit(Becomes(kNobody) && act() ? 0 : 1);
-  int state = -1;
-  return ::waitpid(pid, &state, 0) == pid && state == 0;
-}
-
-bool HasLocalUsers() {
-  return RunAsLocalUser([] { return true; });
-}
+// What may be in the way of a file, by a text that says what it is.
+struct Obstacle {
+  std::string name;
+  std::function<bool(const std::string& path)> put;
+};
 
 std::vector<Obstacle> Obstacles(const std::string& victim) {
   const auto file = [](const std::string& path) {
@@ -46,4 +38,38 @@ std::vector<Obstacle> Obstacles(const std::string& victim) {
       {"a directory with a file in it",
        [=](const std::string& path) { return ::mkdir(path.c_str(), 0777) == 0 && file(path + "/file"); }},
   };
+}
+
+bool Becomes(uid_t user) {
+  return ::setgroups(0, nullptr) == 0 && ::setgid(user) == 0 && ::setuid(user) == 0;
+}
+
+}  // namespace
+
+bool RunAsLocalUser(const std::function<bool()>& act) {
+  return RunInChild([&] { return Becomes(kNobody) && act() ? 0 : 1; }) == 0;
+}
+
+bool HasLocalUsers() {
+  return RunAsLocalUser([] { return true; });
+}
+
+void ObstructEachWay(const std::string& path, const std::string& victim, const std::function<void()>& clear,
+                     const std::function<void()>& look) {
+  int nObstacles = 0;
+  for (const Obstacle& obstacle : Obstacles(victim)) {
+    clear();
+    SCOPED_TRACE(obstacle.name);
+    ASSERT_TRUE(RunAsLocalUser([&] { return obstacle.put(path); }));
+    look();
+    EXPECT_EQ(ReadText(victim), "as was");
+    EXPECT_FALSE(Exists(victim + ".missing"));
+    ++nObstacles;
+  }
+  EXPECT_EQ(nObstacles, 7);
+}
+
+bool IsOurs(const std::string& path) {
+  struct stat info;
+  return ::lstat(path.c_str(), &info) == 0 && S_ISREG(info.st_mode) && info.st_uid == ::geteuid() && info.st_nlink == 1;
 }

@@ -4,7 +4,6 @@
 
 #include <functional>
 #include <string>
-#include <vector>
 
 // Runs `act` as an unprivileged user, in a process of its own; whether it gave true.
 bool RunAsLocalUser(const std::function<bool()>& act);
@@ -12,13 +11,13 @@ bool RunAsLocalUser(const std::function<bool()>& act);
 // Whether there can be one: in a user namespace of its own, a machine has no other users.
 bool HasLocalUsers();
 
-// What a local user may put in the way of a file, by a text that says what it is.
-struct Obstacle {
-  std::string name;
-  std::function<bool(const std::string& path)> put;
-};
+// Has a local user put everything that may be in the way of a file into its place, one thing after another: `clear`
+// makes room for each, and `look` sees to what comes of it. Some of them lead to `victim`, which is root's, holds
+// "as was", and must hold that afterwards too.
+void ObstructEachWay(const std::string& path, const std::string& victim, const std::function<void()>& clear,
+                     const std::function<void()>& look);
 
-// Each leads to, or is a second name of, `victim`, which is root's and holds "as was", where that is what it is.
-std::vector<Obstacle> Obstacles(const std::string& victim);
+// Whether there is a file of our own, under no second name.
+bool IsOurs(const std::string& path);
 
 #endif  // MERO_TESTS_LOCAL_USER_H

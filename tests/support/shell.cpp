@@ -1,29 +1,48 @@
-// Scripts, what they come upon, and what they say.
-#include "shell.h"
+// Commands of the shell.
+#include "tests/support/shell.h"
 
-#include <sys/stat.h>
-#include <sys/wait.h>
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
 
-#include <cstdio>
-#include <filesystem>
-#include <fstream>
+#include <cstdlib>
 
+#include "tests/support/files.h"
+
+namespace {
+
+[[noreturn]] void BecomeShell(const std::string& command, int output) {
+  ::dup2(output, STDOUT_FILENO);
+  ::dup2(output, STDERR_FILENO);
+  const char* szPath = std::getenv("PATH");
+  ::setenv("PATH", ((szPath != nullptr ? szPath : "/usr/bin:/bin") + std::string(":/usr/sbin:/sbin")).c_str(), 1);
+  ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
+  ::_exit(127);
+}
+
+}  // namespace
+
+// Without popen(), which some tests have a function of their own for.
 Ran RunInShell(const std::string& command) {
-  FILE* pipe = ::popen(("{ " + command + "\n} 2>&1").c_str(), "r");
-  Ran ran = {-1, ""};
-  for (int c; (c = std::fgetc(pipe)) != EOF;) ran.output += static_cast<char>(c);
-  const int status = ::pclose(pipe);
-  ran.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  int ends[2];
+  if (::pipe2(ends, O_CLOEXEC) != 0) return {};
+  const pid_t pid = ::fork();
+  if (pid == 0) BecomeShell(command, ends[1]);
+  ::close(ends[1]);
+  Ran ran;
+  char part[4096];
+  for (ssize_t size; (size = ::read(ends[0], part, sizeof part)) > 0;) ran.out.append(part, static_cast<size_t>(size));
+  ::close(ends[0]);
+  ran.status = StatusOf(pid);
   return ran;
 }
 
-void Write(const std::string& path, const std::string& text) {
-  std::filesystem::create_directories(std::filesystem::path(path).parent_path());
-  std::ofstream(path) << text;
+std::string Shell(const std::string& command) {
+  Ran ran = RunInShell(command);
+  EXPECT_EQ(ran.status, 0) << command << "\n" << ran.out;
+  return ran.out;
 }
 
 void Install(const std::string& name, const std::string& script) {
-  const std::string path = "/tmp/bin/" + name;
-  Write(path, "#!/bin/sh\n" + script);
-  ::chmod(path.c_str(), 0755);
+  WriteScript("/tmp/bin/" + name, script);
 }

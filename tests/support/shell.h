@@ -1,20 +1,18 @@
-// Scripts, what they come upon, and what they say.
-#ifndef MERO_TESTS_SHELL_H
-#define MERO_TESTS_SHELL_H
+// Commands of the shell, programs that they come upon, and what they say.
+#ifndef MERO_TESTS_SUPPORT_SHELL_H
+#define MERO_TESTS_SUPPORT_SHELL_H
 
 #include <string>
 
-struct Ran {
-  int status;
-  std::string output;  // of both kinds
-};
+#include "tests/support/processes.h"
 
+// What it says stands in `out`, of both kinds. Finds the programs of administrators too, whoever runs the tests.
 Ran RunInShell(const std::string& command);
 
-// Makes the directories above the file too.
-void Write(const std::string& path, const std::string& text);
+// Runs a command that must succeed, and gives what it says.
+std::string Shell(const std::string& command);
 
 // A program that stands before the machine's own of that name, where PATH begins with /tmp/bin.
 void Install(const std::string& name, const std::string& script);
 
-#endif  // MERO_TESTS_SHELL_H
+#endif  // MERO_TESTS_SUPPORT_SHELL_H

@@ -21,9 +21,7 @@ using testing::Not;
 namespace {
 
 WIRELESS_NETWORK_CONFIG Home(const char* szIp = "DHCP") {
-  WIRELESS_NETWORK_CONFIG config{};
-  config.network = Network("Home");
-  std::strcpy(config.szKey, "open sesame");
+  WIRELESS_NETWORK_CONFIG config = library::Home();
   std::strcpy(config.szIp, szIp);
   std::strcpy(config.szMask, "255.255.255.0");
   std::strcpy(config.szGateway, "10.0.0.1");
@@ -59,9 +57,7 @@ constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
 
 // A supplicant's client that does this.
 void InstallSupplicantClient(const std::string& script) {
-  constexpr char kPath[] = "/usr/sbin/wpa_cli";
-  WriteText(kPath, "#!/bin/sh\n" + script);
-  std::filesystem::permissions(kPath, std::filesystem::perms(0755));
+  WriteScript("/usr/sbin/wpa_cli", script);
 }
 
 TEST_F(Connection, IsMadeOnlyWhenTheFormerSupplicantHasGone) {

@@ -17,11 +17,7 @@ using library::Network;
 // ---- Worlds for commands to be run in ----
 
 WIRELESS_NETWORK_CONFIG Home() {
-  WIRELESS_NETWORK_CONFIG config{};
-  config.network = Network("Home");
-  config.network.opmode = WIRELESS_OPMODE_MANAGED;
-  std::strcpy(config.szKey, "open sesame");
-  std::strcpy(config.szIp, "DHCP");
+  WIRELESS_NETWORK_CONFIG config = library::Home();
   config.atime = 86400;
   return config;
 }
@@ -37,9 +33,9 @@ void InACell() {
 }
 
 void WithAGateway() {
-  EXPECT_EQ(std::system("ip link add wlan0 type veth && ip address add 10.0.0.8/24 dev wlan0 &&"
-                        "ip link set wlan0 up && ip route add default via 10.0.0.1"),
-            0);
+  Shell(
+      "ip link add wlan0 type veth && ip address add 10.0.0.8/24 dev wlan0 &&"
+      "ip link set wlan0 up && ip route add default via 10.0.0.1");
 }
 
 void OffTheAir() {
@@ -139,7 +135,7 @@ TEST_F(Forms, CreateNoFileWhateverTheUmask) {
       std::ranges::set_difference(AllFiles(), before, std::back_inserter(created));
       EXPECT_THAT(created, testing::IsEmpty()) << Joined(words);
     }
-    EXPECT_EQ(std::system("ip link delete wlan0"), 0);  // the last world's
+    Shell("ip link delete wlan0");  // the last world's
   }
 }
 

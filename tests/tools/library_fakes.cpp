@@ -1,7 +1,6 @@
 // The functions that the program comes upon instead of the library's.
 #include "library_fakes.h"
 
-#include <search.h>
 #include <sys/mman.h>
 #include <syslog.h>
 #include <unistd.h>
@@ -10,6 +9,10 @@
 #include <cstdlib>
 #include <cstring>
 #include <sstream>
+
+#include "common/text.h"
+#include "tests/support/fake_functions.h"
+#include "tests/support/ring.h"
 
 namespace library {
 
@@ -23,24 +26,6 @@ uid_t g_user = 0;
 namespace {
 
 int g_calls = -1;  // shared with the processes that are forked
-
-template <class Record>
-void Fill(WIRELESS_LIST* head, const std::vector<Record>& records) {
-  head->q_forw = head;
-  head->q_back = head;
-  for (const Record& record : records) {
-    auto* copy = static_cast<Record*>(std::malloc(sizeof(Record)));
-    std::memcpy(copy, &record, sizeof record);
-    ::insque(&copy->list, head->q_back);
-  }
-}
-
-template <std::size_t kSize>
-void SetText(char (&field)[kSize], std::string_view text) {
-  const std::size_t size = std::min(text.size(), kSize - 1);
-  std::copy_n(text.data(), size, field);
-  field[size] = '\0';
-}
 
 }  // namespace
 
@@ -83,7 +68,7 @@ std::vector<std::string> Calls() {
 
 WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt) {
   WIRELESS_NETWORK network{};
-  SetText(network.szEssid, name);
+  CopyText(network.szEssid, name);
   for (unsigned char& octet : network.bssid) octet = 0x0A;
   network.channel = 6;
   network.signal = 74;
@@ -93,12 +78,21 @@ WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth, WIRELESS_ENC
   return network;
 }
 
+WIRELESS_NETWORK_CONFIG Home() {
+  WIRELESS_NETWORK_CONFIG config{};
+  config.network = Network("Home");
+  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  CopyText(config.szKey, "open sesame");
+  CopyText(config.szIp, "DHCP");
+  return config;
+}
+
 MERO_AP_CONF Office() {
   MERO_AP_CONF conf{};
-  SetText(conf.szSecName, "ExampleStick");
+  CopyText(conf.szSecName, "ExampleStick");
   MERO_HOSTAP_CONF& main = conf.hostapConf;
-  SetText(main.szSSID, "Office");
-  SetText(main.szBridge, "lbr0");
+  CopyText(main.szSSID, "Office");
+  CopyText(main.szBridge, "lbr0");
   main.hwMode = AP_MODE_80211G;
   main.ieee80211n = 1;
   main.wirelessWidth = AP_FREQ_ALL;
@@ -108,8 +102,8 @@ MERO_AP_CONF Office() {
   main.encryption = AP_ENCRYPT_WPA_PSK;
   main.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
   main.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
-  SetText(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
-  SetText(main.guestNet.szSSID, "Guests");
+  CopyText(main.encryptInfo.wpaPskInfo.szPassPhrase, "open sesame");
+  CopyText(main.guestNet.szSSID, "Guests");
   main.guestNet.maxStation = 10;
   conf.txpower = 10;
   conf.guestNetAccessRule.blLanBlock = TRUE;
@@ -117,7 +111,7 @@ MERO_AP_CONF Office() {
 }
 
 void InRange(std::vector<WIRELESS_NETWORK> networks) {
-  MEROWirelessNetworkScan = [networks](WIRELESS_SCAN, WIRELESS_LIST* head) { return Fill(head, networks), 0; };
+  MEROWirelessNetworkScan = [networks](WIRELESS_SCAN, WIRELESS_LIST* head) { return FillRing(head, networks), 0; };
   MEROWirelessNetworkGet = [networks](const char* szValue, WIRELESS_FILTER filter, WIRELESS_NETWORK* found) {
     for (const WIRELESS_NETWORK& network : networks) {
       const bool matches = filter == WIRELESS_FILTER_ESSID ? std::strcmp(network.szEssid, szValue) == 0
@@ -129,15 +123,15 @@ void InRange(std::vector<WIRELESS_NETWORK> networks) {
 }
 
 void Known(std::vector<WIRELESS_NETWORK_CONFIG> configs) {
-  MEROWirelessConfEnum = [configs](WIRELESS_LIST* head) { return Fill(head, configs), 0; };
+  MEROWirelessConfEnum = [configs](WIRELESS_LIST* head) { return FillRing(head, configs), 0; };
   std::ranges::sort(configs, std::greater{}, &WIRELESS_NETWORK_CONFIG::atime);
-  MEROWirelessConfEnumByAtime = [configs](WIRELESS_LIST* head) { return Fill(head, configs), 0; };
+  MEROWirelessConfEnumByAtime = [configs](WIRELESS_LIST* head) { return FillRing(head, configs), 0; };
 }
 
 void Connected(std::string_view name) {
   MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_CONNECTED_MANAGED; };
   MEROWirelessCurInfoGet = [name = std::string(name)](WIRELESS_REQUEST request, PWIRELESS_INFO info) {
-    if (request == REQUEST_ESSID) SetText(info->szEssid, name);
+    if (request == REQUEST_ESSID) CopyText(info->szEssid, name);
     if (request == REQUEST_AUTH) info->auth = WIRELESS_AUTH_WPA2PSK;
     if (request == REQUEST_PROTOCOL) info->protocol = WIRELESS_PROTO_11BGN;
     if (request == REQUEST_MODE) info->opmode = WIRELESS_OPMODE_MANAGED;
@@ -149,7 +143,7 @@ void InCell(std::string_view name) {
   MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_CONNECTED_ADHOC; };
   MEROWirelessCurInfoGet = [name = std::string(name)](WIRELESS_REQUEST request, PWIRELESS_INFO info) {
     if (request == REQUEST_MODE) info->opmode = WIRELESS_OPMODE_ADHOC;
-    if (request == REQUEST_ESSID) SetText(info->szEssid, name);
+    if (request == REQUEST_ESSID) CopyText(info->szEssid, name);
     return 0;
   };
 }
@@ -164,42 +158,14 @@ void Report(const char* szUnit, const char* szMessage) {
 
 }  // namespace library
 
-namespace {
-
-template <class Function>
-struct Signature;
-
-template <class R, class... Args>
-struct Signature<R(Args...)> {
-  using Result = R;
-  template <std::size_t kIndex>
-  using Argument = std::tuple_element_t<kIndex, std::tuple<Args...>>;
-};
-
-}  // namespace
-
-#define ARGUMENT(name, index) Signature<decltype(::name)>::Argument<index>
-#define PARAMETERS_0(name)
-#define PARAMETERS_1(name) ARGUMENT(name, 0) a
-#define PARAMETERS_2(name) PARAMETERS_1(name), ARGUMENT(name, 1) b
-#define PARAMETERS_3(name) PARAMETERS_2(name), ARGUMENT(name, 2) c
-#define PARAMETERS_4(name) PARAMETERS_3(name), ARGUMENT(name, 3) d
-#define PARAMETERS_5(name) PARAMETERS_4(name), ARGUMENT(name, 4) e
-#define VALUES_0
-#define VALUES_1 a
-#define VALUES_2 a, b
-#define VALUES_3 a, b, c
-#define VALUES_4 a, b, c, d
-#define VALUES_5 a, b, c, d, e
-
-#define DEFINE_QUERY(name, count)                                                 \
-  extern "C" Signature<decltype(::name)>::Result name(PARAMETERS_##count(name)) { \
-    return library::name(VALUES_##count);                                         \
+#define DEFINE_QUERY(name, count)            \
+  STAND_IN_FOR(name, count) {                \
+    return library::name(ARGUMENTS_##count); \
   }
-#define DEFINE_ACTION(name, count)                                                \
-  extern "C" Signature<decltype(::name)>::Result name(PARAMETERS_##count(name)) { \
-    library::Record(#name);                                                       \
-    return library::name(VALUES_##count);                                         \
+#define DEFINE_ACTION(name, count)           \
+  STAND_IN_FOR(name, count) {                \
+    library::Record(#name);                  \
+    return library::name(ARGUMENTS_##count); \
   }
 LIBRARY_QUERIES(DEFINE_QUERY)
 LIBRARY_ACTIONS(DEFINE_ACTION)

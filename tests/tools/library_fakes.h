@@ -61,6 +61,9 @@ std::vector<std::string> Calls();
 WIRELESS_NETWORK Network(std::string_view name, WIRELESS_AUTH auth = WIRELESS_AUTH_WPA2PSK,
                          WIRELESS_ENCRYPT encrypt = WIRELESS_ENCRYPT_AES);
 
+// The network "Home" as one that is known, with an address by DHCP.
+WIRELESS_NETWORK_CONFIG Home();
+
 // The settings of an access point, which is switched off.
 MERO_AP_CONF Office();
 

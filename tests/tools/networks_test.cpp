@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "running.h"
+#include "tests/support/ring.h"
 
 using library::Network;
 using testing::ElementsAre;
@@ -16,12 +17,8 @@ namespace {
 constexpr char kSecretPath[] = "/tmp/secret";
 
 WIRELESS_NETWORK_CONFIG Home() {
-  WIRELESS_NETWORK_CONFIG config{};
-  config.network = Network("Home");
-  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  WIRELESS_NETWORK_CONFIG config = library::Home();
   config.atime = 1795174528;
-  std::strcpy(config.szKey, "open sesame");
-  std::strcpy(config.szIp, "DHCP");
   return config;
 }
 
@@ -46,7 +43,7 @@ class Networks : public ToolTest {
 
 TEST_F(Networks, AreScannedForAfreshOnRequestOnly) {
   library::MEROWirelessNetworkScan = [](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
-    head->q_forw = head->q_back = head;
+    FillRing<WIRELESS_NETWORK>(head, {});
     library::Record(std::to_string(scan));
     return 0;
   };
@@ -181,7 +178,7 @@ TEST_F(Networks, ThatAppearedSinceTheLastScanAreFound) {
     return *found = Network("Newcomer"), 1;
   };
   library::MEROWirelessNetworkScan = [](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
-    head->q_forw = head->q_back = head;
+    FillRing<WIRELESS_NETWORK>(head, {});
     return library::Record(scan == WIRELESS_SCAN_RENEW ? "renewed" : "read"), 0;
   };
   const Ran ran = Tool({"save", "Newcomer", "--key-file", kSecretPath});

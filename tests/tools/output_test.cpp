@@ -135,11 +135,7 @@ TEST_F(Output, GivesScriptsEveryNameAsItIsThroughPrintf) {
   for (const std::string& name : EveryHostileName()) names += name + ".";
   library::InRange(Named(EveryHostileName()));
   WriteText("/tmp/lines", Tool({"scan", "--porcelain"}).out);
-  FILE* pipe = ::popen("cut -f 1 /tmp/lines | while IFS= read -r name; do printf '%b.' \"$name\"; done", "r");
-  std::string read;
-  for (int c; (c = std::fgetc(pipe)) != EOF;) read += static_cast<char>(c);
-  ::pclose(pipe);
-  EXPECT_EQ(read, names);
+  EXPECT_EQ(Shell("cut -f 1 /tmp/lines | while IFS= read -r name; do printf '%b.' \"$name\"; done"), names);
 }
 
 // In it the second byte of this letter is a control.
@@ -194,15 +190,12 @@ TEST_F(Output, FitsItsTablesToTheTerminal) {
 
 TEST_F(Output, ThatCannotBeWrittenIsAFailure) {
   testing::internal::CaptureStderr();
-  const pid_t pid = ::fork();
-  if (pid == 0) {
-    if (std::freopen("/dev/full", "w", stdout) == nullptr) ::_exit(99);
+  const int status = RunInChild([] {
+    if (std::freopen("/dev/full", "w", stdout) == nullptr) return 99;
     const char* argv[] = {"merowireless", "status"};
-    ::_exit(RunProgram(2, argv));
-  }
-  int status = 0;
-  ::waitpid(pid, &status, 0);
-  EXPECT_EQ(WEXITSTATUS(status), 1);
+    return RunProgram(2, argv);
+  });
+  EXPECT_EQ(status, 1);
   EXPECT_THAT(testing::internal::GetCapturedStderr(),
               HasSubstr("merowireless: the output could not be written: look at where it goes\n"));
 }

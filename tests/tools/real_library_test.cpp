@@ -3,17 +3,17 @@
 #include <gtest/gtest.h>
 #include <poll.h>
 #include <pty.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
 #include <iterator>
 #include <set>
 #include <sstream>
 #include <string>
+
+#include "tests/support/files.h"
+#include "tests/support/shell.h"
 
 using testing::AllOf;
 using testing::HasSubstr;
@@ -22,39 +22,24 @@ using testing::StartsWith;
 
 namespace {
 
-struct Ran {
-  int status;
-  std::string out;
-};
-
-// Runs a command line of the program, with its standard error output behind its output.
+// Runs a command line of the program.
 Ran Tool(const std::string& arguments) {
-  FILE* pipe = ::popen(("LC_ALL=C.UTF-8 TZ=UTC " MERO_TOOL " " + arguments + " 2>&1").c_str(), "r");
-  Ran ran{};
-  char bytes[4096];
-  for (std::size_t size; (size = std::fread(bytes, 1, sizeof bytes, pipe)) > 0;) ran.out.append(bytes, size);
-  ran.status = WEXITSTATUS(::pclose(pipe));
-  return ran;
-}
-
-std::string ReadText(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(file), {}};
+  return RunInShell("LC_ALL=C.UTF-8 TZ=UTC " MERO_TOOL " " + arguments);
 }
 
 // A shell with job control on a terminal.
-class Shell {
+class ShellOnTerminal {
  public:
-  Shell() {
+  ShellOnTerminal() {
     if (::forkpty(&terminal_, nullptr, nullptr, nullptr) > 0) return;
     ::setenv("LC_ALL", "C.UTF-8", 1);
     ::setenv("PS1", "ready> ", 1);
     ::execl("/bin/bash", "bash", "--norc", "--noprofile", "-i", nullptr);
     ::_exit(EXIT_FAILURE);
   }
-  Shell(const Shell&) = delete;
-  Shell& operator=(const Shell&) = delete;
-  ~Shell() { ::close(terminal_); }
+  ShellOnTerminal(const ShellOnTerminal&) = delete;
+  ShellOnTerminal& operator=(const ShellOnTerminal&) = delete;
+  ~ShellOnTerminal() { ::close(terminal_); }
 
   void Type(const std::string& text) const {
     ASSERT_EQ(::write(terminal_, text.data(), text.size()), static_cast<ssize_t>(text.size()));
@@ -84,11 +69,11 @@ class Shell {
 };
 
 void AnnounceAdapter() {
-  std::ofstream("/tmp/wireless.info") << "PRODUCT=\"Example Stick\"\n";
+  WriteText("/tmp/wireless.info", "PRODUCT=\"Example Stick\"\n");
 }
 
 TEST(InstalledProgram, SavesANetworkThatItThenKnows) {
-  ASSERT_EQ(std::system("printf 'open sesame\\n' >/tmp/secret"), 0);
+  WriteText("/tmp/secret", "open sesame\n");
   EXPECT_EQ(Tool("save 'My Café' --bssid 00:11:22:33:44:55 --security wpa2 --key-file /tmp/secret").out,
             "saved My Café (00:11:22:33:44:55)\n");
   EXPECT_THAT(ReadText("/usr/mero/etc/wireless.conf"),
@@ -98,7 +83,7 @@ TEST(InstalledProgram, SavesANetworkThatItThenKnows) {
 }
 
 TEST(InstalledProgram, DoesNotShowASecretThatIsTypedAfterItWasStopped) {
-  Shell shell;
+  ShellOnTerminal shell;
   ASSERT_TRUE(shell.Shows("ready> "));
   shell.Type(MERO_TOOL " save Home --bssid 00:11:22:33:44:55 --security wpa2\n");
   ASSERT_TRUE(shell.Shows("secret of Home: ")) << shell.shown();
@@ -123,7 +108,7 @@ TEST(InstalledProgram, SwitchesTheRadio) {
 TEST(InstalledProgram, KeepsTheAccessPointsSettings) {
   AnnounceAdapter();
   EXPECT_EQ(Tool("radio on").status, 0);
-  ASSERT_EQ(std::system("printf 'open sesame\\n' >/tmp/secret"), 0);
+  WriteText("/tmp/secret", "open sesame\n");
   EXPECT_EQ(Tool("ap set --ssid Office --encryption wpa2 --key-file /tmp/secret --channel 11").status, 0);
   EXPECT_THAT(
       ReadText("/usr/mero/etc/wireless_ap.conf"),
@@ -137,11 +122,7 @@ TEST(InstalledProgram, KeepsTheAccessPointsSettings) {
 
 // The files and directories that have been written or made on this machine, each behind its mode, or alone.
 std::string Written(const std::string& form) {
-  FILE* pipe = ::popen(("cd /mnt && find etc run tmp usr var -printf '" + form + "\\n' | sort -k 2").c_str(), "r");
-  std::string written;
-  for (int c; (c = std::fgetc(pipe)) != EOF;) written += static_cast<char>(c);
-  ::pclose(pipe);
-  return written;
+  return Shell("cd /mnt && find etc run tmp usr var -printf '" + form + "\\n' | sort -k 2");
 }
 
 // What the program writes, which is removed afterwards.
@@ -152,7 +133,7 @@ std::string WrittenWithUmask(const std::string& mask) {
   for (const char* szArguments :
        {"save Home --bssid 00:11:22:33:44:55 --security wpa2 --key-file /tmp/secret",
         "ap set --ssid Office --encryption wpa2 --key-file /tmp/secret", "radio off", "disconnect", "forget Home"}) {
-    EXPECT_EQ(std::system((tool + szArguments + " >/dev/null").c_str()), 0) << szArguments;
+    Shell(tool + szArguments);
   }
   const std::string written = Written("%m %p");
   std::istringstream after(Written("/%p"));
@@ -164,7 +145,7 @@ std::string WrittenWithUmask(const std::string& mask) {
 
 TEST(InstalledProgram, WritesTheSameModesWhateverTheUmask) {
   AnnounceAdapter();
-  ASSERT_EQ(std::system("printf 'open sesame\n' >/tmp/secret"), 0);
+  WriteText("/tmp/secret", "open sesame\n");
   const std::string written = WrittenWithUmask("000");
   EXPECT_EQ(WrittenWithUmask("077"), written);
   EXPECT_THAT(written,
@@ -181,7 +162,7 @@ TEST(InstalledProgram, SaysThatThereIsNoAdapterAndWhatTheLibraryReported) {
 }
 
 TEST(InstalledProgram, TakesAnEmptyFileOfTheAdapterForNone) {
-  std::ofstream("/tmp/wireless.info").close();
+  WriteText("/tmp/wireless.info", "");
   for (const char* szArguments : {"ap show", "ap status", "ap disable", "radio on"}) {
     const Ran ran = Tool(szArguments);
     EXPECT_EQ(ran.status, 3) << szArguments;

@@ -12,17 +12,14 @@
 #include <vector>
 
 #include "library_fakes.h"
+#include "tests/support/files.h"
+#include "tests/support/processes.h"
+#include "tests/support/shell.h"
 
 struct Surroundings {
   std::string input = {};                               // on the standard input
   std::map<std::string, std::string> environment = {};  // beside LC_ALL=C.UTF-8
   std::function<void()> before = [] {};                 // done in the program's process, before it begins
-};
-
-struct Ran {
-  int status = -1;
-  std::string out;
-  std::string err;
 };
 
 Ran Tool(const std::vector<std::string>& arguments, const Surroundings& surroundings = {});
@@ -42,21 +39,9 @@ Ran CommandOnTerminal(const std::vector<std::string>& command, const Surrounding
 std::vector<std::string> CommandsOf(std::vector<std::string> command = {});
 
 // A run that is not waited for.
-class StartedTool {
+class StartedTool : public StartedChild {
  public:
   explicit StartedTool(const std::vector<std::string>& arguments, const Surroundings& surroundings = {});
-  StartedTool(const StartedTool&) = delete;
-  StartedTool& operator=(const StartedTool&) = delete;
-  ~StartedTool();
-
-  pid_t pid() const { return pid_; }
-  std::string OutputSoFar() const;
-  Ran Wait();
-
- private:
-  pid_t pid_;
-  int out_;
-  int err_;
 };
 
 // Held by every process that is started while it lives, until that ends.
@@ -74,15 +59,9 @@ class Lifeline {
   int ends_[2];
 };
 
-// Whether something becomes true within seconds.
-bool Soon(const std::function<bool()>& happens);
-
 class ToolTest : public testing::Test {
  protected:
   ToolTest() { library::Reset(); }
 };
-
-std::string ReadText(const std::string& path);
-void WriteText(const std::string& path, const std::string& text);
 
 #endif  // MERO_TESTS_TOOLS_RUNNING_H

@@ -9,18 +9,12 @@
 #include <utility>
 #include <vector>
 
+#include "common/text.h"
 #include "reports.h"
 #include "unit_test.h"
 
 // Apart from those of other machines, which bear the same names.
 namespace enabling {
-
-using Effects = std::vector<std::string>;
-
-inline Effects operator+(Effects before, const Effects& behind) {
-  before.insert(before.end(), behind.begin(), behind.end());
-  return before;
-}
 
 inline const std::string kMarker = "/var/tmp/.wireless_ap_connecting";
 inline const std::string kAdapterInfo = "/tmp/wireless.info";
@@ -102,10 +96,6 @@ inline Effects Starts(const std::string& bridge) {
 
 // ---- The machine ----
 
-inline bool Exists(const std::string& path) {
-  return std::filesystem::exists(std::filesystem::symlink_status(path));
-}
-
 struct Bridge {
   NETINFO netInfo;
   BRIDGE_INFO bridgeInfo;
@@ -116,10 +106,10 @@ inline Bridge NatBridge(const std::string& name, const std::string& ip, const st
   bridge.netInfo.blManual = TRUE;
   bridge.netInfo.blActive = TRUE;
   bridge.bridgeInfo.type = TYPE_NAT_MASTER;
-  std::snprintf(bridge.netInfo.szInterface, sizeof bridge.netInfo.szInterface, "%s", name.c_str());
-  std::snprintf(bridge.netInfo.szIp, sizeof bridge.netInfo.szIp, "%s", ip.c_str());
-  std::snprintf(bridge.netInfo.szMask, sizeof bridge.netInfo.szMask, "%s", mask.c_str());
-  std::snprintf(bridge.bridgeInfo.szIfName, sizeof bridge.bridgeInfo.szIfName, "%s", name.c_str());
+  CopyText(bridge.netInfo.szInterface, name);
+  CopyText(bridge.netInfo.szIp, ip);
+  CopyText(bridge.netInfo.szMask, mask);
+  CopyText(bridge.bridgeInfo.szIfName, name);
   return bridge;
 }
 
@@ -176,7 +166,7 @@ class EnableTest : public UnitTest {
 
   // What was done, but for how the settings are taken from their section and running daemons are looked for.
   static Effects Steps() {
-    Effects steps = WithoutLines(fake::Effects());
+    Effects steps = ::Steps();
     std::erase_if(steps, [](const std::string& step) {
       return step.starts_with("PLIBCSzHash") || step.starts_with("popen(") || step.starts_with("pclose(");
     });

@@ -26,17 +26,6 @@ inline const std::string kEndsSupplicant = "/usr/sbin/wpa_cli terminate > /dev/n
 inline const std::string kAsksState = "/usr/sbin/wpa_cli status | grep wpa_state";
 inline const std::string kSavesResolver = "/bin/cp /etc/resolv.conf /etc/resolv.conf.wireless.bak";
 
-inline std::string RunOf(const std::string& command) {
-  return "system(" + command + ")";
-}
-
-using Effects = std::vector<std::string>;
-
-inline Effects operator+(Effects before, const Effects& behind) {
-  before.insert(before.end(), behind.begin(), behind.end());
-  return before;
-}
-
 class ConnectionTest : public UnitTest {
  protected:
   ConnectionTest() { Begin(); }
@@ -66,10 +55,6 @@ class ConnectionTest : public UnitTest {
 
 inline std::string ConnectReport(const std::string& message) {
   return fake::Report("wireless_network_connect:# " + message);
-}
-
-inline bool Exists(const std::string& path) {
-  return std::filesystem::exists(std::filesystem::symlink_status(path));
 }
 
 #endif  // MERO_TESTS_UNIT_CONNECTION_H

@@ -8,7 +8,8 @@
 #include <cerrno>
 #include <cstdarg>
 #include <ctime>
-#include <tuple>
+
+#include "tests/support/fake_functions.h"
 
 namespace fake {
 namespace {
@@ -135,24 +136,6 @@ MERO_FAKES(DEFINE_FAKE)
 
 namespace {
 
-template <class Function>
-struct Signature;
-
-template <class R, class... Args>
-struct Signature<R(Args...)> {
-  using Result = R;
-  using Arguments = std::tuple<Args...>;
-  static constexpr bool kNoexcept = false;
-};
-
-template <class R, class... Args>
-struct Signature<R(Args...) noexcept> : Signature<R(Args...)> {
-  static constexpr bool kNoexcept = true;
-};
-
-template <class Function, size_t kIndex>
-using Argument = std::tuple_element_t<kIndex, typename Signature<Function>::Arguments>;
-
 void RecordReport(int priority, const char* szFormat, va_list values) {
   char szMessage[4096];
   std::vsnprintf(szMessage, sizeof szMessage, szFormat, values);  // at once: %m is the errno of this moment
@@ -174,23 +157,9 @@ Seconds Now(Seconds* pSeconds) {
 }  // namespace
 }  // namespace fake
 
-#define PARAMETERS_0(Function)
-#define PARAMETERS_1(Function) fake::Argument<Function, 0> a
-#define PARAMETERS_2(Function) PARAMETERS_1(Function), fake::Argument<Function, 1> b
-#define PARAMETERS_3(Function) PARAMETERS_2(Function), fake::Argument<Function, 2> c
-#define PARAMETERS_4(Function) PARAMETERS_3(Function), fake::Argument<Function, 3> d
-#define PARAMETERS_5(Function) PARAMETERS_4(Function), fake::Argument<Function, 4> e
-#define ARGUMENTS_0
-#define ARGUMENTS_1 a
-#define ARGUMENTS_2 ARGUMENTS_1, b
-#define ARGUMENTS_3 ARGUMENTS_2, c
-#define ARGUMENTS_4 ARGUMENTS_3, d
-#define ARGUMENTS_5 ARGUMENTS_4, e
-
-#define DEFINE_FUNCTION(name, origin, count)                                                                \
-  extern "C" fake::Signature<decltype(::name)>::Result name(PARAMETERS_##count(decltype(::name))) noexcept( \
-      fake::Signature<decltype(::name)>::kNoexcept) {                                                       \
-    return fake::name.Call(ARGUMENTS_##count);                                                              \
+#define DEFINE_FUNCTION(name, origin, count)   \
+  STAND_IN_FOR(name, count) {                  \
+    return fake::name.Call(ARGUMENTS_##count); \
   }
 MERO_FAKES(DEFINE_FUNCTION)
 

@@ -90,7 +90,7 @@ inline void ForgetCalls() {
 }
 
 inline std::vector<Call> NotedCalls() {
-  const std::string text = ReadText(kNotedCalls);
+  const std::string text = TextOrNothing(kNotedCalls);
   size_t at = 0;
   const auto next = [&] {
     const size_t end = text.find('\0', at);
@@ -108,7 +108,7 @@ inline std::vector<Call> NotedCalls() {
 }
 
 inline bool HasIntruder() {
-  return std::filesystem::exists(kIntruder);
+  return Exists(kIntruder);
 }
 
 #endif  // MERO_TESTS_UNIT_HOSTILE_TEXTS_H

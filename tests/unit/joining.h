@@ -43,7 +43,7 @@ class JoiningTest : public ConnectionTest {
 
   // What was done, but for questions that could come at any time.
   static Effects Steps() {
-    Effects steps = WithoutLines(fake::Effects());
+    Effects steps = ::Steps();
     std::erase_if(steps, [](const std::string& step) {
       return step.starts_with("MEROWirelessInterfaceGet(") || step.starts_with("MEROWirelessBssidStringGet(") ||
              step.starts_with("MEROWirelessEncryptStringGet(");

@@ -1,9 +1,8 @@
 // What somebody else with an account can do to the files that the library has in directories that anyone may write.
-#include "local_user.h"
-
 #include <sys/stat.h>
 
 #include "joining.h"
+#include "tests/support/local_user.h"
 
 namespace {
 
@@ -20,20 +19,8 @@ class ALocalUser : public JoiningTest {
     if (!HasLocalUsers()) GTEST_SKIP() << "not the machine's root";
   }
 
-  // Puts each obstacle in the place of a file in turn, and looks at what comes of it.
-  template <class Look>
-  static void ObstructEachWay(const std::string& path, Look look) {
-    int nObstacles = 0;
-    for (const Obstacle& obstacle : Obstacles(kVictim)) {
-      Begin();
-      SCOPED_TRACE(obstacle.name);
-      ASSERT_TRUE(RunAsLocalUser([&] { return obstacle.put(path); }));
-      look();
-      EXPECT_EQ(ReadText(kVictim), "as was");
-      EXPECT_FALSE(Exists(kVictim + ".missing"));
-      ++nObstacles;
-    }
-    EXPECT_EQ(nObstacles, 7);
+  static void ObstructEachWay(const std::string& path, const std::function<void()>& look) {
+    ::ObstructEachWay(path, kVictim, Begin, look);
   }
 };
 
@@ -49,9 +36,7 @@ TEST_F(ALocalUser, KeepsNobodyFromConnectingByAMarker) {
 TEST_F(ALocalUser, HasNoConnectionRecordedInAFileOfTheirs) {
   ObstructEachWay(kRecord, [this] {
     EXPECT_EQ(Join(), 0);
-    struct stat info;
-    ASSERT_EQ(::lstat(kRecord.c_str(), &info), 0);
-    EXPECT_TRUE(S_ISREG(info.st_mode) && info.st_uid == ::geteuid() && info.st_nlink == 1);
+    EXPECT_TRUE(IsOurs(kRecord));
     EXPECT_EQ(ReadText(kRecord), "Home Net\n7\n5\n8\n00:11:22:AA:BB:CC\n");
   });
 }

@@ -4,18 +4,14 @@
 #include <random>
 
 #include "hostile_texts.h"
+#include "tests/support/shell.h"
 #include "unit_test.h"
 
 namespace {
 
 // What a shell passes to a program whose arguments are the word and a dot.
 std::string PassedOn(const std::string& word) {
-  const std::string command = "printf '<%s>' " + word + " .";
-  std::string output;
-  FILE* pipe = popen(command.c_str(), "r");
-  for (int c; (c = std::fgetc(pipe)) != EOF;) output += static_cast<char>(c);
-  pclose(pipe);
-  return output;
+  return Shell("printf '<%s>' " + word + " .");
 }
 
 class ShellWords : public UnitTest {};

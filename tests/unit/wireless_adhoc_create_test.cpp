@@ -15,10 +15,6 @@ constexpr char kTool[] = "/usr/sbin/iwconfig";
 constexpr char kSetsEssid[] = "/sbin/iwconfig wlan0 essid cell > /dev/null 2>&1";
 constexpr char kSetsNoKey[] = "/sbin/iwconfig wlan0 key off";
 
-std::string RunOf(const std::string& command) {
-  return "system(" + command + ")";
-}
-
 std::string ReportOf(const std::string& message) {
   return fake::Report("wireless_adhoc_create:# " + message);
 }
@@ -69,8 +65,6 @@ class AdhocCell : public UnitTest {
   int Create() {
     return memory::Run(0, [this] { return MEROWirelessAdhocCreate(&config_); });
   }
-
-  static std::vector<std::string> Steps() { return WithoutLines(fake::Effects()); }
 
   void SetKey(const std::string& key) {
     config_.network.encrypt = WIRELESS_ENCRYPT_WEP;

@@ -9,6 +9,7 @@
 #include <random>
 
 #include "ap_settings.h"
+#include "common/text.h"
 #include "hostile_texts.h"
 #include "reports.h"
 #include "unit_test.h"
@@ -51,9 +52,9 @@ class SavedApSettings : public UnitTest {
 
   // Expects that the record is refused with a message, and that the file stays as it is.
   void ExpectRefused(const std::string& message) {
-    const std::string before = ReadText(kSettings);
+    const std::string before = TextOrNothing(kSettings);
     EXPECT_EQ(Save(), FALSE);
-    EXPECT_EQ(ReadText(kSettings), before);
+    EXPECT_EQ(TextOrNothing(kSettings), before);
     EXPECT_THAT(WithoutLines(fake::Messages()), Contains("wireless_ap_conf_set:# " + message));
   }
 
@@ -63,12 +64,7 @@ class SavedApSettings : public UnitTest {
     return conf;
   }
 
-  void NameSection(const std::string& name) { CopyName(conf_.szSecName, name); }
-
-  template <size_t kSize>
-  static void CopyName(char (&szName)[kSize], const std::string& name) {
-    std::snprintf(szName, kSize, "%s", name.c_str());
-  }
+  void NameSection(const std::string& name) { CopyText(conf_.szSecName, name); }
 
   MERO_AP_CONF conf_ = OfficeSettings(AP_ENCRYPT_WPA_PSK, AP_ENCRYPT_WEP);
   const std::string office_ = OfficeSection(AP_ENCRYPT_WPA_PSK, AP_ENCRYPT_WEP);
@@ -83,9 +79,7 @@ const std::string kBehind = "[last]\r\n\tenable=yes\r\nrubbish\n\tno newline at 
 TEST_F(SavedApSettings, AreCreatedForTheFirstModelAndAreTheOwnersAlone) {
   ExpectSaved();
   EXPECT_EQ(ReadText(kSettings), office_);
-  struct stat info;
-  ASSERT_EQ(stat(kSettings.c_str(), &info), 0);
-  EXPECT_EQ(info.st_mode & 07777, 0600u);
+  EXPECT_EQ(ModeOf(kSettings), 0600u);
 }
 
 TEST_F(SavedApSettings, KeepTheModeThatTheFileWasGiven) {
@@ -93,9 +87,7 @@ TEST_F(SavedApSettings, KeepTheModeThatTheFileWasGiven) {
   ASSERT_EQ(chmod(kSettings.c_str(), 0640), 0);
   ExpectSaved();
   EXPECT_EQ(ReadText(kSettings), office_);
-  struct stat info;
-  ASSERT_EQ(stat(kSettings.c_str(), &info), 0);
-  EXPECT_EQ(info.st_mode & 07777, 0640u);
+  EXPECT_EQ(ModeOf(kSettings), 0640u);
 }
 
 TEST_F(SavedApSettings, HoldWhatTheEncryptionsNeedAndNothingElse) {
@@ -187,9 +179,7 @@ TEST_F(SavedApSettings, HoldOnlyTheSwitchWhenADisabledAccessPointIsTheFirst) {
   conf_.blEnable = FALSE;
   ExpectSaved();
   EXPECT_EQ(ReadText(kSettings), "[RT-5370]\n\tenable=no\n");
-  struct stat info;
-  ASSERT_EQ(stat(kSettings.c_str(), &info), 0);
-  EXPECT_EQ(info.st_mode & 07777, 0600u);
+  EXPECT_EQ(ModeOf(kSettings), 0600u);
   WriteText(kSettings, kBefore);
   ExpectSaved();
   EXPECT_EQ(ReadText(kSettings), kBefore + "[RT-5370]\n\tenable=no\n");
@@ -404,7 +394,7 @@ TEST_F(SavedApSettings, AreWholeOrEmptyWhenMemoryRunsOutOnTheFirstSave) {
   memory::FailEach([this] { return MEROWirelessSetAPConfig(&conf_); },
                    [&](int n, BOOL result) {
                      EXPECT_EQ(result, HasReportedFailure() ? FALSE : TRUE) << n;
-                     EXPECT_EQ(ReadText(kSettings), result == TRUE ? office_ : "") << n;
+                     EXPECT_EQ(TextOrNothing(kSettings), result == TRUE ? office_ : "") << n;
                      EXPECT_EQ(memory::Held(), 0u) << n;
                      std::filesystem::remove(kSettings);
                      fake::Begin();
@@ -444,11 +434,6 @@ class AnyRecord {
   static bool IsNeeded(const std::string& with, int encryption, int guestEncryption) {
     return with.empty() || with == "\tencryption=" + std::to_string(encryption) + "\n" ||
            with == "\tguest_net_encryption=" + std::to_string(guestEncryption) + "\n";
-  }
-
-  template <size_t kSize>
-  static void CopyText(char (&szTo)[kSize], const std::string& text) {
-    std::snprintf(szTo, kSize, "%s", text.c_str());
   }
 
   size_t Below(size_t limit) { return std::uniform_int_distribution<size_t>(0, limit - 1)(random_); }

@@ -67,8 +67,6 @@ class ApSave : public UnitTest {
     return memory::Run(0, [this] { return MEROWirelessSetAPConfig(&conf_); });
   }
 
-  static std::vector<std::string> Steps() { return WithoutLines(fake::Effects()); }
-
   // The steps of a save that gets as far as the pairs: those before them, and those behind.
   static std::vector<std::string> StepsAroundPairs(std::vector<std::string> before,
                                                    const std::vector<std::string>& behind) {

@@ -6,13 +6,13 @@
 #include <filesystem>
 
 #include "reports.h"
+#include "tests/support/shell.h"
 #include "unit_test.h"
 
 namespace {
 
 using testing::ElementsAreArray;
 using testing::IsEmpty;
-using Effects = std::vector<std::string>;
 
 const std::string kInfoFile = "/etc/hostapd/hostapd-wlan0.info";
 const std::string kScripts = "/etc/sysconfig/network-scripts";
@@ -20,11 +20,6 @@ const std::string kInterfaceScript = kScripts + "/ifcfg-wlan0";
 const std::string kBridgeScript = kScripts + "/ifcfg-lbr0";
 const std::string kMembers = "/tmp/members";
 const std::string kPlain = "%s=%s\n";
-
-Effects operator+(Effects before, const Effects& behind) {
-  before.insert(before.end(), behind.begin(), behind.end());
-  return before;
-}
 
 std::string DisableReport(const std::string& message) {
   return fake::Report("wireless_ap_disable:# " + message);
@@ -102,8 +97,6 @@ class DisablingAnAccessPoint : public UnitTest {
     fake::PLIBNetBridgeSlaveEnum.Does(
         [](const char*, PPLIBSZLIST* ppslList) { return fake::PLIBCFileEnumSection.Real(kMembers.c_str(), ppslList); });
   }
-
-  static Effects Steps() { return WithoutLines(fake::Effects()); }
 
   static void ExpectDisabledBy(const Effects& steps) {
     EXPECT_EQ(MEROWirelessAPDisable(), TRUE);
@@ -313,8 +306,7 @@ TEST_F(DisablingAnAccessPoint, StopsTheServerOfARealBridgeAndKeepsItsSettings) {
   fake::MERONetGetDhcpServerConf.Reset();
   fake::MERONetSetDhcpServerConfigFiles.Reset();
   fake::PLIBNetBridgeSlaveEnum.Reset();
-  const auto shell = [](const char* szCommand) { EXPECT_EQ(fake::system.Real(szCommand), 0) << szCommand; };
-  shell(
+  Shell(
       "ip link add lbr0 type bridge && ip link add wlan0 type veth peer name eth0 &&"
       " ip link set wlan0 master lbr0 && ip link set eth0 master lbr0");
   MERO_DHCPD_CONF conf{};
@@ -329,7 +321,7 @@ TEST_F(DisablingAnAccessPoint, StopsTheServerOfARealBridgeAndKeepsItsSettings) {
   EXPECT_EQ(ReadText(kBridgeScript), "DEVICE=lbr0\nONBOOT=\"yes\"\nPRIMARY=eth0\nTYPE=Bridge\n");
   EXPECT_EQ(ReadText("/etc/dhcpd/dhcpd-lbr0-lbr0.conf"), server);
   EXPECT_EQ(ReadText("/etc/dhcpd/dhcpd-lbr0-lbr0.info"), "auto_time=\"0\"\nenable=\"no\"\n");
-  shell("ip link delete wlan0 && ip link delete lbr0");
+  Shell("ip link delete wlan0 && ip link delete lbr0");
 }
 
 // After a change to client mode, or with the adapter pulled, the kernel has no such bridge, and it came up at every

@@ -1,5 +1,4 @@
 // What a save leaves in the file.
-#include <sys/stat.h>
 
 #include <cstring>
 #include <filesystem>
@@ -32,9 +31,7 @@ class SavedFile : public UnitTest {
 TEST_F(SavedFile, IsCreatedForTheFirstNetworkAndIsTheOwnersAlone) {
   ExpectSaved(config_);
   EXPECT_EQ(ReadText(kStore), HomeSectionSavedAt(kNow));
-  struct stat info;
-  ASSERT_EQ(stat(kStore.c_str(), &info), 0);
-  EXPECT_EQ(info.st_mode & 07777, 0600u);
+  EXPECT_EQ(ModeOf(kStore), 0600u);
 }
 
 TEST_F(SavedFile, GetsItsFirstNetworkWhenItWasEmpty) {

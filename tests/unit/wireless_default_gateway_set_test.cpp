@@ -26,8 +26,6 @@ class DefaultGateway : public UnitTest {
     fake::MEROWirelessInterfaceGet.Returns("wlan0");
     fake::system.Returns(0);
   }
-
-  static std::vector<std::string> Steps() { return WithoutLines(fake::Effects()); }
 };
 
 TEST_F(DefaultGateway, IsAddedThroughTheWirelessInterface) {

@@ -1,7 +1,6 @@
 // What is written, in the judgement of the daemon that reads it: Debian's hostapd.
-#include <array>
-
 #include "hostapd_files.h"
+#include "tests/support/shell.h"
 
 namespace {
 
@@ -24,15 +23,7 @@ class HostapdAccepts : public HostapdFilesTest {
   HostapdAccepts() { CreateDirectoryOnce(); }
 
   // All that the daemon prints. It ends by itself, since there is no radio.
-  static std::string OutputOfDaemon(const std::string& path) {
-    std::string output;
-    FILE* pipe = fake::popen.Real(("/usr/sbin/hostapd " + path + " 2>&1").c_str(), "r");
-    if (pipe == nullptr) return "cannot be run";
-    std::array<char, 4096> part;
-    while (const size_t size = std::fread(part.data(), 1, part.size(), pipe)) output.append(part.data(), size);
-    fake::pclose.Real(pipe);
-    return output;
-  }
+  static std::string OutputOfDaemon(const std::string& path) { return RunInShell("/usr/sbin/hostapd " + path).out; }
 
   // The daemon's verdict on a file: empty when it reads all of it and goes on to the radio of `szIfName`, else the
   // errors that it finds.

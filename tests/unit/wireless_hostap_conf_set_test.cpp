@@ -19,8 +19,6 @@ using testing::IsEmpty;
 using testing::Not;
 using testing::UnorderedElementsAre;
 
-using Effects = std::vector<std::string>;
-
 constexpr char kModel[] = "/etc.defaults/meroinfo.conf";
 const std::string kListsDaemons = "ps | grep hostapd | grep wlan0 | awk {'print $1'}";
 
@@ -55,16 +53,6 @@ Effects CourseWith(const std::string& step, const std::vector<std::string>& mess
   return course;
 }
 
-mode_t ModeOf(const std::string& path) {
-  struct stat status {};
-  EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
-  return status.st_mode & 07777;
-}
-
-bool Exists(const std::string& path) {
-  return std::filesystem::exists(std::filesystem::symlink_status(path));
-}
-
 class WritingHostapdFiles : public HostapdFilesTest {
  protected:
   WritingHostapdFiles() { Begin(); }
@@ -79,8 +67,6 @@ class WritingHostapdFiles : public HostapdFilesTest {
     Begin();
     fake::PipesGive({"4711\n"});
   }
-
-  static Effects Steps() { return WithoutLines(fake::Effects()); }
 
   static Effects Messages() {
     Effects messages = WithoutLines(fake::Messages());
@@ -496,7 +482,7 @@ TEST_F(EndingADaemonInAShell, LooksForAnInterfaceOfAnyNameUnchanged) {
     EXPECT_THAT(NotedCalls(), UnorderedElementsAre(Call{"/usr/bin/grep", "hostapd"}, Call{"/usr/bin/grep", name}))
         << name;
     EXPECT_THAT(fake::EffectsOf({"PLIBNetIfDown", "kill"}), ElementsAre("PLIBNetIfDown(" + name + ")"));
-    EXPECT_EQ(ReadText("/etc/hostapd/hostapd-" + name + "-host.conf").starts_with("interface=" + name + "\n"),
+    EXPECT_EQ(TextOrNothing("/etc/hostapd/hostapd-" + name + "-host.conf").starts_with("interface=" + name + "\n"),
               namesAFile)
         << name;
     EXPECT_FALSE(HasIntruder()) << name;
@@ -524,18 +510,14 @@ TEST_F(EndingADaemonInAShell, LooksForTheWholeNameOrForNone) {
 }
 
 // Descriptors that a program which is started now would have.
-std::set<std::string> InheritedDescriptors() {
-  std::set<std::string> inherited;
-  for (const auto& link : std::filesystem::directory_iterator("/proc/self/fd")) {
-    const std::string fd = link.path().filename();
-    const int flags = fcntl(std::stoi(fd), F_GETFD);
-    if (flags >= 0 && (flags & FD_CLOEXEC) == 0) inherited.insert(fd);
-  }
+std::set<int> InheritedDescriptors() {
+  std::set<int> inherited = OpenDescriptors();
+  std::erase_if(inherited, [](int fd) { return (fcntl(fd, F_GETFD) & FD_CLOEXEC) != 0; });
   return inherited;
 }
 
 TEST_F(EndingADaemonInAShell, KeepsItsDescriptorsToItself) {
-  const std::set<std::string> before = InheritedDescriptors();
+  const std::set<int> before = InheritedDescriptors();
   int nLooks = 0;
   const auto look = [&] {
     EXPECT_EQ(InheritedDescriptors(), before);

@@ -39,8 +39,6 @@ class Addressing : public UnitTest {
     });
   }
 
-  static std::vector<std::string> Steps() { return WithoutLines(fake::Effects()); }
-
   // Every field of a record, in order, and nothing behind the end of its texts.
   static void ExpectRecord(const NETINFO& record, BOOL manual, const std::string& ifName, const std::string& mac,
                            const std::string& ip, const std::string& mask) {

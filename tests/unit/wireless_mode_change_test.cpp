@@ -14,10 +14,6 @@ constexpr char kChangesToAp[] = "PLIBCExec(/usr/mero/hotplug/usb.wireless.functi
 constexpr char kChangesToClient[] =
     "PLIBCExec(/usr/mero/hotplug/usb.wireless.function, change-mode, client, null, null)";
 
-std::vector<std::string> Steps() {
-  return WithoutLines(fake::Effects());
-}
-
 std::string ReportOf(const std::string& message) {
   return fake::Report("wireless_mode_change:# " + message);
 }

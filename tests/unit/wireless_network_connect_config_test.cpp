@@ -304,12 +304,6 @@ TEST_F(SupplicantConfig, HoldsNothingFromBehindAFieldThatHasNoEnd) {
                                                       std::string(257, 'k') + "\"\n}\n"));
 }
 
-mode_t ModeOf(const std::string& path) {
-  struct stat status {};
-  EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
-  return status.st_mode & 07777;
-}
-
 TEST_F(SupplicantConfig, CanBeReadByItsOwnerAloneAlsoWhenTheOldOneCouldBeReadByAll) {
   const mode_t before = umask(0);
   for (const mode_t mask : {0000, 0077, 0777}) {

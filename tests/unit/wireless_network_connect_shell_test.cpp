@@ -1,7 +1,4 @@
 // The commands of a connection in a real shell.
-#include <chrono>
-#include <thread>
-
 #include "hostile_texts.h"
 #include "joining.h"
 
@@ -31,8 +28,7 @@ class JoiningInAShell : public JoiningTest {
 
   // Some shells start the supplicant and go on, for what looks to others like a redirection to them.
   static unsigned AwaitSupplicant() {
-    using namespace std::chrono_literals;
-    for (int i = 0; i < 1000 && CallsOf(kSupplicant).empty(); ++i) std::this_thread::sleep_for(10ms);
+    Soon([] { return !CallsOf(kSupplicant).empty(); }, 10);
     return 0;
   }
 

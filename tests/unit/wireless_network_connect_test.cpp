@@ -12,15 +12,6 @@ using testing::ElementsAre;
 using testing::ElementsAreArray;
 using testing::IsEmpty;
 
-std::set<int> OpenDescriptors() {
-  std::set<int> descriptors;
-  for (const auto& entry : std::filesystem::directory_iterator("/proc/self/fd")) {
-    descriptors.insert(std::stoi(entry.path().filename()));
-  }
-  std::erase_if(descriptors, [](int fd) { return fcntl(fd, F_GETFD) < 0; });  // that of the directory itself
-  return descriptors;
-}
-
 class Joining : public JoiningTest {};
 
 TEST_F(Joining, StartsTheSupplicantAndWaitsUntilItIsConnected) {
