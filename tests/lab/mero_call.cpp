@@ -6,14 +6,11 @@
 // them, without their prefix.
 //
 // Exit status: 0 the function succeeded, 1 it did not, 2 the call is wrong and was not made.
-#include <search.h>
-
 #include <algorithm>
 #include <array>
 #include <charconv>
 #include <cstddef>
 #include <cstdio>
-#include <cstdlib>
 #include <iterator>
 #include <span>
 #include <stdexcept>
@@ -22,6 +19,7 @@
 
 #include "common/ap_settings.h"
 #include "platform.h"
+#include "tests/support/ring.h"
 #include "wireless.h"
 
 namespace {
@@ -306,38 +304,6 @@ Config ConfigOf(Arguments arguments) {
   return config;
 }
 
-// ---- Lists -------------------------------------------------------------------------------------------------------
-
-// The head of a list of records, which it frees.
-template <class Record>
-class List {
- public:
-  List() = default;
-  List(const List&) = delete;
-  List& operator=(const List&) = delete;
-
-  ~List() {
-    while (head_.q_forw != &head_) {
-      WIRELESS_LIST* node = head_.q_forw;
-      remque(node);
-      std::free(&RecordOf(node));
-    }
-  }
-
-  WIRELESS_LIST* head() { return &head_; }
-
-  void Print() {
-    for (WIRELESS_LIST* node = head_.q_forw; node != &head_; node = node->q_forw) ::Print(RecordOf(node));
-  }
-
- private:
-  static Record& RecordOf(WIRELESS_LIST* node) {
-    return *reinterpret_cast<Record*>(reinterpret_cast<char*>(node) - offsetof(Record, list));
-  }
-
-  WIRELESS_LIST head_{&head_, &head_};
-};
-
 // ---- Calls -------------------------------------------------------------------------------------------------------
 
 // Says what the function returned, before its records.
@@ -348,9 +314,9 @@ int Told(int result) {
 
 template <class Record, class Function>
 int CallForList(Function function) {
-  List<Record> list;
-  const int result = Told(function(list.head()));
-  list.Print();
+  Ring<Record> ring;
+  const int result = Told(function(ring.head()));
+  ring.ForEach([](const Record& record) { Print(record); });
   return result;
 }
 
@@ -438,7 +404,7 @@ int ApShow(Arguments) {
   return result;
 }
 
-// What is not said stays as it was; an access point whose settings are saved is switched on, unless they say otherwise.
+// Settings that are not given stay as they were, but for the switch: saving switches an access point on by default.
 int ApSave(Arguments arguments) {
   Settings settings{};
   (void)ReadSettings(settings);
