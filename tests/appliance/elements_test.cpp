@@ -1,4 +1,4 @@
-// What the listing tool reads out of a beacon, element by element.
+// The listing tool reads a beacon, element by element.
 #include "appliance/sbin/elements.h"
 
 #include <gtest/gtest.h>

@@ -23,7 +23,7 @@ class KitBoot : public Kit {
   }
 };
 
-// One that could not be made kept those after it from being made.
+// A bridge that could not be made kept the bridges after it from being made.
 TEST_F(KitBoot, MakesTheOtherBridgesWhenOneCannotBeMade) {
   Bridge("abr", "IPADDR=nonsense\n");
   Bridge("bbr", "");

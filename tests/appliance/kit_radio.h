@@ -82,7 +82,7 @@ fi
         .out;
   }
 
-  // What there is of an access point; empty when there is nothing.
+  // The parts of an access point that exist: daemons, bridges, files, addresses and rules; empty when there are none.
   static std::string Left() {
     return Daemons() +
            RunInShell(

@@ -1,4 +1,4 @@
-// What somebody else may do to the kit's files in directories that anybody can write to: nothing comes of it.
+// Other users put things in the way of the kit's files, in directories that anybody can write to. It does no harm.
 #include <gmock/gmock.h>
 #include <sys/stat.h>
 

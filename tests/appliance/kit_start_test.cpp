@@ -106,7 +106,7 @@ TEST_F(KitAccessPoint, SaysThatRulesStandWhichItCannotRemove) {
   EXPECT_EQ(Script("start wlan0 lbr0").status, 1);
 }
 
-// One step that failed kept all that came after it: the interface stayed an access point's.
+// A step that failed kept all later steps from being made: the interface stayed an access point's.
 TEST_F(KitAccessPoint, IsTakenDownWhateverStepFails) {
   const struct {
     const char* szProgram;
@@ -133,7 +133,7 @@ TEST_F(KitAccessPoint, IsTakenDownWhateverStepFails) {
   }
 }
 
-// Whoever disables the access point twice, since it failed once, cannot name its bridge any more.
+// A second call to disable the access point, after one that failed, cannot name its bridge any more.
 TEST_F(KitAccessPoint, IsTakenDownWithItsBridgeWhenNobodyNamesThat) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   Break("ip", "link delete");
@@ -224,7 +224,7 @@ TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   EXPECT_EQ(Daemons(), "dnsmasq\ndnsmasq\nhostapd\n");
   EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
 
-  // One that is ended meanwhile stays off.
+  // An access point that is ended meanwhile stays off.
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   BreakOnce("nft");
   EXPECT_EQ(Script("schedule wlan0").status, 1);
@@ -233,7 +233,7 @@ TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   EXPECT_EQ(Left(), "");
 }
 
-// What was made had the mode that the caller's umask left it.
+// Files had the mode that the caller's umask left them.
 TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
   WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nwpa_psk_file=/etc/hostapd.psk\n");
   for (const char* szUmask : {"000", "077", "022"}) {

@@ -18,7 +18,7 @@
 namespace iwlist {
 namespace {
 
-// One row as the library takes it.
+// A row, as the library reads it.
 struct ReadBack {
   bool good = false;
   int channel = 0;

@@ -1,4 +1,4 @@
-// What the listing tool takes from the messages of a radio's driver.
+// The listing tool reads the messages of a radio's driver.
 #include "appliance/sbin/radio.h"
 
 #include <gtest/gtest.h>

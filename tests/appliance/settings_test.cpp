@@ -1,4 +1,4 @@
-// What the kit reads of settings is what the libraries read: both walk the same tables.
+// The kit reads the same settings as the libraries: the tests of both walk the same tables.
 #include <cstring>
 #include <filesystem>
 #include <map>

@@ -1,6 +1,6 @@
 // Memory that runs out.
 //
-// What the functions below stand in front of has names of its own, so that nothing is looked up, which takes memory.
+// The real allocators are called by their other names: looking them up by dlsym() would take memory.
 #include "tests/fault/failing_memory.h"
 
 #include <cerrno>

@@ -86,7 +86,7 @@ TEST_F(WithoutMemory, AHashStaysAsItWas) {
   EXPECT_EQ(hash["NEW"], "(none)");
 }
 
-// Who does not look at what setting a pair gave would have saved the rest as if it were all.
+// A caller that ignored the result of setting a pair saved the other pairs as if they were all.
 TEST_F(WithoutMemory, AHashThatLacksAPairIsNotWritten) {
   const std::string before = ReadText(kSettings);
   const auto lacking = [](TextHash& hash, const char* szKey) {

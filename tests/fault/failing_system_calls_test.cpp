@@ -43,7 +43,7 @@ class ASaveWithAFailure : public PlatformTest {
         failed.insert(outcome.call.name);
         look(before, after, outcome);
         for (const std::string& name : NamesIn(kStoreDirectory)) {
-          // One that was not had, or could not be removed, is the next one's.
+          // A lock that was not taken, or could not be removed, is left for the next writer.
           const bool ofLock =
               outcome.call.name == "flock" || outcome.call.name == "stat" || outcome.call.name == "unlink";
           if (ofLock && name == ".wireless.conf.lock") continue;
@@ -65,7 +65,7 @@ class ASaveWithAFailure : public PlatformTest {
     std::snprintf(szErrno, sizeof szErrno, "errno=0x%X", static_cast<unsigned>(code));
     EXPECT_THAT(outcome.reports, ElementsAre(HasSubstr(kStore), HasSubstr("wireless_conf_set:")));
     EXPECT_THAT(outcome.reports, Contains(AnyOf(HasSubstr(szErrno), HasSubstr("Failed to touch"))));
-    // What has taken its place cannot be taken back; it is whole, but may not outlast a power cut.
+    // The new file has taken the place of the old one for good: it is whole, but may not outlast a power cut.
     const bool inPlace = Lists(outcome.before, "rename");
     EXPECT_THAT(StoredText(), inPlace ? testing::Matcher<std::string>(after) : IsStillThe(before));
   }

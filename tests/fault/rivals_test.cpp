@@ -1,5 +1,5 @@
-// What a rival may do between two system calls of an operation: the first call meets the state before, the next the
-// state after.
+// Another process changes a file between two system calls of an operation: the first call meets the state before the
+// change, the next one the state after it.
 #include <cerrno>
 #include <filesystem>
 
@@ -24,7 +24,8 @@ TEST_F(ARival, ThatMakesAFileDoesNotHaveItEmptiedByTouchingIt) {
   EXPECT_EQ(ReadText(kFile), "content");
 }
 
-// Whoever may write to the directory could lead the new content, secrets included, to a file of theirs.
+// Somebody else with a right to write to the directory could have the new content, with its secrets, written to a file
+// of theirs.
 TEST_F(ARival, ThatPutsALinkInTheWayOfAChangeHasNothingWrittenThroughIt) {
   WriteText(kFile, "KEY=old\n");
   WriteText("/tmp/platform/victim", "as was");

@@ -77,7 +77,7 @@ files() {
     tr -d ' '
 }
 
-# What a component installs, from the build directory.
+# The files that a component installs, from the build directory.
 installed() { # COMPONENT
   DESTDIR=$work/$1 cmake --install "$build" --component "$1" >"$work/log" || fail "$(cat "$work/log")"
   (cd "$work/$1" && find . -not -type d | sed 's/^\.//')

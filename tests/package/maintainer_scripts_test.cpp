@@ -24,7 +24,7 @@ constexpr char kLeaseLock[] = "/run/udhcpc.lease";
 constexpr char kStart[] = "/etc/rc.network";
 constexpr char kConnection[] = "/usr/mero/etc/wpa_supplicant.conf";
 
-// What stands in directories that anyone may write, and what the scripts remove.
+// The files that the scripts remove from directories that anyone may write.
 const std::vector<std::string> kPublic = {"/var/tmp/.wireless_connecting", "/var/tmp/.wireless_current_connection",
                                           "/var/tmp/.wireless_ap_connecting",
                                           "/var/tmp/.wireless_current_connection.aB3xYz", kAdapter};
@@ -33,7 +33,7 @@ Ran Script(const std::string& name, const std::string& arguments) {
   return RunInShell("PATH=/tmp/bin:$PATH sh " PACKAGE_SCRIPTS "/" + name + " " + arguments);
 }
 
-// What dpkg has of the scripts when the packages are removed, in its order.
+// Runs the scripts that dpkg runs when the packages are removed, in its order; all that they say.
 Ran Remove(const std::string& how = "remove") {
   Ran all = {.status = 0, .out = "", .err = ""};
   const std::vector<std::string> scripts =

@@ -228,7 +228,7 @@ is_upgraded() {
   [[ $(inside dpkg-query --show --showformat '${Version}' merowireless-appliance) == *+later ]]
 }
 
-# What the kit's scripts take for an access point's daemon.
+# A process that the kit's scripts take for an access point's daemon.
 start_daemon() {
   mkdir -p "$root/run/rc.network"
   cp "$root/bin/sleep" "$root/tmp/hostapd"

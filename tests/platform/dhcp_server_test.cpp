@@ -395,7 +395,7 @@ TEST_F(DhcpServerFiles, AreReadAsFarAsTheyAreUnderstood) {
   EXPECT_EQ(Find()->autoTime, 0);
 }
 
-// What the server takes for the same configuration as ours, and what the record then holds.
+// Lines that mean the same to the server as ours do, and the record that they are read into.
 TEST_F(DhcpServerFiles, AreReadAsTheServerReadsThem) {
   MERO_DHCPD_CONF conf = FullServer();
   conf.blEnable = FALSE;

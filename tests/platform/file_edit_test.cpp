@@ -1,4 +1,4 @@
-// What holds for every change of a file, whatever its form.
+// Promises that hold for every change of a file, whatever its form.
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
@@ -145,7 +145,8 @@ TEST_F(AFileThatIsChanged, IsNotDisturbedByWhatAKilledWriterLeft) {
   }
 }
 
-// Whoever may write to the directory could lead the new content, secrets included, to a file of theirs.
+// Somebody else with a right to write to the directory could have the new content, with its secrets, written to a file
+// of theirs.
 TEST_F(AFileThatIsChanged, IsNeverWrittenThroughALinkInItsWay) {
   for (const Change& change : kChanges) {
     WriteText(kFile, change.szBefore);

@@ -22,7 +22,7 @@ class KeyValueFile : public PlatformTest {
     return szValue;
   }
 
-  // What becomes of a file of that content when a value is set.
+  // The content of a file after a value was set in it.
   static std::string Set(std::string_view content, const char* szKey, const char* szValue,
                          const char* szFormat = kPlain) {
     WriteText(kFile, content);

@@ -10,7 +10,7 @@
 #include <csignal>
 #include <utility>
 
-// One end of a virtual cable; every kernel has those, unlike dummy interfaces.
+// The interface is one end of a virtual cable: every kernel has those, but not every one has dummy interfaces.
 NetworkInterface::NetworkInterface(std::string name) : name_(std::move(name)) {
   Shell("ip link add " + name_ + " type veth");
 }

@@ -49,7 +49,7 @@ extern "C" int ioctl(int fd, unsigned long request, ...) {
   return next(fd, request, argument);
 }
 
-// What 32-bit programs with 64-bit times call it.
+// The name by which 32-bit programs with 64-bit times call it.
 extern "C" __attribute__((alias("ioctl"))) int __ioctl_time64(int fd, unsigned long request, ...);
 
 ShownInterfaces::ShownInterfaces(const std::vector<Interface>& interfaces) {

@@ -20,13 +20,13 @@ std::string ReadText(const std::string& path);
 // The whole file; an empty text when there is none.
 std::string TextOrNothing(const std::string& path);
 
-// Whether there is something of that name, and be it a link to nothing.
+// Whether there is something of that name; a link to nothing is something.
 bool Exists(const std::string& path);
 
 // The permissions of a file, or of a link itself.
 mode_t ModeOf(const std::string& path);
 
-// What a directory holds, in order of names.
+// The names in a directory, in order.
 std::vector<std::string> NamesIn(const std::string& directory);
 
 // Waits until the clock has left the file's last change so far behind that its times are bound to show the next change.

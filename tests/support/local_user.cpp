@@ -16,7 +16,7 @@ namespace {
 
 constexpr uid_t kNobody = 65534;
 
-// What may be in the way of a file, by a text that says what it is.
+// Something that may be in the way of a file, with its name.
 struct Obstacle {
   std::string name;
   std::function<bool(const std::string& path)> put;

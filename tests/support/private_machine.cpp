@@ -39,7 +39,7 @@ void MakeDirectory(const std::string& path) {
   Require(::mkdir(path.c_str(), 0755) == 0 || errno == EEXIST, "make " + path);
 }
 
-// Whoever is not root becomes the root of a user namespace.
+// A user other than root becomes the root of a user namespace.
 void EnterNamespaces() {
   const uid_t uid = ::getuid();
   const gid_t gid = ::getgid();

@@ -5,7 +5,7 @@
 
 // Moves this process into namespaces in which /etc, /run, /tmp, /usr and /var may be written to, on top of what the
 // machine has, and in which there are no network interfaces but a loopback. /usr/mero/etc and /var/tmp exist.
-// What this machine has beside the one outside stands in /mnt, in a directory for each of them.
+// The files that this machine has and the one outside has not stand in /mnt, in a directory for each of the five.
 // Ends the process with a message when that cannot be done.
 void EnterPrivateMachine();
 

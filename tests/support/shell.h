@@ -6,7 +6,7 @@
 
 #include "tests/support/processes.h"
 
-// What it says stands in `out`, of both kinds. Finds the programs of administrators too, whoever runs the tests.
+// Runs a command; `out` has both of its outputs. Its PATH has the directories of system programs too.
 Ran RunInShell(const std::string& command);
 
 // Runs a command that must succeed, and gives what it says.

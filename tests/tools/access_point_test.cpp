@@ -21,7 +21,7 @@ std::vector<std::string> Words(const std::string& text) {
   return {std::istream_iterator<std::string>(stream), {}};
 }
 
-// What the last save was given; shared with the process that saves.
+// Records each save by the settings that it was given.
 void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
   library::MEROWirelessSetAPConfig = [show](PMERO_AP_CONF conf) {
     library::Record((conf->blEnable == TRUE ? "on: " : "off: ") + show(*conf));

@@ -93,7 +93,7 @@ std::string Joined(const std::vector<std::string>& words) {
   return joined;
 }
 
-// What somebody has on the screen who gives the command.
+// The screen of a person who gives the command.
 std::string Screen(const std::vector<std::string>& words) {
   return "$ merowireless " + Joined(words) + "\n" + Tool(words).out;
 }
@@ -123,7 +123,7 @@ std::set<std::string> AllFiles() {
   return files;
 }
 
-// What is created is the library's, and has the modes that the library gives it.
+// Only the library creates files, and it sets their modes.
 TEST_F(Forms, CreateNoFileWhateverTheUmask) {
   const std::set<std::string> before = AllFiles();
   for (const mode_t mask : {0000, 0077}) {

@@ -22,7 +22,7 @@ WIRELESS_NETWORK_CONFIG Home() {
   return config;
 }
 
-// What a save was given.
+// Records each save by the network that it was given.
 void RecordSaves() {
   library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG* config) {
     library::Record(std::string(config->network.szEssid) + "|" + config->szKey + "|" + config->szIp + "|" +

@@ -45,7 +45,7 @@ class ShellOnTerminal {
     ASSERT_EQ(::write(terminal_, text.data(), text.size()), static_cast<ssize_t>(text.size()));
   }
 
-  // Whether a text is shown next, or after other things; what is shown behind it is next then.
+  // Whether a text is shown, after other things or at once. The next question begins behind that text.
   bool Shows(const std::string& text) {
     constexpr int kPatience = 20'000;
     char bytes[4096];
@@ -125,7 +125,7 @@ std::string Written(const std::string& form) {
   return Shell("cd /mnt && find etc run tmp usr var -printf '" + form + "\\n' | sort -k 2");
 }
 
-// What the program writes, which is removed afterwards.
+// The files that the program writes; they are removed afterwards.
 std::string WrittenWithUmask(const std::string& mask) {
   std::istringstream before(Written("/%p"));
   const std::set<std::string> kept{std::istream_iterator<std::string>(before), {}};

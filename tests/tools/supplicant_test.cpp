@@ -1,4 +1,4 @@
-// What the supplicant says, and what the program makes of it.
+// The supplicant's events, and the effect that they have on the program.
 #include "work/supplicant.h"
 
 #include <poll.h>

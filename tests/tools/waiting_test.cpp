@@ -1,4 +1,4 @@
-// What the program does while the library takes its time.
+// The program while it waits for the library.
 #include <fcntl.h>
 #include <sys/syscall.h>
 #include <unistd.h>

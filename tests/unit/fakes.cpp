@@ -170,7 +170,7 @@ extern "C" void syslog(int priority, const char* szFormat, ...) {
   va_end(values);
 }
 
-// What syslog() becomes in a library that is built with _FORTIFY_SOURCE.
+// The name of syslog() in a library that is built with _FORTIFY_SOURCE.
 // NOLINTNEXTLINE(bugprone-reserved-identifier)
 extern "C" void __syslog_chk(int priority, int, const char* szFormat, ...) {
   va_list values;
@@ -183,7 +183,7 @@ extern "C" time_t time(time_t* pTime) noexcept {
   return fake::Now(pTime);
 }
 
-// What time() becomes where a time_t has 32 bits by default, and the library asked for 64.
+// The name of time() where a time_t has 32 bits by default, and the library asked for 64.
 // NOLINTNEXTLINE(bugprone-reserved-identifier)
 extern "C" int64_t __time64(int64_t* pTime) noexcept {
   return fake::Now(pTime);

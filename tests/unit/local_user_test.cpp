@@ -1,4 +1,4 @@
-// What somebody else with an account can do to the files that the library has in directories that anyone may write.
+// Somebody else with an account puts things in the way of the library's files, in directories that anyone may write.
 #include <sys/stat.h>
 
 #include "joining.h"
@@ -48,7 +48,7 @@ TEST_F(ALocalUser, DoesNotMakeBelieveThatAnAccessPointIsBeingSetUp) {
   });
 }
 
-// Whoever named the adapter chose the settings that it was switched on, and blocked, by.
+// With a name of their own for the adapter, others chose the settings that block it or not.
 TEST_F(ALocalUser, DoesNotNameTheAdapter) {
   ObstructEachWay(kAdapterInfo, [] {
     char szName[64] = "";

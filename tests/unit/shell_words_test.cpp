@@ -9,7 +9,7 @@
 
 namespace {
 
-// What a shell passes to a program whose arguments are the word and a dot.
+// The arguments that a shell passes to a program, for a command with the word and a dot.
 std::string PassedOn(const std::string& word) {
   return Shell("printf '<%s>' " + word + " .");
 }

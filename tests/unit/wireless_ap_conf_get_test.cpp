@@ -18,7 +18,7 @@ const std::string kAsksForHash = "PLIBCSzHashAlloc(1024)";
 const std::string kReadsSection = "PLIBCFileGetSection(" + kSettings + ", " + kModel + ", &)";
 const std::string kFreesHash = "PLIBCSzHashFree(&)";
 
-// What a record holds when nothing could be read: no guests at all.
+// The record when nothing could be read.
 MERO_AP_CONF DefaultSettings() {
   MERO_AP_CONF conf{};
   std::strcpy(conf.szSecName, kModel.c_str());
@@ -32,7 +32,7 @@ MERO_AP_CONF DefaultSettings() {
   return conf;
 }
 
-// What a section stands for that has no lines.
+// The record of a section without lines.
 MERO_AP_CONF BareSettings() {
   MERO_AP_CONF conf{};
   std::strcpy(conf.szSecName, kModel.c_str());
@@ -54,7 +54,7 @@ class ApSettings : public UnitTest {
     return memory::Run(0, [&] { return MEROWirelessGetAPConfig(section.c_str(), &conf_); });
   }
 
-  // What a section of these lines stands for.
+  // The record of a section with these lines.
   MERO_AP_CONF ReadLines(const std::string& lines) {
     WriteText(kSettings, "[" + kModel + "]\n" + lines);
     EXPECT_GT(Read(), 0) << lines;

@@ -1,4 +1,4 @@
-// What saving the access-point settings leaves in the file, and what a read makes of it.
+// Saving the access-point settings: the file afterwards, and the record that is read from it.
 #include <sys/stat.h>
 #include <algorithm>
 
@@ -70,7 +70,7 @@ class SavedApSettings : public UnitTest {
   const std::string office_ = OfficeSection(AP_ENCRYPT_WPA_PSK, AP_ENCRYPT_WEP);
 };
 
-// What stands around the section of the model.
+// The text around the section of the model.
 const std::string kBefore = "# access points\r\n\n[AR-9271]\n\tenable=yes\n\tssid= \xff\x80\" \n; more\n";
 const std::string kBehind = "[last]\r\n\tenable=yes\r\nrubbish\n\tno newline at the end";
 
@@ -359,7 +359,7 @@ TEST_F(SavedApSettings, AreNotSavedToWhatIsNoFile) {
             "wireless_ap_conf_set:# Failed to set key[enable] of sec[" + kModel + "] in file[" + kSettings + "].");
 }
 
-// What another says of a pair that is not written anyway is no failure of the save.
+// A failure for a pair that is not written anyway is no failure of the save.
 bool HasReportedFailure() {
   return std::ranges::any_of(fake::Messages(),
                              [](const std::string& message) { return message.starts_with("wireless_ap_conf_set:"); });
@@ -460,7 +460,7 @@ TEST_F(SavedApSettings, SurviveFieldByFieldWhateverTheBytes) {
   AnyRecord any(7);
   for (int i = 0; i < 300; ++i) {
     conf_ = any.Next();
-    // What is there already may come from a machine that ends its lines in CR LF.
+    // The text that is there already may come from a machine that ends its lines in CR LF.
     if (i % 3 == 0) WriteText(kSettings, "[" + std::string(conf_.szSecName) + "]\r\n\tenable=no\r\n");
     ExpectSaved();
     MERO_AP_CONF expected = ReadBack(conf_);

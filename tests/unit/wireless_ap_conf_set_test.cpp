@@ -1,4 +1,4 @@
-// What saving the access-point settings asks of the platform and of the shell, and what it makes of the answers.
+// Saving the access-point settings: the questions to the platform and to the shell, and the effect of their answers.
 #include <climits>
 
 #include "ap_settings.h"

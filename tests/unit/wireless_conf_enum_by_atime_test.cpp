@@ -1,4 +1,4 @@
-// The order of the known networks; what else their listing promises is tested with the listing in file order.
+// The order of the known networks. All other promises of this listing are tested with the listing in file order.
 #include <algorithm>
 #include <filesystem>
 #include <limits>

@@ -1,4 +1,4 @@
-// What both listings of the known networks promise: that in file order and that by the time of the last save.
+// The promises of both listings of the known networks: the one in file order, and the one by the time of the last save.
 #include <cstring>
 #include <filesystem>
 

@@ -1,4 +1,4 @@
-// What a save leaves in the file.
+// The file after a save.
 
 #include <cstring>
 #include <filesystem>

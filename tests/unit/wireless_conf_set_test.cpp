@@ -1,4 +1,4 @@
-// What the save asks of the platform, and what it makes of the answers.
+// A save: the questions to the platform, and the effect of their answers.
 #include <cstring>
 #include <limits>
 

@@ -1,4 +1,4 @@
-// What is written, in the judgement of the daemon that reads it: Debian's hostapd.
+// The files that are written, judged by the daemon that reads them: Debian's hostapd.
 #include "hostapd_files.h"
 #include "tests/support/shell.h"
 

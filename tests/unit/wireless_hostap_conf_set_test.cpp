@@ -1,4 +1,4 @@
-// What is done to the daemon, the interface and the files when the access-point daemon's files are written.
+// Writing the access-point daemon's files: the effects on the daemon, the interface and the files.
 #include <fcntl.h>
 #include <sys/stat.h>
 

@@ -229,7 +229,7 @@ TEST_F(SupplicantConfig, HoldsNamesAndSecretsAsTheyAre) {
   }
 }
 
-// What the file holds when a value was refused: what was written before it, and nothing of an older file.
+// The file after a value was refused: all that was written before that value, and nothing of an older file.
 TEST_F(SupplicantConfig, IsGivenUpAtANameOrASecretWithALineFeed) {
   const std::string name = kHead + std::string("\tssid=\"Home Net\"\n\tbssid=00:11:22:AA:BB:CC\n\tscan_ssid=1\n");
   const struct {

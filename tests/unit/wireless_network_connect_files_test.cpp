@@ -1,4 +1,4 @@
-// What a connection leaves: its record, a media service that knows of it, and a copy of the resolver's settings.
+// The traces of a connection: its record, a media service that knows of it, and a copy of the resolver's settings.
 #include <sys/mount.h>
 #include <sys/stat.h>
 

@@ -1,4 +1,4 @@
-// What a scan makes of each row of the listing.
+// A scan reads each row of the listing.
 #include <cstring>
 #include <span>
 
@@ -42,7 +42,7 @@ class ListingRow : public UnitTest {
     return names;
   }
 
-  // What was reported of the rows in the first reading.
+  // The reports about rows in the first reading.
   static std::vector<std::string> Complaints() {
     std::vector<std::string> messages = fake::Messages();
     const auto isScans = [](const std::string& message) { return message.find(" Scan 0: ") != std::string::npos; };

@@ -155,7 +155,7 @@ TEST_F(Scan, DoesNotMindHowTheFreshScanEnds) {
   }
 }
 
-// What is said of a reading.
+// The log line of a reading.
 struct Outcome {
   const char* szLine;
   const char* szText;

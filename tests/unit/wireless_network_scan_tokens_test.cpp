@@ -1,4 +1,4 @@
-// What a scan makes of a row's protocol and security tokens.
+// A scan reads a row's protocol and security tokens.
 #include "listing.h"
 #include "unit_test.h"
 
@@ -27,7 +27,7 @@ class ListingToken : public UnitTest {
     return *networks[0];
   }
 
-  // What the first reading of the row asked of a function of the platform, or reported.
+  // The first call of a function, or the first report, in the first reading of the row.
   static std::string First(std::string_view function) {
     const std::vector<std::string> effects = fake::EffectsOf({function});
     return effects.empty() ? "" : effects.front();

@@ -73,7 +73,7 @@ expect_processes() {
   expect_nothing_inherited "$1"
 }
 
-# What runs is a daemon: it holds nothing of the process that started it, no file, no terminal, no end of a pipe to it.
+# The process is a daemon: it holds nothing of the process that started it, no file, no terminal and no end of a pipe.
 # Logs and leases are its own.
 expect_nothing_inherited() {  # NAME
   local process _ held

@@ -1,4 +1,4 @@
-# What a scenario expects. An expectation that is not met ends it, with what was expected and what was seen.
+# Expectations of a scenario. One that is not met ends the scenario, and shows the expected and the seen value.
 # shellcheck shell=bash
 
 # expect_same WHAT EXPECTED SEEN

@@ -7,7 +7,7 @@ serve() {
   local log=$LOGS/$1.dnsmasq interface=${3:-wlan0}
   say "$1: $2.0/24"
   ip -n "$1" address add "$2.1/24" dev "$interface"
-  # What it asks before it offers an address, whether somebody has it, takes 3 s.
+  # Before it offers an address it asks whether somebody has it, which takes 3 s.
   ip netns exec "$1" dnsmasq --conf-file=/dev/null --user=root --port=0 --interface="$interface" --bind-interfaces --no-ping \
     --dhcp-authoritative --dhcp-range="$2.100,$2.199,1h" --dhcp-option="option:dns-server,$2.1" \
     --dhcp-leasefile="/run/lab/$1.leases" --pid-file="/run/lab/$1.dnsmasq.pid" --log-dhcp --log-facility="$log" ||

@@ -1,4 +1,4 @@
-# What a script says, and how it ends when something is not as it should be.
+# Messages of a script, and its end when something is not as it should be.
 # shellcheck shell=bash
 
 # Where the steps are told: standard output, unless a script sends them elsewhere.

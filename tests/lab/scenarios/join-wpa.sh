@@ -16,7 +16,7 @@ supplicant='/usr/sbin/wpa_supplicant -Dwext -iwlan0 -c/usr/mero/etc/wpa_supplica
 supplicant+=' -P/var/run/wpa_supplicant.pid'
 dhcp_client='/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 4 -T 4'
 
-# Whoever serves media wants to know of a new network.
+# The media service has to be told of a new network.
 inside nas tee /etc/meroinfo.conf >/dev/null <<'END'
 runmediaservice=yes
 network_mediaservice=wlan0

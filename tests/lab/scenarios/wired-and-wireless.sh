@@ -54,7 +54,7 @@ applied() {
   inside nas grep -qxF "$BLOCK_END" /etc/resolv.conf
 }
 
-# What is left of the connection; the wire has routes of its own.
+# The traces of the connection. The routes of the wire are not among them.
 disconnects() {
   on nas mero-call disconnect
   within 2 nothing_runs nas || fail "this still runs on nas: $(processes_of nas)"
