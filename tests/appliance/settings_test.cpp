@@ -287,8 +287,7 @@ TEST_F(Settings, ThatCannotBeToldAreAFailure) {
   for (const char* szWords : {"file /tmp/file KEY", "help"}) {
     EXPECT_EQ(RunReader(szWords + " >/dev/full"s).status, 2) << szWords;
   }
-  EXPECT_EQ(RunReader("file /tmp/file KEY >/dev/full").out,
-            "mero-settings: cannot write: No space left on device\n");
+  EXPECT_EQ(RunReader("file /tmp/file KEY >/dev/full").out, "mero-settings: cannot write: No space left on device\n");
   EXPECT_EQ(RunReader("section-name </tmp").out, "mero-settings: cannot read the adapter's name\n");
 }
 

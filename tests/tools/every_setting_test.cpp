@@ -170,21 +170,4 @@ TEST_F(EverySetting, ThatNothingWasSavedForIsWhatTheManualSays) {
   }
 }
 
-// The rows "| what guests reach | yes or no | `KEY` |", where some keys say what they do not reach.
-TEST_F(EverySetting, OfWhatGuestsReachHasItsDefaultInTheKitsPage) {
-  const std::set<std::string> blocks = {"guest_net_lan_block", "guest_net_internet_block", "ap_isolate"};
-  int rows = 0;
-  for (const std::string& line : Split(Document("docs/appliance.md"), "\n")) {
-    const std::vector<std::string> cells = Split(line, " | ");
-    if (cells.size() != 3 || !cells[2].starts_with("`")) continue;
-    const std::string key = Split(cells[2], "`")[1];
-    const auto* row = std::ranges::find_if(
-        kSettingRows, [&](const SettingRow& of) { return of.setting.szKey != nullptr && of.setting.szKey == key; });
-    if (row == std::end(kSettingRows)) continue;
-    ++rows;
-    EXPECT_EQ(cells[1], (row->setting.missing != 0) != blocks.contains(key) ? "yes" : "no") << key;
-  }
-  EXPECT_EQ(rows, 5);
-}
-
 }  // namespace

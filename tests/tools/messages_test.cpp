@@ -185,20 +185,20 @@ TEST_F(Messages, TellOfAnAccessPointWhyItIsNotSetSo) {
       {{"--band", "6"}, "--band cannot be this"},
       {{"--channel", "36"}, "there is no such channel in the 2.4 GHz band"},
       {{"--band", "5", "--channel", "6"}, "there is no such channel in the 5 GHz band"},
-      {{"--mode", "an"}, "this is no mode of the 2.4 GHz band"},
+      {{"--hw-mode", "an"}, "this is no mode of the 2.4 GHz band"},
       {{"--channel", "eleven"}, "--channel cannot be this"},
-      {{"--security", "wpa3"}, "--security cannot be this"},
-      {{"--security", "open", "--cipher", "aes"}, "only WPA has a choice of ciphers"},
-      {{"--security", "open", "--key-file", kSecret}, "an open network has no secret"},
-      {{"--security", "wep"}, "this security needs a secret"},
-      {{"--security", "eap", "--key-file", kSecret}, "EAP needs a RADIUS server"},
-      {{"--radius-server", "10.0.0.1"}, "only EAP has a RADIUS server"},
-      {{"--security", "eap", "--radius-server", "there"}, "the RADIUS server's address is none"},
+      {{"--encryption", "wpa3"}, "--encryption cannot be this"},
+      {{"--encryption", "open", "--wpa-encrypt-type", "aes"}, "only WPA has a choice of ciphers"},
+      {{"--encryption", "open", "--key-file", kSecret}, "an open network has no secret"},
+      {{"--encryption", "wep"}, "this security needs a secret"},
+      {{"--encryption", "eap", "--key-file", kSecret}, "EAP needs a RADIUS server"},
+      {{"--auth-server-addr", "10.0.0.1"}, "only EAP has a RADIUS server"},
+      {{"--encryption", "eap", "--auth-server-addr", "there"}, "the RADIUS server's address is none"},
       {{"--bridge", "../x"}, "this is no bridge's name"},
-      {{"--schedule", "/no/such/file"}, "the schedule cannot be read from /no/such/file"},
-      {{"--schedule", kWeek}, "the schedule is not 168 hours"},
-      {{"--guest-security", "eap"}, "a guest network cannot have EAP"},
-      {{"--guest", "yes", "--guest-security", "wpa2"}, "the guest network's security needs a secret"},
+      {{"--wifi-sched", "/no/such/file"}, "the schedule cannot be read from /no/such/file"},
+      {{"--wifi-sched", kWeek}, "the schedule is not 168 hours"},
+      {{"--guest-net-encryption", "eap"}, "a guest network cannot have EAP"},
+      {{"--guest-net-enable", "yes", "--guest-net-encryption", "wpa2"}, "the guest network's security needs a secret"},
   };
   for (const auto& [options, message] : rows) {
     Words words = {"ap", "set"};
@@ -208,7 +208,7 @@ TEST_F(Messages, TellOfAnAccessPointWhyItIsNotSetSo) {
   ExpectMessages({
       {AnOfficeWithout<NameOf>, {"ap", "enable"}, "the access point has no name"},
       {AnOfficeWithout<BridgeOf>, {"ap", "enable"}, "the access point has no bridge"},
-      {AnOfficeWithout<GuestNameOf>, {"ap", "set", "--guest", "yes"}, "the guest network has no name"},
+      {AnOfficeWithout<GuestNameOf>, {"ap", "set", "--guest-net-enable", "yes"}, "the guest network has no name"},
   });
 }
 
