@@ -196,14 +196,14 @@ function macro_of(core,    is_quoted, is_call) {
 }
 
 function escaped(text) {
-  gsub(/\\/, "\\e", text)
-  if (text ~ /^\(?-[0-9]/) sub(/-/, "\\-", text)
+  gsub(/\\/, "&e", text)
+  if (text ~ /^\(?-[0-9]/) sub(/-/, "\\\\&", text)
   return text
 }
 
 function literal(text) {
-  gsub(/\\/, "\\e", text)
-  gsub(/-/, "\\-", text)
+  gsub(/\\/, "&e", text)
+  gsub(/-/, "\\\\&", text)
   if (text ~ /^[.']/) text = "\\&" text
   print text
 }

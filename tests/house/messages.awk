@@ -17,7 +17,7 @@ BEGIN {
 			"std::fprintf(stderr, 1 Unreadable( 1 WrongUsage( 1 Failure( 2 Failed( 1 Wrong( 1 Unusable( 1 Remark( 1 " \
 			"{Exit:: 2", names, " ")
 		kCall = "(^|[^A-Za-z_:])(LOG|LOG_LINE|LOG_AS|FAIL|std::runtime_error|std::system_error|std::perror|Unreadable" \
-			"|WrongUsage|Failure|Failed|Wrong|Unusable|Remark)\\(|std::fprintf\\(stderr,|{Exit::"
+			"|WrongUsage|Failure|Failed|Wrong|Unusable|Remark)\\(|std::fprintf\\(stderr,|[{]Exit::"
 	}
 	for (i = 1; i in names; i += 2) place[names[i]] = names[i + 1]
 }
