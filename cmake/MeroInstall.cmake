@@ -32,7 +32,7 @@ write_basic_package_version_file(merowireless-core-config-version.cmake COMPATIB
 install(FILES ${CMAKE_CURRENT_BINARY_DIR}/merowireless-core-config-version.cmake DESTINATION ${MERO_INSTALL_CMAKE}
   COMPONENT development)
 
-file(GLOB documents CONFIGURE_DEPENDS SECURITY.md docs/*.md)
+file(GLOB documents CONFIGURE_DEPENDS SECURITY.md docs/[!.]*.md)
 list(REMOVE_ITEM documents ${CMAKE_CURRENT_SOURCE_DIR}/docs/appliance.md)
 install(FILES ${documents} DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT program)
 install(DIRECTORY examples DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/libmerowireless-core-dev COMPONENT development)
