@@ -11,6 +11,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <string>
 
 namespace {
@@ -59,13 +60,24 @@ void MakeWritable(const std::string& name) {
   Mount("overlay", "/" + name, "lowerdir=/" + name + ",upperdir=" + upper + ",workdir=" + work);
 }
 
+// What an appliance that is installed on the machine outside keeps.
+void ForgetAppliance() {
+  for (const char* path : {"/usr/mero", "/etc/dhcpd", "/etc/sysconfig", "/var/tmp/.wireless_current_connection"}) {
+    std::error_code error;
+    std::filesystem::remove_all(path, error);
+    Require(!error, std::string("remove ") + path);
+  }
+}
+
 }  // namespace
 
 void EnterPrivateMachine() {
+  ::umask(022);
   EnterNamespaces();
   Require(::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) == 0, "private mounts");
   Mount("tmpfs", kUpper, "");
   for (const char* name : {"etc", "run", "tmp", "usr", "var"}) MakeWritable(name);
+  ForgetAppliance();
   Mount("sysfs", "/sys", "");
   for (const char* path : {"/usr/mero", "/usr/mero/etc", "/var/tmp"}) MakeDirectory(path);
 }
