@@ -35,13 +35,23 @@ tools/show/output.h:2: closes the circle tools/base/text > tools/show/output > t
     ;;
   floor)
     mkdir platform/attic
-    touch platform/attic/old.c platform/newer.h
+    touch platform/attic/old.c platform/newer.h tools/base.hpp
+    echo '#include "base.hpp"' >>tools/show/output.h
     expected='platform/attic/old.c: stands on no floor
-platform/newer.h: stands on no floor'
+platform/newer.h: stands on no floor
+tools/show/output.h:3: tools/show may not include tools (base.hpp)'
     ;;
   nowhere)
+    mkdir tests
+    touch tests/ring.h platform/base/table.inc
     echo '#include "../base/text.h"' >>tools/show/output.h
-    expected='tools/show/output.h:3: there is no source ../base/text.h'
+    printf '#include <%s>\n' base/../show/output.h ../platform/base/file.h >>tools/base/text.h
+    printf '#include <%s>\n' tests/ring.h platform/base/table.inc >>common/log.h
+    expected='common/log.h:2: there is no source tests/ring.h
+common/log.h:3: there is no source platform/base/table.inc
+tools/base/text.h:2: there is no source base/../show/output.h
+tools/base/text.h:3: there is no source ../platform/base/file.h
+tools/show/output.h:3: there is no source ../base/text.h'
     ;;
 esac
 
