@@ -201,8 +201,21 @@ TEST_F(ACard, ThatKeepsAnAddressWhenItIsDisconnectedIsReported) {
   ExpectFailure(ERR_UNKNOWN, "Failed to remove the addresses of net0: No buffer space available");
 }
 
+TEST_F(ACard, ThatKeepsItsDhcpClientIsReported) {
+  const std::filesystem::path pidFile = "/var/run/udhcpc-net0.pid";
+  std::filesystem::create_directory(pidFile);
+  EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), -1);
+  ExpectFailure(ERR_BAD_PARAMETERS, "Failed to end the DHCP client of net0: Invalid argument");
+  EXPECT_EQ(interface_.addresses(), "");
+  std::filesystem::remove(pidFile);
+}
+
 TEST_F(ACard, ThatIsNotThereIsReported) {
-  NETINFO netInfo = Static("10.9.0.2", "255.255.255.0");
+  NETINFO netInfo{};  // for DHCP
+  CopyText(netInfo.szInterface, "none0");
+  EXPECT_EQ(Set(netInfo), -1);
+  ExpectFailure(ERR_NO_DEVICE, "Failed to bring up none0: No such device");
+  netInfo = Static("10.9.0.2", "255.255.255.0");
   for (const char* szName : {"none0", "", "fifteen-letters"}) {
     CopyText(netInfo.szInterface, szName);
     EXPECT_EQ(Set(netInfo), -1);
