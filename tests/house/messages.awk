@@ -1,8 +1,9 @@
 # Lists the messages in sources: a line for each, of its file, its line, its text, and its text as an extended regular
 # expression, between tabs. A value is the byte \001, or \002 where it stands between two literals that are put together.
 #
-# A message is the text that a reporter is given: a word of a command in shell, an argument of a call in C++. A text that
-# has no letters of its own, beside the program's name, passes another's message on, and is not listed.
+# A message is the text that a reporter is given: a word of a command in shell, an argument of a call in C++. A text
+# that has no letters of its own, beside the program's name, passes another's message on, and is not listed, except in
+# the libraries: nothing there passes one on.
 
 BEGIN {
 	kValue = "\001"
@@ -13,11 +14,11 @@ BEGIN {
 		split("fail 1 warn 1 tell 1 attempt 1 give_up 2", names, " ")
 		kCall = "(^|[ \t;&|{('])(fail|warn|tell|attempt|give_up) "
 	} else {
-		split("LOG( 1 LOG_LINE( 2 LOG_AS( 3 FAIL( 2 std::runtime_error( 1 std::system_error( 3 std::perror( 1 " \
-			"std::fprintf(stderr, 1 Unreadable( 1 WrongUsage( 1 Failure( 2 Failed( 1 Wrong( 1 Unusable( 1 Remark( 1 " \
-			"{Exit:: 2", names, " ")
-		kCall = "(^|[^A-Za-z_:])(LOG|LOG_LINE|LOG_AS|FAIL|std::runtime_error|std::system_error|std::perror|Unreadable" \
-			"|WrongUsage|Failure|Failed|Wrong|Unusable|Remark)\\(|std::fprintf\\(stderr,|[{]Exit::"
+		split("LOG( 1 LOG_LINE( 2 LOG_AS( 3 FAIL( 2 syslog( 2 std::runtime_error( 1 std::system_error( 3 " \
+			"std::perror( 1 std::fprintf(stderr, 1 Unreadable( 1 WrongUsage( 1 Failure( 2 Failed( 1 Wrong( 1 " \
+			"Unusable( 1 Remark( 1 {Exit:: 2", names, " ")
+		kCall = "(^|[^A-Za-z_:])(LOG|LOG_LINE|LOG_AS|FAIL|syslog|std::runtime_error|std::system_error|std::perror" \
+			"|Unreadable|WrongUsage|Failure|Failed|Wrong|Unusable|Remark)\\(|std::fprintf\\(stderr,|[{]Exit::"
 	}
 	for (i = 1; i in names; i += 2) place[names[i]] = names[i + 1]
 }
@@ -34,7 +35,7 @@ FNR == 1 { finish() }
 }
 END { finish() }
 
-function finish(   rest, at, call) {
+function finish(   rest, at) {
 	at = 1
 	while (match(rest = substr(text, at), kCall)) {
 		call = substr(rest, RSTART, RLENGTH)
@@ -49,7 +50,7 @@ function finish(   rest, at, call) {
 function tell(message,   own, before) {
 	own = message
 	gsub(/\\([nr]|x1b\[K)|^[a-z-]+: /, "", own)
-	if (own !~ /[A-Za-z]/) return
+	if (own !~ /[A-Za-z]/ && !(call ~ /^(LOG|FAIL|syslog)/ && file ~ /^(lib|platform)\//)) return
 	own = message
 	gsub(/[][\\.^$*+?(){}|]/, "\\\\&", own)
 	before = substr(text, 1, begins)
@@ -61,6 +62,7 @@ function tell(message,   own, before) {
 # The nth word from a place on, in which nothing is quoted before the text.
 function word(at, n,   rest, quote, c, message) {
 	rest = substr(text, at)
+	while (sub(/^\\\n[ \t]*/, "", rest)) continue # the word stands in the next line
 	for (; n > 1; --n) sub(/^("[^"]*"|[^ "]+) +/, "", rest)
 	quote = substr(rest, 1, 1)
 	if (quote != "'" && quote != "\"") return
