@@ -223,7 +223,7 @@ constexpr Field<ApConf> Told(const char* szKey, Value (*value)(const ApConf&),
 constexpr int kMostStations = 2007;  // as many as an access point can tell apart
 
 // Later rows build on earlier ones: --band sets a channel that --channel replaces, and a cipher is one of its
-// protection.
+// protection. A new row stands last, since scripts know the fields of a porcelain line by their places.
 constexpr ApSetting kSettings[] = {
     {Told(
         "enable", [](const ApConf& of) { return Value(of.blEnable != FALSE); },
@@ -243,7 +243,6 @@ constexpr ApSetting kSettings[] = {
        SetCipher(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "wpa-encrypt-type");
      }},
     {Told("auth_server_addr", RadiusAddress), "A.B.C.D", "the RADIUS server of EAP", SetRadiusAddress},
-    {Told("auth_server_port", RadiusPort), "N", "its port", SetRadiusPort},
     {Told(
          "band", [](const ApConf& of) { return Value(Is5GHz(of) ? "5" : "2.4"); },
          [](const ApConf& of, bool) { return Shown{Is5GHz(of) ? "5 GHz" : "2.4 GHz"}; }),
@@ -323,6 +322,7 @@ constexpr ApSetting kSettings[] = {
     {.field = Told("guest_net_secret",
                    [](const ApConf& of) { return Value(SecretOf(Guest(of).encryption, Guest(of).encryptInfo)); }),
      .show = Show::kOnRequest},
+    {Told("auth_server_port", RadiusPort), "N", "the port of the RADIUS server", SetRadiusPort},
 };
 
 }  // namespace

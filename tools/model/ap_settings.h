@@ -28,7 +28,7 @@ struct ApSetting {
 // The option that sets a key, without its dashes: the key, with hyphens.
 std::string OptionOf(std::string_view key);
 
-// In the order in which they are shown and set; the secrets come last.
+// In the order in which they are shown and set.
 std::span<const ApSetting> ApSettings();
 
 std::vector<Field<ApConf>> ApFields(bool showSecrets);
