@@ -6,7 +6,6 @@
 #include <cstring>
 #include <filesystem>
 #include <set>
-#include <sstream>
 
 #include "running.h"
 
@@ -139,20 +138,10 @@ TEST_F(Forms, CreateNoFileWhateverTheUmask) {
   }
 }
 
-// The commands that a help text lists, each behind `prefix`.
-std::vector<std::string> Listed(const std::vector<std::string>& words, const std::string& prefix) {
-  std::istringstream help(Tool(With(words, "--help")).out);
-  std::vector<std::string> listed;
-  std::string line;
-  while (std::getline(help, line) && line != "Subcommands:") continue;
-  for (std::string name; std::getline(help, line) && std::istringstream(line) >> name;) listed.push_back(prefix + name);
-  return listed;
-}
-
 TEST_F(Forms, AreLookedAtForEveryCommand) {
-  std::vector<std::string> commands = Listed({}, "");
+  std::vector<std::string> commands = CommandsOf();
   std::erase(commands, "ap");
-  for (const std::string& command : Listed({"ap"}, "ap ")) commands.push_back(command);
+  for (const std::string& command : CommandsOf({"ap"})) commands.push_back("ap " + command);
   EXPECT_GT(commands.size(), 15U);
   for (const std::string& command : commands) {
     EXPECT_TRUE(std::ranges::any_of(kCommands, [&](const Command& known) {
