@@ -62,7 +62,7 @@ WIRELESS_PROTOCOL ProtocolOf(unsigned standards) {
   return found == std::end(kProtocols) ? WIRELESS_PROTO_UNKNOWN : found->protocol;
 }
 
-// What the rates are called depends on the band.
+// The standards that the rates of a band stand for: the same rate is 802.11g in one band and 802.11a in the other.
 struct Band {
   unsigned dsss;
   unsigned ofdm;
@@ -112,7 +112,7 @@ constexpr Generation kWpa = {
 constexpr Generation kWpa2 = {
     {0x00, 0x0F, 0xAC}, WIRELESS_ENCRYPT_AES, WIRELESS_AUTH_UNKNOWN, WIRELESS_AUTH_WPA2EAP, WIRELESS_AUTH_WPA2PSK};
 
-// What a maker's own element begins with when it is WPA's.
+// The first bytes of a WPA element, which tell it from other vendor-specific elements.
 constexpr std::uint8_t kWpaPrefix[] = {0x00, 0x50, 0xF2, 0x01};
 
 bool IsWpa(Bytes body) {
@@ -124,7 +124,7 @@ WIRELESS_ENCRYPT operator|(WIRELESS_ENCRYPT left, WIRELESS_ENCRYPT right) {
 }
 
 // Takes the fields of a WPA or RSN element from front to back. A sender may leave fields off the end, which come out
-// empty; a field that is cut short makes the whole element worthless.
+// empty. An element with a field that is cut short is not used at all.
 class SuiteReader {
  public:
   explicit SuiteReader(Bytes bytes) : rest_(bytes) {}
@@ -168,7 +168,7 @@ WIRELESS_ENCRYPT CiphersOf(Bytes pairwise, Bytes group, const Generation& genera
   return tkip | aes;
 }
 
-// Of several, the one that asks least of the user.
+// The authentication of a network that offers several: the one that asks least of the user.
 WIRELESS_AUTH AuthOf(Bytes keys, const Generation& generation) {
   if (Lists(keys, generation, kKeyPsk)) return generation.psk;
   if (keys.empty() || Lists(keys, generation, kKeyEap)) return generation.eap;
@@ -194,7 +194,7 @@ Security Combine(const Security& wpa, const Security& wpa2) {
   return {wpa2.auth, wpa.encrypt | wpa2.encrypt};
 }
 
-// What the elements of one network said of its security.
+// The security that the elements of one network announce.
 struct SecurityElements {
   std::optional<Security> wpa;
   std::optional<Security> wpa2;

@@ -1,4 +1,4 @@
-// Reads what access points and ad-hoc cells say of themselves in their beacons. Every byte of it is a stranger's.
+// Reads the beacons of access points and ad-hoc cells. No byte of them can be trusted: anyone may send them.
 #ifndef MERO_APPLIANCE_ELEMENTS_H
 #define MERO_APPLIANCE_ELEMENTS_H
 
@@ -7,7 +7,7 @@
 namespace iwlist {
 
 // The network of a beacon or probe response, from its information elements, its capability field and its frequency.
-// What stands in front of a malformed element is used. WPA that cannot be read is unknown, never none or WEP.
+// The elements before a malformed one are used. WPA that cannot be read is unknown, never none or WEP.
 Description Describe(Bytes elements, unsigned capability, unsigned megahertz);
 
 // The number of the channel at a centre frequency; 0 when there is none.

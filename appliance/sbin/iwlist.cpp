@@ -37,7 +37,7 @@ int List(const char* interface) {
   }
 }
 
-// Returns only when it could not.
+// Runs the ordinary tool in place of this program; returns only when that cannot be done.
 int HandOver(char* argv[]) {
   execv(kOrdinaryTool, argv);
   const int status = errno == ENOENT ? 127 : 126;

@@ -17,14 +17,14 @@
 
 namespace iwlist {
 
-// Who reads the listing. A program gets every byte of a name that a row can hold; on a terminal no name moves the
-// cursor or sets a colour. What is left out shows as "?".
+// The reader of the listing. A program gets every byte of a name that a row can hold; on a terminal no name moves the
+// cursor or sets a colour. Bytes that are left out are shown as "?".
 enum class Reader { kProgram, kTerminal };
 
 std::string Row(const Network& network, Reader reader);
 
 // The whole listing. Of the descriptions of one address that were heard, it shows the latest, preferring one with a
-// name. Networks with a strong signal come first: who takes the first row of a name takes its best access point.
+// name. Networks with a strong signal come first, so that the first row of a name is its best access point.
 std::string Listing(std::vector<Network> networks, Reader reader);
 
 // Writes all of `text`; throws std::system_error when it cannot.

@@ -18,7 +18,7 @@ struct Security {
   WIRELESS_ENCRYPT encrypt = WIRELESS_ENCRYPT_UNKNOWN;
 };
 
-// What a network says of itself.
+// The part of a network that its own elements tell.
 struct Description {
   std::string name;  // the bytes as sent; empty when it is kept out of the beacons
   WIRELESS_PROTOCOL protocol = WIRELESS_PROTO_UNKNOWN;

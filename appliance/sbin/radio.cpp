@@ -27,7 +27,7 @@ using Socket = std::unique_ptr<nl_sock, Releaser<nl_socket_free>>;
 using Message = std::unique_ptr<nl_msg, Releaser<nlmsg_free>>;
 using Callbacks = std::unique_ptr<nl_cb, Releaser<nl_cb_put>>;
 
-// What the driver sent in answer to one request.
+// The driver's answer to one request.
 struct Answer {
   std::vector<Network> networks;
   int error = 0;  // an errno
@@ -40,7 +40,7 @@ int OnNetwork(nl_msg* message, void* answer) {
   return NL_OK;
 }
 
-// A listing that the driver breaks off says so in its last message only.
+// Only the last message tells whether the driver broke the listing off.
 int OnFinish(nl_msg* message, void* answer) {
   const nlmsghdr* header = nlmsg_hdr(message);
   int status = 0;
@@ -83,7 +83,7 @@ Message ScanResultsRequest(int family, unsigned interface) {
   return message;
 }
 
-// The result is one of libnl's, and concerns the exchange; what the driver had to say is in `answer`.
+// The result is one of libnl's, for the exchange of messages; the driver's own error is in `answer`.
 int Ask(nl_sock* socket, int family, unsigned interface, Answer& answer) {
   const Message request = ScanResultsRequest(family, interface);
   const Callbacks callbacks(nl_cb_alloc(NL_CB_DEFAULT));
@@ -100,7 +100,7 @@ bool SaysNotWireless(int error) {
   return error == ENODEV || error == EOPNOTSUPP;
 }
 
-// What a message says of a network, by kind.
+// The attributes of a network in a message, by their kind.
 using Attributes = std::array<nlattr*, NL80211_BSS_MAX + 1>;
 
 // False when the message describes no network.

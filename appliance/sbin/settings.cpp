@@ -46,7 +46,7 @@ struct Unreadable : std::runtime_error {
 
 using Words = std::span<char* const>;
 
-// What is told.
+// The lines that are printed, all at once, and the exit status.
 class Answers {
  public:
   void Add(std::string_view line) { (text_ += line) += '\n'; }
@@ -139,8 +139,8 @@ void TellFile(Answers& answers, Words words) {
 
 void TellCheck(Answers& answers, Words words) {
   if (words.size() != 3) throw WrongUsage("check needs a FILE, a KEY and a VALUE");
-  (void)ValueOf(words[0],
-                words[1]);  // the check does not tell a file that cannot be read from one that has another value
+  // Fails for a file that cannot be read, which the check does not tell from one that has another value.
+  (void)ValueOf(words[0], words[1]);
   answers.AddCheck(PLIBCFileCheckKeyValue(words[0], words[1], words[2], 0) != 0);
 }
 
@@ -176,8 +176,8 @@ constexpr struct {
 std::optional<Bridge> ReadBridge(const char* szBridge) {
   Bridge bridge{};
   if (MERONetGetBridgeConfig(szBridge, &bridge.netInfo, &bridge.bridgeInfo) >= 0) return bridge;
-  (void)ValueOf(InterfacePath(kInterfaceScriptFormat, szBridge).c_str(),
-                "TYPE");  // fails where the file cannot be read
+  // Fails for a file that cannot be read.
+  (void)ValueOf(InterfacePath(kInterfaceScriptFormat, szBridge).c_str(), "TYPE");
   return std::nullopt;
 }
 
@@ -200,7 +200,7 @@ bool CanBeInName(char c) {
   return static_cast<unsigned char>(c) >= ' ' && kNotInName.find(c) == std::string_view::npos;
 }
 
-// What fits of a text into so many bytes, without a part of a UTF-8 character at its end.
+// The beginning of a text that has room in so many bytes, without a part of a UTF-8 character at its end.
 std::string_view Cut(std::string_view text, size_t most) {
   if (text.size() <= most) return text;
   constexpr size_t kMostContinued = 3;
