@@ -1,0 +1,92 @@
+#!/bin/bash
+# run_test.sh CASE
+#
+# Looks at what ./run asks of the machine that it runs on: a copy of it stands in a house of its own, where no package is
+# installed, and where the commands that it calls note what they are called for.
+set -euo pipefail
+source=$(realpath "$(dirname "$0")/../..")
+house=$(mktemp -d)
+trap 'rm -r "$house"' EXIT
+cd "$house"
+
+# command_from NAME: makes a command of what is on standard input.
+command_from() {
+  { echo '#!/bin/bash' && cat; } >"$1"
+  chmod +x "$1"
+}
+
+mkdir -p bin docs tests/lab/scenarios
+cp "$source/run" .
+touch tests/lab/scenarios/{a-scan,b-join}.sh
+# shellcheck disable=SC2016  # for the shells of the commands
+{
+  command_from bin/dpkg-query <<<'exit 1'
+  command_from bin/sudo <<<'exec "$@"'
+  command_from bin/apt-get <<<'[[ $1 == update ]] || printf "%s\n" "${@:4}" >>packages'
+  command_from bin/cmake <<<'echo "cmake $*" >>calls'
+  command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
+}
+# As the real one does, it names one scenario after the other.
+command_from tests/lab/lab <<'END'
+case $1 in
+  packages) echo qemu ;;
+  list) for name in a-scan b-join; do echo "$name  What it shows." && sleep 0.1; done ;;
+  *) echo "lab $*" >>calls ;;
+esac
+END
+PATH=$house/bin:$PATH
+
+# Notes what it calls, and what it installs; shows what it says when it fails.
+run() {
+  : >calls
+  : >packages
+  ./run "$@" >said 2>&1 || { cat said && return 1; }
+}
+
+lines() { [[ $# -eq 0 ]] || printf '%s\n' "$@"; }
+
+expect_calls() { lines "$@" | diff - calls; }
+
+expect_packages() { lines "$@" | sort | diff - <(sort -u packages); }
+
+# What the packages are built with, and a compiler, which who makes packages has anyway.
+build_packages() {
+  echo g++
+  sed -n 's/^Build-Depends://; T; :next; p; n; /^ /b next' "$source/debian/control" | grep -oE '^ +[a-z0-9+-]+' |
+    tr -d ' ' | grep -vx debhelper-compat
+}
+
+mapfile -t building < <(build_packages)
+case $1 in
+  build)
+    run build
+    expect_calls 'cmake --preset release' 'cmake --build --preset release'
+    expect_packages "${building[@]}"
+    ;;
+  demo)
+    run demo
+    expect_calls 'cmake --preset release' 'cmake --build --preset lab' 'lab demo'
+    expect_packages "${building[@]}" qemu
+    ;;
+  docs)
+    run docs
+    expect_calls 'make_html.sh . build/docs'
+    expect_packages cmark-gfm mandoc
+    ;;
+  scenario) # The list was piped into a search that ended at the first name, which failed the list.
+    run lab a-scan
+    expect_calls 'cmake --preset release' 'cmake --build --preset lab' 'lab run a-scan'
+    run lab a-scan b-join
+    grep -qx 'lab run a-scan b-join' calls
+    run lab run -v b-join
+    grep -qx 'lab run -v b-join' calls
+    run lab
+    grep -qx 'lab run' calls
+    ;;
+  list) # A build was made first.
+    run lab list
+    expect_calls
+    expect_packages
+    grep -q '^b-join ' said
+    ;;
+esac
