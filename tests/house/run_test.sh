@@ -15,15 +15,17 @@ command_from() {
   chmod +x "$1"
 }
 
-mkdir -p bin docs tests/lab/scenarios
+mkdir -p bin docs lib tests/lab/scenarios
 cp "$source/run" .
-touch tests/lab/scenarios/{a-scan,b-join}.sh
+touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
+git init --quiet
 # shellcheck disable=SC2016  # for the shells of the commands
 {
   command_from bin/dpkg-query <<<'exit 1'
   command_from bin/sudo <<<'exec "$@"'
   command_from bin/apt-get <<<'[[ $1 == update ]] || printf "%s\n" "${@:4}" >>packages'
   command_from bin/cmake <<<'echo "cmake $*" >>calls'
+  command_from bin/clang-tidy <<<'echo "clang-tidy ${*: -1}" >>calls'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
 }
 # As the real one does, it names one scenario after the other.
@@ -72,6 +74,11 @@ case $1 in
     run docs
     expect_calls 'make_html.sh . build/docs'
     expect_packages cmark-gfm mandoc
+    ;;
+  lint)
+    run test lint
+    expect_calls 'cmake --preset release' 'clang-tidy lib/unit.cpp'
+    expect_packages "${building[@]}" clang-tidy
     ;;
   scenario) # The list was piped into a search that ended at the first name, which failed the list.
     run lab a-scan
