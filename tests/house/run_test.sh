@@ -96,4 +96,13 @@ case $1 in
     expect_packages
     grep -q '^b-join ' said
     ;;
+  arguments)
+    for name in build demo docs format lint package; do
+      if run "$name" tests >shown; then
+        echo "$name takes an argument"
+        exit 1
+      fi
+      [[ ! -s calls && ! -s packages ]]
+    done
+    ;;
 esac
