@@ -44,9 +44,10 @@ end_stray_hostapd() {
 	done
 }
 
-# is_ours PROCESS: whether it has this machine's files and network, and not those of a container.
+# is_ours PROCESS: whether root runs it, and it has this machine's files and network, and not those of a container. Any
+# user can run a process with the daemon's name, also one with root's rights; to end it may take seconds.
 is_ours() {
-	[ "$(belongings_of "$1")" = "$(belongings_of /proc/self)" ]
+	grep -qs '^Uid:[^0-9]*0[^0-9]' "$1/status" && [ "$(belongings_of "$1")" = "$(belongings_of /proc/self)" ]
 }
 
 belongings_of() { # PROCESS
