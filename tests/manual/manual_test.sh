@@ -98,6 +98,8 @@ program_options() {
   for subcommand in $subcommands; do (program_options "$@" "$subcommand"); done
 }
 
+program_statuses() { "$argument" --help | sed -n '/^Exit status:/,/^Usage:/p' | grep -oE '\<[0-9]+\>'; }
+
 # The commands of a script of the appliance, by its usage.
 script_commands() {
   sed -n "s/^\(usage:\| *\) ${argument##*/} //p" "$argument" | sed 's/  .*//; s/ [A-Z[].*//' | split_choices
@@ -158,6 +160,8 @@ described_options() {
       }
     }' "$manual/merowireless.1"
 }
+
+described_statuses() { sed -n '/^\.Sh EXIT STATUS/,/^\.Sh EXAMPLES/s/^\.It \([0-9]*\)$/\1/p' "$manual/merowireless.1"; }
 
 # In the lines that name them.
 described_paths() { grep -hE '(^|[. ])Pa ' "$manual"/*.[1358]; }
@@ -325,6 +329,7 @@ case $check in
   script) expect_same script_commands described_script_commands ;;
   program) expect_program ;;
   commands) expect_same program_options described_options ;;
+  statuses) expect_same program_statuses described_statuses ;; # 7 was not in the help
   names) expect_names ;;
   readme) expect_readme ;;
   references) expect_references ;;
