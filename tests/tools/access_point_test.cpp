@@ -182,6 +182,19 @@ TEST_F(AccessPoint, RefusesSettingsThatCannotBe) {
   EXPECT_THAT(library::Calls(), IsEmpty());
 }
 
+// For the guests' network, the option of the main one was advised, which would have protected another network.
+TEST_F(AccessPoint, IsToldTheOptionThatIsMissingOfTheNetworkInQuestion) {
+  WriteText("/tmp/key", "open sesame\n");
+  EXPECT_THAT(Tool({"ap", "set", "--encryption", "open", "--key-file", "/tmp/key"}).err,
+              HasSubstr("has no secret: add --encryption wpa2\n"));
+  EXPECT_THAT(Tool({"ap", "set", "--guest-net-key-file", "/tmp/key"}).err,
+              HasSubstr("has no secret: add --guest-net-encryption wpa2\n"));
+  EXPECT_THAT(Tool({"ap", "set", "--guest-net-wpa-encrypt-type", "aes"}).err,
+              HasSubstr("choice of ciphers: add --guest-net-encryption wpa2\n"));
+  EXPECT_THAT(Tool({"ap", "set", "--guest-net-encryption", "wpa3"}).err,
+              HasSubstr("--guest-net-encryption cannot be this"));
+}
+
 TEST_F(AccessPoint, IsEnabledAndDisabledTogetherWithItsSwitch) {
   RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
   EXPECT_EQ(Tool({"ap", "enable"}).out, "the access point Office is enabled\n");

@@ -31,12 +31,17 @@ int* CipherOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info) {
   return nullptr;
 }
 
+// The option that a network without protection lacks.
+std::string AddProtection(std::string_view options) {
+  return "add --" + std::string(options) + "encryption wpa2";
+}
+
 }  // namespace
 
 // The details are a union: those of another encryption mean nothing to this one and are cleared.
 void SetProtection(MERO_AP_ENCRYPT& encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
-                   std::string_view option) {
-  const Protection& protection = RowOf<Protection>(kProtections, text, option);
+                   std::string_view options) {
+  const Protection& protection = RowOf<Protection>(kProtections, text, std::string(options) + "encryption");
   if (encryption != protection.encryption) info = {};
   encryption = protection.encryption;
   ForEachSecret(encryption, FALSE, [&](const char*, const Setting& setting) {
@@ -62,10 +67,10 @@ Value CipherValue(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO info) {
 }
 
 void SetCipher(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& text,
-               std::string_view option) {
+               std::string_view options) {
   int* cipher = CipherOf(encryption, info);
-  if (cipher == nullptr) throw Wrong("only WPA has a choice of ciphers", "add --encryption wpa2");
-  *cipher = ValueOf(kCiphers, text, option);
+  if (cipher == nullptr) throw Wrong("only WPA has a choice of ciphers", AddProtection(options));
+  *cipher = ValueOf(kCiphers, text, std::string(options) + "wpa-encrypt-type");
 }
 
 const char* SecretOf(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {
@@ -83,7 +88,8 @@ const char* SecretOf(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO&
   return "";
 }
 
-void SetSecretOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& secret) {
+void SetSecretOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, const std::string& secret,
+                 std::string_view options) {
   switch (encryption) {
     case AP_ENCRYPT_WEP:
       RequireWepKey(secret);
@@ -97,7 +103,7 @@ void SetSecretOf(MERO_AP_ENCRYPT encryption, MERO_HOSTAP_ENCRYPT_INFO& info, con
     case AP_ENCRYPT_MAX:
       break;
   }
-  throw Wrong("an open network has no secret", "add --encryption wpa2");
+  throw Wrong("an open network has no secret", AddProtection(options));
 }
 
 bool LacksSecret(MERO_AP_ENCRYPT encryption, const MERO_HOSTAP_ENCRYPT_INFO& info) {

@@ -234,13 +234,13 @@ constexpr ApSetting kSettings[] = {
           [](const ApConf& of) { return Value(ProtectionText(of.hostapConf.encryption, of.hostapConf.encryptInfo)); }),
      "open|wep|wpa|wpa2|mixed|eap", "how the network is protected",
      [](ApConf& of, const std::string& text) {
-       SetProtection(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "encryption");
+       SetProtection(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, kMainOptions);
      }},
     {Told("wpa_encrypt_type",
           [](const ApConf& of) { return CipherValue(of.hostapConf.encryption, of.hostapConf.encryptInfo); }),
      "tkip|aes|both", "the ciphers of WPA",
      [](ApConf& of, const std::string& text) {
-       SetCipher(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, "wpa-encrypt-type");
+       SetCipher(of.hostapConf.encryption, of.hostapConf.encryptInfo, text, kMainOptions);
      }},
     {Told("auth_server_addr", RadiusAddress), "A.B.C.D", "the RADIUS server of EAP", SetRadiusAddress},
     {Told(
@@ -291,13 +291,13 @@ constexpr ApSetting kSettings[] = {
      "open|wep|wpa|wpa2|mixed", "how the guest network is protected",
      [](ApConf& of, const std::string& text) {
        if (text == "eap") throw Wrong("a guest network cannot have EAP", "use wpa2");
-       SetProtection(Guest(of).encryption, Guest(of).encryptInfo, text, "guest-net-encryption");
+       SetProtection(Guest(of).encryption, Guest(of).encryptInfo, text, kGuestOptions);
      }},
     {Told("guest_net_wpa_encrypt_type",
           [](const ApConf& of) { return CipherValue(Guest(of).encryption, Guest(of).encryptInfo); }),
      "tkip|aes|both", "the ciphers of its WPA",
      [](ApConf& of, const std::string& text) {
-       SetCipher(Guest(of).encryption, Guest(of).encryptInfo, text, "guest-net-wpa-encrypt-type");
+       SetCipher(Guest(of).encryption, Guest(of).encryptInfo, text, kGuestOptions);
      }},
     Switch<"guest_net_ignore_broadcast_ssid">("yes keeps its name out of the beacons"),
     Number<"guest_net_max_num_sta", 1, kMostStations>("the most guests at a time"),
@@ -346,11 +346,11 @@ std::vector<Field<ApConf>> ApFields(bool showSecrets) {
 }
 
 void SetApSecret(ApConf& conf, const std::string& secret) {
-  SetSecretOf(conf.hostapConf.encryption, conf.hostapConf.encryptInfo, secret);
+  SetSecretOf(conf.hostapConf.encryption, conf.hostapConf.encryptInfo, secret, kMainOptions);
 }
 
 void SetGuestSecret(ApConf& conf, const std::string& secret) {
-  SetSecretOf(Guest(conf).encryption, Guest(conf).encryptInfo, secret);
+  SetSecretOf(Guest(conf).encryption, Guest(conf).encryptInfo, secret, kGuestOptions);
 }
 
 bool LacksSecret(const ApConf& conf) {
