@@ -73,6 +73,7 @@ void ForgetAppliance() {
 
 void EnterPrivateMachine() {
   ::umask(022);
+  ::setenv("LC_ALL", "C", 1);
   EnterNamespaces();
   Require(::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) == 0, "private mounts");
   Mount("tmpfs", kUpper, "");
