@@ -137,7 +137,7 @@ TEST_F(ACard, IsBroughtUpAndNotedDown) {
 }
 
 TEST_F(ACard, IsNotedDownInDirectoriesOfTheSameModeWhateverTheUmask) {
-  for (const mode_t mask : {0, 077}) {
+  for (const mode_t mask : {0u, 077u}) {
     std::filesystem::remove_all("/etc/sysconfig");
     ::umask(mask);
     EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), 0);

@@ -101,7 +101,7 @@ TEST_F(Command, StartsWithAllSignalsAsIfNobodyHadTouchedThem) {
 }
 
 TEST_F(Command, HasAnOrdinaryUmaskAndTheCallerKeepsItsOwn) {
-  for (const mode_t mask : {0000, 0077}) {
+  for (const mode_t mask : {0000u, 0077u}) {
     const mode_t before = ::umask(mask);
     EXPECT_EQ(Shell("umask >/tmp/platform/output"), 0);
     EXPECT_EQ(::umask(before), mask);

@@ -105,8 +105,8 @@ TEST_F(CurrentConnection, HasTheStatusThatTheDriverGives) {
 TEST_F(CurrentConnection, IsNoneForAnAccessPointAndThatIsNoFailure) {
   ASSERT_EQ(PLIBNetIfUp("wlan3"), 1);
   WriteText(kRecord, "home\n10\n5\n8\n00:11:22:AA:BB:CC\n");
-  for (const unsigned mode : {+WIRELESS_OPMODE_MASTER, +WIRELESS_OPMODE_REPEATER, +WIRELESS_OPMODE_SECONDEARY, 7}) {
-    driver_.mode = mode;
+  for (const int mode : {+WIRELESS_OPMODE_MASTER, +WIRELESS_OPMODE_REPEATER, +WIRELESS_OPMODE_SECONDEARY, 7}) {
+    driver_.mode = static_cast<unsigned>(mode);
     EXPECT_EQ(Ask(REQUEST_STATUS).status, WIRELESS_STATUS_DISCONNECTED) << mode;
     EXPECT_STREQ(Ask(REQUEST_ESSID).szEssid, "") << mode;
     EXPECT_EQ(Ask(REQUEST_PROTOCOL).protocol, WIRELESS_PROTO_UNKNOWN) << mode;

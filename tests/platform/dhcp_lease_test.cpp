@@ -235,7 +235,7 @@ TEST_F(ALease, NamesNoMoreServersThanTheLibraryAsks) {
 }
 
 TEST_F(ALease, KeepsTheModeAndTheOwnerOfTheResolversFileWhateverTheUmask) {
-  for (const mode_t mask : {0, 077}) {
+  for (const mode_t mask : {0u, 077u}) {
     WriteText(kResolver, "nameserver 192.0.2.1\n", 0664);
     ASSERT_EQ(::chown(kResolver, 3, 4), 0);
     EXPECT_EQ(Run({"bound"}, Usual({"dns=10.1.0.2"}), mask), 0);

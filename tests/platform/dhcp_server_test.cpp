@@ -319,7 +319,7 @@ TEST_F(DhcpServerFiles, AreRefusedForAWordThatTheServerWouldTakeForAnother) {
 }
 
 TEST_F(DhcpServerFiles, LieInADirectoryOfTheSameModeWhateverTheUmask) {
-  for (const mode_t mask : {0, 077}) {
+  for (const mode_t mask : {0u, 077u}) {
     fs::remove_all("/etc/dhcpd");
     const MERO_DHCPD_CONF conf = Server();
     ::umask(mask);

@@ -283,7 +283,7 @@ TEST_F(AFileThatIsChanged, IsNotWaitedForLongerWhenItsLockIsTakenAgainAndAgain) 
 }
 
 TEST_F(AFileThatIsChanged, GetsItsModeWhateverTheUmask) {
-  for (const mode_t mask : {0000, 0077, 0777}) {
+  for (const mode_t mask : {0000u, 0077u, 0777u}) {
     const mode_t before = ::umask(mask);
     for (const Change& change : kChanges) {
       PLIBCSysUnlink(kFile);

@@ -16,8 +16,8 @@ struct LogLine {
   int line;
   std::string text;
 
-  friend std::ostream& operator<<(std::ostream& to, const LogLine& line) {
-    return to << line.unit << ':' << line.line << ' ' << line.text;
+  friend std::ostream& operator<<(std::ostream& to, const LogLine& logged) {
+    return to << logged.unit << ':' << logged.line << ' ' << logged.text;
   }
 };
 

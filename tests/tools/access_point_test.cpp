@@ -218,7 +218,9 @@ TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
       {"Failed to enable AP.", "could not be enabled"},
   };
   for (const auto& [szReport, szSentence] : reports) {
-    library::MEROWirelessAPEnable = [szReport] { return library::Report("wireless_ap_enable", szReport), FALSE; };
+    library::MEROWirelessAPEnable = [szText = szReport] {
+      return library::Report("wireless_ap_enable", szText), FALSE;
+    };
     const Ran ran = Tool({"ap", "enable"});
     EXPECT_EQ(ran.status, 1);
     EXPECT_THAT(ran.err, HasSubstr(szSentence));

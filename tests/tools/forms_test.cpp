@@ -125,7 +125,7 @@ std::set<std::string> AllFiles() {
 // Only the library creates files, and it sets their modes.
 TEST_F(Forms, CreateNoFileWhateverTheUmask) {
   const std::set<std::string> before = AllFiles();
-  for (const mode_t mask : {0000, 0077}) {
+  for (const mode_t mask : {0000u, 0077u}) {
     for (const auto& [world, words] : kCommands) {
       library::Reset();
       world();

@@ -91,7 +91,7 @@ TEST_F(CommandLine, HasTheExitStatusesOfTheManualInItsHelp) {
 
 // Columns, where every byte but the continuation of a character is one.
 std::size_t WidthOf(std::string_view line) {
-  return std::ranges::count_if(line, [](char byte) { return (byte & 0xC0) != 0x80; });
+  return static_cast<std::size_t>(std::ranges::count_if(line, [](char byte) { return (byte & 0xC0) != 0x80; }));
 }
 
 TEST_F(CommandLine, HasHelpThatFitsATerminal) {

@@ -29,7 +29,7 @@ TEST(Frames, AreGivenOnceTheyHaveComeWhole) {
   char bytes[64];
   const ssize_t first = ::read(sent.fds[0], bytes, sizeof bytes);
   SendFrame(sent.fds[1], Frame::Kind::kResult, std::string("\0\1", 2));
-  const ssize_t size = first + ::read(sent.fds[0], bytes + first, sizeof bytes - first);
+  const ssize_t size = first + ::read(sent.fds[0], bytes + first, sizeof bytes - static_cast<std::size_t>(first));
   Frames frames;
   std::vector<std::string> given;
   for (ssize_t i = 0; i < size; ++i) {

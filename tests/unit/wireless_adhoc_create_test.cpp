@@ -254,7 +254,7 @@ TEST_F(AdhocCell, HasItsNameUnchangedWhateverThatHolds) {
 TEST_F(AdhocCell, HasItsKeyUnchangedWhateverThatHolds) {
   InstallNoter(kTool);
   for (const std::string& text : kHostileTexts) {
-    for (const size_t size : {5, 10, 13, 26}) {
+    for (const size_t size : {5u, 10u, 13u, 26u}) {
       std::string key = text.substr(0, size);
       key.resize(size, 'x');
       BeginWithTool();

@@ -414,7 +414,7 @@ TEST_F(WritingHostapdFiles, ReplacesTheMainOneInsteadOfWhatItsNamePointsTo) {
 }
 
 TEST_F(WritingHostapdFiles, CreatesThoseWithSecretsForTheirOwnerAlone) {
-  for (const mode_t mask : {0, 022, 077}) {
+  for (const mode_t mask : {0u, 022u, 077u}) {
     HostapdFilesTest::Begin();
     Begin();
     const mode_t before = umask(mask);

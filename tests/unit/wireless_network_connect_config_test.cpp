@@ -306,7 +306,7 @@ TEST_F(SupplicantConfig, HoldsNothingFromBehindAFieldThatHasNoEnd) {
 
 TEST_F(SupplicantConfig, CanBeReadByItsOwnerAloneAlsoWhenTheOldOneCouldBeReadByAll) {
   const mode_t before = umask(0);
-  for (const mode_t mask : {0000, 0077, 0777}) {
+  for (const mode_t mask : {0000u, 0077u, 0777u}) {
     umask(mask);
     EXPECT_EQ(Join(), 0);
     EXPECT_EQ(ModeOf(kSupplicantConfig), 0600u) << mask;

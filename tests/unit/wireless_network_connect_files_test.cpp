@@ -56,7 +56,7 @@ TEST_F(ConnectionRecord, HoldsNamesAsTheyAre) {
 }
 
 TEST_F(ConnectionRecord, CanBeReadByOtherProgramsWhateverTheUmask) {
-  for (const mode_t mask : {0022, 0000, 0077}) {
+  for (const mode_t mask : {0022u, 0000u, 0077u}) {
     const mode_t before = umask(mask);
     EXPECT_EQ(Join(), 0);
     umask(before);
@@ -238,7 +238,7 @@ TEST_F(AfterJoining, CommandsHaveAnOrdinaryUmaskAndTheCallerKeepsItsOwn) {
     umask(mask);
     return mask;
   };
-  for (const mode_t mask : {0000, 0077}) {
+  for (const mode_t mask : {0000u, 0077u}) {
     const mode_t before = umask(mask);
     std::vector<mode_t> seen;
     fake::system.Does([&](const char*) { return seen.push_back(current()), 0; });
