@@ -83,7 +83,7 @@ TEST_F(ACard, ThatHasOtherAddressesIsLeftWithTheWantedOneAlone) {
         Shell("ip -4 address flush dev net0; echo " + std::to_string(promotes) +
               " >/proc/sys/net/ipv4/conf/net0/promote_secondaries");
         Shell(std::string("ip address add dev net0 ") + szFirst);
-        Shell(std::string("ip address add dev net0 ") + szSecond + " 2>/dev/null || true");
+        Shell(std::string("ip address replace dev net0 ") + szSecond);
         EXPECT_EQ(Set(Static("10.9.0.2", "255.255.255.0")), 0);
         EXPECT_EQ(Told(), "net0 inet 10.9.0.2/24 brd 10.9.0.255 scope global net0\n") << szFirst << ", " << szSecond;
       }

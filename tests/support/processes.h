@@ -21,7 +21,7 @@ struct Ran {
   std::string err;
 };
 
-// A child in a session of its own, without a terminal, whose outputs are kept. It is killed when the holder ends before
+// A child without a terminal (it has called setsid()), whose outputs are kept. It is killed when the holder ends before
 // it was waited for.
 class StartedChild {
  public:
