@@ -11,7 +11,7 @@ namespace {
 
 // The formats of all that a unit of the library reports.
 std::set<std::string> FormatsOf(std::string_view unit) {
-  const std::string source = ReadText(MERO_LIBRARY_SOURCES "/" + std::string(unit) + ".cpp");
+  const std::string source = ReadText(MERO_SOURCE "/lib/obsolete/" + std::string(unit) + ".cpp");
   static const std::regex kLog(R"re(LOG(?:_LINE\([0-9]+,|\()\s*"([^"]*)")re");
   std::set<std::string> formats;
   for (std::sregex_iterator log(source.begin(), source.end(), kLog), end; log != end; ++log) formats.insert((*log)[1]);
