@@ -11,8 +11,8 @@ extern "C" {
 #include <csignal>
 #include <cstdio>
 
+#include "common/descriptor.h"
 #include "common/text.h"
-#include "platform/base/descriptor.h"
 #include "platform/base/file_read.h"
 #include "platform/base/number.h"
 

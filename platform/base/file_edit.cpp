@@ -103,7 +103,7 @@ Status WriteBeside(const char* szBeside, std::string_view content, int model) {
   if (Status status = TakeOwnerAndMode(file.get(), model); !status.ok()) return status;
   if (Status status = WriteAll(file.get(), content); !status.ok()) return status;
   if (::fsync(file.get()) < 0) return Status::Failed(errno);
-  return file.Close();
+  return Status::Of(file.Close());
 }
 
 // Flushes the directory of a path, so that a rename in it outlasts a power cut.

@@ -7,8 +7,8 @@
 #include <climits>
 #include <string_view>
 
+#include "common/descriptor.h"
 #include "platform/base/bytes.h"
-#include "platform/base/descriptor.h"
 #include "platform/base/result.h"
 
 // Another process has kept a file's lock for as long as this one would wait. An error of our own: no errno says so.

@@ -7,8 +7,8 @@
 #include <cstdint>
 #include <string_view>
 
+#include "common/descriptor.h"
 #include "common/text.h"
-#include "platform/base/descriptor.h"
 #include "platform/base/result.h"
 
 // Whether the kernel would take a text for an interface's name. One that it would not take stands for no interface, and

@@ -3,7 +3,7 @@
 #ifndef MERO_PLATFORM_SHARED_DIRECTORY_H
 #define MERO_PLATFORM_SHARED_DIRECTORY_H
 
-#include "platform/base/descriptor.h"
+#include "common/descriptor.h"
 #include "platform/base/result.h"
 
 // The file is somebody else's. An error of our own: no errno says so.

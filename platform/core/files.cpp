@@ -5,7 +5,7 @@
 
 #include <cstdio>
 
-#include "platform/base/descriptor.h"
+#include "common/descriptor.h"
 #include "platform/base/failure.h"
 #include "platform/base/shared_directory.h"
 

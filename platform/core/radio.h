@@ -4,8 +4,8 @@
 
 #include <net/if.h>
 
+#include "common/descriptor.h"
 #include "platform.h"
-#include "platform/base/descriptor.h"
 #include "platform/base/result.h"
 #include "platform/core/radio_texts.h"
 

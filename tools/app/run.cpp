@@ -9,7 +9,7 @@
 #include <exception>
 
 #include "app/options.h"
-#include "base/descriptor.h"
+#include "base/require.h"
 #include "work/library_log.h"
 
 namespace {

@@ -3,6 +3,8 @@
 
 #include <sys/signalfd.h>
 
+#include "base/require.h"
+
 namespace {
 
 bool IsIgnored(int signal) {

@@ -5,7 +5,7 @@
 #include <csignal>
 #include <initializer_list>
 
-#include "base/descriptor.h"
+#include "common/descriptor.h"
 
 // Blocks the signals that end the program, and `others`, as long as it lives; they make fd() readable instead. A signal
 // that the program was started to ignore stays ignored.

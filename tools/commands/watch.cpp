@@ -9,8 +9,9 @@
 #include <cstdio>
 #include <iterator>
 
-#include "base/descriptor.h"
+#include "base/require.h"
 #include "base/signals.h"
+#include "common/descriptor.h"
 #include "model/status.h"
 
 namespace {

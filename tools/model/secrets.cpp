@@ -7,9 +7,10 @@
 
 #include <cstring>
 
-#include "base/descriptor.h"
 #include "base/failure.h"
+#include "base/require.h"
 #include "base/signals.h"
+#include "common/descriptor.h"
 #include "model/security.h"
 
 namespace {
@@ -53,7 +54,7 @@ std::string Checked(std::string text, const std::string& from) {
 
 std::string ReadFile(const std::string& path) {
   const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
-  if (!file) throw Failure(Exit::kFailed, path + " cannot be read: " + std::strerror(errno), "check the file");
+  if (!file.valid()) throw Failure(Exit::kFailed, path + " cannot be read: " + std::strerror(errno), "check the file");
   return Checked(ReadAll(file.get(), path), path);
 }
 
@@ -112,7 +113,7 @@ std::optional<std::string> ReadSecret(const SecretSource& source, const std::str
   if (source.standardInput && ::isatty(STDIN_FILENO) == 0)
     return Checked(ReadAll(STDIN_FILENO, "the standard input"), "the standard input");
   const Descriptor terminal(::open("/dev/tty", O_RDWR | O_CLOEXEC));
-  if (!terminal) return std::nullopt;
+  if (!terminal.valid()) return std::nullopt;
   return Prompt(terminal.get(), prompt);
 }
 

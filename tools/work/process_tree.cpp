@@ -18,6 +18,8 @@ extern "C" {
 #include <fstream>
 #include <utility>
 
+#include "base/require.h"
+
 namespace {
 
 using std::chrono::milliseconds;

@@ -7,7 +7,7 @@
 #include <functional>
 #include <vector>
 
-#include "base/descriptor.h"
+#include "common/descriptor.h"
 
 class ProcessTree {
  public:

@@ -7,6 +7,8 @@
 #include <algorithm>
 #include <cstring>
 
+#include "base/require.h"
+
 namespace {
 
 // Events are recognised by how they begin and end. Names from the air stand between, and are not looked at.
@@ -68,7 +70,7 @@ bool SupplicantListener::Attach() {
 void SupplicantListener::Tick() {
   constexpr std::chrono::seconds kPatience{1};
   const auto now = std::chrono::steady_clock::now();
-  if (!socket_) {
+  if (!socket_.valid()) {
     lastAsked_ = now;
     if (!Attach()) socket_.Close();
     return;
@@ -80,7 +82,7 @@ void SupplicantListener::Tick() {
 
 void SupplicantListener::Receive() {
   char event[4096];
-  while (socket_) {
+  while (socket_.valid()) {
     const ssize_t size = ::recv(socket_.get(), event, sizeof event, 0);
     if (size < 0) {
       if (errno != EAGAIN && errno != EINTR) socket_.Close();

@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "base/descriptor.h"
+#include "common/descriptor.h"
 #include "work/listener.h"
 
 // Why a join failed. The greater value tells more.

@@ -11,10 +11,11 @@
 #include <fstream>
 #include <optional>
 
-#include "base/descriptor.h"
 #include "base/failure.h"
+#include "base/require.h"
 #include "base/signals.h"
 #include "base/text.h"
+#include "common/descriptor.h"
 #include "show/progress.h"
 #include "work/frames.h"
 #include "work/library_log.h"

@@ -1,12 +1,10 @@
 // A file descriptor that is closed in one place.
-#ifndef MERO_PLATFORM_DESCRIPTOR_H
-#define MERO_PLATFORM_DESCRIPTOR_H
+#ifndef MERO_COMMON_DESCRIPTOR_H
+#define MERO_COMMON_DESCRIPTOR_H
 
 #include <unistd.h>
 
 #include <utility>
-
-#include "platform/base/result.h"
 
 class Descriptor {
  public:
@@ -16,18 +14,16 @@ class Descriptor {
     std::swap(fd_, other.fd_);
     return *this;
   }
-  ~Descriptor() {
-    if (fd_ >= 0) ::close(fd_);
-  }
+  ~Descriptor() { Close(); }
 
   bool valid() const { return fd_ >= 0; }
   int get() const { return fd_; }
 
-  // For a file that was written, where a failed close is a failed write.
-  Status Close() { return Status::Of(::close(std::exchange(fd_, -1))); }
+  // Closes it before its time. Of a file that was written, a failed close is a failed write: -1, and errno says why.
+  int Close() { return fd_ < 0 ? 0 : ::close(std::exchange(fd_, -1)); }
 
  private:
   int fd_;
 };
 
-#endif  // MERO_PLATFORM_DESCRIPTOR_H
+#endif  // MERO_COMMON_DESCRIPTOR_H
