@@ -59,7 +59,8 @@ inline constexpr char kHostapdGuestFormat[] = "/etc/hostapd/hostapd-%s-guest.con
 inline constexpr char kHostapdGuestInfoFormat[] = "/etc/hostapd/hostapd-%s-guest.info";
 inline constexpr char kHostapdInfoFormat[] = "/etc/hostapd/hostapd-%s.info";
 
-// Where the access-point daemon has a control socket for each interface.
+// The pid of the access-point daemon of an interface, and where it has a control socket for each.
+inline constexpr char kHostapdPidFormat[] = "/var/run/rc.network/hostapd-%s.pid";
 inline constexpr char kHostapdControlDirectory[] = "/var/run/hostapd";
 
 // The guest network's interface, a second one on the adapter's radio, and its bridge.

@@ -38,6 +38,7 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
       {"printf '%s' \"$guest_bridge\"", kGuestBridge},
       {"printf '%s' \"$control\"", kHostapdControlDirectory},
       {"printf '%s' \"$scripts\"", kInterfaceScriptDirectory},
+      {"hostapd_pid if0", PathOf(kHostapdPidFormat)},
       {asks + "script_value KEY if0", PathOf(kInterfaceScriptFormat)},
       {asks + "access_point_is if0 yes", PathOf(kHostapdInfoFormat)},
       {"put() { printf '%s' \"$1\"; }; set_access_point if0 yes", PathOf(kHostapdInfoFormat)},

@@ -28,9 +28,14 @@ WIRELESS_NETWORK_CONFIG Home(const char* szIp = "DHCP") {
   return config;
 }
 
+constexpr char kApMarker[] = "/var/tmp/.wireless_ap_connecting";
+constexpr char kApPid[] = "/var/run/rc.network/hostapd-wlan0.pid";
+
 class Connection : public ToolTest {
  protected:
   Connection() {
+    std::filesystem::remove(kApMarker);
+    std::filesystem::remove(kApPid);
     library::Known({Home()});
     library::Connected("Home");
     library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG* config) {
@@ -116,6 +121,57 @@ TEST_F(Connection, IsNotTriedWhileTheRadioIsSwitchedOff) {
     }
   }
   EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+const std::vector<std::vector<std::string>> kJoins = {{"connect", "Home"}, {"autoconnect"}, {"adhoc", "cell"}};
+
+void MakeAccessPoint() {
+  library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_UNKNOWN; };
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
+    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
+  };
+}
+
+// Everybody was knocked off the access point, which was called "on the air" afterwards.
+TEST_F(Connection, IsNotTriedWhileTheAdapterIsAnAccessPoint) {
+  MakeAccessPoint();
+  for (const auto& command : kJoins) {
+    const Ran ran = Tool(command);
+    EXPECT_EQ(ran.status, 8);
+    EXPECT_THAT(ran.err, AllOf(HasSubstr("the adapter is an access point, and would be none any more"),
+                               HasSubstr("`merowireless ap disable`")));
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(Connection, IsNotTriedWhileTheAccessPointsDaemonRuns) {
+  library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
+  {
+    const StartedDaemon hostapd("hostapd", kApPid);
+    for (const auto& command : kJoins) EXPECT_EQ(Tool(command).status, 8);
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0) << "the file alone tells of no daemon";
+  const StartedDaemon another("another", kApPid);
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0) << "nor does another program's process";
+}
+
+TEST_F(Connection, IsNotTriedWhileAnAccessPointIsBeingSetUp) {
+  WriteText(kApMarker, "");
+  for (const auto& command : kJoins) {
+    const Ran ran = Tool(command);
+    EXPECT_EQ(ran.status, 8);
+    EXPECT_THAT(ran.err,
+                AllOf(HasSubstr("the adapter is about to be an access point"), HasSubstr("`merowireless ap disable`")));
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_TRUE(Exists(kApMarker));
+}
+
+TEST_F(Connection, IsTriedWhenOnlyAnOldMarkerOfAnAccessPointIsLeft) {
+  WriteText(kApMarker, "");
+  Shell("touch -d '3 minutes ago' " + std::string(kApMarker));
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
 }
 
 TEST_F(Connection, ThatFailsWithoutAReasonSaysSo) {

@@ -4,9 +4,12 @@
 #include <fcntl.h>
 #include <poll.h>
 #include <pty.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <cstdlib>
+#include <filesystem>
 #include <sstream>
 #include <utility>
 
@@ -85,6 +88,21 @@ std::vector<std::string> CommandsOf(std::vector<std::string> command) {
 
 StartedTool::StartedTool(const std::vector<std::string>& arguments, const Surroundings& surroundings)
     : StartedChild([&] { return RunHere(arguments, surroundings); }, surroundings.input) {}
+
+StartedDaemon::StartedDaemon(const std::string& program, const std::string& pidPath) {
+  const std::string path = "/tmp/daemons/" + program;
+  std::filesystem::create_directories("/tmp/daemons");
+  std::filesystem::copy_file("/bin/sleep", path, std::filesystem::copy_options::skip_existing);
+  pid_ = ::fork();
+  if (pid_ == 0) ::_exit(Become({path, "60"}));
+  EXPECT_TRUE(Soon([&] { return std::filesystem::read_symlink("/proc/" + std::to_string(pid_) + "/exe") == path; }));
+  WriteText(pidPath, std::to_string(pid_) + "\n");
+}
+
+StartedDaemon::~StartedDaemon() {
+  ::kill(pid_, SIGKILL);
+  ::waitpid(pid_, nullptr, 0);
+}
 
 Lifeline::Lifeline() {
   if (::pipe2(ends_, O_CLOEXEC) < 0) std::abort();

@@ -44,6 +44,18 @@ class StartedTool : public StartedChild {
   explicit StartedTool(const std::vector<std::string>& arguments, const Surroundings& surroundings = {});
 };
 
+// A process that runs a program of this name, whose pid is in a file.
+class StartedDaemon {
+ public:
+  StartedDaemon(const std::string& program, const std::string& pidPath);
+  StartedDaemon(const StartedDaemon&) = delete;
+  StartedDaemon& operator=(const StartedDaemon&) = delete;
+  ~StartedDaemon();
+
+ private:
+  pid_t pid_;
+};
+
 // Held by every process that is started while it lives, until that ends.
 class Lifeline {
  public:

@@ -15,6 +15,7 @@ enum class Exit : int {
   kSecretRefused = 5,
   kRadioOff = 6,
   kNoLease = 7,  // joined; the appliance goes on asking for an address
+  kBusy = 8,     // the adapter is used otherwise
   kInterrupted = 130,
 };
 

@@ -9,6 +9,7 @@
 #include "model/addressing.h"
 #include "model/library.h"
 #include "model/library_lines.h"
+#include "model/on_air.h"
 #include "model/security.h"
 #include "model/status.h"
 #include "work/supplicant.h"
@@ -16,6 +17,13 @@
 namespace {
 
 // ---- Joining ----
+
+// Fails when the adapter cannot be used, or is used otherwise.
+void RequireFreeAdapter() {
+  RequireAdapter();
+  RequireRadio();
+  RequireNoAccessPoint();
+}
 
 // Ends everything that a failed attempt has left.
 void LeaveNothing() {
@@ -165,8 +173,7 @@ bool IsInCell(const std::string& name) {
 }  // namespace
 
 void Connect(const Program& program, const NetworkToJoin& wanted) {
-  RequireAdapter();
-  RequireRadio();
+  RequireFreeAdapter();
   const KnownNetwork config = NetworkOf(program, wanted);
   Join(program, config);
   if (!wanted.noAddress) ApplyAddressing(program, config);
@@ -174,8 +181,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
 }
 
 void AutoConnect(const Program& program) {
-  RequireAdapter();
-  RequireRadio();
+  RequireFreeAdapter();
   // Called while there is a connection, the library would end it and fail.
   if (ReadStatus().isConnected()) return SayConnected(program);
   if (Known(Order::kByTime).empty()) {
@@ -204,8 +210,7 @@ void ShowStatus(const Program& program) {
 }
 
 void MakeCell(const Program& program, const CellToMake& wanted) {
-  RequireAdapter();
-  RequireRadio();
+  RequireFreeAdapter();
   KnownNetwork config{};
   SetNetworkName(config.network.szEssid, wanted.name);
   config.network.opmode = WIRELESS_OPMODE_ADHOC;
