@@ -42,6 +42,9 @@ inline constexpr char kSupplicantConfigPath[] = "/usr/mero/etc/wpa_supplicant.co
 inline constexpr char kSupplicantPidPath[] = "/var/run/wpa_supplicant.pid";
 inline constexpr char kSupplicantControlDirectory[] = "/var/run/wpa_supplicant";
 
+// A directory that root alone may open; it is locked by the management program while that joins or leaves a network.
+inline constexpr char kJoinLock[] = "/var/run/merowireless";
+
 // The pid of an interface's DHCP client, and the program that applies what the client leases and gives it back.
 inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
 inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";

@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <csignal>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 
@@ -31,11 +32,17 @@ WIRELESS_NETWORK_CONFIG Home(const char* szIp = "DHCP") {
 constexpr char kApMarker[] = "/var/tmp/.wireless_ap_connecting";
 constexpr char kApPid[] = "/var/run/rc.network/hostapd-wlan0.pid";
 
+constexpr char kJoinMarker[] = "/var/tmp/.wireless_connecting";
+constexpr char kJoinLock[] = "/var/run/merowireless";
+constexpr char kGo[] = "/tmp/go-on";
+constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
+
 class Connection : public ToolTest {
  protected:
   Connection() {
     std::filesystem::remove(kApMarker);
     std::filesystem::remove(kApPid);
+    for (const char* szPath : {kSupplicantPid, kJoinMarker, kJoinLock, kGo}) std::filesystem::remove_all(szPath);
     library::Known({Home()});
     library::Connected("Home");
     library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG* config) {
@@ -57,8 +64,6 @@ TEST_F(Connection, ToAKnownNetworkTakesItsSecretAndAddress) {
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||0",
                                             "MEROWirelessIfconfigSet", "wlan0|DHCP|255.255.255.0"));
 }
-
-constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
 
 // A supplicant's client that does this.
 void InstallSupplicantClient(const std::string& script) {
@@ -172,6 +177,69 @@ TEST_F(Connection, IsTriedWhenOnlyAnOldMarkerOfAnAccessPointIsLeft) {
   WriteText(kApMarker, "");
   Shell("touch -d '3 minutes ago' " + std::string(kApMarker));
   EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
+}
+
+// Two attempts ended each other, and nothing was connected.
+TEST_F(Connection, IsMadeByOneCommandAtATime) {
+  library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    library::Record("joining");
+    return Soon([] { return Exists(kGo); }) ? 0 : -1;
+  };
+  StartedTool first({"connect", "Home", "--no-address"});
+  ASSERT_TRUE(Soon([] { return library::Calls().size() == 2; }));
+  InstallSupplicantClient("touch /tmp/told-in-between\n");
+  WriteText(kSupplicantPid, "1\n");
+  for (const auto& command : kJoins) {
+    const Ran ran = Tool(command);
+    EXPECT_EQ(ran.status, 8);
+    EXPECT_THAT(ran.err, HasSubstr("another command is joining or leaving a network"));
+  }
+  EXPECT_EQ(Tool({"disconnect"}).status, 8);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "joining"));
+  EXPECT_FALSE(Exists("/tmp/told-in-between"));
+  std::filesystem::remove(kSupplicantPid);
+  WriteText(kGo, "");
+  EXPECT_EQ(first.Wait().status, 0);
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
+}
+
+TEST_F(Connection, IsNotMadeWhileAnotherProgramMakesOne) {
+  WriteText(kJoinMarker, "");
+  for (const auto& command : kJoins) {
+    const Ran ran = Tool(command);
+    EXPECT_EQ(ran.status, 8);
+    EXPECT_THAT(ran.err, HasSubstr("another program is joining a network"));
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_TRUE(Exists(kJoinMarker));
+}
+
+// The library refuses once after a power cut that came while a network was being joined.
+TEST_F(Connection, IsMadeWhenOnlyTheMarkerOfOneIsLeft) {
+  for (const std::string change : {"touch -d '3 minutes ago' ", "touch -d tomorrow ", "chown 1 "}) {
+    WriteText(kJoinMarker, "");
+    Shell(change + kJoinMarker);
+    EXPECT_EQ(Tool({"connect", "Home"}).status, 0) << change;
+    EXPECT_FALSE(Exists(kJoinMarker)) << change;
+  }
+  WriteText(kJoinMarker + std::string("/file"), "");
+  const Ran ran = Tool({"connect", "Home"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("an old marker of a join cannot be removed"));
+}
+
+TEST_F(Connection, IsNotMadeWhereOthersCannotBeKeptAway) {
+  std::filesystem::remove(kJoinLock);
+  WriteText(kJoinLock, "");
+  EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("other joins cannot be kept away"));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(Connection, CanBeMadeAgainWhileProgramsRunThatOneHasStarted) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return std::system("sleep 5 &"); };
+  for (int i = 0; i < 2; ++i) EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
+  EXPECT_EQ(ModeOf(kJoinLock), 0700U) << "anyone else could hold it for ever";
 }
 
 TEST_F(Connection, ThatFailsWithoutAReasonSaysSo) {

@@ -197,13 +197,16 @@ TEST_F(Waiting, ForChangesIsEndedWithoutAComplaint) {
 }
 
 TEST_F(Waiting, ThatIsEndedKeepsAnothersMarker) {
-  Touch(kMarker);
-  JoinForever();
-  StartedTool tool({"connect", "Home"});
+  constexpr char kApMarker[] = "/var/tmp/.wireless_ap_connecting";
+  Touch(kApMarker);
+  library::SavedAp(library::Office());
+  library::MEROWirelessAPEnable = [] { return StartDaemon(), WaitForEver(), TRUE; };
+  StartedTool tool({"ap", "enable"});
   Daemon();
   ::kill(tool.pid(), SIGINT);
   EXPECT_EQ(tool.Wait().status, 130);
-  EXPECT_TRUE(std::filesystem::exists(kMarker));
+  EXPECT_TRUE(std::filesystem::exists(kApMarker));
+  std::filesystem::remove(kApMarker);
 }
 
 TEST_F(Waiting, EndsWhatDoesNotWantToEnd) {

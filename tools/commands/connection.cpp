@@ -7,6 +7,7 @@
 
 #include "common/paths.h"
 #include "model/addressing.h"
+#include "model/join_lock.h"
 #include "model/library.h"
 #include "model/library_lines.h"
 #include "model/on_air.h"
@@ -23,6 +24,7 @@ void RequireFreeAdapter() {
   RequireAdapter();
   RequireRadio();
   RequireNoAccessPoint();
+  RequireNoOtherJoin();
 }
 
 // Ends everything that a failed attempt has left.
@@ -46,7 +48,8 @@ std::string SupplicantSocket() {
 std::optional<Failure> AttemptFailed(const std::string& name) {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
   if (WasReported(Report::kAnotherJoin)) {
-    return Failed("a network is being joined already, or an attempt was cut off", "wait a moment and try again");
+    return Failure(Exit::kBusy, "a network is being joined already, or an attempt was cut off",
+                   "wait a moment and try again");
   }
   if (WasReported(Report::kUnknownSecurity)) {
     return Failed(name + " is protected in a way that cannot be joined", "`merowireless scan` shows how");
@@ -173,6 +176,7 @@ bool IsInCell(const std::string& name) {
 }  // namespace
 
 void Connect(const Program& program, const NetworkToJoin& wanted) {
+  const JoinLock lock;
   RequireFreeAdapter();
   const KnownNetwork config = NetworkOf(program, wanted);
   Join(program, config);
@@ -181,6 +185,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
 }
 
 void AutoConnect(const Program& program) {
+  const JoinLock lock;
   RequireFreeAdapter();
   // Called while there is a connection, the library would end it and fail.
   if (ReadStatus().isConnected()) return SayConnected(program);
@@ -199,6 +204,7 @@ void AutoConnect(const Program& program) {
 }
 
 void Disconnect(const Program& program) {
+  const JoinLock lock;
   if (Run<int>(program.Doing("disconnecting"), [] { return MEROWirelessNetworkDisconnect(); }) < 0) {
     throw Failed("the connection could not be ended whole");
   }
@@ -210,6 +216,7 @@ void ShowStatus(const Program& program) {
 }
 
 void MakeCell(const Program& program, const CellToMake& wanted) {
+  const JoinLock lock;
   RequireFreeAdapter();
   KnownNetwork config{};
   SetNetworkName(config.network.szEssid, wanted.name);
