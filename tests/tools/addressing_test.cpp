@@ -26,6 +26,7 @@ class Addresses : public ToolTest {
   Addresses() {
     Shell("ip link add wlan0 type veth && ip address add 10.0.0.9/24 dev wlan0 && ip link set wlan0 up");
     library::Connected("Home");
+    library::InRange({Home("").network});
     library::MEROWirelessIfconfigSet = [](const char* szInterface, WIRELESS_NETWORK_CONFIG config) {
       library::Record(std::string(szInterface) + "|" + config.szIp + "|" + config.szMask);
       return 0;

@@ -24,7 +24,7 @@ constexpr char kAbout[] =
     "\n"
     "Exit status: 0 done, 1 failed, 2 wrong usage, 3 no adapter, 4 no such network or\n"
     "out of range, 5 secret refused, 6 radio switched off, 7 no address yet, 8 busy,\n"
-    "130 interrupted.";
+    "9 timed out, 10 protected in a way that cannot be joined, 130 interrupted.";
 
 // Adds commands: a name, a sentence of help, the function that describes the options, and the one that acts on their
 // values. The values live as long as the action, which holds them.

@@ -16,6 +16,8 @@ enum class Exit : int {
   kRadioOff = 6,
   kNoLease = 7,  // joined; the appliance goes on asking for an address
   kBusy = 8,     // the adapter is used otherwise
+  kTimedOut = 9,
+  kUnsupported = 10,  // protected in a way that cannot be joined
   kInterrupted = 130,
 };
 

@@ -7,6 +7,8 @@
 
 namespace {
 
+const Signals* g_outermost = nullptr;
+
 bool IsIgnored(int signal) {
   struct sigaction action {};
   return ::sigaction(signal, nullptr, &action) == 0 && action.sa_handler == SIG_IGN;
@@ -28,11 +30,13 @@ Signals::Signals(std::initializer_list<int> others) : before_() {
   const sigset_t held = EndingSignalsAnd(others);
   fd_ = Descriptor(Require(::signalfd(-1, &held, SFD_CLOEXEC | SFD_NONBLOCK), "signalfd"));
   Require(::sigprocmask(SIG_BLOCK, &held, &before_), "sigprocmask");
+  if (g_outermost == nullptr) g_outermost = this;
 }
 
 // A signal that has come and was not read by Next() ends the program now.
 Signals::~Signals() {
-  RestoreMask();
+  if (g_outermost == this) g_outermost = nullptr;
+  ::sigprocmask(SIG_SETMASK, &before_, nullptr);
 }
 
 int Signals::Next() const {
@@ -40,6 +44,6 @@ int Signals::Next() const {
   return ::read(fd_.get(), &info, sizeof info) == sizeof info ? static_cast<int>(info.ssi_signo) : 0;
 }
 
-void Signals::RestoreMask() const {
-  ::sigprocmask(SIG_SETMASK, &before_, nullptr);
+void Signals::RestoreMask() {
+  ::sigprocmask(SIG_SETMASK, &g_outermost->before_, nullptr);
 }

@@ -8,7 +8,7 @@
 #include "common/descriptor.h"
 
 // Blocks the signals that end the program, and `others`, as long as it lives; they make fd() readable instead. A signal
-// that the program was started to ignore stays ignored.
+// that the program was started to ignore stays ignored. One may live within the life of another: the inner one hears.
 class Signals {
  public:
   explicit Signals(std::initializer_list<int> others = {});
@@ -22,8 +22,8 @@ class Signals {
   int Next() const;
   bool HasCome() const { return Next() != 0; }
 
-  // Gives a child the mask that was there before.
-  void RestoreMask() const;
+  // Gives a child the mask that was there before all of them.
+  static void RestoreMask();
 
  private:
   sigset_t before_;

@@ -2,14 +2,14 @@
 #include "commands/connection.h"
 
 #include <chrono>
-#include <optional>
 #include <thread>
 
 #include "common/paths.h"
 #include "model/addressing.h"
+#include "model/former_connection.h"
+#include "model/join_failures.h"
 #include "model/join_lock.h"
 #include "model/library.h"
-#include "model/library_lines.h"
 #include "model/on_air.h"
 #include "model/security.h"
 #include "model/status.h"
@@ -27,71 +27,15 @@ void RequireFreeAdapter() {
   RequireNoOtherJoin();
 }
 
-// Ends everything that a failed attempt has left.
-void LeaveNothing() {
-  if (MEROWirelessNetworkDisconnect() < 0) throw Failed("the connection could not be ended whole");
-}
-
 Task Joining(const Program& program, const std::string& what, SupplicantListener& listener) {
   Task task = program.Doing(what);
   task.szMarker = kJoinMarkerPath;
   task.listener = &listener;
-  task.undo = LeaveNothing;
   return task;
 }
 
 std::string SupplicantSocket() {
   return std::string(kSupplicantControlDirectory) + "/" + MEROWirelessInterfaceGet();
-}
-
-// Why the library gave an attempt up before it asked an access point, if it did.
-std::optional<Failure> AttemptFailed(const std::string& name) {
-  if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (WasReported(Report::kAnotherJoin)) {
-    return Failure(Exit::kBusy, "a network is being joined already, or an attempt was cut off",
-                   "wait a moment and try again");
-  }
-  if (WasReported(Report::kUnknownSecurity)) {
-    return Failed(name + " is protected in a way that cannot be joined", "`merowireless scan` shows how");
-  }
-  if (WasReported(Report::kSupplicantNotConfigured) || WasReported(Report::kJoinNotRecorded)) {
-    return Failed("the join could not be written down", "is there room on the disk? -v shows which file it is");
-  }
-  return std::nullopt;
-}
-
-// Why an access point let nobody in, by what the supplicant said.
-std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
-  switch (verdict) {
-    case Verdict::kSecretRefused:
-      return Failure(Exit::kSecretRefused, name + " does not accept the secret",
-                     "`merowireless save` saves the right one");
-    case Verdict::kRefused:
-      return Failed(name + " refuses this appliance",
-                    "look for address filters and station limits at the access point");
-    case Verdict::kNotFound:
-      return Failure(Exit::kOutOfRange, name + " is not in range",
-                     "move closer; `merowireless scan --renew` shows what is");
-    case Verdict::kNone:
-      break;
-  }
-  return std::nullopt;
-}
-
-Failure JoinFailed(const std::string& name, Verdict verdict) {
-  if (const auto failure = AttemptFailed(name)) return *failure;
-  if (const auto failure = Refused(name, verdict)) return *failure;
-  return Failed(name + " could not be joined in time", "try again closer to it; -v shows what the library reports");
-}
-
-Failure AutoConnectFailed(Verdict verdict) {
-  if (const auto failure = AttemptFailed("a known network")) return *failure;
-  if (WasReported(Report::kAddressNotSet)) {
-    return Failed("a network was joined, but its address could not be set");
-  }
-  if (verdict > Verdict::kNotFound) return *Refused("one of the known networks", verdict);
-  return {Exit::kOutOfRange, "none of the known networks could be joined",
-          "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
 }
 
 // The library tells a running supplicant to end and starts the next one at once. That one gives up while the control
@@ -122,9 +66,7 @@ void Join(const Program& program, const KnownNetwork& config) {
 
 void ApplyAddressing(const Program& program, const KnownNetwork& config) {
   if (config.szIp[0] == '\0') return;
-  Task task = SettingAddress(program, config);
-  task.undo = LeaveNothing;  // a join without its address is half of what was asked for
-  ApplyAddress(task, config);
+  ApplyAddress(SettingAddress(program, config), config);
   ApplySavedGateway(config);
 }
 
@@ -148,10 +90,28 @@ void SetUser(KnownNetwork& config, const std::string& user) {
 KnownNetwork NetworkOf(const Program& program, const NetworkToJoin& wanted) {
   const auto known = FindKnown(wanted.name);
   KnownNetwork config = known ? *known : FromTheAir(program, wanted);
+  if (!CanBeJoined(config.network)) throw Unsupported(program.output.Name(config.network.szEssid));
   if (config.szKey[0] == '\0' || wanted.secret.isGiven()) SetSecret(program, config, wanted.secret);
   SetUser(config, wanted.user);
   config.noneBssid = wanted.anyAccessPoint ? 1 : 0;
   return config;
+}
+
+// One that is given has been looked at.
+void RequireSavedSecret(const Program& program, const KnownNetwork& config) {
+  if (CanBeSecret(config.network.auth, config.szKey)) return;
+  throw Failure(Exit::kSecretRefused,
+                "the secret that was saved for " + program.output.Name(config.network.szEssid) + " can be none",
+                "`merowireless save` saves the right one");
+}
+
+// A look at the air takes a while. It is worth that where there is a connection to be lost; elsewhere the attempt
+// tells.
+void RequireInRange(const Program& program, const KnownNetwork& config, const FormerConnection& former) {
+  if (!former.exists() || IsInRange(program, config)) return;
+  throw Failure(Exit::kOutOfRange,
+                program.output.Name(config.network.szEssid) + " is not in range, and nothing was changed",
+                "move closer; `merowireless scan --renew` shows what is");
 }
 
 void SayConnected(const Program& program) {
@@ -179,8 +139,14 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
   const JoinLock lock;
   RequireFreeAdapter();
   const KnownNetwork config = NetworkOf(program, wanted);
-  Join(program, config);
-  if (!wanted.noAddress) ApplyAddressing(program, config);
+  RequireSavedSecret(program, config);
+  if (!wanted.noAddress) RequireAddressing(config);
+  const FormerConnection former(program);
+  RequireInRange(program, config, former);
+  former.Try([&] {
+    Join(program, config);
+    if (!wanted.noAddress) ApplyAddressing(program, config);
+  });
   SayConnected(program);
 }
 
@@ -193,11 +159,13 @@ void AutoConnect(const Program& program) {
     throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");
   }
 
-  EndFormerSupplicant(program);
-  SupplicantListener listener(SupplicantSocket());
-  if (Run<int>(Joining(program, "joining a known network", listener), [] { return MEROWirelessAutoConnect(); }) < 0) {
-    throw AutoConnectFailed(listener.verdict());
-  }
+  FormerConnection(program).Try([&] {
+    EndFormerSupplicant(program);
+    SupplicantListener listener(SupplicantSocket());
+    if (Run<int>(Joining(program, "joining a known network", listener), [] { return MEROWirelessAutoConnect(); }) < 0) {
+      throw AutoConnectFailed(listener.verdict());
+    }
+  });
   RequireLease();
   ApplyGatewayOfConnection();
   SayConnected(program);
@@ -206,7 +174,7 @@ void AutoConnect(const Program& program) {
 void Disconnect(const Program& program) {
   const JoinLock lock;
   if (Run<int>(program.Doing("disconnecting"), [] { return MEROWirelessNetworkDisconnect(); }) < 0) {
-    throw Failed("the connection could not be ended whole");
+    throw NotEnded();
   }
   program.output.Done("disconnected");
 }
@@ -225,12 +193,12 @@ void MakeCell(const Program& program, const CellToMake& wanted) {
   config.network.encrypt = wanted.wep ? WIRELESS_ENCRYPT_WEP : WIRELESS_ENCRYPT_NONE;
   SetSecret(program, config, wanted.secret);
   const std::string name = program.output.Name(wanted.name);
-  Task task = program.Doing("starting " + name);
-  task.undo = LeaveNothing;
-  if (Run<int>(task, [&] { return MEROWirelessAdhocCreate(&config); }) < 0 || !IsInCell(wanted.name)) {
-    Undo(task);
+  FormerConnection(program).Try([&] {
+    EndFormerSupplicant(program);
+    const int result = Run<int>(program.Doing("starting " + name), [&] { return MEROWirelessAdhocCreate(&config); });
+    if (result >= 0 && IsInCell(wanted.name)) return;
     throw Failed("the cell " + name + " could not be started",
                  "not every adapter can; -v shows what the library reports");
-  }
+  });
   program.output.Done("started the ad-hoc cell " + name);
 }

@@ -4,9 +4,11 @@
 #include <arpa/inet.h>
 #include <net/if.h>
 
+#include <cstdint>
 #include <cstdio>
 #include <fstream>
 #include <string_view>
+#include <tuple>
 
 #include "base/text.h"
 #include "model/library_lines.h"
@@ -15,6 +17,23 @@ namespace {
 
 bool IsDhcp(const KnownNetwork& config) {
   return std::string_view(config.szIp) == "DHCP";
+}
+
+std::uint32_t NumberOf(const std::string& address) {
+  in_addr number{};
+  ::inet_pton(AF_INET, address.c_str(), &number);
+  return ntohl(number.s_addr);
+}
+
+// Whether an address is a host's in its subnet: neither the network's nor the broadcast address.
+bool IsHost(const std::string& ip, const std::string& mask) {
+  const std::uint32_t others = ~NumberOf(mask);
+  const std::uint32_t host = NumberOf(ip) & others;
+  return others <= 1 || (host != 0 && host != others);
+}
+
+bool IsInSubnet(const std::string& gateway, const std::string& ip, const std::string& mask) {
+  return ((NumberOf(gateway) ^ NumberOf(ip)) & NumberOf(mask)) == 0;
 }
 
 void RequireStatic(const Addressing& addressing) {
@@ -60,6 +79,19 @@ void SetAddressing(KnownNetwork& config, const Addressing& addressing) {
   SetText(config.szIp, addressing.ip == "none" ? "" : addressing.ip, "the address");
   SetText(config.szMask, addressing.mask, "the netmask");
   SetText(config.szGateway, addressing.gateway, "the gateway");
+}
+
+void RequireAddressing(const KnownNetwork& config) {
+  const auto& [ip, mask, gateway] =
+      std::tuple<std::string, std::string, std::string>(config.szIp, config.szMask, config.szGateway);
+  if (ip.empty() || IsDhcp(config)) return;
+  const std::string advice = "`merowireless save` saves it with another one, or with DHCP";
+  if (!IsIpAddress(ip) || !IsNetmask(mask) || !IsHost(ip, mask)) {
+    throw Failed("the network was saved with an address that no host can have", advice);
+  }
+  if (!gateway.empty() && (!IsIpAddress(gateway) || !IsInSubnet(gateway, ip, mask))) {
+    throw Failed("the network was saved with a gateway that is not in its subnet", advice);
+  }
 }
 
 Task SettingAddress(const Program& program, const KnownNetwork& config) {

@@ -17,6 +17,9 @@ struct Addressing {
 // Puts it into a network; fails when it is not sound.
 void SetAddressing(KnownNetwork& config, const Addressing& addressing);
 
+// Fails when a network was saved with an address that it cannot have.
+void RequireAddressing(const KnownNetwork& config);
+
 // Gives the interface a network's address, as a task.
 Task SettingAddress(const Program& program, const KnownNetwork& config);
 void ApplyAddress(const Task& task, const KnownNetwork& config);

@@ -9,6 +9,7 @@
 #include <cstring>
 
 #include "model/library_lines.h"
+#include "work/radio.h"
 
 namespace {
 
@@ -96,6 +97,13 @@ Answer LookUpAfresh(const std::string& name, const std::optional<Address>& addre
   return LookUp(name, address);
 }
 
+// The access point that a network is to be joined through; nothing when any will do.
+std::optional<Address> AccessPointFor(const KnownNetwork& config) {
+  Address address;
+  std::ranges::copy(config.network.bssid, address.begin());
+  return config.noneBssid != 0 || address == Address{} ? std::nullopt : std::optional(address);
+}
+
 }  // namespace
 
 std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan) {
@@ -131,6 +139,17 @@ Network FindInRange(const Program& program, const std::string& name) {
                   "`merowireless scan --renew` shows those that are");
   }
   return answer.network;
+}
+
+bool IsInRange(const Program& program, const KnownNetwork& config) {
+  const std::string name = config.network.szEssid;
+  const std::optional<Address> address = AccessPointFor(config);
+  const std::string wanted = address ? "" : name;
+  return Run<bool>(program.Doing("looking for " + program.output.Name(name)), [&] {
+    if (LookUp(wanted, address).result > 0) return true;
+    const bool called = CallNetwork(MEROWirelessInterfaceGet(), name);
+    return (called ? LookUp(wanted, address) : LookUpAfresh(wanted, address)).result > 0;
+  });
 }
 
 std::vector<KnownNetwork> AllKnown(const std::string& name) {

@@ -27,6 +27,10 @@ std::vector<KnownNetwork> Known(Order order);
 // A network in range, by its name or the address of its access point; fails when there is none.
 Network FindInRange(const Program& program, const std::string& name);
 
+// Whether a network is in range, also one that hides its name: through any of its access points, or, where the network
+// is to be joined through one, through that.
+bool IsInRange(const Program& program, const KnownNetwork& config);
+
 // The network that was saved last under a name or an address.
 std::optional<KnownNetwork> FindKnown(const std::string& name);
 

@@ -42,6 +42,16 @@ bool IsPrintable(char c) {
   return c >= ' ' && c <= '~';
 }
 
+bool IsWepKey(std::string_view key) {
+  const std::size_t size = key.size();
+  if (size == 5 || size == 13) return true;
+  return (size == 10 || size == 26) && std::ranges::all_of(key, [](unsigned char c) { return std::isxdigit(c) != 0; });
+}
+
+bool HasLengthOfPassphrase(std::string_view secret) {
+  return secret.size() >= 8 && secret.size() <= 63;
+}
+
 }  // namespace
 
 std::string SecurityText(WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt) {
@@ -61,6 +71,19 @@ bool NeedsUser(WIRELESS_AUTH auth) {
   return SecurityOf(auth).user;
 }
 
+bool CanBeJoined(const WIRELESS_NETWORK& network) {
+  if (network.opmode == WIRELESS_OPMODE_ADHOC) {
+    return network.encrypt == WIRELESS_ENCRYPT_NONE || network.encrypt == WIRELESS_ENCRYPT_WEP;
+  }
+  return network.auth != WIRELESS_AUTH_UNKNOWN && network.auth != WIRELESS_AUTH_WPANONE;
+}
+
+bool CanBeSecret(WIRELESS_AUTH auth, std::string_view secret) {
+  const Security& security = SecurityOf(auth);
+  if (security.encrypt == WIRELESS_ENCRYPT_WEP) return IsWepKey(secret);
+  return !security.secret || security.user || HasLengthOfPassphrase(secret);
+}
+
 bool SetSecurity(WIRELESS_NETWORK& network, std::string_view name) {
   const auto* found = std::ranges::find(kSecurities, name, &Security::name);
   if (name.empty() || found == std::end(kSecurities)) return false;
@@ -70,16 +93,13 @@ bool SetSecurity(WIRELESS_NETWORK& network, std::string_view name) {
 }
 
 void RequireWepKey(std::string_view key) {
-  const std::size_t size = key.size();
-  if (size == 5 || size == 13) return;
-  const bool digits = std::ranges::all_of(key, [](unsigned char c) { return std::isxdigit(c) != 0; });
-  if ((size == 10 || size == 26) && digits) return;
+  if (IsWepKey(key)) return;
   throw Failure(Exit::kSecretRefused, "a WEP key cannot have this length",
                 "give 5 or 13 characters, or 10 or 26 hexadecimal digits");
 }
 
 void RequirePassphrase(std::string_view passphrase) {
-  if (passphrase.size() >= 8 && passphrase.size() <= 63 && std::ranges::all_of(passphrase, IsPrintable)) return;
+  if (HasLengthOfPassphrase(passphrase) && std::ranges::all_of(passphrase, IsPrintable)) return;
   throw Failure(Exit::kSecretRefused, "this can be no passphrase", "give 8 to 63 printable ASCII characters");
 }
 

@@ -13,6 +13,13 @@ std::string SecurityText(WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt);
 bool NeedsSecret(WIRELESS_AUTH auth);
 bool NeedsUser(WIRELESS_AUTH auth);
 
+// Whether the library can join a network that is protected so.
+bool CanBeJoined(const WIRELESS_NETWORK& network);
+
+// Whether a secret can be one of a network that is protected so. Any character can be in one that was not saved by this
+// program.
+bool CanBeSecret(WIRELESS_AUTH auth, std::string_view secret);
+
 // Sets the protection that is called `name`, one of kSecurityNames; false when none is.
 bool SetSecurity(WIRELESS_NETWORK& network, std::string_view name);
 inline constexpr char kSecurityNames[] = "open, wep, wpa, wpa2, wpa-eap, wpa2-eap";

@@ -108,7 +108,7 @@ class Worker {
     const int out = pipe_.writer.get();
     try {
       Redirect(errors_.fd());
-      signals_.RestoreMask();
+      Signals::RestoreMask();
       library_log::SendTo([out](std::string_view line) { SendFrame(out, Frame::Kind::kLine, line); });
       SendFrame(out, Frame::Kind::kResult, call());
     } catch (const std::exception& failure) {

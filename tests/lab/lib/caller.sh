@@ -7,3 +7,16 @@
 through_functions() {
   [[ ! $LAB_PROGRAM ]]
 }
+
+# ends_with NAME STATUS COMMAND...: on an appliance, a command of the program ends with that status, and gives its reason
+# on the standard error output alone, which is kept in ERRORS.
+ends_with() {
+  local status=0
+  say_words "$1$ merowireless" "${@:3}"
+  inside "$1" merowireless "${@:3}" >"$LOGS/$1.output" 2>"$LOGS/$1.errors" || status=$?
+  ERRORS=$(<"$LOGS/$1.errors")
+  show <<<"$ERRORS"
+  expect_same "the status of $3" "$2" "$status"
+  expect_same "the output of $3" '' "$(<"$LOGS/$1.output")"
+  grep -q '^merowireless: .*: ' <<<"$ERRORS" || fail "no reason is given: $ERRORS"
+}

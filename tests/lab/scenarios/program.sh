@@ -10,18 +10,6 @@ appliance nas
 inside nas tee /var/lib/wrong.key >/dev/null <<<'trois croissants'
 inside nas tee /var/lib/right.key >/dev/null <<<'deux croissants'
 
-# ends_with STATUS COMMAND...: a command of the program ends with that status, and gives its reason on the standard
-# error output alone.
-ends_with() {
-  local status=0
-  say_words 'nas$ merowireless' "${@:2}"
-  inside nas merowireless "${@:2}" >"$LOGS/nas.output" 2>"$LOGS/nas.errors" || status=$?
-  show <"$LOGS/nas.errors"
-  expect_same "the status of $2" "$1" "$status"
-  expect_same "the output of $2" '' "$(<"$LOGS/nas.output")"
-  grep -q '^merowireless: .*: ' "$LOGS/nas.errors" || fail "no reason is given: $(<"$LOGS/nas.errors")"
-}
-
 say '-- what is in range'
 on nas merowireless scan --renew --porcelain
 expect_output <<END
@@ -39,7 +27,7 @@ say '-- the wrong passphrase'
 on nas merowireless save cafe --key-file /var/lib/wrong.key
 on nas merowireless known --porcelain
 [[ $OUTPUT == "cafe	WPA2PSK	AES	MANAGED	DHCP	"*"	$(address_of cafe)		yes" ]] || fail "this should be known: $OUTPUT"
-ends_with 5 connect cafe
+ends_with nas 5 connect cafe
 expect_nothing_left nas
 
 say '-- the user does not want to wait: the supplicant that tries goes too'
@@ -67,11 +55,11 @@ expect_nothing_left nas
 
 say '-- out of range, and the radio is switched off'
 switch_off cafe
-ends_with 4 connect cafe
+ends_with nas 4 connect cafe
 expect_nothing_left nas
 plug_in nas
 on nas merowireless radio off
-ends_with 6 connect cafe
+ends_with nas 6 connect cafe
 on nas merowireless radio on
 
 say '-- an access point, which gives way to a client and comes back with the mode'

@@ -1,0 +1,68 @@
+// Why networks are not joined.
+#include "model/join_failures.h"
+
+#include <optional>
+
+#include "model/library.h"
+#include "model/library_lines.h"
+
+namespace {
+
+// Why the library gave an attempt up before it asked an access point, if it did.
+std::optional<Failure> AttemptFailed(const std::string& name) {
+  if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
+  if (WasReported(Report::kAnotherJoin)) {
+    return Failure(Exit::kBusy, "a network is being joined already, or an attempt was cut off",
+                   "wait a moment and try again");
+  }
+  if (WasReported(Report::kUnknownSecurity)) return Unsupported(name);
+  if (WasReported(Report::kSupplicantNotConfigured) || WasReported(Report::kJoinNotRecorded)) {
+    return Failed("the join could not be written down", "is there room on the disk? -v shows which file it is");
+  }
+  return std::nullopt;
+}
+
+// Why an access point let nobody in, by what the supplicant said.
+std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
+  switch (verdict) {
+    case Verdict::kSecretRefused:
+      return Failure(Exit::kSecretRefused, name + " does not accept the secret",
+                     "`merowireless save` saves the right one");
+    case Verdict::kRefused:
+      return Failed(name + " refuses this appliance",
+                    "look for address filters and station limits at the access point");
+    case Verdict::kNotFound:
+      return Failure(Exit::kOutOfRange, name + " is not in range",
+                     "move closer; `merowireless scan --renew` shows what is");
+    case Verdict::kNone:
+      break;
+  }
+  return std::nullopt;
+}
+
+}  // namespace
+
+Failure Unsupported(const std::string& name) {
+  return {Exit::kUnsupported, name + " is protected in a way that cannot be joined", "`merowireless scan` shows how"};
+}
+
+Failure JoinFailed(const std::string& name, Verdict verdict) {
+  if (const auto failure = AttemptFailed(name)) return *failure;
+  if (const auto failure = Refused(name, verdict)) return *failure;
+  return {Exit::kTimedOut, name + " could not be joined in time",
+          "try again closer to it; -v shows what the library reports"};
+}
+
+Failure AutoConnectFailed(Verdict verdict) {
+  if (const auto failure = AttemptFailed("a known network")) return *failure;
+  if (WasReported(Report::kAddressNotSet)) {
+    return Failed("a network was joined, but its address could not be set");
+  }
+  if (verdict > Verdict::kNotFound) return *Refused("one of the known networks", verdict);
+  return {Exit::kOutOfRange, "none of the known networks could be joined",
+          "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
+}
+
+Failure NotEnded() {
+  return Failed("the connection could not be ended whole");
+}

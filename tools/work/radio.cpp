@@ -1,0 +1,66 @@
+// What the kernel is asked of a wireless interface where the library has no function for it.
+#include "work/radio.h"
+
+#include <linux/wireless.h>
+#include <sys/ioctl.h>
+#include <sys/socket.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <cstring>
+#include <thread>
+
+#include "base/require.h"
+#include "common/descriptor.h"
+
+namespace {
+
+bool Ask(const std::string& interface, unsigned long what, iwreq& request) {
+  const Descriptor control(Require(::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0), "socket"));
+  if (interface.size() >= sizeof request.ifr_name) return errno = ENODEV, false;
+  std::ranges::copy(interface, request.ifr_name);
+  return ::ioctl(control.get(), what, &request) == 0;
+}
+
+// The kernel has no results to show as long as it scans.
+bool IsScanning(const std::string& interface) {
+  char results[1];
+  iwreq request{};
+  request.u.data.pointer = results;
+  return !Ask(interface, SIOCGIWSCAN, request) && errno == EAGAIN;
+}
+
+}  // namespace
+
+std::optional<Address> AccessPointOf(const std::string& interface) {
+  iwreq request{};
+  if (!Ask(interface, SIOCGIWAP, request)) return std::nullopt;
+  Address address;
+  std::memcpy(address.data(), request.u.ap_addr.sa_data, address.size());
+  return address == Address{} ? std::nullopt : std::optional(address);
+}
+
+std::string WepKeyOf(const std::string& interface) {
+  char key[IW_ENCODING_TOKEN_MAX];
+  iwreq request{};
+  request.u.encoding.pointer = key;
+  request.u.encoding.length = sizeof key;
+  if (!Ask(interface, SIOCGIWENCODE, request) || (request.u.encoding.flags & IW_ENCODE_DISABLED) != 0) return "";
+  return Hex({key, request.u.encoding.length});
+}
+
+bool CallNetwork(const std::string& interface, const std::string& name) {
+  constexpr std::chrono::milliseconds kPause{100};
+  constexpr int kPatience = 100;  // pauses
+  iw_scan_req call{};
+  call.essid_len = static_cast<__u8>(std::min(name.size(), sizeof call.essid));
+  std::memcpy(call.essid, name.data(), call.essid_len);
+  iwreq request{};
+  request.u.data.pointer = &call;
+  request.u.data.length = sizeof call;
+  request.u.data.flags = IW_SCAN_THIS_ESSID;
+  if (!Ask(interface, SIOCSIWSCAN, request)) return false;
+  for (int i = 0; i < kPatience && IsScanning(interface); ++i) std::this_thread::sleep_for(kPause);
+  return true;
+}
