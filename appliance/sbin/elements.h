@@ -10,9 +10,6 @@ namespace iwlist {
 // The elements before a malformed one are used. WPA that cannot be read is unknown, never none or WEP.
 Description Describe(Bytes elements, unsigned capability, unsigned megahertz);
 
-// The number of the channel at a centre frequency; 0 when there is none.
-int ChannelOf(unsigned megahertz);
-
 }  // namespace iwlist
 
 #endif  // MERO_APPLIANCE_ELEMENTS_H

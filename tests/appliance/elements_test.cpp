@@ -5,6 +5,7 @@
 
 #include <string>
 
+#include "common/channel.h"
 #include "tests/appliance/elements_text.h"
 
 namespace iwlist {
