@@ -41,15 +41,65 @@ class Networks : public ToolTest {
   }
 };
 
-TEST_F(Networks, AreScannedForAfreshOnRequestOnly) {
+// Records how each scan is to be made.
+void RecordScans() {
   library::MEROWirelessNetworkScan = [](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
     FillRing<WIRELESS_NETWORK>(head, {});
-    library::Record(std::to_string(scan));
-    return 0;
+    return library::Record(scan == WIRELESS_SCAN_RENEW ? "renewed" : "read"), 0;
   };
-  EXPECT_EQ(Tool({"scan"}).out, "no network is in range\n");
+}
+
+// How a scan is made when this has been heard.
+std::string WayOfScan(const std::vector<kernel::Result>& heard, std::vector<std::string> options = {}) {
+  kernel::Heard(heard);
+  options.insert(options.begin(), "scan");
+  const Ran ran = Tool(options);
+  return ran.status == 0 ? library::Calls().back() : ran.err;
+}
+
+constexpr Address kCafe = {2, 0, 0, 0, 1, 0};
+
+// The first scan read the results of none, and said that nothing was in range.
+TEST_F(Networks, AreScannedForWhenTheLastResultsAreOldOrNone) {
+  RecordScans();
+  EXPECT_EQ(WayOfScan({}), "renewed");
+  EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 30'000}}), "read");
+  EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 30'001}}), "renewed");
+  EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 40'000}, {.address = kernel::kHome, .msAgo = 1'000}}), "read");
+}
+
+TEST_F(Networks, AreScannedForThoughTheOneThatIsJoinedIsHeardAllTheTime) {
+  RecordScans();
+  const kernel::Result joined{.address = kernel::kHome, .msAgo = 50, .isJoined = true};
+  EXPECT_EQ(WayOfScan({joined}), "renewed");
+  EXPECT_EQ(WayOfScan({joined, {.address = kCafe, .msAgo = 40'000}}), "renewed");
+  EXPECT_EQ(WayOfScan({joined, {.address = kCafe, .msAgo = 9'000}}), "read");
+}
+
+TEST_F(Networks, AreScannedForOrNotAsIsAskedFor) {
+  RecordScans();
+  EXPECT_EQ(WayOfScan({}, {"--cached"}), "read");
+  EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 10}}, {"--renew"}), "renewed");
+  EXPECT_EQ(Tool({"scan", "--cached"}).out, "no network is in range\n");
   EXPECT_EQ(Tool({"scan", "--renew", "--json"}).out, "{\"result\":\"ok\",\"networks\":[]}\n");
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkScan", "0", "MEROWirelessNetworkScan", "1"));
+  EXPECT_EQ(Tool({"scan", "--renew", "--cached"}).status, 2);
+}
+
+// A scan takes the adapter off the channel on which others rely on it.
+TEST_F(Networks, AreNotScannedForWhileTheAdapterIsAnAccessPoint) {
+  RecordScans();
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
+    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
+  };
+  constexpr char kRefusal[] =
+      "merowireless: the access point is on the air, and a scan would disturb it: `merowireless ap disable` takes it "
+      "down; `merowireless scan --cached` shows what was heard last\n";
+  EXPECT_EQ(WayOfScan({}), kRefusal);
+  EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 10}}, {"--renew"}), kRefusal);
+  EXPECT_EQ(Tool({"save", "Elsewhere"}).err, kRefusal);
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_EQ(WayOfScan({}, {"--cached"}), "read");
+  EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 10}}), "read");
 }
 
 TEST_F(Networks, CannotBeScannedForWithoutAnAdapter) {
@@ -57,6 +107,7 @@ TEST_F(Networks, CannotBeScannedForWithoutAnAdapter) {
   EXPECT_EQ(Tool({"scan"}).status, 1);
   library::MEROWirelessAdapterNum = [] { return 0; };
   EXPECT_EQ(Tool({"scan"}).status, 3);
+  EXPECT_EQ(Tool({"scan", "--cached"}).status, 3);
 }
 
 TEST_F(Networks, ThatAreKnownAreListedWithoutTheirSecrets) {

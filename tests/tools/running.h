@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "kernel_fakes.h"
 #include "library_fakes.h"
 #include "tests/support/files.h"
 #include "tests/support/processes.h"
@@ -73,7 +74,10 @@ class Lifeline {
 
 class ToolTest : public testing::Test {
  protected:
-  ToolTest() { library::Reset(); }
+  ToolTest() {
+    library::Reset();
+    kernel::Heard({});
+  }
 };
 
 #endif  // MERO_TESTS_TOOLS_RUNNING_H

@@ -76,11 +76,15 @@ void DescribeMask(CLI::App& command, Addressing& addressing) {
 // ---- Networks ----
 
 struct Scanning {
+  bool cached = false;
   bool renew = false;
+
+  Results results() const { return cached ? Results::kThoseThereAre : renew ? Results::kNew : Results::kUsable; }
 };
 
 void DescribeScanning(CLI::App& command, Scanning& values) {
-  command.add_flag("--renew", values.renew, "scan afresh instead of reading the last results");
+  auto* cached = command.add_flag("--cached", values.cached, "show the last results, however old");
+  command.add_flag("--renew", values.renew, "scan, however new the last results are")->excludes(cached);
 }
 
 struct Listing {
@@ -117,7 +121,7 @@ void DescribeSaving(CLI::App& command, NetworkToSave& values) {
 
 void AddNetworkCommands(Commands& commands) {
   commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
-                         [](const Program& program, const Scanning& values) { Scan(program, values.renew); });
+                         [](const Program& program, const Scanning& values) { Scan(program, values.results()); });
   commands.Add<Listing>(
       "known", "List the networks that have been saved", DescribeListing,
       [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });

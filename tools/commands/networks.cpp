@@ -2,9 +2,11 @@
 #include "commands/networks.h"
 
 #include <algorithm>
+#include <chrono>
 #include <ctime>
 
 #include "common/paths.h"
+#include "model/last_scan.h"
 #include "model/library.h"
 #include "model/security.h"
 
@@ -112,13 +114,25 @@ Network Described(const NetworkToSave& wanted) {
   return network;
 }
 
+// ---- Scanning ----
+
+// Whether the adapter's last results say what is in range now.
+bool AreUsable() {
+  constexpr std::chrono::seconds kOldest{30};
+  const LastScan last = ReadLastScan(MEROWirelessInterfaceGet());
+  return last.age && *last.age <= kOldest;
+}
+
 Failure NotSaved() {
   return Failed("the network could not be saved", "is there room on the disk? -v shows more");
 }
 
 }  // namespace
 
-void Scan(const Program& program, bool renew) {
+void Scan(const Program& program, Results results) {
+  RequireAdapter();
+  const bool renew = results == Results::kNew || (results == Results::kUsable && !AreUsable());
+  if (renew) RequireScanning();
   const auto networks = InRange(program, renew ? WIRELESS_SCAN_RENEW : WIRELESS_SCAN_LAST);
   program.output.List<Network>("networks", kNetworkFields, networks, "no network is in range");
 }

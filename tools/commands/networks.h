@@ -17,7 +17,10 @@ struct NetworkToSave {
   Addressing addressing;
 };
 
-void Scan(const Program& program, bool renew);
+// The results that a list of what is in range is made of. Those that are used are at most half a minute old.
+enum class Results { kUsable, kThoseThereAre, kNew };
+
+void Scan(const Program& program, Results results);
 void ListKnown(const Program& program, bool byTime, bool showSecrets);
 void Save(const Program& program, const NetworkToSave& wanted);
 

@@ -127,6 +127,7 @@ std::vector<KnownNetwork> Known(Order order) {
 }
 
 Network FindInRange(const Program& program, const std::string& name) {
+  RequireScanning();
   const std::optional<Address> address = ParseAddress(name);
   const std::string shown = program.output.Name(name);
   const auto answer = Run<Answer>(program.Doing("looking for " + shown), [&] {
@@ -166,6 +167,13 @@ std::optional<KnownNetwork> FindKnown(const std::string& name) {
 
 void RequireAdapter() {
   if (MEROWirelessAdapterNum() <= 0) throw NoAdapter();
+}
+
+void RequireScanning() {
+  WIRELESS_INFO info{};
+  if (MEROWirelessCurInfoGet(REQUEST_MODE, &info) != 0 || info.opmode != WIRELESS_OPMODE_MASTER) return;
+  throw Failed("the access point is on the air, and a scan would disturb it",
+               "`merowireless ap disable` takes it down; `merowireless scan --cached` shows what was heard last");
 }
 
 void RequireRadio() {

@@ -40,6 +40,9 @@ std::vector<KnownNetwork> AllKnown(const std::string& name);
 // Fails when there is no adapter.
 void RequireAdapter();
 
+// Fails while the adapter is an access point, which would have to leave its channel, and whoever is on it, for a scan.
+void RequireScanning();
+
 // Fails when the user has switched the radio off, or when that cannot be told.
 void RequireRadio();
 

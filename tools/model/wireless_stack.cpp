@@ -1,0 +1,18 @@
+// The kernel's wireless stack, asked about an interface.
+#include "model/wireless_stack.h"
+
+#include <net/if.h>
+
+#include "common/nl80211.h"
+#include "model/library.h"
+
+std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool all) {
+  const unsigned index = ::if_nametoindex(interface.c_str());
+  if (index == 0) return {};
+  nl80211::Answer answer = nl80211::Ask({command, all, index});
+  if (answer.saysNotWireless()) return {};
+  if (answer.error != 0 || answer.failure < 0) {
+    throw Failed("the kernel does not say what " + interface + " does: " + answer.reason());
+  }
+  return std::move(answer.messages);
+}
