@@ -377,13 +377,49 @@ TEST_F(Connection, ThatIsWatchedIsNoLongerWhenNobodyReadsOn) {
 }
 
 TEST_F(Connection, IsShownAgainWhenItHasChanged) {
+  library::g_now = library::kNow;
   int asked = 0;
   library::MEROWirelessConnStatusGet = [asked]() mutable {
     return asked++ < 2 ? WIRELESS_STATUS_DOWN : WIRELESS_STATUS_DISCONNECTED;
   };
   const Ran ran = Tool({"watch", "--count", "2", "--porcelain"});
   EXPECT_EQ(ran.status, 0);
-  EXPECT_EQ(ran.out, "down\t\t\t\t\twlan0\t\t\ton\t\ndisconnected\t\t\t\t\twlan0\t\t\ton\t\n");
+  EXPECT_EQ(ran.out,
+            "down\t\t\t\t\twlan0\t\t\ton\t\t2026-11-20T11:35:28Z\n"
+            "disconnected\t\t\t\t\twlan0\t\t\ton\t\t2026-11-20T11:35:28Z\n");
+}
+
+TEST_F(Connection, IsWatchedByTheClockOnTheWall) {
+  library::g_now = library::kNow;
+  const Surroundings india{.environment = {{"TZ", "XIT-5:30"}}};
+  EXPECT_THAT(Tool({"watch", "--count", "1"}, india).out, HasSubstr("\ntime       17:05:28\n"));
+  EXPECT_THAT(Tool({"watch", "--count", "1", "--json"}, india).out, HasSubstr(R"("time":"2026-11-20T11:35:28Z"}})"));
+  EXPECT_THAT(Tool({"status"}, india).out, Not(HasSubstr("time")));
+}
+
+// The steps of a change were shown too: the address with the mask of its class, then none.
+TEST_F(Connection, IsWatchedWithoutTheAddressesThatItHasOnTheWayToAnother) {
+  library::g_now = library::kNow;
+  Shell("ip link add wlan0 type veth && ip link set wlan0 up");
+  StartedTool tool({"watch", "--count", "2", "--porcelain"});
+  ASSERT_TRUE(Soon([&] { return !tool.OutputSoFar().empty(); }));
+  Shell(
+      "ip address add 10.0.0.9/8 dev wlan0 && sleep 0.05 && ip address delete 10.0.0.9/8 dev wlan0 && sleep 0.05 &&"
+      "ip address add 10.0.0.9/24 dev wlan0");
+  EXPECT_EQ(tool.Wait().out,
+            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\t2026-11-20T11:35:28Z\n"
+            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t10.0.0.9\t255.255.255.0\ton\t\t2026-11-20T11:35:28Z\n");
+  Shell("ip link delete wlan0");
+}
+
+// The news of a busy machine never ends.
+TEST_F(Connection, IsWatchedThoughTheKernelIsNeverQuiet) {
+  Shell("ip link add wlan0 type veth && ip link add noise type veth");
+  const StartedChild noise([] {
+    while (true) Shell("ip link set noise up; ip link set noise down");
+    return 0;
+  });
+  EXPECT_EQ(Tool({"watch", "--count", "1", "--porcelain"}).out.substr(0, 10), "connected\t");
 }
 
 TEST_F(Connection, NeedsARadioThatCanBeSwitched) {

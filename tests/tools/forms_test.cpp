@@ -106,6 +106,7 @@ TEST_F(Forms, OfEveryCommandAreAsTheyAlwaysWere) {
   std::string screens;
   for (const auto& [world, words] : kCommands) {
     library::Reset();
+    library::g_now = library::kNow;
     world();
     screens += Screen(words) + Screen(With(words, "--json")) + Screen(With(words, "--porcelain"));
   }

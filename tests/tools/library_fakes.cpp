@@ -22,6 +22,7 @@ LIBRARY_ACTIONS(DEFINE)
 #undef DEFINE
 
 uid_t g_user = 0;
+std::time_t g_now = 0;
 
 namespace {
 
@@ -33,6 +34,7 @@ void Reset() {
   if (g_calls >= 0) ::close(g_calls);
   g_calls = ::memfd_create("calls", MFD_CLOEXEC);
   g_user = 0;
+  g_now = 0;
 
 #define GIVE_ZERO(name, count) name = [](auto&&...) { return decltype(name)::result_type{}; };
   LIBRARY_ACTIONS(GIVE_ZERO)
@@ -172,4 +174,12 @@ LIBRARY_ACTIONS(DEFINE_ACTION)
 
 extern "C" uid_t geteuid() {
   return library::g_user;
+}
+
+extern "C" std::time_t time(std::time_t* now) noexcept {
+  timespec machine{};
+  ::clock_gettime(CLOCK_REALTIME, &machine);
+  const std::time_t told = library::g_now != 0 ? library::g_now : machine.tv_sec;
+  if (now != nullptr) *now = told;
+  return told;
 }

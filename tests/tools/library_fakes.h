@@ -5,6 +5,7 @@
 
 #include <sys/types.h>
 
+#include <ctime>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -75,6 +76,10 @@ void SavedAp(const MERO_AP_CONF& conf);
 
 // Who runs the program, 0 for root.
 extern uid_t g_user;
+
+// The time, where that is to be the same in every run; 0, as at first, for the machine's.
+extern std::time_t g_now;
+inline constexpr std::time_t kNow = 1795174528;  // 2026-11-20 11:35:28 UTC
 
 // As a unit of the library reports.
 void Report(const char* szUnit, const char* szMessage);

@@ -3,8 +3,8 @@
 
 #include <algorithm>
 #include <chrono>
-#include <ctime>
 
+#include "base/clock.h"
 #include "common/paths.h"
 #include "model/last_scan.h"
 #include "model/library.h"
@@ -59,14 +59,6 @@ constexpr Field<Network> kNetworkFields[] = {
     {"name_hex", "", [](const Network& of) { return NameInHex(of.szEssid); }},
 };
 
-std::string TimeText(std::int32_t seconds, const char* szFormat, std::tm* (*partsOf)(const std::time_t*, std::tm*)) {
-  const std::time_t time = seconds;
-  std::tm parts{};
-  char szText[sizeof "2038-01-19T03:14:07Z"];
-  if (partsOf(&time, &parts) == nullptr || std::strftime(szText, sizeof szText, szFormat, &parts) == 0) return "";
-  return szText;
-}
-
 // The secret is the last field, so that it can be left out.
 constexpr Field<KnownNetwork> kKnownFields[] = {
     {"name", "NAME", [](const KnownNetwork& of) { return Value(of.network.szEssid); }, Layout::kElastic},
@@ -78,10 +70,10 @@ constexpr Field<KnownNetwork> kKnownFields[] = {
     {"mask", "", [](const KnownNetwork& of) { return Value(of.szMask); }},
     {"gateway", "", [](const KnownNetwork& of) { return Value(of.szGateway); }},
     {"saved", "SAVED",
-     [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(TimeText(of.atime, "%FT%TZ", ::gmtime_r)); },
+     [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(UtcText(of.atime)); },
      Layout::kLeft,
      [](const KnownNetwork& of, bool) {
-       return of.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{TimeText(of.atime, "%F %R", ::localtime_r)};
+       return of.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{LocalText(of.atime, "%F %R")};
      }},
     {"address", "ACCESS POINT", [](const KnownNetwork& of) { return Value(AddressText(of.network.bssid)); }},
     {"name_hex", "", [](const KnownNetwork& of) { return NameInHex(of.network.szEssid); }},
