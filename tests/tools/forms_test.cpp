@@ -22,9 +22,13 @@ WIRELESS_NETWORK_CONFIG Home() {
 }
 
 void Connected() {
-  library::InRange({Network("Home"), Network("square", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE)});
+  WIRELESS_NETWORK square = Network("square", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE);
+  square.bssid[5] = 0x0B;
+  square.signal = 70;
+  library::InRange({Network("Home"), square});
   library::Known({Home()});
   library::Connected("Home");
+  kernel::Heard({{.address = kernel::kHome, .isJoined = true}});
 }
 
 void InACell() {

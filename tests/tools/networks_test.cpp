@@ -102,6 +102,43 @@ TEST_F(Networks, AreNotScannedForWhileTheAdapterIsAnAccessPoint) {
   EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 10}}), "read");
 }
 
+TEST_F(Networks, AreListedByTheirStrengthWhateverTheListingToolDoes) {
+  WIRELESS_NETWORK weak = Network("weak"), strong = Network("strong"), fair = Network("fair");
+  weak.signal = -80;
+  strong.signal = -40;
+  fair.signal = -60;
+  library::InRange({weak, strong, fair});
+  WriteText("/tmp/list", Tool({"scan", "--porcelain"}).out);
+  EXPECT_EQ(Shell("cut -f 1 /tmp/list"), "strong\nfair\nweak\n");
+}
+
+TEST_F(Networks, AreMarkedThatAreJoinedOrKnown) {
+  WIRELESS_NETWORK other = Network("Home");
+  other.bssid[5] = 0x0B;
+  other.signal = 50;
+  WIRELESS_NETWORK strange = Network("Strange");
+  strange.bssid[5] = 0x0C;
+  strange.signal = 20;
+  library::InRange({Network("Home"), other, strange});
+  library::Known({Home()});
+  kernel::Heard({{.address = kernel::kHome, .isJoined = true}});
+  EXPECT_EQ(Tool({"scan"}).out,
+            "NAME       SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT       KNOWN\n"
+            "Home     ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A  joined\n"
+            "Home     ▂▄▁▁  50   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0B  yes\n"
+            "Strange  ▂▁▁▁  20   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0C  -\n");
+  WriteText("/tmp/list", Tool({"scan", "--porcelain"}).out);
+  EXPECT_EQ(Shell("cut -f 1,9,10 /tmp/list"), "Home\tyes\tyes\nHome\tno\tyes\nStrange\tno\tno\n");
+  EXPECT_THAT(Tool({"scan", "--json"}).out, HasSubstr(R"("joined":true,"known":true},{"name":"Home","signal":50)"));
+}
+
+// Anybody can put up an open network with a name that is known.
+TEST_F(Networks, AreNotMarkedAsKnownThatOnlyBearAKnownName) {
+  library::Known({Home()});
+  library::InRange({Network("Home", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE)});
+  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::EndsWith("\tno\tno\n"));
+}
+
 TEST_F(Networks, CannotBeScannedForWithoutAnAdapter) {
   library::MEROWirelessNetworkScan = [](WIRELESS_SCAN, WIRELESS_LIST*) { return -1; };
   EXPECT_EQ(Tool({"scan"}).status, 1);

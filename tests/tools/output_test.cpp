@@ -30,9 +30,9 @@ TEST_F(Output, OfAScanIsATableWithAlignedColumnsAndSignalBars) {
   const Ran ran = Tool({"scan"});
   EXPECT_EQ(ran.status, 0);
   EXPECT_EQ(ran.out,
-            "NAME            SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT\n"
-            "Café du coin  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A\n"
-            "guests        ▂▁▁▁   9  11  open      11b/g/n   0A:0A:0A:0A:0A:0A\n");
+            "NAME            SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT       KNOWN\n"
+            "Café du coin  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A  -\n"
+            "guests        ▂▁▁▁   9  11  open      11b/g/n   0A:0A:0A:0A:0A:0A  -\n");
   EXPECT_EQ(ran.err, "");
 }
 
@@ -40,16 +40,16 @@ TEST_F(Output, OfAScanIsOneDocumentInJson) {
   EXPECT_EQ(Tool({"scan", "--json"}).out,
             R"({"result":"ok","networks":[)"
             R"({"name":"Café du coin","signal":74,"channel":6,"auth":"WPA2PSK","encryption":"AES",)"
-            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null},)"
+            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false},)"
             R"({"name":"guests","signal":9,"channel":11,"auth":"OPEN","encryption":"NONE",)"
-            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null}]})"
+            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false}]})"
             "\n");
 }
 
 TEST_F(Output, OfAScanIsARecordALineForScripts) {
   EXPECT_EQ(Tool({"--porcelain", "scan"}).out,
-            "Café du coin\t74\t6\tWPA2PSK\tAES\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\n"
-            "guests\t9\t11\tOPEN\tNONE\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\n");
+            "Café du coin\t74\t6\tWPA2PSK\tAES\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\tno\tno\n"
+            "guests\t9\t11\tOPEN\tNONE\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\tno\tno\n");
 }
 
 TEST_F(Output, KeepsNamesFromBreakingALineForScripts) {
@@ -166,9 +166,9 @@ TEST_F(Output, KeepsToAsciiWhereTheLocaleDoes) {
 TEST_F(Output, AlignsNamesOfWideCharacters) {
   library::InRange({Network("東京"), Network("abcd")});
   EXPECT_EQ(Tool({"scan"}).out,
-            "NAME    SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT\n"
-            "東京  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A\n"
-            "abcd  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A\n");
+            "NAME    SIGNAL  CH  SECURITY  STANDARD  ACCESS POINT       KNOWN\n"
+            "東京  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A  -\n"
+            "abcd  ▂▄▆▁  74   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0A  -\n");
 }
 
 TEST_F(Output, HasColourOnATerminal) {
@@ -185,7 +185,7 @@ TEST_F(Output, FitsItsTablesToTheTerminal) {
   library::InRange({Network("a name that is thirty-two long!!", WIRELESS_AUTH_WPA2PSK,
                             static_cast<WIRELESS_ENCRYPT>(WIRELESS_ENCRYPT_TKIP | WIRELESS_ENCRYPT_AES))});
   const std::string out = ToolOnTerminal({"scan"}, 80, {.environment = {{"NO_COLOR", "1"}}}).out;
-  EXPECT_THAT(out, HasSubstr("\na name that is thirty…  ▂▄▆▁  74   6  WPA2 TKIP+AES  11b/g/n   0A:0A:0A:0A:0A:0A\r\n"));
+  EXPECT_THAT(out, HasSubstr("\na name that is…  ▂▄▆▁  74   6  WPA2 TKIP+AES  11b/g/n   0A:0A:0A:0A:0A:0A  -\r\n"));
 }
 
 TEST_F(Output, ThatCannotBeWrittenIsAFailure) {

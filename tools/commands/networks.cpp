@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <chrono>
+#include <functional>
 
 #include "base/clock.h"
 #include "common/paths.h"
@@ -24,15 +25,15 @@ int QualityOf(int signal) {
   return std::clamp(signal < 0 ? 2 * (signal + 100) : signal, 0, 100);
 }
 
-Shown ShowSignal(const Network& network, bool utf8) {
+Shown ShowSignal(int signal, bool utf8) {
   constexpr std::string_view kBars[] = {"▂", "▄", "▆", "█"};
-  const int quality = QualityOf(network.signal);
+  const int quality = QualityOf(signal);
   const auto lit = static_cast<std::size_t>((quality + 24) / 25);
   std::string text;
   for (std::size_t i = 0; i < std::size(kBars); ++i) {
     text += utf8 ? (i < lit ? kBars[i] : "▁") : (i < lit ? "#" : ".");
   }
-  const std::string figure = std::to_string(network.signal);
+  const std::string figure = std::to_string(signal);
   text += std::string(figure.size() < 4 ? 4 - figure.size() : 1, ' ') + figure;
   return {text, quality >= 60 ? Tone::kGood : quality >= 30 ? Tone::kFair : Tone::kBad};
 }
@@ -47,16 +48,32 @@ Value EncryptionOf(const Network& network) {
   return std::string(MEROWirelessEncryptStringGet(network.encrypt, 0));
 }
 
-constexpr Field<Network> kNetworkFields[] = {
-    {"name", "NAME", [](const Network& of) { return Value(of.szEssid); }, Layout::kElastic},
-    {"signal", "  SIGNAL", [](const Network& of) { return Value(int64_t{of.signal}); }, Layout::kLeft, ShowSignal},
-    {"channel", "CH", [](const Network& of) { return Value(int64_t{of.channel}); }, Layout::kRight},
-    {"auth", "SECURITY", AuthOf, Layout::kLeft,
-     [](const Network& of, bool) { return Shown{SecurityText(of.auth, of.encrypt)}; }},
-    {"encryption", "", EncryptionOf},
-    {"standard", "STANDARD", [](const Network& of) { return Value(MEROWirelessProtocolStringGet(of.protocol)); }},
-    {"address", "ACCESS POINT", [](const Network& of) { return Value(AddressText(of.bssid)); }},
-    {"name_hex", "", [](const Network& of) { return NameInHex(of.szEssid); }},
+// A network in range, and what it is to this appliance.
+struct Found {
+  Network network;
+  bool isJoined;  // through this access point
+  bool isKnown;
+};
+
+Shown ShowKnown(const Found& of, bool) {
+  if (of.isJoined) return {"joined", Tone::kGood};
+  return of.isKnown ? Shown{"yes"} : Shown{"-", Tone::kFaint};
+}
+
+constexpr Field<Found> kFoundFields[] = {
+    {"name", "NAME", [](const Found& of) { return Value(of.network.szEssid); }, Layout::kElastic},
+    {"signal", "  SIGNAL", [](const Found& of) { return Value(int64_t{of.network.signal}); }, Layout::kLeft,
+     [](const Found& of, bool utf8) { return ShowSignal(of.network.signal, utf8); }},
+    {"channel", "CH", [](const Found& of) { return Value(int64_t{of.network.channel}); }, Layout::kRight},
+    {"auth", "SECURITY", [](const Found& of) { return AuthOf(of.network); }, Layout::kLeft,
+     [](const Found& of, bool) { return Shown{SecurityText(of.network.auth, of.network.encrypt)}; }},
+    {"encryption", "", [](const Found& of) { return EncryptionOf(of.network); }},
+    {"standard", "STANDARD",
+     [](const Found& of) { return Value(MEROWirelessProtocolStringGet(of.network.protocol)); }},
+    {"address", "ACCESS POINT", [](const Found& of) { return Value(AddressText(of.network.bssid)); }},
+    {"name_hex", "", [](const Found& of) { return NameInHex(of.network.szEssid); }},
+    {"joined", "", [](const Found& of) { return Value(of.isJoined); }},
+    {"known", "KNOWN", [](const Found& of) { return Value(of.isKnown); }, Layout::kLeft, ShowKnown},
 };
 
 // The secret is the last field, so that it can be left out.
@@ -115,6 +132,28 @@ bool AreUsable() {
   return last.age && *last.age <= kOldest;
 }
 
+// One of a known name that is protected otherwise is another network, or pretends to be that one.
+bool IsSame(const Network& one, const Network& other) {
+  return std::string_view(one.szEssid) == other.szEssid &&
+         SecurityText(one.auth, WIRELESS_ENCRYPT_UNKNOWN) == SecurityText(other.auth, WIRELESS_ENCRYPT_UNKNOWN);
+}
+
+// The networks, the strongest first.
+std::vector<Found> FoundAmong(std::vector<Network> networks) {
+  const auto known = Known(Order::kAsSaved);
+  const auto joined = ReadLastScan(MEROWirelessInterfaceGet()).joined;
+  std::ranges::stable_sort(networks, std::greater{}, &Network::signal);
+  std::vector<Found> found;
+  found.reserve(networks.size());
+  for (const Network& network : networks) {
+    found.push_back({.network = network,
+                     .isJoined = joined && std::ranges::equal(*joined, network.bssid),
+                     .isKnown = std::ranges::any_of(
+                         known, [&](const KnownNetwork& other) { return IsSame(other.network, network); })});
+  }
+  return found;
+}
+
 Failure NotSaved() {
   return Failed("the network could not be saved", "is there room on the disk? -v shows more");
 }
@@ -126,7 +165,7 @@ void Scan(const Program& program, Results results) {
   const bool renew = results == Results::kNew || (results == Results::kUsable && !AreUsable());
   if (renew) RequireScanning();
   const auto networks = InRange(program, renew ? WIRELESS_SCAN_RENEW : WIRELESS_SCAN_LAST);
-  program.output.List<Network>("networks", kNetworkFields, networks, "no network is in range");
+  program.output.List<Found>("networks", kFoundFields, FoundAmong(networks), "no network is in range");
 }
 
 void ListKnown(const Program& program, bool byTime, bool showSecrets) {

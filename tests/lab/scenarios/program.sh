@@ -13,7 +13,7 @@ inside nas tee /var/lib/right.key >/dev/null <<<'deux croissants'
 say '-- what is in range'
 on nas merowireless scan --renew --porcelain
 expect_output <<END
-cafe	-47	6	WPA2PSK	AES	11b/g	$(address_of cafe)	
+cafe	-47	6	WPA2PSK	AES	11b/g	$(address_of cafe)		no	no
 END
 
 say '-- one that came after the last scan'
