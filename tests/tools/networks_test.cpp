@@ -155,7 +155,7 @@ TEST_F(Networks, ThatAreKnownAreListedWithoutTheirSecrets) {
             "Home  WPA2 AES  DHCP     2026-11-20 11:35  0A:0A:0A:0A:0A:0A\n");
   EXPECT_EQ(Tool({"known", "--json"}).out,
             R"({"result":"ok","networks":[{"name":"Home","auth":"WPA2PSK","encryption":"AES","mode":"MANAGED",)"
-            R"("ip":"DHCP","mask":"","gateway":"","saved":"2026-11-20T11:35:28Z","address":"0A:0A:0A:0A:0A:0A",)"
+            R"("ip":"DHCP","mask":null,"gateway":null,"saved":"2026-11-20T11:35:28Z","address":"0A:0A:0A:0A:0A:0A",)"
             R"("name_hex":null,"has_secret":true}]})"
             "\n");
   EXPECT_EQ(Tool({"known", "--porcelain"}).out,

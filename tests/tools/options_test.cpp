@@ -42,7 +42,7 @@ TEST_F(CommandLine, ThatNamesNoCommandIsToldSo) {
 
 TEST_F(CommandLine, ThatIsWrongIsExplainedToMachinesToo) {
   const std::string document = R"({"result":"failed","code":2,"error":"there are more arguments than were expected",)"
-                               R"("advice":"`merowireless --help` tells more"})"
+                               R"("advice":"`merowireless --help` tells more","reason":"wrong-usage"})"
                                "\n";
   EXPECT_EQ(Tool({"--json", "scan", "--bogus"}).out, document);
   EXPECT_EQ(Tool({"scan", "--bogus", "--json"}).out, document);

@@ -3,9 +3,12 @@
 #include <unistd.h>
 
 #include <cstdio>
+#include <map>
 #include <nlohmann/json.hpp>
+#include <sstream>
 
 #include "app/run.h"
+#include "base/failure.h"
 #include "base/text.h"
 #include "running.h"
 
@@ -242,9 +245,49 @@ TEST_F(Output, OfAFailureIsASentenceAndInJsonADocumentToo) {
   EXPECT_EQ(ran.status, 3);
   EXPECT_EQ(ran.err, "merowireless: no adapter is plugged in: plug in a wireless USB adapter and try again\n");
   EXPECT_EQ(ran.out, R"({"result":"failed","code":3,"error":"no adapter is plugged in",)"
-                     R"("advice":"plug in a wireless USB adapter and try again"})"
+                     R"("advice":"plug in a wireless USB adapter and try again","reason":"no-adapter"})"
                      "\n");
   EXPECT_EQ(Tool({"connect", "Home", "--porcelain"}).out, "");
+}
+
+// The rows of a table in a document whose cells are a number and a word in backquotes.
+std::map<int, std::string> WordsIn(const std::string& document) {
+  std::map<int, std::string> words;
+  std::istringstream lines(document);
+  for (std::string line; std::getline(lines, line);) {
+    int number = 0;
+    char szWord[32];
+    if (std::sscanf(line.c_str(), "| %d | `%31[^`]` |", &number, szWord) == 2) words[number] = szWord;
+  }
+  return words;
+}
+
+TEST_F(Output, OfAFailureHasTheWordForItsExitStatusThatIsDocumented) {
+  std::map<int, std::string> words;
+  for (const ExitMeaning& meaning : kExitMeanings) words[static_cast<int>(meaning.exit)] = meaning.word;
+  words.erase(0);
+  EXPECT_EQ(words, WordsIn(ReadText(MERO_SOURCE "/docs/json.md")));
+
+  library::MEROWirelessCheckBlock = [] { return 0; };
+  const std::vector<std::vector<std::string>> failures = {{"radio", "sideways"}, {"forget", "Nowhere"}, {"connect", "a"}};
+  for (std::vector<std::string> command : failures) {
+    command.emplace_back("--json");
+    const Ran ran = Tool(command);
+    EXPECT_EQ(nlohmann::json::parse(ran.out)["reason"], words[ran.status]) << ran.out;
+  }
+}
+
+// There were texts without a character, where other fields had null.
+TEST_F(Output, IsNullInJsonWhereNothingIsMeant) {
+  WIRELESS_NETWORK_CONFIG open{};
+  open.network = Network("open", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE);
+  library::Known({open});
+  EXPECT_THAT(Tool({"known", "--json", "--show-secrets"}).out,
+              HasSubstr(R"("ip":null,"mask":null,"gateway":null,"saved":null,)"));
+  const auto settings = nlohmann::json::parse(Tool({"ap", "show", "--json", "--show-secrets"}).out)["access_point"];
+  for (const char* szKey : {"ssid", "bridge", "guest_net_ssid", "secret", "guest_net_secret"}) {
+    EXPECT_TRUE(settings[szKey].is_null()) << szKey << settings;
+  }
 }
 
 }  // namespace

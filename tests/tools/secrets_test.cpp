@@ -70,7 +70,7 @@ TEST_F(Secrets, CanBeRefusedWhileTheyComeFromTheStandardInput) {
   const Ran ran = tool.Wait();
   EXPECT_EQ(ran.status, 130);
   EXPECT_EQ(ran.out, R"({"result":"failed","code":130,"error":"interrupted, and nothing of the command goes on",)"
-                     R"("advice":"run it again"})"
+                     R"("advice":"run it again","reason":"interrupted"})"
                      "\n");
   EXPECT_THAT(library::Calls(), IsEmpty());
 }

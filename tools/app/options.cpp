@@ -9,6 +9,7 @@
 #include <sstream>
 
 #include "base/choices.h"
+#include "base/failure.h"
 #include "commands/access_point.h"
 #include "commands/adapter.h"
 #include "commands/addressing.h"
@@ -19,12 +20,15 @@
 
 namespace {
 
-constexpr char kAbout[] =
-    "Manages the appliance's wireless networking.\n"
-    "\n"
-    "Exit status: 0 done, 1 failed, 2 wrong usage, 3 no adapter, 4 no such network or\n"
-    "out of range, 5 secret refused, 6 radio switched off, 7 no address yet, 8 busy,\n"
-    "9 timed out, 10 protected in a way that cannot be joined, 130 interrupted.";
+// What the program is for, and what its exit statuses mean.
+std::string About() {
+  std::string statuses;
+  for (const ExitMeaning& meaning : kExitMeanings) {
+    statuses += (statuses.empty() ? "" : ", ") + std::to_string(static_cast<int>(meaning.exit)) + " ";
+    statuses += meaning.text;
+  }
+  return "Manages the appliance's wireless networking.\n\nExit status: " + statuses + ".";
+}
 
 // Adds commands: a name, a sentence of help, the function that describes the options, and the one that acts on their
 // values. The values live as long as the action, which holds them.
@@ -258,7 +262,7 @@ std::string Complaint(const CLI::App& app, const CLI::ParseError& error) {
 
 Options ParseOptions(int argc, const char* const* argv) {
   Options options;
-  CLI::App app(kAbout, "merowireless");
+  CLI::App app(About(), "merowireless");
   bool json = false;
   bool porcelain = false;
   auto* jsonFlag = app.add_flag("--json", json, "write one JSON document");

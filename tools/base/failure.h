@@ -2,8 +2,11 @@
 #ifndef MERO_TOOLS_FAILURE_H
 #define MERO_TOOLS_FAILURE_H
 
+#include <algorithm>
+#include <iterator>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 
 // Exit codes are part of the interface: scripts depend on them.
 enum class Exit : int {
@@ -20,6 +23,34 @@ enum class Exit : int {
   kUnsupported = 10,  // protected in a way that cannot be joined
   kInterrupted = 130,
 };
+
+// What an exit status means: as a word for machines, and in the help.
+struct ExitMeaning {
+  std::string_view word;
+  std::string_view text;
+  Exit exit;
+};
+
+// Each status has a row here, one in docs/json.md and one in the manual.
+inline constexpr ExitMeaning kExitMeanings[] = {
+    {"done", "done", Exit::kDone},
+    {"failed", "failed", Exit::kFailed},
+    {"wrong-usage", "wrong usage", Exit::kUsage},
+    {"no-adapter", "no adapter", Exit::kNoAdapter},
+    {"out-of-range", "no such network or out of range", Exit::kOutOfRange},
+    {"secret-refused", "secret refused", Exit::kSecretRefused},
+    {"radio-off", "radio switched off", Exit::kRadioOff},
+    {"no-address", "no address yet", Exit::kNoLease},
+    {"busy", "busy", Exit::kBusy},
+    {"timed-out", "timed out", Exit::kTimedOut},
+    {"unsupported", "protected in a way that cannot be joined", Exit::kUnsupported},
+    {"interrupted", "interrupted", Exit::kInterrupted},
+};
+
+inline std::string_view WordOf(Exit exit) {
+  const auto* found = std::ranges::find(kExitMeanings, exit, &ExitMeaning::exit);
+  return found != std::end(kExitMeanings) ? found->word : "failed";
+}
 
 // A failure that the user is told about: what happened, and what to do next.
 class Failure : public std::runtime_error {

@@ -22,8 +22,11 @@ void Put(std::string_view text) {
 
 // ---- JSON: one document a line ----
 
+// A text without a character is none.
 Json JsonOf(const Value& value) {
-  return std::visit([](const auto& held) { return Json(held); }, value);
+  return std::visit(Overloaded{[](const auto& held) { return Json(held); },
+                               [](const std::string& held) { return held.empty() ? Json(nullptr) : Json(held); }},
+                    value);
 }
 
 Json JsonOf(const Table& table, std::size_t row) {
@@ -225,6 +228,7 @@ void Output::Failed(const Failure& failure) const {
   PutDocument({{"result", "failed"},
                {"code", static_cast<int>(failure.exit())},
                {"error", failure.what()},
-               {"advice", failure.advice()}},
+               {"advice", failure.advice()},
+               {"reason", WordOf(failure.exit())}},
               MachinesSeeUtf8());
 }
