@@ -35,23 +35,79 @@ TEST_F(CommandLine, ThatIsWrongIsExplainedInOneLine) {
 }
 
 TEST_F(CommandLine, ThatNamesNoCommandIsToldSo) {
-  EXPECT_EQ(Tool({"bogus"}).err, "merowireless: there is no such command: `merowireless --help` tells more\n");
-  EXPECT_EQ(Tool({"ap", "bogus"}).err, "merowireless: there is no such command: `merowireless --help` tells more\n");
-  EXPECT_EQ(Tool({"ap"}).err, "merowireless: a command is missing: `merowireless --help` tells more\n");
+  EXPECT_EQ(Tool({"bogus"}).err, "merowireless: there is no such command: `merowireless --help` lists them\n");
+  EXPECT_EQ(Tool({"ap", "bogus"}).err, "merowireless: there is no such command: `merowireless ap --help` lists them\n");
+  EXPECT_EQ(Tool({"ap"}).err, "merowireless: a command is missing: `merowireless ap --help` lists them\n");
+}
+
+TEST_F(CommandLine, ThatHasTooMuchIsToldSo) {
+  EXPECT_EQ(Tool({"save", "Home", "--key-stdin=x"}).err,
+            "merowireless: an option takes no value and was given one: `merowireless save --help` tells more\n");
+}
+
+TEST_F(CommandLine, ThatMisspellsACommandIsToldTheOneThatIsMeant) {
+  const std::pair<std::vector<std::string>, std::string> rows[] = {
+      {{"scna"}, "scan"},     {{"conect", "Home"}, "connect"}, {{"stauts", "--json"}, "status"},
+      {{"disc"}, "disconnect"}, {{"ap", "enabel"}, "enable"},
+  };
+  for (const auto& [words, meant] : rows) {
+    EXPECT_THAT(Tool(words).err, HasSubstr("there is no such command: is " + meant + " meant? ")) << words.front();
+  }
+}
+
+// All that was said of one was that there were more arguments than expected.
+TEST_F(CommandLine, ThatHasAnUnknownOptionIsToldItAndTheOneThatIsMeant) {
+  const std::pair<std::vector<std::string>, std::string> rows[] = {
+      {{"scan", "--renwe"}, "there is no option --renwe: is --renew meant? `merowireless scan --help` lists those that "},
+      {{"scan", "--bogus"}, "there is no option --bogus: `merowireless scan --help` lists those that there are\n"},
+      {{"scan", "--jsn"}, "there is no option --jsn: is --json meant? "},
+      {{"--porcelian", "scan"}, "there is no option --porcelian: is --porcelain meant? "},
+      {{"--bogus"}, "there is no option --bogus: `merowireless --help` lists"},
+      {{"save", "Home", "--key"}, "there is no option --key: is --key-file meant? "},
+      {{"ap", "set", "--chanel", "6"}, "there is no option --chanel: is --channel meant? `merowireless ap set --help` "},
+      {{"scan", "-x"}, "there is no option -x: `merowireless scan --help` lists"},
+  };
+  for (const auto& [words, message] : rows) {
+    const Ran ran = Tool(words);
+    EXPECT_EQ(ran.status, 2);
+    EXPECT_THAT(ran.err, HasSubstr("merowireless: " + message)) << testing::PrintToString(words);
+  }
+}
+
+// The secret was asked for where the name of its file was empty, and else "1 required TEXT missing" was said.
+TEST_F(CommandLine, ThatLacksTheValueOfAnOptionIsToldWhichOne) {
+  const std::pair<std::vector<std::string>, std::string> rows[] = {
+      {{"save", "Home", "--key-file"}, "--key-file is given without its value: write --key-file FILE\n"},
+      {{"save", "Home", "--key-file", "--ip", "DHCP"}, "--key-file is given without its value: "},
+      {{"save", "Home", "--key-file", ""}, "--key-file is given without its value: "},
+      {{"ap", "set", "--guest-net-key-file", ""}, "--guest-net-key-file is given without its value: "},
+      {{"watch", "--count"}, "--count is given without its value: write --count N\n"},
+      {{"ap", "set", "--encryption"}, "--encryption is given without its value: write --encryption open|wep|wpa|wpa2|"},
+  };
+  for (const auto& [words, message] : rows) {
+    const Ran ran = Tool(words);
+    EXPECT_EQ(ran.status, 2);
+    EXPECT_THAT(ran.err, HasSubstr("merowireless: " + message)) << testing::PrintToString(words);
+  }
 }
 
 TEST_F(CommandLine, ThatIsWrongIsExplainedToMachinesToo) {
   const std::string document = R"({"result":"failed","code":2,"error":"there are more arguments than were expected",)"
-                               R"("advice":"`merowireless --help` tells more","reason":"wrong-usage"})"
+                               R"("advice":"`merowireless scan --help` tells more","reason":"wrong-usage"})"
                                "\n";
-  EXPECT_EQ(Tool({"--json", "scan", "--bogus"}).out, document);
-  EXPECT_EQ(Tool({"scan", "--bogus", "--json"}).out, document);
+  EXPECT_EQ(Tool({"--json", "scan", "bogus"}).out, document);
+  EXPECT_EQ(Tool({"scan", "bogus", "--json"}).out, document);
   EXPECT_THAT(Tool({"scan", "--json", "--porcelain"}).out, HasSubstr("--json excludes --porcelain"));
 }
 
 TEST_F(CommandLine, ThatIsWrongIsNotRepeatedSinceItMayHoldASecret) {
   const std::vector<std::vector<std::string>> wrong = {{"save", "Home", "open-sesame"},
                                                        {"save", "Home", "--key-stdin=open-sesame"},
+                                                       {"save", "Home", "--key=open-sesame"},
+                                                       {"save", "Home", "--pass", "open-sesame"},
+                                                       {"save", "Home", "-popen-sesame"},
+                                                       {"save", "Home", "--", "-open-sesame"},
+                                                       {"open-sesame"},
                                                        {"mode", "open-sesame"},
                                                        {"radio", "open-sesame"},
                                                        {"watch", "--count", "open-sesame"},

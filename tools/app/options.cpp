@@ -7,9 +7,12 @@
 #include <limits>
 #include <memory>
 #include <sstream>
+#include <vector>
 
+#include "app/spelling.h"
 #include "base/choices.h"
 #include "base/failure.h"
+#include "base/text.h"
 #include "commands/access_point.h"
 #include "commands/adapter.h"
 #include "commands/addressing.h"
@@ -68,8 +71,16 @@ class Commands {
   Options& options_;
 };
 
+// No file has an empty name, which a script gives whose variable is not set; and what looks like an option is one. The
+// answer is a complaint, or empty.
+std::string HasName(const std::string& file) {
+  return file.empty() || file.starts_with("--") ? "it is no name" : "";
+}
+
 void DescribeSecret(CLI::App& command, SecretSource& source) {
-  auto* file = command.add_option("--key-file", source.file, "read the secret from FILE")->option_text("FILE");
+  auto* file = command.add_option("--key-file", source.file, "read the secret from FILE")
+                   ->option_text("FILE")
+                   ->check(HasName);
   command.add_flag("--key-stdin", source.standardInput, "read the secret from the standard input")->excludes(file);
 }
 
@@ -212,7 +223,8 @@ void AddApCommands(Commands& commands, CLI::App& app) {
         }
         DescribeSecret(command, values.secret);
         command.add_option("--guest-net-key-file", values.guestKeyFile, "read the guest network's secret from FILE")
-            ->option_text("FILE");
+            ->option_text("FILE")
+            ->check(HasName);
       },
       SetAp);
   commands.AddPlain(*ap, "enable", "Put the access point on the air", EnableAp);
@@ -245,17 +257,108 @@ void FallThrough(CLI::App& app) {
   }
 }
 
+// ---- Command lines that cannot be understood ----
+//
+// What is said of them repeats none of the arguments but the names of options: any other may be a secret at a wrong
+// place.
+
 bool LacksCommand(const CLI::App& app) {
   const auto given = app.get_subcommands();
   return given.empty() ? app.get_require_subcommand_min() > 0 : LacksCommand(*given.front());
 }
 
-// Says why the command line is wrong. It repeats none of the arguments: one may be a secret at a wrong place.
-std::string Complaint(const CLI::App& app, const CLI::ParseError& error) {
-  if (LacksCommand(app)) return app.remaining(true).empty() ? "a command is missing" : "there is no such command";
-  if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr) return "there are more arguments than were expected";
-  if (dynamic_cast<const CLI::ConversionError*>(&error) != nullptr) return "an option takes no value and was given one";
-  return Harmless(error.what(), false);
+// The commands that are given, such as "ap set", each with those above it: the program itself is the first.
+std::vector<const CLI::App*> GivenCommands(const CLI::App& app) {
+  std::vector<const CLI::App*> commands{&app};
+  while (!commands.back()->get_subcommands().empty()) commands.push_back(commands.back()->get_subcommands().front());
+  return commands;
+}
+
+std::string HelpOf(const std::vector<const CLI::App*>& commands) {
+  std::string help = "`";
+  for (const CLI::App* command : commands) help += command->get_name() + " ";
+  return help + "--help`";
+}
+
+std::vector<std::string> OptionsOf(const std::vector<const CLI::App*>& commands) {
+  std::vector<std::string> options;
+  for (const CLI::App* command : commands) {
+    for (const CLI::Option* option : command->get_options([](const CLI::Option* each) { return each->nonpositional(); })) {
+      std::istringstream names(option->get_name(false, true));
+      for (std::string name; std::getline(names, name, ',');) {
+        if (name.starts_with("--")) options.push_back(name);
+      }
+    }
+  }
+  return options;
+}
+
+std::vector<std::string> CommandsOf(const CLI::App& app) {
+  std::vector<std::string> names;
+  for (const CLI::App* command : app.get_subcommands([](const CLI::App*) { return true; })) {
+    names.push_back(command->get_name());
+  }
+  return names;
+}
+
+// The first argument that is written as an option and is none, without its value; empty when all are.
+std::string UnknownOption(const std::vector<std::string>& unexpected) {
+  for (const std::string& argument : unexpected) {
+    if (argument == "--") break;
+    if (argument.starts_with("--")) return argument.substr(0, argument.find('='));
+    if (argument.size() > 1 && argument.starts_with('-')) return argument.substr(0, 2);
+  }
+  return "";
+}
+
+// `tells` says what the help is good for.
+std::string Advice(const std::string& meant, const std::vector<const CLI::App*>& commands, const std::string& tells) {
+  return (meant.empty() ? "" : "is " + meant + " meant? ") + HelpOf(commands) + " " + tells;
+}
+
+Failure NoSuchOption(const std::string& option, const std::vector<const CLI::App*>& commands) {
+  return Wrong("there is no option " + Harmless(option, false),
+               Advice(Nearest(option, OptionsOf(commands)), commands, "lists those that there are"));
+}
+
+// There is no word when none was given.
+Failure NoSuchCommand(const std::vector<std::string>& unexpected, const std::vector<const CLI::App*>& commands) {
+  if (unexpected.empty()) return Wrong("a command is missing", Advice("", commands, "lists them"));
+  return Wrong("there is no such command",
+               Advice(Nearest(unexpected.front(), CommandsOf(*commands.back())), commands, "lists them"));
+}
+
+// The option that an error begins with: "--key-file: 1 required TEXT missing".
+const CLI::Option* OptionIn(const std::string& error, const std::vector<const CLI::App*>& commands) {
+  const std::string name = error.substr(0, error.find(':'));
+  for (const CLI::App* command : commands) {
+    if (const CLI::Option* option = command->get_option_no_throw(name)) return option;
+  }
+  return nullptr;
+}
+
+Failure LacksValue(const CLI::Option& option) {
+  const std::string name = option.get_name();
+  return Wrong(name + " is given without its value", "write " + name + " " + option.get_option_text());
+}
+
+Failure Complaint(const CLI::App& app, const CLI::ParseError& error) {
+  const auto unexpected = app.remaining(true);
+  const auto commands = GivenCommands(app);
+  if (const auto option = UnknownOption(unexpected); !option.empty()) return NoSuchOption(option, commands);
+  if (LacksCommand(app)) return NoSuchCommand(unexpected, commands);
+  const std::string more = Advice("", commands, "tells more");
+  if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr) {
+    return Wrong("there are more arguments than were expected", more);
+  }
+  if (dynamic_cast<const CLI::ConversionError*>(&error) != nullptr) {
+    return Wrong("an option takes no value and was given one", more);
+  }
+  if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) != nullptr ||
+      dynamic_cast<const CLI::ValidationError*>(&error) != nullptr) {
+    if (const CLI::Option* option = OptionIn(error.what(), commands)) return LacksValue(*option);
+  }
+  return Wrong(Harmless(error.what(), false), more);
 }
 
 }  // namespace

@@ -5,6 +5,7 @@
 #include <functional>
 #include <string>
 
+#include "base/failure.h"
 #include "show/output.h"
 #include "work/program.h"
 
@@ -22,7 +23,7 @@ struct Help {
 // A command line that cannot be understood: why, and the form in which to say so.
 struct WrongUsage {
   Form form;
-  std::string text;
+  Failure why;
 };
 
 // Throws Help or WrongUsage.

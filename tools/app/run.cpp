@@ -70,6 +70,6 @@ int RunProgram(int argc, const char* const* argv) {
     return Finish(Status(Exit::kDone));
   } catch (const WrongUsage& wrong) {
     const Output output(wrong.form, TerminalOf(STDOUT_FILENO));
-    return Finish(Report(output, Wrong(wrong.text, "`merowireless --help` tells more")));
+    return Finish(Report(output, wrong.why));
   }
 }
