@@ -291,7 +291,7 @@ TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirSecret) {
 
 TEST_F(Networks, AreNotSavedWithWhatCannotBeTheirAddress) {
   const std::vector<std::vector<std::string>> wrong = {
-      {"--ip", "dhcp"},
+      {"--ip", "dhcpd"},
       {"--ip", "10.0.0.256", "--mask", "255.0.0.0"},
       {"--ip", "10.0.0.1"},
       {"--ip", "10.0.0.1", "--mask", "255.0.255.0"},

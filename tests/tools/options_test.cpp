@@ -120,6 +120,38 @@ TEST_F(CommandLine, ThatIsWrongIsNotRepeatedSinceItMayHoldASecret) {
   }
 }
 
+// Each of these words had to be in small letters, and DHCP in capitals.
+TEST_F(CommandLine, HasItsWordsInCapitalsOrInSmallLetters) {
+  WriteText("/tmp/secret", "open sesame\n");
+  library::SavedAp(library::Office());
+  library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG* config) {
+    library::Record(std::string(config->szIp) + "|" + std::to_string(config->network.auth));
+    return 0;
+  };
+  library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE mode) { return library::Record(std::to_string(mode)), TRUE; };
+  const std::pair<std::vector<std::string>, std::string> rows[] = {
+      {{"save", "Hidden", "--bssid", "00:11:22:33:44:55", "--security", "WPA2", "--key-file", "/tmp/secret", "--ip",
+        "dhcp"},
+       "DHCP|5"},
+      {{"save", "Hidden", "--bssid", "00:11:22:33:44:55", "--security", "Open", "--ip", "None"}, "|1"},
+      {{"mode", "AP"}, "0"},
+      {{"mode", "Client"}, "1"},
+      {{"radio", "Off"}, "PLIBCFileSetSectionValue"},
+      {{"radio", "ON"}, "PLIBCFileSetSectionValue"},
+      {{"address", "dhcp"}, "MEROWirelessIfconfigSet"},
+  };
+  for (const auto& [words, done] : rows) {
+    const Ran ran = Tool(words);
+    EXPECT_EQ(ran.status, 0) << ran.err;
+    EXPECT_EQ(library::Calls().back(), done) << testing::PrintToString(words);
+  }
+  const Ran ran = Tool({"ap", "set", "--encryption", "WPA2", "--wpa-encrypt-type", "Both", "--channel", "AUTO",
+                        "--wmm-enabled", "No", "--hw-mode", "GN", "--wifi-sched", "OFF", "--json"});
+  EXPECT_THAT(ran.out, HasSubstr(R"("encryption":"wpa2","wpa_encrypt_type":"both")")) << ran.err;
+  EXPECT_THAT(ran.out, HasSubstr(R"("channel":0,)"));
+  EXPECT_THAT(ran.out, HasSubstr(R"("wmm_enabled":false)"));
+}
+
 TEST_F(CommandLine, ExplainsItselfOnRequest) {
   const Ran ran = Tool({"--help"});
   EXPECT_EQ(ran.status, 0);

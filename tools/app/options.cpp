@@ -238,14 +238,14 @@ void AddAdapterCommands(Commands& commands) {
       [](CLI::App& command, std::string& mode) {
         command.add_option("mode", mode, "ap or client")->required()->option_text("ap|client");
       },
-      ChangeMode);
+      [](const Program& program, const std::string& mode) { ChangeMode(program, Lower(mode)); });
   commands.Add<std::string>(
       "radio", "Show whether the radio may be used, or switch it",
       [](CLI::App& command, std::string& state) {
         command.add_option("state", state, "on or off; nothing shows it")->option_text("[on|off]");
       },
       [](const Program& program, const std::string& state) {
-        state.empty() ? ShowRadio(program) : SwitchRadio(program, state);
+        state.empty() ? ShowRadio(program) : SwitchRadio(program, Lower(state));
       });
 }
 

@@ -20,7 +20,7 @@ std::string Choices(std::span<const Row> rows) {
 
 template <class Row>
 const Row& RowOf(std::span<const Row> rows, const std::string& text, std::string_view option) {
-  const auto found = std::ranges::find(rows, text, &Row::text);
+  const auto found = std::ranges::find_if(rows, [&](const Row& row) { return IsWord(text, row.text); });
   if (found == rows.end()) {
     throw Wrong("--" + std::string(option) + " cannot be this", "it is one of " + Choices(rows));
   }

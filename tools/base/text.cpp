@@ -161,6 +161,18 @@ bool IsNetmask(const std::string& text) {
   return zeros != UINT32_MAX && (zeros & (zeros + 1)) == 0;
 }
 
+std::string Lower(std::string_view text) {
+  std::string lower(text);
+  for (char& c : lower) {
+    if (c >= 'A' && c <= 'Z') c = static_cast<char>(c - 'A' + 'a');
+  }
+  return lower;
+}
+
+bool IsWord(std::string_view text, std::string_view word) {
+  return Lower(text) == Lower(word);
+}
+
 std::optional<int> ParseNumber(std::string_view text) {
   int number = 0;
   const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);

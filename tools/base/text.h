@@ -43,6 +43,10 @@ bool IsIpAddress(const std::string& text);
 // A dotted netmask: ones, then zeros.
 bool IsNetmask(const std::string& text);
 
+// ASCII letters as small ones. A word of the command line may be written in either.
+std::string Lower(std::string_view text);
+bool IsWord(std::string_view text, std::string_view word);
+
 // A whole decimal number.
 std::optional<int> ParseNumber(std::string_view text);
 

@@ -1,10 +1,11 @@
 // The commands about the interface's address and gateway.
 #include "commands/addressing.h"
 
+#include "base/text.h"
 #include "model/status.h"
 
 void SetAddress(const Program& program, const Addressing& addressing) {
-  if (addressing.ip == "none") throw Wrong("none is no address", "`merowireless disconnect` takes the address away");
+  if (IsWord(addressing.ip, "none")) throw Wrong("none is no address", "`merowireless disconnect` takes the address away");
   KnownNetwork config{};
   SetAddressing(config, addressing);
   RequireAdapter();

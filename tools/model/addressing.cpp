@@ -70,13 +70,15 @@ void RequireGateway(const std::string& gateway) {
 }
 
 void SetAddressing(KnownNetwork& config, const Addressing& addressing) {
-  if (addressing.ip != "DHCP" && addressing.ip != "none") {
+  const bool isDhcp = IsWord(addressing.ip, "DHCP");
+  const bool isNone = IsWord(addressing.ip, "none");
+  if (!isDhcp && !isNone) {
     RequireStatic(addressing);
   } else if (!addressing.mask.empty() || !addressing.gateway.empty()) {
     throw Wrong("only a static address has a netmask and a gateway of its own", "add --ip A.B.C.D");
   }
   if (!addressing.gateway.empty()) RequireGateway(addressing.gateway);
-  SetText(config.szIp, addressing.ip == "none" ? "" : addressing.ip, "the address");
+  SetText(config.szIp, isNone ? "" : isDhcp ? "DHCP" : addressing.ip, "the address");
   SetText(config.szMask, addressing.mask, "the netmask");
   SetText(config.szGateway, addressing.gateway, "the gateway");
 }

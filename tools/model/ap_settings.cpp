@@ -82,7 +82,7 @@ void RequireChannel(const ApConf& conf) {
 
 void SetChannel(ApConf& conf, const std::string& text) {
   constexpr int kLast = k5GHzChannels[std::size(k5GHzChannels) - 1];
-  conf.hostapConf.channel = text == "auto" ? 0 : NumberOf(text, 1, kLast, "channel");
+  conf.hostapConf.channel = IsWord(text, "auto") ? 0 : NumberOf(text, 1, kLast, "channel");
 }
 
 bool HasEap(const ApConf& conf) {
@@ -124,7 +124,7 @@ void SetBridge(ApConf& conf, const std::string& text) {
 
 // The hours of a week as 168 zeros and ones, white space between them aside.
 void SetSchedule(MERO_WIFI_SCHED_CONF& schedule, const std::string& path) {
-  if (path == "off") {
+  if (IsWord(path, "off")) {
     schedule.wifiSchedEnabled = 0;
     return;
   }
@@ -290,7 +290,7 @@ constexpr ApSetting kSettings[] = {
           [](const ApConf& of) { return Value(ProtectionText(Guest(of).encryption, Guest(of).encryptInfo)); }),
      "open|wep|wpa|wpa2|mixed", "how the guest network is protected",
      [](ApConf& of, const std::string& text) {
-       if (text == "eap") throw Wrong("a guest network cannot have EAP", "use wpa2");
+       if (IsWord(text, "eap")) throw Wrong("a guest network cannot have EAP", "use wpa2");
        SetProtection(Guest(of).encryption, Guest(of).encryptInfo, text, kGuestOptions);
      }},
     {Told("guest_net_wpa_encrypt_type",

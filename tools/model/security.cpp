@@ -5,6 +5,7 @@
 #include <cctype>
 
 #include "base/failure.h"
+#include "base/text.h"
 #include "platform.h"
 
 namespace {
@@ -85,7 +86,7 @@ bool CanBeSecret(WIRELESS_AUTH auth, std::string_view secret) {
 }
 
 bool SetSecurity(WIRELESS_NETWORK& network, std::string_view name) {
-  const auto* found = std::ranges::find(kSecurities, name, &Security::name);
+  const auto* found = std::ranges::find_if(kSecurities, [&](const Security& each) { return IsWord(name, each.name); });
   if (name.empty() || found == std::end(kSecurities)) return false;
   network.auth = found->auth;
   network.encrypt = static_cast<WIRELESS_ENCRYPT>(found->encrypt);
