@@ -94,11 +94,14 @@ TEST_F(Messages, TellOfNetworksWhyTheyAreNotListed) {
 TEST_F(Messages, TellOfAddressesWhyTheyAreNotSet) {
   ExpectMessages({
       {AsItIs, {"address", "nowhere"}, "this is no IPv4 address: nowhere"},
-      {AsItIs, {"address", "10.0.0.9"}, "a static address needs its netmask"},
+      {AsItIs, {"address", "10.0.0.9"}, "a static address and its netmask go together"},
+      {AsItIs, {"address", "10.0.0.9", "--mask", "255.0.255.0"}, "this is no netmask: 255.0.255.0"},
       {AsItIs, {"address", "none"}, "none is no address"},
       {AsItIs,
        {"address", "DHCP", "--mask", "255.0.0.0"},
-       "only a static address has a netmask and a gateway of its own"},
+       "a static address and its netmask go together"},
+      {AsItIs, {"save", "Home", "--mask", "255.0.0.0"}, "a static address and its netmask go together"},
+      {AsItIs, {"save", "Home", "--gateway", "10.0.0.1"}, "only a static address has a gateway of its own"},
       {AsItIs, {"gateway", "there"}, "the gateway is no IPv4 address"},
       {[] { library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) { return -1; }; },
        {"address", "DHCP"},

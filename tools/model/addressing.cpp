@@ -36,13 +36,20 @@ bool IsInSubnet(const std::string& gateway, const std::string& ip, const std::st
   return ((NumberOf(gateway) ^ NumberOf(ip)) & NumberOf(mask)) == 0;
 }
 
+// One message for both ways in which one of the two can be missing.
+Failure MaskWithoutAddress() {
+  return Wrong("a static address and its netmask go together",
+               "give both, such as 192.168.1.20 with --mask 255.255.255.0, or neither");
+}
+
 void RequireStatic(const Addressing& addressing) {
   if (!IsIpAddress(addressing.ip)) {
     throw Wrong("this is no IPv4 address: " + Harmless(addressing.ip, false),
                 "give DHCP or an address such as 192.168.1.20");
   }
+  if (addressing.mask.empty()) throw MaskWithoutAddress();
   if (!IsNetmask(addressing.mask)) {
-    throw Wrong("a static address needs its netmask", "add --mask, such as 255.255.255.0");
+    throw Wrong("this is no netmask: " + Harmless(addressing.mask, false), "give one such as 255.255.255.0");
   }
 }
 
@@ -74,8 +81,10 @@ void SetAddressing(KnownNetwork& config, const Addressing& addressing) {
   const bool isNone = IsWord(addressing.ip, "none");
   if (!isDhcp && !isNone) {
     RequireStatic(addressing);
-  } else if (!addressing.mask.empty() || !addressing.gateway.empty()) {
-    throw Wrong("only a static address has a netmask and a gateway of its own", "add --ip A.B.C.D");
+  } else if (!addressing.mask.empty()) {
+    throw MaskWithoutAddress();
+  } else if (!addressing.gateway.empty()) {
+    throw Wrong("only a static address has a gateway of its own", "add --ip A.B.C.D --mask A.B.C.D");
   }
   if (!addressing.gateway.empty()) RequireGateway(addressing.gateway);
   SetText(config.szIp, isNone ? "" : isDhcp ? "DHCP" : addressing.ip, "the address");
