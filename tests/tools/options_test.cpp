@@ -9,7 +9,17 @@ using testing::MatchesRegex;
 
 namespace {
 
-class CommandLine : public ToolTest {};
+class CommandLine : public ToolTest {
+ protected:
+  // The words of each; the first has none.
+  static std::vector<std::vector<std::string>> EveryCommand() {
+    std::vector<std::vector<std::string>> commands = {{}};
+    for (const std::string& command : CommandsOf()) commands.push_back({command});
+    for (const std::string& command : CommandsOf({"ap"})) commands.push_back({"ap", command});
+    EXPECT_THAT(commands, testing::IsSupersetOf<std::vector<std::string>>({{"scan"}, {"ap", "set"}}));
+    return commands;
+  }
+};
 
 TEST_F(CommandLine, ThatIsWrongIsExplainedInOneLine) {
   const std::vector<std::vector<std::string>> wrong = {
@@ -158,6 +168,23 @@ TEST_F(CommandLine, ExplainsItselfOnRequest) {
   EXPECT_THAT(Tool({"ap", "set", "--help"}).out, HasSubstr("--channel N|auto"));
 }
 
+TEST_F(CommandLine, TellsTheVersion) {
+  const Ran ran = Tool({"--version"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(ran.out, "merowireless " MERO_PROJECT_VERSION "\n");
+}
+
+// Who read the help of a command learned of them nowhere.
+TEST_F(CommandLine, HasTheOptionsOfEveryCommandInItsHelp) {
+  for (std::vector<std::string> words : EveryCommand()) {
+    words.emplace_back("--help");
+    const std::string help = Tool(words).out;
+    for (const char* szOption : {"\n  --json ", "\n  --porcelain ", "\n  -v,--verbose "}) {
+      EXPECT_THAT(help, HasSubstr(szOption)) << testing::PrintToString(words);
+    }
+  }
+}
+
 // The help did not have 7.
 TEST_F(CommandLine, HasTheExitStatusesOfTheManualInItsHelp) {
   const std::string manual = ReadText(MERO_SOURCE "/docs/man/merowireless.1");
@@ -183,11 +210,7 @@ std::size_t WidthOf(std::string_view line) {
 }
 
 TEST_F(CommandLine, HasHelpThatFitsATerminal) {
-  std::vector<std::vector<std::string>> commands = {{}};
-  for (const std::string& command : CommandsOf()) commands.push_back({command});
-  for (const std::string& command : CommandsOf({"ap"})) commands.push_back({"ap", command});
-  EXPECT_THAT(commands, testing::IsSupersetOf<std::vector<std::string>>({{"scan"}, {"ap", "set"}}));
-  for (std::vector<std::string>& words : commands) {
+  for (std::vector<std::string> words : EveryCommand()) {
     words.emplace_back("--help");
     std::istringstream help(Tool(words).out);
     for (std::string line; std::getline(help, line);) EXPECT_LE(WidthOf(line), 80U) << line;

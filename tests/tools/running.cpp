@@ -81,7 +81,7 @@ std::vector<std::string> CommandsOf(std::vector<std::string> command) {
   bool listed = false;
   for (std::string line; std::getline(help, line);) {
     if (listed && line.starts_with("  ")) commands.push_back(line.substr(2, line.find(' ', 2) - 2));
-    listed = listed || line == "Subcommands:";
+    listed = (listed && !line.empty()) || line == "Subcommands:";
   }
   return commands;
 }

@@ -249,12 +249,21 @@ void AddAdapterCommands(Commands& commands) {
       });
 }
 
-// Lets the options of the program itself stand behind a command too.
-void FallThrough(CLI::App& app) {
+// Lets the options of the program itself stand behind a command too, and its help tell of them.
+void FallThrough(CLI::App& app, const std::string& footer) {
   for (CLI::App* command : app.get_subcommands([](CLI::App*) { return true; })) {
     command->fallthrough();
-    FallThrough(*command);
+    command->footer(footer);
+    FallThrough(*command, footer);
   }
+}
+
+std::string HelpOfOptions(std::initializer_list<const CLI::Option*> options) {
+  const CLI::Formatter formatter;
+  std::string help = "Options of every command:\n";
+  for (const CLI::Option* option : options) help += formatter.make_option(option, false);
+  help.pop_back();  // the last line end
+  return help;
 }
 
 // ---- Command lines that cannot be understood ----
@@ -369,8 +378,10 @@ Options ParseOptions(int argc, const char* const* argv) {
   bool json = false;
   bool porcelain = false;
   auto* jsonFlag = app.add_flag("--json", json, "write one JSON document");
-  app.add_flag("--porcelain", porcelain, "write one record a line, fields between tabs")->excludes(jsonFlag);
-  app.add_flag("-v,--verbose", options.verbose, "show what the library reports");
+  auto* porcelainFlag =
+      app.add_flag("--porcelain", porcelain, "write one record a line, fields between tabs")->excludes(jsonFlag);
+  auto* verboseFlag = app.add_flag("-v,--verbose", options.verbose, "show what the library reports");
+  app.set_version_flag("--version", "merowireless " MERO_VERSION, "tell the version of this program");
   app.require_subcommand(1);
 
   Commands commands(app, options);
@@ -378,7 +389,7 @@ Options ParseOptions(int argc, const char* const* argv) {
   AddConnectionCommands(commands);
   AddApCommands(commands, app);
   AddAdapterCommands(commands);
-  FallThrough(app);
+  FallThrough(app, HelpOfOptions({jsonFlag, porcelainFlag, verboseFlag}));
 
   try {
     app.parse(argc, argv);
