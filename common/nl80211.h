@@ -1,5 +1,5 @@
-// Questions to the kernel's wireless stack, which the listing tool and the management program have. Nothing here changes
-// anything, or waits for the radio.
+// Questions to the kernel's wireless stack, which the listing tool and the management program have. Nothing here
+// changes anything, or waits for the radio.
 #ifndef MERO_COMMON_NL80211_H
 #define MERO_COMMON_NL80211_H
 
@@ -32,8 +32,8 @@ struct Question {
 
 struct Answer {
   std::vector<std::string> messages = {};  // each a whole netlink message
-  int error = 0;                      // the driver's, an errno; ENODEV too where no radio has ever been
-  int failure = 0;                    // of the exchange itself, as libnl numbers them: below 0
+  int error = 0;                           // the driver's, an errno; ENODEV too where no radio has ever been
+  int failure = 0;                         // of the exchange itself, as libnl numbers them: below 0
 
   bool saysNotWireless() const { return error == ENODEV || error == EOPNOTSUPP; }
   const char* reason() const { return error != 0 ? std::strerror(error) : nl_geterror(failure); }

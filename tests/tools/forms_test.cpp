@@ -2,16 +2,20 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <clocale>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <set>
+#include <sstream>
 
+#include "common/text.h"
 #include "running.h"
 
 namespace {
 
 using library::Network;
+using testing::HasSubstr;
 
 // ---- Worlds for commands to be run in ----
 
@@ -115,6 +119,61 @@ TEST_F(Forms, OfEveryCommandAreAsTheyAlwaysWere) {
     screens += Screen(words) + Screen(With(words, "--json")) + Screen(With(words, "--porcelain"));
   }
   EXPECT_EQ(screens, ReadText(MERO_SCREENS));
+}
+
+// The words on a screen of so many columns, where all lines have room.
+std::set<std::string> WordsOnScreen(const std::vector<std::string>& words, unsigned short columns) {
+  std::istringstream screen(ToolOnTerminal(words, columns, {.environment = {{"NO_COLOR", "1"}}}).out);
+  std::set<std::string> shown;
+  for (std::string line; std::getline(screen, line);) {
+    if (line.ends_with('\r')) line.pop_back();
+    EXPECT_LE(::WidthOf(line, true), columns) << line;
+    std::istringstream in(line);
+    for (std::string word; in >> word;) shown.insert(word);
+  }
+  return shown;
+}
+
+// Lines were broken in the middle of a word, and tables made no sense.
+TEST_F(Forms, FitAScreenOfFortyColumnsWordByWord) {
+  ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr);
+  for (const auto& [world, words] : kCommands) {
+    library::Reset();
+    library::g_now = library::kNow;
+    world();
+    EXPECT_EQ(WordsOnScreen(words, 40), WordsOnScreen(words, 300)) << Joined(words);
+  }
+  Shell("ip link delete wlan0");
+  for (const std::vector<std::string>& wrong : {std::vector<std::string>{"scan", "--renwe"}, {"forget", "Nowhere"}}) {
+    EXPECT_EQ(WordsOnScreen(wrong, 40), WordsOnScreen(wrong, 300)) << Joined(wrong);
+  }
+}
+
+TEST_F(Forms, OfATableThatHasNoRoomAreALineForEachField) {
+  Connected();
+  constexpr char kHome[] =
+      "NAME          Home\n"
+      "SIGNAL        ▂▄▆▁  74\n"
+      "CH            6\n"
+      "SECURITY      WPA2 AES\n"
+      "STANDARD      11b/g/n\n"
+      "ACCESS POINT  0A:0A:0A:0A:0A:0A\n"
+      "KNOWN         joined\n"
+      "\n"
+      "NAME          square\n";
+  EXPECT_THAT(Tool({"scan"}, {.environment = {{"COLUMNS", "40"}}}).out, testing::StartsWith(kHome));
+  EXPECT_THAT(Tool({"scan", "--porcelain"}, {.environment = {{"COLUMNS", "40"}}}).out, testing::StartsWith("Home\t74"));
+}
+
+TEST_F(Forms, OfAValueThatHasNoRoomBesideItsTitleAreOnLinesOfTheirOwn) {
+  MERO_AP_CONF conf = library::Office();
+  CopyText(conf.hostapConf.szSSID, "a name that is thirty-two long!!");
+  CopyText(conf.hostapConf.szBridge, "withoutblanks");
+  library::SavedAp(conf);
+  const std::string out = Tool({"ap", "show"}, {.environment = {{"COLUMNS", "40"}}}).out;
+  EXPECT_THAT(out, HasSubstr("\nssid\n    a name that is thirty-two long!!\n"));
+  EXPECT_THAT(out, HasSubstr("\nbridge\n    withoutblanks\n"));
+  EXPECT_THAT(out, HasSubstr("\nieee80211n_wireless_width        20 and\n                                 40 MHz\n"));
 }
 
 // Everything that has been made on this machine.

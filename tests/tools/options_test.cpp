@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <sstream>
 
+#include "base/text.h"
 #include "running.h"
 
 using testing::HasSubstr;
@@ -204,16 +205,22 @@ TEST_F(CommandLine, HasTheExitStatusesOfTheManualInItsHelp) {
   EXPECT_EQ(told, statuses);
 }
 
-// Columns, where every byte but the continuation of a character is one.
-std::size_t WidthOf(std::string_view line) {
-  return static_cast<std::size_t>(std::ranges::count_if(line, [](char byte) { return (byte & 0xC0) != 0x80; }));
+TEST_F(CommandLine, HasHelpInWhichALineThatGoesOnIsSeenToDoSo) {
+  const std::string help = Tool({"save", "--help"}, {.environment = {{"COLUMNS", "40"}}}).out;
+  EXPECT_THAT(help, HasSubstr("\n  --security\n      open|wep|wpa|wpa2|wpa-eap|wpa2-eap\n      how a network that hides is\n"));
 }
 
 TEST_F(CommandLine, HasHelpThatFitsATerminal) {
   for (std::vector<std::string> words : EveryCommand()) {
     words.emplace_back("--help");
-    std::istringstream help(Tool(words).out);
-    for (std::string line; std::getline(help, line);) EXPECT_LE(WidthOf(line), 80U) << line;
+    for (const std::size_t columns : {std::size_t{40}, std::size_t{80}, std::size_t{132}}) {
+      std::istringstream help(Tool(words, {.environment = {{"COLUMNS", std::to_string(columns)}}}).out);
+      for (std::string line; std::getline(help, line);) EXPECT_LE(WidthOf(line, false), columns) << line;
+    }
+    const std::string wide = Tool(words).out;
+    for (const char* szColumns : {"0", "80", "-1", "wide"}) {
+      EXPECT_EQ(Tool(words, {.environment = {{"COLUMNS", szColumns}}}).out, wide) << szColumns;
+    }
   }
 }
 

@@ -269,7 +269,8 @@ TEST_F(Output, OfAFailureHasTheWordForItsExitStatusThatIsDocumented) {
   EXPECT_EQ(words, WordsIn(ReadText(MERO_SOURCE "/docs/json.md")));
 
   library::MEROWirelessCheckBlock = [] { return 0; };
-  const std::vector<std::vector<std::string>> failures = {{"radio", "sideways"}, {"forget", "Nowhere"}, {"connect", "a"}};
+  const std::vector<std::vector<std::string>> failures = {
+      {"radio", "sideways"}, {"forget", "Nowhere"}, {"connect", "a"}};
   for (std::vector<std::string> command : failures) {
     command.emplace_back("--json");
     const Ran ran = Tool(command);

@@ -18,7 +18,7 @@
 namespace {
 
 void Enter(const Surroundings& surroundings) {
-  for (const char* szName : {"NO_COLOR", "LC_CTYPE", "LANG"}) ::unsetenv(szName);
+  for (const char* szName : {"NO_COLOR", "COLUMNS", "LC_CTYPE", "LANG"}) ::unsetenv(szName);
   ::setenv("LC_ALL", "C.UTF-8", 1);
   ::setenv("TERM", "xterm", 1);
   for (const auto& [name, value] : surroundings.environment) ::setenv(name.c_str(), value.c_str(), 1);

@@ -9,7 +9,7 @@ const std::vector<std::string> kWords = {"scan", "connect", "disconnect", "statu
 
 TEST(Spelling, LeadsToTheNearestWord) {
   const std::pair<const char*, const char*> rows[] = {
-      {"scna", "scan"},      {"can", "scan"},     {"scann", "scan"},        {"conect", "connect"},
+      {"scna", "scan"},       {"can", "scan"},      {"scann", "scan"},          {"conect", "connect"},
       {"disc", "disconnect"}, {"statsu", "status"}, {"--chnanel", "--channel"}, {"app", "ap"},
   };
   for (const auto& [given, meant] : rows) EXPECT_EQ(Nearest(given, kWords), meant) << given;

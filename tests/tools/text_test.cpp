@@ -40,6 +40,23 @@ TEST(Text, HasTheWidthThatATerminalGivesIt) {
   EXPECT_EQ(CutToWidth("names", 0, true), "");
 }
 
+TEST(Text, IsBrokenAtBlanksAlone) {
+  EXPECT_EQ(Wrapped("one two three", 0, 2, true), "one two three");
+  EXPECT_EQ(Wrapped("one two three", 13, 2, true), "one two three");
+  EXPECT_EQ(Wrapped("one two three", 12, 2, true), "one two\n  three");
+  EXPECT_EQ(Wrapped("  one two three", 7, 0, true), "  one\ntwo\nthree");
+  EXPECT_EQ(Wrapped("unbreakable or not", 6, 1, true), "unbreakable\n or\n not");
+  EXPECT_EQ(Wrapped("in  one   line", 14, 0, true), "in  one   line");
+  EXPECT_EQ(Wrapped("Café Ümit", 9, 0, true), "Café Ümit");
+  EXPECT_EQ(Wrapped("", 9, 3, true), "");
+}
+
+TEST(Text, IsAWordInAnyCase) {
+  EXPECT_TRUE(IsWord("wPa2-eap", "WPA2-EAP"));
+  EXPECT_FALSE(IsWord("wpa2", "wpa2-eap"));
+  EXPECT_FALSE(IsWord("", "wpa2"));
+}
+
 TEST(Text, IsAnAddressOnlyWhole) {
   EXPECT_EQ(ParseAddress("00:1a:2B:3c:4D:ff"), (Address{0x00, 0x1A, 0x2B, 0x3C, 0x4D, 0xFF}));
   for (const char* wrong : {"", "00:1a:2b:3c:4d", "00:1a:2b:3c:4d:5", "00:1a:2b:3c:4d:5e:6f", "00-1a-2b-3c-4d-5e",

@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <exception>
 
+#include "app/help.h"
 #include "app/options.h"
 #include "base/require.h"
 #include "work/library_log.h"
@@ -66,7 +67,9 @@ int RunProgram(int argc, const char* const* argv) {
     if (options.verbose) library_log::ShowLines();
     return Finish(RunCommand(options));
   } catch (const Help& help) {
-    std::fputs(help.text.c_str(), stdout);
+    constexpr std::size_t kCustomary = 80;
+    const std::size_t width = TerminalOf(STDOUT_FILENO).width;
+    std::fputs(FittedHelp(help.text, width > 0 ? width : kCustomary).c_str(), stdout);
     return Finish(Status(Exit::kDone));
   } catch (const WrongUsage& wrong) {
     const Output output(wrong.form, TerminalOf(STDOUT_FILENO));

@@ -7,7 +7,8 @@
 
 namespace {
 
-// How many letters have to be put in, taken out, replaced, or changed with their neighbours to make one word of another.
+// How many letters have to be put in, taken out, replaced, or changed with their neighbours to make one word of
+// another.
 std::size_t Distance(std::string_view one, std::string_view other) {
   std::vector<std::size_t> former, last(other.size() + 1), current(other.size() + 1);
   std::iota(last.begin(), last.end(), 0);

@@ -110,6 +110,29 @@ std::string CutToWidth(std::string_view text, std::size_t width, bool utf8) {
   return width > 0 ? cut.append(sign) : cut;
 }
 
+std::string Wrapped(std::string_view text, std::size_t width, std::size_t indent, bool utf8) {
+  if (width == 0) return std::string(text);
+  std::string wrapped;
+  std::size_t column = 0;
+  bool begun = false;  // a word stands on this line
+  while (!text.empty()) {
+    const std::size_t blanks = std::min(text.find_first_not_of(' '), text.size());
+    const std::size_t end = std::min(text.find(' ', blanks), text.size());
+    const std::string_view word = text.substr(blanks, end - blanks);
+    std::size_t gap = blanks;
+    if (begun && column + gap + WidthOf(word, utf8) > width) {
+      wrapped += '\n';
+      column = 0;
+      gap = indent;
+    }
+    wrapped.append(gap, ' ').append(word);
+    column += gap + WidthOf(word, utf8);
+    begun = true;
+    text.remove_prefix(end);
+  }
+  return wrapped;
+}
+
 bool IsUtf8(std::string_view bytes) {
   while (!bytes.empty()) {
     const Start character = FirstOf(bytes);

@@ -28,6 +28,10 @@ std::size_t WidthOf(std::string_view text, bool utf8);
 // A harmless text, cut to `width` columns with a sign that it was.
 std::string CutToWidth(std::string_view text, std::size_t width, bool utf8);
 
+// A harmless text in lines of up to `width` columns, each after the first behind `indent` blanks. Lines are broken at
+// blanks, so a longer word makes a longer line. 0 is any width.
+std::string Wrapped(std::string_view text, std::size_t width, std::size_t indent, bool utf8);
+
 bool IsUtf8(std::string_view bytes);
 std::string Hex(std::string_view bytes);
 

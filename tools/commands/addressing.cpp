@@ -5,7 +5,8 @@
 #include "model/status.h"
 
 void SetAddress(const Program& program, const Addressing& addressing) {
-  if (IsWord(addressing.ip, "none")) throw Wrong("none is no address", "`merowireless disconnect` takes the address away");
+  if (IsWord(addressing.ip, "none"))
+    throw Wrong("none is no address", "`merowireless disconnect` takes the address away");
   KnownNetwork config{};
   SetAddressing(config, addressing);
   RequireAdapter();

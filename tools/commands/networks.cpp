@@ -68,8 +68,7 @@ constexpr Field<Found> kFoundFields[] = {
     {"auth", "SECURITY", [](const Found& of) { return AuthOf(of.network); }, Layout::kLeft,
      [](const Found& of, bool) { return Shown{SecurityText(of.network.auth, of.network.encrypt)}; }},
     {"encryption", "", [](const Found& of) { return EncryptionOf(of.network); }},
-    {"standard", "STANDARD",
-     [](const Found& of) { return Value(MEROWirelessProtocolStringGet(of.network.protocol)); }},
+    {"standard", "STANDARD", [](const Found& of) { return Value(MEROWirelessProtocolStringGet(of.network.protocol)); }},
     {"address", "ACCESS POINT", [](const Found& of) { return Value(AddressText(of.network.bssid)); }},
     {"name_hex", "", [](const Found& of) { return NameInHex(of.network.szEssid); }},
     {"joined", "", [](const Found& of) { return Value(of.isJoined); }},
@@ -86,8 +85,7 @@ constexpr Field<KnownNetwork> kKnownFields[] = {
     {"ip", "ADDRESS", [](const KnownNetwork& of) { return Value(of.szIp); }},
     {"mask", "", [](const KnownNetwork& of) { return Value(of.szMask); }},
     {"gateway", "", [](const KnownNetwork& of) { return Value(of.szGateway); }},
-    {"saved", "SAVED",
-     [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(UtcText(of.atime)); },
+    {"saved", "SAVED", [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(UtcText(of.atime)); },
      Layout::kLeft,
      [](const KnownNetwork& of, bool) {
        return of.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{LocalText(of.atime, "%F %R")};

@@ -13,10 +13,10 @@ _merowireless_names() {
   done < <(merowireless --porcelain known 2>/dev/null </dev/null)
 }
 
-# The help of the program or a command says all that may follow.
+# The help of the program or a command says all that may follow. It is read as it is on a wide screen.
 _merowireless_help() { # [COMMAND]
   # shellcheck disable=SC2086  # a command is one word or two
-  merowireless $1 --help 2>/dev/null </dev/null
+  COLUMNS=0 merowireless $1 --help 2>/dev/null </dev/null
 }
 
 # What the help that it reads has under a heading, a row each: a name, and what it takes.

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 #include <numeric>
+#include <sstream>
 
 namespace {
 
@@ -133,17 +134,44 @@ std::vector<std::size_t> WidthsOf(const Table& table, bool utf8) {
   return widths;
 }
 
-// Makes the elastic columns narrower until the table fits the terminal.
-void Squeeze(const Table& table, std::vector<std::size_t>& widths, std::size_t room) {
+// Makes the elastic columns narrower until the table fits the terminal; false when it does not.
+bool Squeeze(const Table& table, std::vector<std::size_t>& widths, std::size_t room) {
+  constexpr std::size_t kLeast = 8;  // of a name, say, so that something of it can be read
   const std::size_t total = std::accumulate(widths.begin(), widths.end(), kGap * (widths.size() - 1));
-  if (room == 0 || total <= room) return;
+  if (room == 0 || total <= room) return true;
   std::size_t excess = total - room;
   for (std::size_t i = 0; i < widths.size(); ++i) {
     if (table.columns[i].layout != Layout::kElastic) continue;
-    const std::size_t taken = std::min(excess, widths[i] - std::min(widths[i], table.columns[i].title.size()));
+    const std::size_t least = std::max(kLeast, table.columns[i].title.size());
+    const std::size_t taken = std::min(excess, widths[i] - std::min(widths[i], least));
     widths[i] -= taken;
     excess -= taken;
   }
+  return excess == 0;
+}
+
+// Titles of columns may be moved to the right by blanks.
+std::string_view TitleOf(const Column& column) {
+  return column.title.substr(column.title.find_first_not_of(' '));
+}
+
+std::size_t WidthOfTitles(const Table& table) {
+  std::size_t width = 0;
+  for (const Column& column : table.columns) width = std::max(width, TitleOf(column).size());
+  return width;
+}
+
+// A value as it stands behind its title, or on lines of its own where a word of it has no room there.
+std::string Beside(const std::string& value, std::size_t titles, std::size_t width, bool utf8) {
+  constexpr std::size_t kIndent = 4;
+  const std::size_t column = titles + kGap;
+  if (width == 0 || column + WidthOf(value, utf8) <= width) return value;
+  const std::string wrapped = Wrapped(std::string(column, ' ') + value, width, column, utf8);
+  std::istringstream lines(wrapped);
+  bool fits = true;
+  for (std::string line; std::getline(lines, line);) fits = fits && WidthOf(line, utf8) <= width;
+  if (fits) return wrapped.substr(column);
+  return "\n" + Wrapped(std::string(kIndent, ' ') + value, width, kIndent, utf8);
 }
 
 }  // namespace
@@ -173,9 +201,7 @@ void Output::Put(const Shown& shown, std::size_t width, Layout layout, bool last
   ::Put(std::string(kGap, ' '));
 }
 
-void Output::WriteColumns(const Table& table) const {
-  std::vector<std::size_t> widths = WidthsOf(table, terminal_.utf8);
-  Squeeze(table, widths, terminal_.width);
+void Output::WriteColumns(const Table& table, const std::vector<std::size_t>& widths) const {
   const std::size_t last = table.columns.size() - 1;
   for (std::size_t i = 0; i <= last; ++i) {
     Put({std::string(table.columns[i].title), Tone::kFaint}, widths[i], table.columns[i].layout, i == last);
@@ -187,14 +213,24 @@ void Output::WriteColumns(const Table& table) const {
   }
 }
 
-void Output::WritePairs(const Table& table) const {
-  std::size_t width = 0;
-  for (const Column& column : table.columns) width = std::max(width, column.title.size());
+void Output::WritePairs(const Table& table, std::size_t row) const {
+  const std::size_t titles = WidthOfTitles(table);
   for (std::size_t i = 0; i < table.columns.size(); ++i) {
-    const Shown& shown = table.rows.front()[i].shown;
-    Put({std::string(table.columns[i].title), Tone::kFaint}, width, Layout::kLeft, false);
+    Shown shown = table.rows[row][i].shown;
+    shown.text = Beside(shown.text, titles, terminal_.width, terminal_.utf8);
+    Put({std::string(TitleOf(table.columns[i])), Tone::kFaint}, titles, Layout::kLeft, shown.text.starts_with('\n'));
     Put(shown, WidthOf(shown.text, terminal_.utf8), Layout::kLeft, true);
     ::Put("\n");
+  }
+}
+
+// As a table, or one after the other where that is too wide.
+void Output::WriteRecords(const Table& table) const {
+  std::vector<std::size_t> widths = WidthsOf(table, terminal_.utf8);
+  if (Squeeze(table, widths, terminal_.width)) return WriteColumns(table, widths);
+  for (std::size_t row = 0; row < table.rows.size(); ++row) {
+    if (row > 0) ::Put("\n");
+    WritePairs(table, row);
   }
 }
 
@@ -207,7 +243,7 @@ void Output::WriteList(std::string_view name, Table table, std::string_view none
   }
   if (table.rows.empty()) return Done(std::string(none));
   LeaveWhatIsShown(table);
-  WriteColumns(table);
+  WriteRecords(table);
 }
 
 void Output::WriteOne(std::string_view name, Table table) const {
@@ -215,11 +251,11 @@ void Output::WriteOne(std::string_view name, Table table) const {
   if (form_ == Form::kJson)
     return PutDocument({{"result", "ok"}, {std::string(name), JsonOf(table, 0)}}, MachinesSeeUtf8());
   LeaveWhatIsShown(table);
-  WritePairs(table);
+  WritePairs(table, 0);
 }
 
 void Output::Done(const std::string& sentence) const {
-  if (form_ == Form::kHuman) ::Put(sentence + "\n");
+  if (form_ == Form::kHuman) ::Put(Wrapped(sentence, terminal_.width, kSentenceIndent, terminal_.utf8) + "\n");
   if (form_ == Form::kJson) PutDocument({{"result", "ok"}}, MachinesSeeUtf8());
 }
 

@@ -20,7 +20,8 @@ enum class Form { kHuman, kJson, kPorcelain };
 
 enum class Tone { kPlain, kGood, kFair, kBad, kFaint };
 
-enum class Layout { kLeft, kRight, kElastic };  // an elastic column is cut when a table is too wide
+// An elastic column is cut when a table is too wide. When that does not help, each record has a line for each field.
+enum class Layout { kLeft, kRight, kElastic };
 
 // The value of a field, for machines. A field without one is null in JSON and empty in a porcelain line.
 using Value = std::variant<std::nullptr_t, bool, std::int64_t, std::string>;
@@ -120,13 +121,14 @@ class Output {
 
   // Output for machines is the same in every locale. On a terminal it is not: one that is not UTF-8 may take its bytes
   // for control characters.
-  bool MachinesSeeUtf8() const { return terminal_.width == 0 || terminal_.utf8; }
+  bool MachinesSeeUtf8() const { return !terminal_.isTerminal || terminal_.utf8; }
 
   Shown Show(const Value& value) const;
   void WriteList(std::string_view name, Table table, std::string_view none) const;
   void WriteOne(std::string_view name, Table table) const;
-  void WriteColumns(const Table& table) const;
-  void WritePairs(const Table& table) const;
+  void WriteColumns(const Table& table, const std::vector<std::size_t>& widths) const;
+  void WritePairs(const Table& table, std::size_t row) const;
+  void WriteRecords(const Table& table) const;
   void Put(const Shown& shown, std::size_t width, Layout layout, bool last) const;
 
   Form form_;
