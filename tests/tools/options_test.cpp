@@ -58,7 +58,7 @@ TEST_F(CommandLine, ThatHasTooMuchIsToldSo) {
 
 TEST_F(CommandLine, ThatMisspellsACommandIsToldTheOneThatIsMeant) {
   const std::pair<std::vector<std::string>, std::string> rows[] = {
-      {{"scna"}, "scan"},     {{"conect", "Home"}, "connect"}, {{"stauts", "--json"}, "status"},
+      {{"scna"}, "scan"},       {{"conect", "Home"}, "connect"}, {{"stauts", "--json"}, "status"},
       {{"disc"}, "disconnect"}, {{"ap", "enabel"}, "enable"},
   };
   for (const auto& [words, meant] : rows) {
@@ -69,13 +69,15 @@ TEST_F(CommandLine, ThatMisspellsACommandIsToldTheOneThatIsMeant) {
 // All that was said of one was that there were more arguments than expected.
 TEST_F(CommandLine, ThatHasAnUnknownOptionIsToldItAndTheOneThatIsMeant) {
   const std::pair<std::vector<std::string>, std::string> rows[] = {
-      {{"scan", "--renwe"}, "there is no option --renwe: is --renew meant? `merowireless scan --help` lists those that "},
+      {{"scan", "--renwe"},
+       "there is no option --renwe: is --renew meant? `merowireless scan --help` lists those that "},
       {{"scan", "--bogus"}, "there is no option --bogus: `merowireless scan --help` lists those that there are\n"},
       {{"scan", "--jsn"}, "there is no option --jsn: is --json meant? "},
       {{"--porcelian", "scan"}, "there is no option --porcelian: is --porcelain meant? "},
       {{"--bogus"}, "there is no option --bogus: `merowireless --help` lists"},
       {{"save", "Home", "--key"}, "there is no option --key: is --key-file meant? "},
-      {{"ap", "set", "--chanel", "6"}, "there is no option --chanel: is --channel meant? `merowireless ap set --help` "},
+      {{"ap", "set", "--chanel", "6"},
+       "there is no option --chanel: is --channel meant? `merowireless ap set --help` "},
       {{"scan", "-x"}, "there is no option -x: `merowireless scan --help` lists"},
   };
   for (const auto& [words, message] : rows) {
@@ -129,6 +131,22 @@ TEST_F(CommandLine, ThatIsWrongIsNotRepeatedSinceItMayHoldASecret) {
     EXPECT_EQ(ran.status, 2) << testing::PrintToString(arguments);
     EXPECT_THAT(ran.out + ran.err, testing::Not(HasSubstr("sesame"))) << testing::PrintToString(arguments);
   }
+}
+
+// `scan`, `save` and `mode` waited for one, and `ap enable` asked for settings first.
+TEST_F(CommandLine, ThatNeedsAnAdapterIsToldAtOnceThatThereIsNone) {
+  library::MEROWirelessAdapterNum = [] { return 0; };
+  const std::vector<std::vector<std::string>> needy = {
+      {"scan"},           {"scan", "--renew"}, {"save", "Home"},        {"connect", "Home"},     {"autoconnect"},
+      {"adhoc", "Bench"}, {"address", "DHCP"}, {"gateway", "10.0.0.1"}, {"adhoc", "x", "--wep"}, {"ap", "enable"},
+      {"mode", "ap"},     {"mode", "client"}};
+  for (const auto& words : needy) {
+    const Ran ran = ToolOnTerminal(words);  // which could be asked for a secret
+    EXPECT_EQ(ran.status, 3) << testing::PrintToString(words);
+    EXPECT_THAT(ran.out, testing::StartsWith("merowireless: no adapter is plugged in: ")) << ran.out;
+  }
+  EXPECT_THAT(library::Calls(), testing::IsEmpty());
+  EXPECT_EQ(Tool({"save", "Hidden", "--bssid", "00:11:22:33:44:55", "--security", "open"}).status, 0);
 }
 
 // Each of these words had to be in small letters, and DHCP in capitals.
@@ -207,7 +225,8 @@ TEST_F(CommandLine, HasTheExitStatusesOfTheManualInItsHelp) {
 
 TEST_F(CommandLine, HasHelpInWhichALineThatGoesOnIsSeenToDoSo) {
   const std::string help = Tool({"save", "--help"}, {.environment = {{"COLUMNS", "40"}}}).out;
-  EXPECT_THAT(help, HasSubstr("\n  --security\n      open|wep|wpa|wpa2|wpa-eap|wpa2-eap\n      how a network that hides is\n"));
+  EXPECT_THAT(
+      help, HasSubstr("\n  --security\n      open|wep|wpa|wpa2|wpa-eap|wpa2-eap\n      how a network that hides is\n"));
 }
 
 TEST_F(CommandLine, HasHelpThatFitsATerminal) {

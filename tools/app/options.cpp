@@ -20,6 +20,7 @@
 #include "commands/networks.h"
 #include "commands/watch.h"
 #include "model/ap_settings.h"
+#include "model/library.h"
 
 namespace {
 
@@ -57,12 +58,13 @@ class Commands {
     return Add<Values>(app_, szName, szHelp, std::move(describe), std::move(act));
   }
 
-  CLI::App* AddPlain(CLI::App& parent, const char* szName, const char* szHelp, void (*act)(const Program&)) {
+  CLI::App* AddPlain(CLI::App& parent, const char* szName, const char* szHelp,
+                     const std::function<void(const Program&)>& act) {
     return Add<std::nullptr_t>(parent, szName, szHelp, nullptr,
                                [act](const Program& program, const std::nullptr_t&) { act(program); });
   }
 
-  CLI::App* AddPlain(const char* szName, const char* szHelp, void (*act)(const Program&)) {
+  CLI::App* AddPlain(const char* szName, const char* szHelp, const std::function<void(const Program&)>& act) {
     return AddPlain(app_, szName, szHelp, act);
   }
 
@@ -71,6 +73,15 @@ class Commands {
   Options& options_;
 };
 
+// What needs an adapter says at once that there is none: before it waits for one, and before it asks for a secret.
+template <class... Values>
+std::function<void(const Program&, const Values&...)> WithAdapter(void (*act)(const Program&, const Values&...)) {
+  return [act](const Program& program, const Values&... values) {
+    RequireAdapter();
+    act(program, values...);
+  };
+}
+
 // No file has an empty name, which a script gives whose variable is not set; and what looks like an option is one. The
 // answer is a complaint, or empty.
 std::string HasName(const std::string& file) {
@@ -78,9 +89,8 @@ std::string HasName(const std::string& file) {
 }
 
 void DescribeSecret(CLI::App& command, SecretSource& source) {
-  auto* file = command.add_option("--key-file", source.file, "read the secret from FILE")
-                   ->option_text("FILE")
-                   ->check(HasName);
+  auto* file =
+      command.add_option("--key-file", source.file, "read the secret from FILE")->option_text("FILE")->check(HasName);
   command.add_flag("--key-stdin", source.standardInput, "read the secret from the standard input")->excludes(file);
 }
 
@@ -183,14 +193,15 @@ void DescribeCell(CLI::App& command, CellToMake& values) {
 }
 
 void AddConnectionCommands(Commands& commands) {
-  commands.Add<NetworkToJoin>("connect", "Join a network and take an address in it", DescribeJoining, Connect);
-  commands.AddPlain("autoconnect", "Join the newest known network that can be joined", AutoConnect);
+  commands.Add<NetworkToJoin>("connect", "Join a network and take an address in it", DescribeJoining,
+                              WithAdapter(Connect));
+  commands.AddPlain("autoconnect", "Join the newest known network that can be joined", WithAdapter(AutoConnect));
   commands.AddPlain("disconnect", "End the connection", Disconnect);
   commands.AddPlain("status", "Show the state of the connection", ShowStatus);
   commands.Add<Watching>("watch", "Show the connection's state whenever it changes", DescribeWatching, WatchSoOften);
-  commands.Add<Addressing>("address", "Give the interface an address", DescribeAddress, SetAddress);
-  commands.Add<std::string>("gateway", "Add a default gateway", DescribeGateway, SetGateway);
-  commands.Add<CellToMake>("adhoc", "Start or join an ad-hoc cell", DescribeCell, MakeCell);
+  commands.Add<Addressing>("address", "Give the interface an address", DescribeAddress, WithAdapter(SetAddress));
+  commands.Add<std::string>("gateway", "Add a default gateway", DescribeGateway, WithAdapter(SetGateway));
+  commands.Add<CellToMake>("adhoc", "Start or join an ad-hoc cell", DescribeCell, WithAdapter(MakeCell));
 }
 
 // ---- The access point and the adapter ----
@@ -227,9 +238,13 @@ void AddApCommands(Commands& commands, CLI::App& app) {
             ->check(HasName);
       },
       SetAp);
-  commands.AddPlain(*ap, "enable", "Put the access point on the air", EnableAp);
+  commands.AddPlain(*ap, "enable", "Put the access point on the air", WithAdapter(EnableAp));
   commands.AddPlain(*ap, "disable", "Take the access point down", DisableAp);
   commands.AddPlain(*ap, "status", "Show whether the access point is on the air", ShowApStatus);
+}
+
+void ChangeModeTo(const Program& program, const std::string& mode) {
+  ChangeMode(program, Lower(mode));
 }
 
 void AddAdapterCommands(Commands& commands) {
@@ -238,7 +253,7 @@ void AddAdapterCommands(Commands& commands) {
       [](CLI::App& command, std::string& mode) {
         command.add_option("mode", mode, "ap or client")->required()->option_text("ap|client");
       },
-      [](const Program& program, const std::string& mode) { ChangeMode(program, Lower(mode)); });
+      WithAdapter(ChangeModeTo));
   commands.Add<std::string>(
       "radio", "Show whether the radio may be used, or switch it",
       [](CLI::App& command, std::string& state) {
@@ -292,7 +307,8 @@ std::string HelpOf(const std::vector<const CLI::App*>& commands) {
 std::vector<std::string> OptionsOf(const std::vector<const CLI::App*>& commands) {
   std::vector<std::string> options;
   for (const CLI::App* command : commands) {
-    for (const CLI::Option* option : command->get_options([](const CLI::Option* each) { return each->nonpositional(); })) {
+    for (const CLI::Option* option :
+         command->get_options([](const CLI::Option* each) { return each->nonpositional(); })) {
       std::istringstream names(option->get_name(false, true));
       for (std::string name; std::getline(names, name, ',');) {
         if (name.starts_with("--")) options.push_back(name);

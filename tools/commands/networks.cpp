@@ -173,6 +173,7 @@ void ListKnown(const Program& program, bool byTime, bool showSecrets) {
 }
 
 void Save(const Program& program, const NetworkToSave& wanted) {
+  if (wanted.address.empty()) RequireAdapter();  // to look for the network
   KnownNetwork config{};
   SetAddressing(config, wanted.addressing);
   config.network = wanted.address.empty() ? FindInRange(program, wanted.name) : Described(wanted);
