@@ -78,23 +78,31 @@ struct Answer {
   Network network;
 };
 
-// Searches the results of the adapter's last scan; when there are none, the library scans.
-Answer LookUp(const std::string& name, const std::optional<Address>& address) {
+// Searches the results of the adapter's last scan; when there are none, the library scans. Six bytes of an address it
+// takes as a pointer to text.
+Answer LookUpBy(const char* szValue, WIRELESS_FILTER filter) {
   Answer found{};
-  found.result = MEROWirelessNetworkGet(name.c_str(), WIRELESS_FILTER_ESSID, &found.network);
-  if (found.result == 0 && address) {
-    // Six bytes, which the library takes as a pointer to text.
-    const auto* octets = reinterpret_cast<const char*>(address->data());
-    found.result = MEROWirelessNetworkGet(octets, WIRELESS_FILTER_BSSID, &found.network);
-  }
+  found.result = MEROWirelessNetworkGet(szValue, filter, &found.network);
   return found;
 }
 
-// Scans before it searches: the last results may be older than the network.
-Answer LookUpAfresh(const std::string& name, const std::optional<Address>& address) {
+Answer LookUp(const Address& address) {
+  return LookUpBy(reinterpret_cast<const char*>(address.data()), WIRELESS_FILTER_BSSID);
+}
+
+Answer LookUp(const std::string& name, const std::optional<Address>& address) {
+  const Answer found = LookUpBy(name.c_str(), WIRELESS_FILTER_ESSID);
+  return found.result == 0 && address ? LookUp(*address) : found;
+}
+
+// The last results may be older than the network.
+bool ScanAfresh() {
   Ring<Network> ring;
-  if (MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, ring.head()) < 0) return {-1, {}};
-  return LookUp(name, address);
+  return MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, ring.head()) >= 0;
+}
+
+Answer LookUpAfresh(const std::string& name, const std::optional<Address>& address) {
+  return ScanAfresh() ? LookUp(name, address) : Answer{-1, {}};
 }
 
 // The access point that a network is to be joined through; nothing when any will do.
@@ -145,11 +153,9 @@ Network FindInRange(const Program& program, const std::string& name) {
 bool IsInRange(const Program& program, const KnownNetwork& config) {
   const std::string name = config.network.szEssid;
   const std::optional<Address> address = AccessPointFor(config);
-  const std::string wanted = address ? "" : name;
+  const auto isListed = [&] { return (address ? LookUp(*address) : LookUp(name, std::nullopt)).result > 0; };
   return Run<bool>(program.Doing("looking for " + program.output.Name(name)), [&] {
-    if (LookUp(wanted, address).result > 0) return true;
-    const bool called = CallNetwork(MEROWirelessInterfaceGet(), name);
-    return (called ? LookUp(wanted, address) : LookUpAfresh(wanted, address)).result > 0;
+    return isListed() || ((CallNetwork(MEROWirelessInterfaceGet(), name) || ScanAfresh()) && isListed());
   });
 }
 
