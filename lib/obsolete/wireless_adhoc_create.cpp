@@ -3,9 +3,9 @@
 
 #include "common/log.h"
 #include "common/text.h"
+#include "common/wep_key.h"
 #include "platform.h"
 #include "shell_words.h"
-#include "wep_key.h"
 #include "wireless.h"
 
 namespace {

@@ -8,10 +8,10 @@
 #include "common/log.h"
 #include "common/paths.h"
 #include "common/text.h"
+#include "common/wep_key.h"
 #include "holders.h"
 #include "platform.h"
 #include "shell_words.h"
-#include "wep_key.h"
 #include "wireless.h"
 
 namespace {

@@ -1,6 +1,6 @@
 // The forms of a WEP key. Its length alone tells which form it has.
-#ifndef MERO_LIB_WEP_KEY_H
-#define MERO_LIB_WEP_KEY_H
+#ifndef MERO_COMMON_WEP_KEY_H
+#define MERO_COMMON_WEP_KEY_H
 
 #include <string_view>
 
@@ -23,4 +23,4 @@ inline WepKeyForm FormOfWepKey(std::string_view key) {
   }
 }
 
-#endif  // MERO_LIB_WEP_KEY_H
+#endif  // MERO_COMMON_WEP_KEY_H
