@@ -4,9 +4,12 @@
 #include <algorithm>
 #include <csignal>
 #include <cstring>
+#include <ctime>
 #include <iterator>
 #include <sstream>
 
+#include "base/text.h"
+#include "common/paths.h"
 #include "running.h"
 
 using testing::ElementsAre;
@@ -306,17 +309,148 @@ TEST_F(AccessPoint, WhoseChangeIsInterruptedHasItsSwitchAsItWas) {
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on", "MEROWirelessSetAPConfig", "off"));
 }
 
-TEST_F(AccessPoint, TellsWhetherItIsOnTheAir) {
-  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}).out, "off\tOffice\tno\twlan0\n");
-  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
-    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
-  };
-  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}).out, "on-air\tOffice\tno\twlan0\n");
-  library::MEROWirelessTestAPMode = [] { return TRUE; };
-  EXPECT_EQ(Tool({"ap", "status", "--json"}).out,
-            R"({"result":"ok","access_point":{"state":"setting-up","name":"Office","enabled":false,)"
-            R"("interface":"wlan0"}})"
+TEST_F(AccessPoint, ThatTheKernelDoesNotHaveAfterwardsWasNotEnabled) {
+  library::MEROWirelessAPEnable = [] { return TRUE; };
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point Office was started, and is not on the air: "));
+}
+
+TEST_F(AccessPoint, ThatTheKernelHasAfterwardsWasNotDisabled) {
+  kernel::BecomeAccessPoint("Office");
+  library::MEROWirelessAPDisable = [] { return TRUE; };
+  const Ran ran = Tool({"ap", "disable"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point is disabled, and the kernel has one on the air: "));
+}
+
+// ---- Its status ----
+
+// The settings of an access point that has a schedule, with no hour on the air or with all of them.
+MERO_AP_CONF Scheduled(char digit) {
+  MERO_AP_CONF conf = library::Office();
+  MERO_WIFI_SCHED_CONF& schedule = conf.wifiSchedConf;
+  schedule.wifiSchedEnabled = 1;
+  std::memset(schedule.szWifiSched, digit, sizeof schedule.szWifiSched - 1);
+  return conf;
+}
+
+// The first fields of the status in a line.
+std::string StatusLine() {
+  const std::string line = Tool({"ap", "status", "--porcelain"}).out;
+  return line.substr(0, line.find("\tOffice"));
+}
+
+std::string StatusDocument() {
+  return Tool({"ap", "status", "--json"}).out;
+}
+
+// What was saved was shown as what is on the air.
+TEST_F(AccessPoint, TellsWhatIsOnTheAirByTheKernel) {
+  kernel::BecomeAccessPoint("Old Office", 5180);
+  kernel::Main().stations = 3;
+  EXPECT_EQ(StatusDocument(),
+            R"({"result":"ok","access_point":{"state":"on-air","name":"Office","enabled":false,"interface":"wlan0",)"
+            R"("air_name":"Old Office","air_name_hex":null,"channel":36,"megahertz":5180,"stations":3,)"
+            R"("pending":null}})"
             "\n");
+  EXPECT_EQ(Tool({"ap", "status"}).out,
+            "access point  on the air\n"
+            "name          Office\n"
+            "enabled       no\n"
+            "interface     wlan0\n"
+            "on air as     Old Office\n"
+            "channel       36\n"
+            "stations      3\n"
+            "settings      -\n");
+  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}).out, "on-air\tOffice\tno\twlan0\tOld Office\t\t36\t5180\t3\t\n");
+}
+
+TEST_F(AccessPoint, CountsItsGuestsAmongItsStations) {
+  kernel::BecomeAccessPoint("Office");
+  kernel::Main().stations = 2;
+  kernel::Guests() = kernel::Main();
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("stations":4,)"));
+}
+
+TEST_F(AccessPoint, ThatThereIsNoneOfIsOff) {
+  EXPECT_EQ(StatusDocument(),
+            R"({"result":"ok","access_point":{"state":"off","name":"Office","enabled":false,"interface":"wlan0",)"
+            R"("air_name":null,"air_name_hex":null,"channel":null,"megahertz":null,"stations":null,)"
+            R"("pending":null}})"
+            "\n");
+  kernel::Main().isThere = false;
+  EXPECT_EQ(StatusLine(), "off");
+}
+
+// The interface has the type of an access point then, and so it was said to be on the air.
+TEST_F(AccessPoint, ThatItsScheduleKeepsOffTheAirSaysSo) {
+  kernel::BecomeAccessPoint("", 0);
+  library::SavedAp(Scheduled('0'));
+  EXPECT_EQ(StatusLine(), "off-by-schedule");
+  EXPECT_THAT(Tool({"ap", "status"}).out, HasSubstr("off the air at this hour, by its schedule\n"));
+  library::SavedAp(Scheduled('1'));
+  EXPECT_EQ(StatusLine(), "off");
+}
+
+TEST_F(AccessPoint, TellsByTheHourOfTheWeekWhetherItsScheduleKeepsItOffTheAir) {
+  kernel::BecomeAccessPoint("", 0);
+  MERO_AP_CONF conf = Scheduled('0');
+  std::tm utc{};
+  const std::time_t now = std::time(nullptr);
+  ::gmtime_r(&now, &utc);
+  const int hour = utc.tm_wday * 24 + utc.tm_hour;
+  for (const int on : {hour, hour + 1}) conf.wifiSchedConf.szWifiSched[on % 168] = '1';  // the hour may end meanwhile
+  library::SavedAp(conf);
+  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}, {.environment = {{"TZ", "UTC"}}}).out.substr(0, 4), "off\t");
+}
+
+TEST_F(AccessPoint, ThatListensForRadarSaysSo) {
+  kernel::BecomeAccessPoint("", 5260);
+  EXPECT_EQ(StatusLine(), "waiting-for-radar");
+  library::MEROWirelessAPEnable = [] { return TRUE; };
+  EXPECT_EQ(Tool({"ap", "enable"}).out,
+            "the access point Office is enabled, and waits until channel 52 is known to be free of radar\n");
+}
+
+TEST_F(AccessPoint, IsBeingSetUpWhileSomebodyIsAtIt) {
+  library::MEROWirelessTestAPMode = [] { return TRUE; };
+  WriteText(kApMarkerPath, "");
+  EXPECT_EQ(StatusLine(), "setting-up");
+  EXPECT_THAT(Tool({"ap", "status"}).out, testing::StartsWith("access point  being set up\n"));
+}
+
+// A process that was killed left its marker, and the access point was "being set up" from then on.
+TEST_F(AccessPoint, IsNotBeingSetUpByAProcessThatIsGone) {
+  library::MEROWirelessTestAPMode = [] { return TRUE; };
+  Shell(std::string("touch -d '10 minutes ago' ") + kApMarkerPath);
+  EXPECT_EQ(StatusLine(), "off");
+}
+
+TEST_F(AccessPoint, TellsWhetherWhatWasSavedIsOnTheAir) {
+  const std::string host = "/etc/hostapd/hostapd-wlan0-host.conf";
+  kernel::BecomeAccessPoint("Office");
+  Shell("mkdir -p /etc/hostapd");
+  WriteText(host,
+            "interface=wlan0\ndriver=nl80211\nssid=Office\nignore_broadcast_ssid=0\nmacaddr_acl=0\n"
+            "wpa_psk_file=/etc/hostapd.psk\nwps_state=2\nap_setup_locked=1\nctrl_interface=/var/run/hostapd\n"
+            "config_methods=label display push_button keypad\nmax_num_sta=256\nbridge=lbr0\nchannel=6\nieee80211n=1\n"
+            "ht_capab=[SHORT-GI-20][DELAYED-BA][SHORT-GI-40][MAX-AMSDU-7935][HT40-]\nwmm_enabled=1\nhw_mode=g\n"
+            "eap_server=1\nauth_algs=1\nwpa=2\nwpa_key_mgmt=WPA-PSK\nwpa_passphrase=open sesame\nwpa_pairwise=CCMP\n"
+            "rsn_pairwise=CCMP\n");
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":false})"));
+  EXPECT_THAT(Tool({"ap", "status"}).out, HasSubstr("\nsettings      as on the air\n"));
+
+  MERO_AP_CONF conf = library::Office();
+  std::strcpy(conf.hostapConf.encryptInfo.wpaPskInfo.szPassPhrase, "open says me");
+  library::SavedAp(conf);
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})"));
+  EXPECT_THAT(Tool({"ap", "status"}).out, HasSubstr("\nsettings      saved, not yet on the air\n"));
+
+  conf = library::Office();
+  conf.hostapConf.guestNet.blEnable = TRUE;
+  library::SavedAp(conf);
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})")) << "guests, who are not on the air";
 }
 
 TEST_F(AccessPoint, NeedsAnAdapterThatHasBeenAnnounced) {
@@ -324,6 +458,12 @@ TEST_F(AccessPoint, NeedsAnAdapterThatHasBeenAnnounced) {
   EXPECT_EQ(Tool({"ap", "show"}).status, 1);
   library::MEROWirelessAdapterNum = [] { return 0; };
   EXPECT_EQ(Tool({"ap", "show"}).status, 3);
+}
+
+// Without it, the access point was said to be off.
+TEST_F(AccessPoint, HasNoStatusWithoutItsAdapter) {
+  library::MEROWirelessAdapterNum = [] { return 0; };
+  EXPECT_EQ(Tool({"ap", "status"}).status, 3);
 }
 
 }  // namespace

@@ -1,37 +1,69 @@
-// What the program comes upon instead of the kernel's wireless stack.
+// The kernel's wireless stack, as the program asks it.
 #include "kernel_fakes.h"
 
 #include <netlink/genl/genl.h>
+#include <sys/mman.h>
 
 #include <cstdlib>
+#include <functional>
 #include <memory>
 #include <string>
 #include <utility>
+#include <vector>
 
+#include "common/paths.h"
+#include "common/text.h"
 #include "model/wireless_stack.h"
 
 namespace kernel {
 namespace {
 
+struct State {
+  Interface main;
+  Interface guests;
+};
+
+State& Shared() {
+  static void* const memory = ::mmap(nullptr, sizeof(State), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+  if (memory == MAP_FAILED) std::abort();
+  return *static_cast<State*>(memory);
+}
+
 std::vector<Result> g_results;
 
-// As the kernel describes a network that was heard.
-std::string Description(const Result& result) {
+std::string MessageOf(nl80211_commands command, const std::function<void(nl_msg*)>& fill) {
   const std::unique_ptr<nl_msg, decltype(&nlmsg_free)> message(nlmsg_alloc(), nlmsg_free);
-  genlmsg_put(message.get(), 0, 0, 28, 0, NLM_F_MULTI, NL80211_CMD_NEW_SCAN_RESULTS, 1);
-  nlattr* nest = nla_nest_start(message.get(), NL80211_ATTR_BSS);
-  nla_put(message.get(), NL80211_BSS_BSSID, static_cast<int>(result.address.size()), result.address.data());
-  nla_put_u32(message.get(), NL80211_BSS_SEEN_MS_AGO, result.msAgo);
-  if (result.isJoined) nla_put_u32(message.get(), NL80211_BSS_STATUS, NL80211_BSS_STATUS_ASSOCIATED);
-  nla_nest_end(message.get(), nest);
+  genlmsg_put(message.get(), 0, 0, 28, 0, 0, command, 1);
+  fill(message.get());
   const nlmsghdr* header = nlmsg_hdr(message.get());
   return {reinterpret_cast<const char*>(header), header->nlmsg_len};
 }
 
-std::vector<std::string> ScanResults() {
-  std::vector<std::string> messages;
-  for (const Result& result : g_results) messages.push_back(Description(result));
-  return messages;
+// As the kernel describes a network that was heard.
+std::string Description(const Result& result) {
+  return MessageOf(NL80211_CMD_NEW_SCAN_RESULTS, [&](nl_msg* message) {
+    nlattr* nest = nla_nest_start(message, NL80211_ATTR_BSS);
+    nla_put(message, NL80211_BSS_BSSID, static_cast<int>(result.address.size()), result.address.data());
+    nla_put_u32(message, NL80211_BSS_SEEN_MS_AGO, result.msAgo);
+    if (result.isJoined) nla_put_u32(message, NL80211_BSS_STATUS, NL80211_BSS_STATUS_ASSOCIATED);
+    nla_nest_end(message, nest);
+  });
+}
+
+std::string Description(const Interface& interface) {
+  return MessageOf(NL80211_CMD_NEW_INTERFACE, [&](nl_msg* message) {
+    nla_put_u32(message, NL80211_ATTR_IFTYPE, interface.type);
+    if (interface.megahertz != 0) nla_put_u32(message, NL80211_ATTR_WIPHY_FREQ, interface.megahertz);
+    const std::string_view name = interface.szName;
+    if (!name.empty()) nla_put(message, NL80211_ATTR_SSID, static_cast<int>(name.size()), name.data());
+  });
+}
+
+std::string Station(int number) {
+  return MessageOf(NL80211_CMD_NEW_STATION, [&](nl_msg* message) {
+    const unsigned char address[] = {2, 0, 0, 0, 0, static_cast<unsigned char>(number)};
+    nla_put(message, NL80211_ATTR_MAC, sizeof address, address);
+  });
 }
 
 }  // namespace
@@ -40,9 +72,41 @@ void Heard(std::vector<Result> results) {
   g_results = std::move(results);
 }
 
+Interface& Main() {
+  return Shared().main;
+}
+
+Interface& Guests() {
+  return Shared().guests;
+}
+
+void Reset() {
+  Shared() = {};
+  BecomeClient();
+}
+
+void BecomeClient() {
+  Main() = {.isThere = true, .type = NL80211_IFTYPE_STATION, .megahertz = 0, .szName = "", .stations = 0};
+}
+
+void BecomeAccessPoint(std::string_view name, unsigned megahertz) {
+  Main() = {.isThere = true, .type = NL80211_IFTYPE_AP, .megahertz = megahertz, .szName = "", .stations = 0};
+  CopyText(Main().szName, name);
+}
+
 }  // namespace kernel
 
-std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string&, bool) {
-  if (command == NL80211_CMD_GET_SCAN) return kernel::ScanResults();
-  std::abort();
+std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool) {
+  std::vector<std::string> messages;
+  if (command == NL80211_CMD_GET_SCAN) {
+    for (const kernel::Result& result : kernel::g_results) messages.push_back(kernel::Description(result));
+    return messages;
+  }
+  const kernel::Interface& asked = interface == kGuestInterface ? kernel::Guests() : kernel::Main();
+  if (!asked.isThere) return messages;
+  if (command == NL80211_CMD_GET_INTERFACE) messages.push_back(kernel::Description(asked));
+  if (command == NL80211_CMD_GET_STATION) {
+    for (int i = 0; i < asked.stations; ++i) messages.push_back(kernel::Station(i));
+  }
+  return messages;
 }

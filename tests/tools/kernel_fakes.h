@@ -2,7 +2,10 @@
 #ifndef MERO_TESTS_TOOLS_KERNEL_FAKES_H
 #define MERO_TESTS_TOOLS_KERNEL_FAKES_H
 
+#include <linux/nl80211.h>
+
 #include <cstdint>
+#include <string_view>
 #include <vector>
 
 #include "base/text.h"
@@ -21,6 +24,26 @@ struct Result {
 
 // Those that there are from now on; at first there are none.
 void Heard(std::vector<Result> results);
+
+// An interface, as the kernel tells of it; on the air as an access point when it has a name.
+struct Interface {
+  bool isThere;
+  nl80211_iftype type;
+  unsigned megahertz;  // of its channel; 0 for none
+  char szName[33];
+  int stations;
+};
+
+// wlan0 and the guests'. Processes of the program's own see them too, and change them for all.
+Interface& Main();
+Interface& Guests();
+
+// wlan0 is a client's.
+void Reset();
+
+// wlan0 is a client's, or an access point's on the air.
+void BecomeClient();
+void BecomeAccessPoint(std::string_view name, unsigned megahertz = 2437);
 
 }  // namespace kernel
 

@@ -10,7 +10,9 @@
 #include <cstring>
 #include <sstream>
 
+#include "common/paths.h"
 #include "common/text.h"
+#include "kernel_fakes.h"
 #include "tests/support/fake_functions.h"
 #include "tests/support/ring.h"
 
@@ -35,6 +37,7 @@ void Reset() {
   g_calls = ::memfd_create("calls", MFD_CLOEXEC);
   g_user = 0;
   g_now = 0;
+  kernel::Reset();
 
 #define GIVE_ZERO(name, count) name = [](auto&&...) { return decltype(name)::result_type{}; };
   LIBRARY_ACTIONS(GIVE_ZERO)
@@ -44,11 +47,17 @@ void Reset() {
   MEROWirelessInterfaceGet = [] { return "wlan0"; };
   MEROWirelessCheckBlock = [] { return 1; };
   MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
-  for (auto* enable : {&MEROWirelessAPEnable, &MEROWirelessAPDisable}) *enable = [] { return TRUE; };
-  MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return TRUE; };
+  MEROWirelessAPEnable = [] { return kernel::BecomeAccessPoint("Office"), TRUE; };
+  MEROWirelessAPDisable = [] { return kernel::BecomeClient(), TRUE; };
+  MEROWirelessModeChange = [](MERO_WIRELESS_MODE mode) {
+    mode == WIRELESS_AP_MODE ? kernel::BecomeAccessPoint("Office") : kernel::BecomeClient();
+    return TRUE;
+  };
   MEROWirelessApConfigSecNameGet = [](char* szName, size_t) { return std::strcpy(szName, "ExampleStick"), TRUE; };
   MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return TRUE; };
-  PLIBCFileCheckKeyValue = [](const char*, const char*, const char*, int) { return 1; };
+  PLIBCFileCheckKeyValue = [](const char* szPath, const char*, const char*, int) {
+    return std::strcmp(szPath, kModelPath) == 0 ? 1 : 0;
+  };
   PLIBCFileRemoveSection = [](const char*, const char*) { return 1; };
   InRange({});
   Known({});

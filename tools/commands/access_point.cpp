@@ -7,6 +7,7 @@
 #include "common/ap_settings.h"
 #include "common/paths.h"
 #include "model/ap_settings.h"
+#include "model/ap_status.h"
 #include "model/library.h"
 #include "model/library_lines.h"
 
@@ -123,45 +124,17 @@ Failure EnableFailed() {
   return Failed("the access point could not be enabled");
 }
 
-struct ApStatus {
-  std::string interface;
-  bool enabled;
-  bool settingUp;
-  bool onAir;
-  std::string name;
-};
-
-const char* StateOf(const ApStatus& status) {
-  return status.settingUp ? "setting-up" : status.onAir ? "on-air" : "off";
-}
-
-Shown ShowState(const ApStatus& status, bool) {
-  if (status.settingUp) return {"being set up", Tone::kFair};
-  return status.onAir ? Shown{"on the air", Tone::kGood} : Shown{"off", Tone::kFair};
-}
-
-constexpr Field<ApStatus> kApStatusFields[] = {
-    {"state", "access point", [](const ApStatus& of) { return Value(StateOf(of)); }, Layout::kLeft, ShowState},
-    {"name", "name", [](const ApStatus& of) { return Value(of.name); }},
-    {"enabled", "enabled", [](const ApStatus& of) { return Value(of.enabled); }},
-    {"interface", "interface", [](const ApStatus& of) { return Value(of.interface); }},
-};
-
-bool IsOnAir() {
-  WIRELESS_INFO info{};
-  return MEROWirelessAdapterNum() > 0 && MEROWirelessCurInfoGet(REQUEST_MODE, &info) == 0 &&
-         info.opmode == WIRELESS_OPMODE_MASTER;
-}
-
-ApStatus ReadApStatus() {
-  const ApConf conf = ReadSettings();
-  return {
-      .interface = MEROWirelessAPInterfaceGet(),
-      .enabled = conf.blEnable != FALSE,
-      .settingUp = MEROWirelessTestAPMode() != FALSE,
-      .onAir = IsOnAir(),
-      .name = conf.hostapConf.szSSID,
-  };
+// The kernel tells what became of it.
+void SayEnabled(const Program& program, const ApConf& conf) {
+  const ApStatus status = ReadApStatus(conf);
+  const std::string name = program.output.Name(status.name);
+  if (status.state == ApState::kOff) {
+    throw Failed("the access point " + name + " was started, and is not on the air",
+                 "-v shows what the library reports");
+  }
+  const std::string more = status.state == ApState::kOnAir ? "" : ", and " + WhatBecameOf(status);
+  program.output.Done<ApStatus>("the access point " + name + " is enabled" + more, "access_point", ApStatusFields(),
+                                status);
 }
 
 }  // namespace
@@ -198,16 +171,20 @@ void EnableAp(const Program& program) {
     if (!IsAnothers()) Undo(task);
     throw EnableFailed();
   }
-  program.output.Done<ApStatus>("the access point " + program.output.Name(conf.hostapConf.szSSID) + " is enabled",
-                                "access_point", kApStatusFields, ReadApStatus());
+  SayEnabled(program, ReadSettings());
 }
 
 void DisableAp(const Program& program) {
-  const ApConf conf = ReadSettings();
-  Disable(program, conf);
-  program.output.Done<ApStatus>("the access point is disabled", "access_point", kApStatusFields, ReadApStatus());
+  Disable(program, ReadSettings());
+  const ApStatus status = ReadApStatus(ReadSettings());
+  if (status.isRunning()) {
+    throw Failed("the access point is disabled, and the kernel has one on the air",
+                 "another access-point daemon may run: `ps -C hostapd` shows it");
+  }
+  program.output.Done<ApStatus>("the access point is disabled", "access_point", ApStatusFields(), status);
 }
 
 void ShowApStatus(const Program& program) {
-  program.output.One<ApStatus>("access_point", kApStatusFields, ReadApStatus());
+  RequireAdapter();
+  program.output.One<ApStatus>("access_point", ApStatusFields(), ReadApStatus(ReadSettings()));
 }

@@ -67,11 +67,11 @@ on nas merowireless ap set --ssid office --encryption wpa2 --key-file /var/lib/r
 on nas merowireless ap enable
 expect_nothing_inherited nas
 on nas merowireless ap status --porcelain
-expect_output <<<'on-air	office	yes	wlan0'
+expect_output <<<'on-air	office	yes	wlan0	office		11	2462	0	no'
 on nas merowireless mode client
 expect_same "the kind of nas's interface" managed "$(radio_type nas)"
 on nas merowireless mode ap
 on nas merowireless ap status --porcelain
-expect_output <<<'on-air	office	yes	wlan0'
+expect_output <<<'on-air	office	yes	wlan0	office		11	2462	0	no'
 on nas merowireless ap disable
 expect_no_access_point nas

@@ -1,0 +1,17 @@
+// The files that the access-point daemon is started from, and whether somebody is at it.
+#ifndef MERO_TOOLS_AP_FILES_H
+#define MERO_TOOLS_AP_FILES_H
+
+#include <optional>
+#include <string>
+
+#include "model/ap_settings.h"
+
+// Whether the daemon of an interface was given other settings than these; nothing when it was given none. What else the
+// settings hold, such as the guests' rights, is not looked at.
+std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf);
+
+// Whether an access point is being set up at this moment. A process that was killed leaves its marker behind.
+bool IsBeingSetUp();
+
+#endif  // MERO_TOOLS_AP_FILES_H
