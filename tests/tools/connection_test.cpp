@@ -437,13 +437,4 @@ TEST_F(Connection, NeedsARadioThatCanBeSwitched) {
   EXPECT_EQ(Tool({"radio", "sideways"}).status, 2);
 }
 
-TEST_F(Connection, NeedsAnAdapterThatIsAClients) {
-  library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE mode) { return library::Record(std::to_string(mode)), TRUE; };
-  EXPECT_EQ(Tool({"mode", "client"}).status, 0);
-  EXPECT_EQ(Tool({"mode", "ap"}).status, 0);
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessModeChange", "1", "MEROWirelessModeChange", "0"));
-  library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return FALSE; };
-  EXPECT_EQ(Tool({"mode", "ap"}).status, 1);
-}
-
 }  // namespace

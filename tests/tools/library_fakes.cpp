@@ -1,6 +1,7 @@
 // The functions that the program comes upon instead of the library's.
 #include "library_fakes.h"
 
+#include <dlfcn.h>
 #include <sys/mman.h>
 #include <syslog.h>
 #include <unistd.h>
@@ -55,8 +56,11 @@ void Reset() {
   };
   MEROWirelessApConfigSecNameGet = [](char* szName, size_t) { return std::strcpy(szName, "ExampleStick"), TRUE; };
   MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return TRUE; };
-  PLIBCFileCheckKeyValue = [](const char* szPath, const char*, const char*, int) {
-    return std::strcmp(szPath, kModelPath) == 0 ? 1 : 0;
+  PLIBCFileCheckKeyValue = [](const char* szPath, const char* szKey, const char* szExpected, int exact) {
+    if (std::strcmp(szPath, kModelPath) == 0) return 1;
+    static const auto real =
+        reinterpret_cast<decltype(&::PLIBCFileCheckKeyValue)>(::dlsym(RTLD_NEXT, "PLIBCFileCheckKeyValue"));
+    return real(szPath, szKey, szExpected, exact);
   };
   PLIBCFileRemoveSection = [](const char*, const char*) { return 1; };
   InRange({});

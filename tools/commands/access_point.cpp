@@ -13,36 +13,15 @@
 
 namespace {
 
-// A record that nothing was saved for knows of no guests; they get what a section has that says nothing of them. A name
-// is not made up for them.
-void SetGuestDefaults(ApConf& conf) {
-  for (const auto& [turn, setting] : kSettingRows) {
-    const bool isNumber = setting.kind == SettingKind::kInteger;
-    if (isNumber && NumberIn(&conf, setting) == 0) PutNumber(&conf, setting, setting.missing);
-  }
-  SetText(conf.guestNetSchedConf.szWifiSched, kAlwaysOn, "the schedule");
-}
-
 // `radio off` may have saved settings that hold the switch alone, and so no bridge.
 void SetBridgeDefault(ApConf& conf) {
   if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, kNatBridge, "the bridge");
 }
 
-// Reads the settings of the adapter's model; false, with the defaults, when none were saved.
-bool ReadSaved(ApConf& conf) {
-  return MEROWirelessGetAPConfig(AdapterModel().c_str(), &conf) > 0;
-}
-
-ApConf ReadSettings() {
-  ApConf conf{};
-  if (!ReadSaved(conf)) SetGuestDefaults(conf);
-  return conf;
-}
-
 // The saved settings. The defaults are never enabled: they are an open network, which nobody has asked for.
 ApConf SettingsToEnable() {
   ApConf conf{};
-  if (!ReadSaved(conf)) {
+  if (!ReadSavedAp(conf)) {
     throw Failure(Exit::kUsage, "no access point has been set up for this adapter",
                   "`merowireless ap set` gives it a name and a protection");
   }
@@ -141,14 +120,14 @@ void SayEnabled(const Program& program, const ApConf& conf) {
 
 void ShowAp(const Program& program, bool showSecrets) {
   const auto fields = ApFields(showSecrets);
-  program.output.One<ApConf>("access_point", fields, ReadSettings());
+  program.output.One<ApConf>("access_point", fields, ReadApSettings());
 }
 
 void SetAp(const Program& program, const ApChanges& changes) {
   if (changes.settings.empty() && !changes.secret.isGiven() && changes.guestKeyFile.empty()) {
     throw Failure(Exit::kUsage, "there is nothing to change", "`merowireless ap set --help` lists the settings");
   }
-  ApConf conf = ReadSettings();
+  ApConf conf = ReadApSettings();
   SetBridgeDefault(conf);
   ApplySettings(conf, changes);
   ApplySecrets(program, conf, changes);
@@ -171,12 +150,12 @@ void EnableAp(const Program& program) {
     if (!IsAnothers()) Undo(task);
     throw EnableFailed();
   }
-  SayEnabled(program, ReadSettings());
+  SayEnabled(program, ReadApSettings());
 }
 
 void DisableAp(const Program& program) {
-  Disable(program, ReadSettings());
-  const ApStatus status = ReadApStatus(ReadSettings());
+  Disable(program, ReadApSettings());
+  const ApStatus status = ReadApStatus(ReadApSettings());
   if (status.isRunning()) {
     throw Failed("the access point is disabled, and the kernel has one on the air",
                  "another access-point daemon may run: `ps -C hostapd` shows it");
@@ -186,5 +165,5 @@ void DisableAp(const Program& program) {
 
 void ShowApStatus(const Program& program) {
   RequireAdapter();
-  program.output.One<ApStatus>("access_point", ApStatusFields(), ReadApStatus(ReadSettings()));
+  program.output.One<ApStatus>("access_point", ApStatusFields(), ReadApStatus(ReadApSettings()));
 }

@@ -111,6 +111,12 @@ std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& c
   return *given != lines.text() || HasOtherGuests(interface, conf.hostapConf.guestNet);
 }
 
+ApSwitch ApSwitchOf(const std::string& interface) {
+  const std::string info = PathOf(kHostapdInfoFormat, interface);
+  if (PLIBCFileExist(info.c_str()) == 0) return ApSwitch::kNone;
+  return PLIBCFileCheckKeyValue(info.c_str(), "enable", "yes", 0) != 0 ? ApSwitch::kOn : ApSwitch::kOff;
+}
+
 bool IsBeingSetUp() {
   constexpr nanoseconds kLongest = std::chrono::minutes(5);
   struct stat marker {};

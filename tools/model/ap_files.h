@@ -11,6 +11,11 @@
 // settings hold, such as the guests' rights, is not looked at.
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf);
 
+// Whether an access point was set up on an interface and not disabled since, and whether it is switched on: a change of
+// the adapter's mode switches it off and on.
+enum class ApSwitch { kNone, kOff, kOn };
+ApSwitch ApSwitchOf(const std::string& interface);
+
 // Whether an access point is being set up at this moment. A process that was killed leaves its marker behind.
 bool IsBeingSetUp();
 

@@ -325,7 +325,29 @@ constexpr ApSetting kSettings[] = {
     {Told("auth_server_port", RadiusPort), "N", "the port of the RADIUS server", SetRadiusPort},
 };
 
+// ---- What was saved ----
+
+// A record that nothing was saved for knows of no guests; they get what a section has that says nothing of them. A name
+// is not made up for them.
+void SetGuestDefaults(ApConf& conf) {
+  for (const auto& [turn, setting] : kSettingRows) {
+    const bool isNumber = setting.kind == SettingKind::kInteger;
+    if (isNumber && NumberIn(&conf, setting) == 0) PutNumber(&conf, setting, setting.missing);
+  }
+  SetText(conf.guestNetSchedConf.szWifiSched, kAlwaysOn, "the schedule");
+}
+
 }  // namespace
+
+bool ReadSavedAp(ApConf& conf) {
+  return MEROWirelessGetAPConfig(AdapterModel().c_str(), &conf) > 0;
+}
+
+ApConf ReadApSettings() {
+  ApConf conf{};
+  if (!ReadSavedAp(conf)) SetGuestDefaults(conf);
+  return conf;
+}
 
 std::string OptionOf(std::string_view key) {
   std::string option(key);

@@ -25,6 +25,12 @@ struct ApSetting {
   bool hasOption() const { return set != nullptr; }
 };
 
+// Reads the settings of the adapter's model; false, with the defaults, when none were saved.
+bool ReadSavedAp(ApConf& conf);
+
+// The same, where defaults will do.
+ApConf ReadApSettings();
+
 // The option that sets a key, without its dashes: the key, with hyphens.
 std::string OptionOf(std::string_view key);
 

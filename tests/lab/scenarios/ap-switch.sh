@@ -17,11 +17,14 @@ home=(essid=home auth=WPA2PSK encrypt=AES key='deux croissants')
 say '-- a client becomes an access point'
 joins nas cafe "${cafe[@]}"
 on nas mero-call ifconfig wlan0 ip=DHCP
-on nas mero-call mode ap
-expect_line result=1
-within 2 no_station cafe nas || fail 'it is still a client'
-expect_processes nas </dev/null
-expect_same 'the addresses of nas' '' "$(addresses_of nas)"
+# The program refuses that: nothing would come in the connection's place.
+if through_functions; then
+  on nas mero-call mode ap
+  expect_line result=1
+  within 2 no_station cafe nas || fail 'it is still a client'
+  expect_processes nas </dev/null
+  expect_same 'the addresses of nas' '' "$(addresses_of nas)"
+fi
 serves nas ssid=home encryption=2 wpa_passphrase='deux croissants' wpa=2 wpa_encrypt_type=2 channel=6 \
   ieee80211n_wireless_width=1
 guest_of nas guest "${home[@]}"
@@ -83,7 +86,8 @@ ip netns exec nas iw phy "${RADIO_OF[nas]}" set netns 1
 on nas mero-call ap-save channel=6
 fails_to_start "there is no interface 'wlan0'"
 fails_on nas mero-call mode ap
-expect_message nas 'no adapter is plugged in'
+# The program finds that out by itself, too.
+if through_functions; then expect_message nas 'no adapter is plugged in'; fi
 iw phy "${RADIO_OF[nas]}" set netns name nas
 
 say '-- somebody else answers names'
