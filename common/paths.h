@@ -14,7 +14,10 @@ inline constexpr char kKnownNetworksPath[] = "/usr/mero/etc/wireless.conf";
 // The access-point settings, one section an adapter model.
 inline constexpr char kApSettingsPath[] = "/usr/mero/etc/wireless_ap.conf";
 
-// A line of a section, in both files.
+// What used the radio when it was switched off, until it is switched on again.
+inline constexpr char kRadioUsePath[] = "/usr/mero/etc/wireless_radio.conf";
+
+// A line of a section, in both of the first files.
 inline constexpr char kSectionLineFormat[] = "\t%s=%s\n";
 
 // What the appliance's model can do.

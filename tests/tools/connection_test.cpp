@@ -424,17 +424,4 @@ TEST_F(Connection, IsWatchedThoughTheKernelIsNeverQuiet) {
   EXPECT_EQ(Tool({"watch", "--count", "1", "--porcelain"}).out.substr(0, 10), "connected\t");
 }
 
-TEST_F(Connection, NeedsARadioThatCanBeSwitched) {
-  EXPECT_EQ(Tool({"radio", "--porcelain"}).out, "on\tExampleStick\n");
-  library::PLIBCFileSetSectionValue = [](const char* szPath, const char* szSection, const char* szKey,
-                                         const char* szValue, const char* szFormat) {
-    library::Record(std::string(szPath) + "|" + szSection + "|" + szKey + "|" + szValue + "|" + szFormat);
-    return 0;
-  };
-  EXPECT_EQ(Tool({"radio", "off"}).status, 0);
-  EXPECT_THAT(library::Calls(), ElementsAre("PLIBCFileSetSectionValue",
-                                            "/usr/mero/etc/wireless_ap.conf|ExampleStick|unblock|no|\t%s=%s", ""));
-  EXPECT_EQ(Tool({"radio", "sideways"}).status, 2);
-}
-
 }  // namespace

@@ -144,10 +144,13 @@ std::set<std::string> WordsOnScreen(const std::vector<std::string>& words, unsig
 TEST_F(Forms, FitAScreenOfFortyColumnsWordByWord) {
   ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr);
   for (const auto& [world, words] : kCommands) {
-    library::Reset();
-    library::g_now = library::kNow;
-    world();
-    EXPECT_EQ(WordsOnScreen(words, 40), WordsOnScreen(words, 300)) << Joined(words);
+    const auto wordsAt = [&](unsigned short columns) {
+      library::Reset();
+      library::g_now = library::kNow;
+      world();
+      return WordsOnScreen(words, columns);
+    };
+    EXPECT_EQ(wordsAt(40), wordsAt(300)) << Joined(words);
   }
   Shell("ip link delete wlan0");
   for (const std::vector<std::string>& wrong : {std::vector<std::string>{"scan", "--renwe"}, {"forget", "Nowhere"}}) {

@@ -62,6 +62,7 @@ void Reset() {
         reinterpret_cast<decltype(&::PLIBCFileCheckKeyValue)>(::dlsym(RTLD_NEXT, "PLIBCFileCheckKeyValue"));
     return real(szPath, szKey, szExpected, exact);
   };
+  PLIBCFileSetKeyValue = [](const char*, const char*, const char*, const char*) { return 1; };
   PLIBCFileRemoveSection = [](const char*, const char*) { return 1; };
   InRange({});
   Known({});

@@ -43,6 +43,7 @@
   FAKE(MEROWirelessAPDisable, 0)         \
   FAKE(MEROWirelessModeChange, 1)        \
   FAKE(PLIBCFileRemoveSection, 2)        \
+  FAKE(PLIBCFileSetKeyValue, 4)          \
   FAKE(PLIBCFileSetSectionValue, 5)
 
 namespace library {

@@ -98,11 +98,11 @@ TEST(InstalledProgram, DoesNotShowASecretThatIsTypedAfterItWasStopped) {
 
 TEST(InstalledProgram, SwitchesTheRadio) {
   AnnounceAdapter();
-  EXPECT_EQ(Tool("radio --porcelain").out, "on\tExample Stick\n");
-  EXPECT_EQ(Tool("radio off --porcelain").out, "off\tExample Stick\n");
-  EXPECT_EQ(Tool("radio --porcelain").out, "off\tExample Stick\n");
+  EXPECT_EQ(Tool("radio --porcelain").out, "on\tExample Stick\t\n");
+  EXPECT_EQ(Tool("radio off --porcelain").out, "off\tExample Stick\t\n");
+  EXPECT_EQ(Tool("radio --porcelain").out, "off\tExample Stick\t\n");
   EXPECT_EQ(Tool("radio on").out, "the radio is on\n");
-  EXPECT_EQ(Tool("radio --porcelain").out, "on\tExample Stick\n");
+  EXPECT_EQ(Tool("radio --porcelain").out, "on\tExample Stick\t\n");
 }
 
 TEST(InstalledProgram, KeepsTheAccessPointsSettings) {
@@ -169,7 +169,7 @@ TEST(InstalledProgram, TakesAnEmptyFileOfTheAdapterForNone) {
     EXPECT_EQ(ran.status, 3) << szArguments;
     EXPECT_THAT(ran.out, StartsWith("merowireless: no adapter is plugged in")) << szArguments;
   }
-  EXPECT_EQ(Tool("radio --porcelain").out, "on\t\n");
+  EXPECT_EQ(Tool("radio --porcelain").out, "on\t\t\n");
 }
 
 TEST(InstalledProgram, DisconnectsWhatIsNotConnected) {

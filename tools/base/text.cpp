@@ -152,6 +152,16 @@ std::string Hex(std::string_view bytes) {
   return hex;
 }
 
+std::string BytesOfHex(std::string_view hex) {
+  std::string bytes;
+  for (std::size_t i = 0; i + 2 <= hex.size(); i += 2) {
+    unsigned value = 0;
+    const char* end = hex.data() + i + 2;
+    if (std::from_chars(hex.data() + i, end, value, 16).ptr == end) bytes += static_cast<char>(value);
+  }
+  return bytes;
+}
+
 std::string AddressText(const unsigned char (&address)[6]) {
   char szText[sizeof "00:11:22:33:44:55"];
   std::snprintf(szText, sizeof szText, "%02X:%02X:%02X:%02X:%02X:%02X", address[0], address[1], address[2], address[3],

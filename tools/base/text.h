@@ -35,6 +35,9 @@ std::string Wrapped(std::string_view text, std::size_t width, std::size_t indent
 bool IsUtf8(std::string_view bytes);
 std::string Hex(std::string_view bytes);
 
+// The bytes that Hex() wrote out; what is no pair of its digits is left out.
+std::string BytesOfHex(std::string_view hex);
+
 using Address = std::array<unsigned char, 6>;
 
 std::string AddressText(const unsigned char (&address)[6]);

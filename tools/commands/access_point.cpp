@@ -141,6 +141,7 @@ void SetAp(const Program& program, const ApChanges& changes) {
 void EnableAp(const Program& program) {
   const ApConf conf = SettingsToEnable();
   RequireAdapter();
+  RefuseWhileRadioIsOff();
   Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
   task.szMarker = kApMarkerPath;
   task.undo = [&] { Disable(program, conf); };

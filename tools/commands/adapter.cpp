@@ -1,33 +1,73 @@
 // The commands about the adapter as a whole: radio, mode.
 #include "commands/adapter.h"
 
+#include <cstring>
+
+#include "commands/connection.h"
 #include "common/paths.h"
 #include "model/ap_files.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
+#include "model/kernel_switch.h"
 #include "model/library.h"
+#include "model/radio_use.h"
+#include "model/status.h"
 
 namespace {
+
+// ---- The radio ----
 
 struct Radio {
   int answer;
   std::string model;
+  KernelBlock block;
+
+  bool isOff() const { return answer == 0 || block == KernelBlock::kSet || block == KernelBlock::kOfHardware; }
 };
 
 const char* TextOf(const Radio& radio) {
-  return radio.answer == 1 ? "on" : radio.answer == 0 ? "off" : "unknown";
+  return radio.isOff() ? "off" : radio.answer == 1 ? "on" : "unknown";
+}
+
+Value BlockOf(const Radio& radio) {
+  switch (radio.block) {
+    case KernelBlock::kUnknown:
+      return nullptr;
+    case KernelBlock::kNone:
+      return "none";
+    case KernelBlock::kSet:
+      return "set";
+    case KernelBlock::kOfHardware:
+      return "hardware";
+  }
+  return nullptr;
+}
+
+Shown ShowBlock(const Radio& radio, bool) {
+  switch (radio.block) {
+    case KernelBlock::kUnknown:
+      return {"-", Tone::kFaint};
+    case KernelBlock::kNone:
+      return {"none"};
+    case KernelBlock::kSet:
+      return {"set"};
+    case KernelBlock::kOfHardware:
+      return {"set by a switch of the hardware", Tone::kBad};
+  }
+  return {""};
 }
 
 constexpr Field<Radio> kRadioFields[] = {
     {"radio", "radio", [](const Radio& of) { return Value(TextOf(of)); }, Layout::kLeft,
      [](const Radio& of, bool) {
-       return Shown{TextOf(of), of.answer == 1 ? Tone::kGood : Tone::kBad};
+       return Shown{TextOf(of), of.isOff() || of.answer != 1 ? Tone::kBad : Tone::kGood};
      }},
     {"adapter", "adapter", [](const Radio& of) { return of.model.empty() ? nullptr : Value(of.model); }},
+    {"kernel_block", "kernel's block", BlockOf, Layout::kLeft, ShowBlock},
 };
 
 Radio ReadRadio() {
-  return {MEROWirelessCheckBlock(), AdapterModelOrNone()};
+  return {MEROWirelessCheckBlock(), AdapterModelOrNone(), KernelBlockOf(MEROWirelessAPInterfaceGet())};
 }
 
 // ---- The mode ----
@@ -71,6 +111,7 @@ void BecomeAccessPoint(const Program& program) {
     throw Failure(Exit::kUsage, "no access point is enabled, and the change would only end a connection",
                   "`merowireless ap enable` makes the adapter one");
   }
+  RefuseWhileRadioIsOff();
   if (!Change(program, WIRELESS_AP_MODE)) throw NotChanged(before.interface);
   const ApStatus after = ReadApStatus(conf);
   if (!after.isRunning()) throw Failed("the mode was changed, and no access point is on the air");
@@ -88,23 +129,116 @@ void BecomeClient(const Program& program) {
   Say(program, "the adapter is a client's now", {"client", true});
 }
 
+// ---- The radio's switch ----
+
+// The switch is a key in the access-point settings. The library can save it only along with all the others, and only
+// when the access point is enabled, so the key is set in the file.
+void SaveSwitch(const std::string& model, bool on) {
+  if (PLIBCFileSetSectionValue(kApSettingsPath, model.c_str(), "unblock", on ? "yes" : "no", kSectionLineFormat) >= 0) {
+    return;
+  }
+  throw Failed("the radio could not be switched", "is there room on the disk? -v shows more");
+}
+
+void LiftBlock() {
+  if (const int error = SetKernelBlock(MEROWirelessAPInterfaceGet(), false); error != 0) {
+    throw Failed(std::string("the kernel's block of the radio could not be lifted: ") + std::strerror(error));
+  }
+}
+
+// An access point that is switched off by the mode can come back with it.
+void EndUse(const Program& program, const RadioUse& use) {
+  if (use.isAccessPoint) {
+    if (Change(program, WIRELESS_CLIENT_MODE) && !IsAccessPoint(MEROWirelessAPInterfaceGet())) return;
+    throw Failed("the radio stays on, since the access point could not be ended");
+  }
+  if (Run<int>(program.Doing("disconnecting"), [] { return MEROWirelessNetworkDisconnect(); }) >= 0) return;
+  throw Failed("the radio stays on, since the connection could not be ended");
+}
+
+void SetBlock() {
+  if (const int error = SetKernelBlock(MEROWirelessAPInterfaceGet(), true); error != 0) {
+    throw Failed(std::string("the radio stays on, since the kernel does not block it: ") + std::strerror(error));
+  }
+}
+
+// Tells what came back, for a sentence about the radio.
+std::string BringBackAccessPoint(const Program& program) {
+  const ApConf conf = ReadApSettings();
+  const std::string interface = MEROWirelessAPInterfaceGet();
+  if (ApSwitchOf(interface) == ApSwitch::kNone) return "";  // it was disabled meanwhile
+  if (!ReadApStatus(conf).isRunning()) (void)Change(program, WIRELESS_AP_MODE);
+  const ApStatus status = ReadApStatus(conf);
+  if (status.isRunning()) return ", and " + Described(program, status);
+  throw Failed("the radio is on, and the access point that was there does not come back",
+               "`merowireless mode ap` tries again; -v shows what the library reports");
+}
+
+std::string BringBackConnection(const Program& program, const std::string& network) {
+  const std::string name = program.output.Name(network);
+  if (ReadStatus().name == network) return ", and connected to " + name;
+  const auto known = FindKnown(network);
+  if (!known) return "; " + name + " is not among the known networks, and was not joined again";
+  try {
+    JoinAgain(program, *known);
+  } catch (const Failure& failure) {
+    throw Failure(failure.exit(), "the radio is on, and not connected to " + name + " again: " + failure.what(),
+                  failure.advice());
+  }
+  return ", and connected to " + name;
+}
+
+std::string BringBack(const Program& program, const RadioUse& use) {
+  if (use.isAccessPoint) return BringBackAccessPoint(program);
+  return use.network.empty() ? "" : BringBackConnection(program, use.network);
+}
+
+// Undoes a part of SwitchOff().
+void StayOn(const Program& program, const std::string& model, const RadioUse& use) {
+  SaveSwitch(model, true);
+  LiftBlock();
+  (void)BringBack(program, use);
+  ForgetRadioUse();
+}
+
+std::string SwitchOff(const Program& program) {
+  const std::string model = AdapterModel();
+  const RadioUse use = ReadRadioUse();
+  const bool wasOff = MEROWirelessCheckBlock() == 0;
+  if (!wasOff || use != RadioUse{}) NoteRadioUse(use);
+  SaveSwitch(model, false);
+  try {
+    EndUse(program, use);
+    SetBlock();
+  } catch (...) {
+    Task task = program.Doing("switching the radio back on");
+    task.undo = [&] { StayOn(program, model, use); };
+    if (!wasOff) Undo(task);
+    throw;
+  }
+  return "the radio is off: no network will be joined";
+}
+
+std::string SwitchOn(const Program& program) {
+  const std::string model = AdapterModel();
+  LiftBlock();
+  RequireNoBlock();  // by a switch that only hands can move
+  const RadioUse use = NotedRadioUse();
+  SaveSwitch(model, true);
+  ForgetRadioUse();
+  return "the radio is on" + BringBack(program, use);
+}
+
 }  // namespace
 
 void ShowRadio(const Program& program) {
   program.output.One<Radio>("radio", kRadioFields, ReadRadio());
 }
 
-// The radio's switch is a key in the access-point settings. The library can save it only along with all the others, and
-// only when the access point is enabled, so the key is set in the file.
 void SwitchRadio(const Program& program, const std::string& state) {
   if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
-  const bool on = state == "on";
-  const std::string model = AdapterModel();
-  if (PLIBCFileSetSectionValue(kApSettingsPath, model.c_str(), "unblock", on ? "yes" : "no", kSectionLineFormat) < 0) {
-    throw Failed("the radio could not be switched", "is there room on the disk? -v shows more");
-  }
-  program.output.Done<Radio>(on ? "the radio is on" : "the radio is off: no network will be joined", "radio",
-                             kRadioFields, ReadRadio());
+  const std::string sentence = state == "on" ? SwitchOn(program) : SwitchOff(program);
+  program.output.Done<Radio>(sentence, "radio", kRadioFields, ReadRadio());
 }
 
 void ChangeMode(const Program& program, const std::string& mode) {

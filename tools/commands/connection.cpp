@@ -150,6 +150,11 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
   SayConnected(program);
 }
 
+void JoinAgain(const Program& program, const KnownNetwork& config) {
+  Join(program, config);
+  ApplyAddressing(program, config);
+}
+
 void AutoConnect(const Program& program) {
   const JoinLock lock;
   RequireFreeAdapter();

@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "model/library.h"
 #include "model/secrets.h"
 #include "work/program.h"
 
@@ -22,6 +23,10 @@ struct CellToMake {
 };
 
 void Connect(const Program& program, const NetworkToJoin& wanted);
+
+// Joins a known network, with its address, and says nothing.
+void JoinAgain(const Program& program, const KnownNetwork& config);
+
 void AutoConnect(const Program& program);
 void Disconnect(const Program& program);
 void ShowStatus(const Program& program);

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <cstring>
 
+#include "model/kernel_switch.h"
 #include "model/library_lines.h"
 #include "work/radio.h"
 
@@ -182,12 +183,29 @@ void RequireScanning() {
                "`merowireless ap disable` takes it down; `merowireless scan --cached` shows what was heard last");
 }
 
+void RequireNoBlock() {
+  const KernelBlock block = KernelBlockOf(MEROWirelessInterfaceGet());
+  if (block == KernelBlock::kSet) {
+    throw Failure(Exit::kRadioOff, "the kernel blocks the radio", "`merowireless radio on` lifts the block");
+  }
+  if (block == KernelBlock::kOfHardware) {
+    throw Failure(Exit::kRadioOff, "a switch of the hardware has the radio blocked", "look for it at the adapter");
+  }
+}
+
 void RequireRadio() {
   const int answer = MEROWirelessCheckBlock();
-  if (answer == 1) return;
-  throw Failure(Exit::kRadioOff,
-                answer == 0 ? "the radio is switched off" : "nobody knows whether the radio may be used",
-                "`merowireless radio on` switches it on");
+  if (answer != 1) {
+    throw Failure(Exit::kRadioOff,
+                  answer == 0 ? "the radio is switched off" : "nobody knows whether the radio may be used",
+                  "`merowireless radio on` switches it on");
+  }
+  RequireNoBlock();
+}
+
+void RefuseWhileRadioIsOff() {
+  if (MEROWirelessCheckBlock() == 0) RequireRadio();
+  RequireNoBlock();
 }
 
 std::string AdapterModelOrNone() {

@@ -43,8 +43,14 @@ void RequireAdapter();
 // Fails while the adapter is an access point, which would have to leave its channel, and whoever is on it, for a scan.
 void RequireScanning();
 
-// Fails when the user has switched the radio off, or when that cannot be told.
+// Fails when the kernel lets nobody use the radio.
+void RequireNoBlock();
+
+// Fails when the user has switched the radio off, or when that cannot be told, or when the kernel blocks it.
 void RequireRadio();
+
+// The same, but for a switch of which nobody can tell: an access point may be started then.
+void RefuseWhileRadioIsOff();
 
 // The settings section of the adapter that is plugged in, or nothing when none has been announced.
 std::string AdapterModelOrNone();
