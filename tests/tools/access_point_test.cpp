@@ -324,6 +324,153 @@ TEST_F(AccessPoint, ThatTheKernelHasAfterwardsWasNotDisabled) {
   EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point is disabled, and the kernel has one on the air: "));
 }
 
+// ---- Its channel ----
+
+// A radio as it is where channels 12 and 13 may only be listened to.
+void GiveChannels() {
+  kernel::g_channels = {{2412},
+                        {2437},
+                        {2462},
+                        {2472, NL80211_FREQUENCY_ATTR_NO_IR},
+                        {2484, NL80211_FREQUENCY_ATTR_DISABLED},
+                        {5180},
+                        {5260, NL80211_FREQUENCY_ATTR_RADAR},
+                        {5500, NL80211_FREQUENCY_ATTR_DISABLED},
+                        {5860}};  // which no access point of this program uses
+}
+
+constexpr char kUsable[] = "it may use 1, 6, 11 in the 2.4 GHz band, and 36, 52 (radar) in the 5 GHz band\n";
+
+// It was saved, and the access point that was on the air went off it when it was enabled.
+TEST_F(AccessPoint, TakesNoChannelThatTheRadioMayNotUse) {
+  GiveChannels();
+  for (const char* szOptions : {"--channel 13", "--channel 14", "--channel 2", "--band 5 --channel 100"}) {
+    const Ran ran = Tool(Words(std::string("ap set ") + szOptions));
+    EXPECT_EQ(ran.status, 2) << szOptions;
+    EXPECT_THAT(ran.err, testing::StartsWith("merowireless: this radio may not use channel ")) << szOptions;
+    EXPECT_THAT(ran.err, testing::EndsWith(std::string(" here and now: ") + kUsable)) << szOptions;
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  for (const char* szOptions : {"--channel 11", "--channel auto", "--band 5", "--band 5 --channel 52"}) {
+    const Ran ran = Tool(Words(std::string("ap set ") + szOptions));
+    EXPECT_EQ(ran.status, 0) << szOptions;
+    EXPECT_EQ(ran.err, "") << szOptions;
+  }
+}
+
+TEST_F(AccessPoint, IsNotTriedOnAChannelThatTheRadioMayNotUse) {
+  GiveChannels();
+  MERO_AP_CONF conf = library::Office();
+  conf.hostapConf.channel = 13;
+  library::SavedAp(conf);
+  EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("merowireless: this radio may not use channel 13 here and now: "));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_EQ(Tool({"ap", "set", "--ssid", "New"}).status, 0) << "what has nothing to do with the channel";
+}
+
+TEST_F(AccessPoint, IsSavedWithoutARadioThatKnowsItsChannels) {
+  const Ran ran = Tool({"ap", "set", "--channel", "13"});
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_EQ(ran.err, "merowireless: the channel could not be checked, since no radio is there to tell\n");
+  EXPECT_EQ(library::Calls().size(), 2U);
+  EXPECT_EQ(Tool({"ap", "set", "--ssid", "New"}).err, "") << "no remark about what was not asked for";
+}
+
+// ---- The one that was on the air before ----
+
+class FormerAccessPoint : public AccessPoint {
+ protected:
+  FormerAccessPoint() {
+    kernel::BecomeAccessPoint("Old Office");
+    WriteText(kHost, "ssid=Old Office\n");
+    WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n", 0644);
+    WriteText(kScripts + "ifcfg-wlan0", "DEVICE=wlan0\nBRIDGE=br7\n", 0644);
+    library::MEROWirelessAPEnable = [] {
+      kernel::BecomeClient();
+      WriteText(kHost, "ssid=Office\n");
+      WriteText(kScripts + "ifcfg-wlan0", "DEVICE=wlan0\nBRIDGE=lbr0\n");
+      WriteText(kScripts + "ifcfg-lbr0", "DEVICE=lbr0\n");
+      WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+      return library::Record("enabling"), FALSE;
+    };
+    library::MEROWirelessAPDisable = [] { return kernel::BecomeClient(), TRUE; };
+    RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
+    kernel::AppearWith(kStarted, "Old Office");
+  }
+
+  static void SetScript(const std::string& text) { WriteScript("/etc/rc.network", text); }
+
+  static inline const std::string kHost = "/etc/hostapd/hostapd-wlan0-host.conf";
+  static inline const std::string kScripts = "/etc/sysconfig/network-scripts/";
+  static constexpr char kStarted[] = "/tmp/started";
+};
+
+// It was gone for good, for a channel that the new one could not use.
+TEST_F(FormerAccessPoint, ComesBackWhenTheNextOneCannotBeEnabled) {
+  SetScript("echo $* >/tmp/started\n");
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  constexpr char kMessage[] = "the access point could not be enabled, and the one that was on the air is there again";
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: " + std::string(kMessage) + ": "));
+  EXPECT_EQ(ReadText(kStarted), "start wlan0 br7\n");
+  EXPECT_EQ(ReadText(kHost), "ssid=Old Office\n");
+  EXPECT_EQ(ModeOf(kHost), 0600U);
+  EXPECT_EQ(ReadText("/etc/hostapd/hostapd-wlan0.info"), "enable=\"yes\"\n");
+  EXPECT_EQ(ReadText(kScripts + "ifcfg-wlan0"), "DEVICE=wlan0\nBRIDGE=br7\n");
+  EXPECT_FALSE(Exists(kScripts + "ifcfg-lbr0"));
+  EXPECT_THAT(NamesIn("/etc/hostapd"), Not(testing::Contains(HasSubstr("host.conf."))));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable", "enabling"));
+}
+
+TEST_F(FormerAccessPoint, ComesBackWhenTheNextOneIsInterrupted) {
+  SetScript("echo $* >/tmp/started\n");
+  library::MEROWirelessAPEnable = [] {
+    kernel::BecomeClient();
+    WriteText(kHost, "ssid=Office\n");
+    library::Record("enabling");
+    while (true) ::pause();
+    return TRUE;
+  };
+  StartedTool tool({"ap", "enable"});
+  ASSERT_TRUE(Soon([] { return std::ranges::count(library::Calls(), "enabling") > 0; }));
+  ::kill(tool.pid(), SIGINT);
+  EXPECT_EQ(tool.Wait().status, 130);
+  EXPECT_EQ(ReadText(kStarted), "start wlan0 br7\n");
+  EXPECT_EQ(ReadText(kHost), "ssid=Old Office\n");
+}
+
+TEST_F(FormerAccessPoint, ThatDoesNotComeBackIsDisabled) {
+  SetScript("exit 1\n");
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  constexpr char kMessage[] = "the access point that was on the air could not be brought back, and is disabled";
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: " + std::string(kMessage) + "\n"));
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point could not be enabled: "));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable", "enabling",
+                                            "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
+}
+
+// ---- Who is at it ----
+
+// Its marker stayed, and the next attempt was refused.
+TEST_F(AccessPoint, IsEnabledAfterAnAttemptThatWasKilled) {
+  library::MEROWirelessAPEnable = [] {
+    return Exists(kApMarkerPath) ? FALSE : (kernel::BecomeAccessPoint("Office"), TRUE);
+  };
+  Shell(std::string("touch -d '10 minutes ago' ") + kApMarkerPath);
+  library::MEROWirelessTestAPMode = [] { return Exists(kApMarkerPath) ? TRUE : FALSE; };
+  EXPECT_EQ(Tool({"ap", "enable"}).status, 0);
+}
+
+// The library would have taken the marker of whoever was at it.
+TEST_F(AccessPoint, ThatSomebodySetsUpIsNotTouched) {
+  library::MEROWirelessTestAPMode = [] { return TRUE; };
+  WriteText(kApMarkerPath, "");
+  EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("merowireless: an access point is being set up already, or "));
+  EXPECT_TRUE(Exists(kApMarkerPath));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
 // ---- Its status ----
 
 // The settings of an access point that has a schedule, with no hour on the air or with all of them.

@@ -14,13 +14,19 @@
 #include "common/paths.h"
 #include "common/text.h"
 #include "model/wireless_stack.h"
+#include "tests/support/files.h"
 
 namespace kernel {
+
+std::vector<Channel> g_channels;
+
 namespace {
 
 struct State {
   Interface main;
   Interface guests;
+  char szAppearsWith[64];
+  char szAppearing[33];
 };
 
 State& Shared() {
@@ -66,6 +72,26 @@ std::string Station(int number) {
   });
 }
 
+void PutChannel(nl_msg* message, const Channel& channel) {
+  nlattr* description = nla_nest_start(message, 0);
+  nla_put_u32(message, NL80211_FREQUENCY_ATTR_FREQ, channel.megahertz);
+  if (channel.flag != NL80211_FREQUENCY_ATTR_FREQ) nla_put_flag(message, channel.flag);
+  nla_nest_end(message, description);
+}
+
+// One message a channel, as the kernel cuts its answer into parts.
+std::string PartOfRadio(const Channel& channel) {
+  return MessageOf(NL80211_CMD_NEW_WIPHY, [&](nl_msg* message) {
+    nlattr* bands = nla_nest_start(message, NL80211_ATTR_WIPHY_BANDS);
+    nlattr* band = nla_nest_start(message, channel.megahertz < 5000 ? NL80211_BAND_2GHZ : NL80211_BAND_5GHZ);
+    nlattr* channels = nla_nest_start(message, NL80211_BAND_ATTR_FREQS);
+    PutChannel(message, channel);
+    nla_nest_end(message, channels);
+    nla_nest_end(message, band);
+    nla_nest_end(message, bands);
+  });
+}
+
 }  // namespace
 
 void Heard(std::vector<Result> results) {
@@ -82,6 +108,7 @@ Interface& Guests() {
 
 void Reset() {
   Shared() = {};
+  g_channels.clear();
   BecomeClient();
 }
 
@@ -94,9 +121,20 @@ void BecomeAccessPoint(std::string_view name, unsigned megahertz) {
   CopyText(Main().szName, name);
 }
 
+void AppearWith(const char* szPath, std::string_view name) {
+  CopyText(Shared().szAppearsWith, szPath);
+  CopyText(Shared().szAppearing, name);
+}
+
+void Appear() {
+  State& state = Shared();
+  if (state.szAppearsWith[0] != '\0' && Exists(state.szAppearsWith)) BecomeAccessPoint(state.szAppearing);
+}
+
 }  // namespace kernel
 
 std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool) {
+  kernel::Appear();
   std::vector<std::string> messages;
   if (command == NL80211_CMD_GET_SCAN) {
     for (const kernel::Result& result : kernel::g_results) messages.push_back(kernel::Description(result));
@@ -107,6 +145,9 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
   if (command == NL80211_CMD_GET_INTERFACE) messages.push_back(kernel::Description(asked));
   if (command == NL80211_CMD_GET_STATION) {
     for (int i = 0; i < asked.stations; ++i) messages.push_back(kernel::Station(i));
+  }
+  if (command == NL80211_CMD_GET_WIPHY) {
+    for (const kernel::Channel& channel : kernel::g_channels) messages.push_back(kernel::PartOfRadio(channel));
   }
   return messages;
 }

@@ -38,12 +38,22 @@ struct Interface {
 Interface& Main();
 Interface& Guests();
 
-// wlan0 is a client's.
+// What the radio may do on a channel.
+struct Channel {
+  unsigned megahertz;
+  nl80211_frequency_attr flag = NL80211_FREQUENCY_ATTR_FREQ;  // DISABLED, NO_IR or RADAR
+};
+extern std::vector<Channel> g_channels;
+
+// wlan0 is a client's, and the radio tells of no channels.
 void Reset();
 
 // wlan0 is a client's, or an access point's on the air.
 void BecomeClient();
 void BecomeAccessPoint(std::string_view name, unsigned megahertz = 2437);
+
+// wlan0 is an access point's on the air, too, once there is a file at this path: a script can make one.
+void AppearWith(const char* szPath, std::string_view name);
 
 }  // namespace kernel
 

@@ -2,10 +2,14 @@
 #include "commands/access_point.h"
 
 #include <algorithm>
+#include <optional>
 
 #include "base/signals.h"
 #include "common/ap_settings.h"
 #include "common/paths.h"
+#include "model/ap_channels.h"
+#include "model/ap_files.h"
+#include "model/ap_former.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
 #include "model/library.h"
@@ -63,6 +67,12 @@ void ApplySettings(ApConf& conf, const ApChanges& changes) {
   }
 }
 
+bool ConcernsChannel(const ApChanges& changes) {
+  return std::ranges::any_of(changes.settings, [](const auto& change) {
+    return change.first == "channel" || change.first == "band" || change.first == "hw_mode";
+  });
+}
+
 // Takes the access point down. The library fails when none has ever been set up; the command does not, since there is
 // nothing to take down then.
 void TakeDown(const Program& program) {
@@ -92,15 +102,38 @@ bool IsAnothers() {
   return WasReported(Report::kAnotherAp);
 }
 
-Failure EnableFailed() {
+Failure Anothers() {
+  return Failed("an access point is being set up already, or an attempt was cut off", "wait a moment and try again");
+}
+
+// The access point that there was is on the air again, or there was none.
+Failure EnableFailed(bool hasFormer) {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (IsAnothers()) {
-    return Failed("an access point is being set up already, or an attempt was cut off", "wait a moment and try again");
+  if (IsAnothers()) return Anothers();
+  if (hasFormer) {
+    return Failed("the access point could not be enabled, and the one that was on the air is there again",
+                  "the settings stay saved; -v shows what is wrong with them");
   }
   if (WasReported(Report::kScriptFailed)) {
     return Failed("the network start script failed, and the access point is disabled", "-v shows what it says");
   }
   return Failed("the access point could not be enabled");
+}
+
+// Ends an attempt that has failed: the access point that there was comes back, or else none is left.
+void TakeBack(const Program& program, const ApConf& conf, const std::optional<FormerAp>& former) {
+  if (!former) return Disable(program, conf);
+  const bool back =
+      Run<bool>(program.Doing("bringing the former access point back"), [&] { return former->PutBack(); });
+  if (back && ReadApStatus(conf).isRunning()) return;
+  Disable(program, conf);
+  throw Failed("the access point that was on the air could not be brought back, and is disabled");
+}
+
+// A process that was killed leaves its marker behind, and the library would refuse the next attempt.
+void RequireNobodyAtIt() {
+  if (IsBeingSetUp()) throw Anothers();
+  (void)PLIBCSysUnlink(kApMarkerPath);  // reported by itself; the library refuses then
 }
 
 // The kernel tells what became of it.
@@ -132,7 +165,9 @@ void SetAp(const Program& program, const ApChanges& changes) {
   ApplySettings(conf, changes);
   ApplySecrets(program, conf, changes);
   RequireComplete(conf);
+  const bool checked = !ConcernsChannel(changes) || CheckChannel(conf) == ChannelCheck::kPassed;
   SaveKeepingSwitch(conf);
+  if (!checked) Remark("merowireless: the channel could not be checked, since no radio is there to tell");
   const auto fields = ApFields(false);
   program.output.Done<ApConf>("saved; `merowireless ap enable` puts the settings on the air", "access_point", fields,
                               conf);
@@ -142,14 +177,20 @@ void EnableAp(const Program& program) {
   const ApConf conf = SettingsToEnable();
   RequireAdapter();
   RefuseWhileRadioIsOff();
+  (void)CheckChannel(conf);  // what nobody can tell beforehand, the attempt shows
+  RequireNobodyAtIt();
+  const ApStatus before = ReadApStatus(conf);
+  std::optional<FormerAp> former;
+  if (before.isRunning()) former.emplace(before.interface, conf.hostapConf.szBridge);
+
   Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
   task.szMarker = kApMarkerPath;
-  task.undo = [&] { Disable(program, conf); };
+  task.undo = [&] { TakeBack(program, conf, former); };
   const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
   if (start == Start::kNotSaved) throw NotSaved();
   if (start == Start::kFailed) {
     if (!IsAnothers()) Undo(task);
-    throw EnableFailed();
+    throw EnableFailed(former && ReadApStatus(conf).isRunning());
   }
   SayEnabled(program, ReadApSettings());
 }

@@ -3,6 +3,7 @@
 
 #include <netlink/genl/genl.h>
 
+#include <algorithm>
 #include <array>
 
 #include "common/channel.h"
@@ -23,6 +24,41 @@ std::optional<Attributes> AttributesOf(std::string& message) {
   return attributes;
 }
 
+// Calls `visit(attribute)` for each attribute within another.
+template <class Visit>
+void ForEachIn(const nlattr* outer, Visit visit) {
+  const auto* attribute = static_cast<const nlattr*>(nla_data(outer));
+  for (int left = nla_len(outer); nla_ok(attribute, left) != 0; attribute = nla_next(attribute, &left))
+    visit(attribute);
+}
+
+// A channel that is disabled cannot be used, and where nobody may radiate first, no access point may begin.
+void AddChannel(std::vector<Channel>& channels, const nlattr* description) {
+  nla_policy policy[NL80211_FREQUENCY_ATTR_MAX + 1] = {};
+  policy[NL80211_FREQUENCY_ATTR_FREQ].type = NLA_U32;
+  std::array<nlattr*, NL80211_FREQUENCY_ATTR_MAX + 1> channel;
+  if (nla_parse_nested(channel.data(), NL80211_FREQUENCY_ATTR_MAX, const_cast<nlattr*>(description), policy) < 0)
+    return;
+  if (channel[NL80211_FREQUENCY_ATTR_FREQ] == nullptr || channel[NL80211_FREQUENCY_ATTR_DISABLED] != nullptr ||
+      channel[NL80211_FREQUENCY_ATTR_NO_IR] != nullptr) {
+    return;
+  }
+  const unsigned megahertz = nla_get_u32(channel[NL80211_FREQUENCY_ATTR_FREQ]);
+  channels.push_back({.number = ChannelOf(megahertz),
+                      .megahertz = static_cast<int>(megahertz),
+                      .isRadars = channel[NL80211_FREQUENCY_ATTR_RADAR] != nullptr});
+}
+
+void AddChannels(std::vector<Channel>& channels, const nlattr* bands) {
+  ForEachIn(bands, [&](const nlattr* band) {
+    if (nla_type(band) != NL80211_BAND_2GHZ && nla_type(band) != NL80211_BAND_5GHZ) return;
+    ForEachIn(band, [&](const nlattr* attribute) {
+      if (nla_type(attribute) != NL80211_BAND_ATTR_FREQS) return;
+      ForEachIn(attribute, [&](const nlattr* channel) { AddChannel(channels, channel); });
+    });
+  });
+}
+
 }  // namespace
 
 std::optional<Air> AirOf(const std::string& interface) {
@@ -41,6 +77,19 @@ std::optional<Air> AirOf(const std::string& interface) {
     air.name.assign(static_cast<const char*>(nla_data(name)), static_cast<std::size_t>(nla_len(name)));
   }
   return air;
+}
+
+// A radio has more to tell than one message holds, so each may have a part of the channels.
+std::vector<Channel> ChannelsOf(const std::string& interface) {
+  std::vector<Channel> channels;
+  for (std::string& message : AskWirelessStack(NL80211_CMD_GET_WIPHY, interface, true)) {
+    const auto attributes = AttributesOf(message);
+    if (attributes && (*attributes)[NL80211_ATTR_WIPHY_BANDS] != nullptr) {
+      AddChannels(channels, (*attributes)[NL80211_ATTR_WIPHY_BANDS]);
+    }
+  }
+  std::ranges::sort(channels, {}, &Channel::megahertz);
+  return channels;
 }
 
 int StationsOf(const std::string& interface) {

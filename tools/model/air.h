@@ -16,6 +16,18 @@ struct Air {
 // Nothing without such an interface, or a wireless one.
 std::optional<Air> AirOf(const std::string& interface);
 
+// A channel of 2.4 or 5 GHz that an access point may use, by the rules of the place where the radio is.
+struct Channel {
+  int number;
+  int megahertz;
+  bool isRadars;  // it has to be listened to for radar first
+
+  bool is5GHz() const { return megahertz >= 5000; }
+};
+
+// In ascending order; nothing without such an interface, or a wireless one.
+std::vector<Channel> ChannelsOf(const std::string& interface);
+
 // How many stations an access point has.
 int StationsOf(const std::string& interface);
 

@@ -40,12 +40,6 @@ std::string PathOf(const char* szFormat, const std::string& interface) {
   return InterfacePath(szFormat, interface.c_str()).c_str();
 }
 
-std::optional<std::string> TextOfFile(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  if (!file) return std::nullopt;
-  return std::string(std::istreambuf_iterator<char>(file), {});
-}
-
 bool HasOtherGuests(const std::string& interface, const MERO_HOSTAP_GUEST_NET& guest) {
   if (PLIBCFileCheckKeyValue(kModelPath, "support_pci_wifi", "yes", 0) == 0) return false;  // and so no guests at all
   const std::string info = PathOf(kHostapdGuestInfoFormat, interface);
@@ -102,6 +96,12 @@ bool CouldHaveMade(const char* szPid, nanoseconds age) {
 }
 
 }  // namespace
+
+std::optional<std::string> TextOfFile(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  if (!file) return std::nullopt;
+  return std::string(std::istreambuf_iterator<char>(file), {});
+}
 
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf) {
   const auto given = TextOfFile(PathOf(kHostapdHostFormat, interface));

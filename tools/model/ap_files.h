@@ -7,6 +7,9 @@
 
 #include "model/ap_settings.h"
 
+// The whole of a file; nothing when it cannot be read.
+std::optional<std::string> TextOfFile(const std::string& path);
+
 // Whether the daemon of an interface was given other settings than these; nothing when it was given none. What else the
 // settings hold, such as the guests' rights, is not looked at.
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf);

@@ -45,10 +45,6 @@ const Mode* ModeOf(const ApConf& conf) {
   return found != std::end(kModes) ? found : nullptr;
 }
 
-bool Is5GHz(const ApConf& conf) {
-  return conf.hostapConf.hwMode == AP_MODE_80211A;
-}
-
 void SetMode(ApConf& conf, const std::string& text) {
   const Mode& mode = RowOf<Mode>(kModes, text, "hw-mode");
   if ((mode.hwMode == AP_MODE_80211A) != Is5GHz(conf)) {
@@ -69,15 +65,12 @@ void SetBand(ApConf& conf, const std::string& text) {
 
 // A channel is one of its band; 0 leaves it to the daemon.
 void RequireChannel(const ApConf& conf) {
-  constexpr int kLast2GHz = 14;
   const int channel = conf.hostapConf.channel;
-  if (channel == 0) return;
-  if (Is5GHz(conf) && std::ranges::find(k5GHzChannels, channel) == std::end(k5GHzChannels)) {
+  if (channel == 0 || IsChannelOfBand(channel, Is5GHz(conf))) return;
+  if (Is5GHz(conf)) {
     throw Wrong("there is no such channel in the 5 GHz band", "it is auto, 36, 40, 44, 48 ... 165; or add --band 2.4");
   }
-  if (!Is5GHz(conf) && channel > kLast2GHz) {
-    throw Wrong("there is no such channel in the 2.4 GHz band", "it is auto or 1 to 14; or add --band 5");
-  }
+  throw Wrong("there is no such channel in the 2.4 GHz band", "it is auto or 1 to 14; or add --band 5");
 }
 
 void SetChannel(ApConf& conf, const std::string& text) {
@@ -338,6 +331,16 @@ void SetGuestDefaults(ApConf& conf) {
 }
 
 }  // namespace
+
+bool Is5GHz(const ApConf& conf) {
+  return conf.hostapConf.hwMode == AP_MODE_80211A;
+}
+
+bool IsChannelOfBand(int channel, bool is5GHz) {
+  constexpr int kLast2GHz = 14;
+  if (!is5GHz) return channel >= 1 && channel <= kLast2GHz;
+  return std::ranges::find(k5GHzChannels, channel) != std::end(k5GHzChannels);
+}
 
 bool ReadSavedAp(ApConf& conf) {
   return MEROWirelessGetAPConfig(AdapterModel().c_str(), &conf) > 0;

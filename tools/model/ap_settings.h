@@ -43,6 +43,12 @@ std::vector<Field<ApConf>> ApFields(bool showSecrets);
 void SetApSecret(ApConf& conf, const std::string& secret);
 void SetGuestSecret(ApConf& conf, const std::string& secret);
 
+// Whether the main network is one of the 5 GHz band, and not of that at 2.4 GHz.
+bool Is5GHz(const ApConf& conf);
+
+// Whether an access point can be given this channel of a band.
+bool IsChannelOfBand(int channel, bool is5GHz);
+
 // Whether the main network's protection needs a secret and has none.
 bool LacksSecret(const ApConf& conf);
 
