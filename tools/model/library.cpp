@@ -179,8 +179,8 @@ void RequireAdapter() {
 void RequireScanning() {
   WIRELESS_INFO info{};
   if (MEROWirelessCurInfoGet(REQUEST_MODE, &info) != 0 || info.opmode != WIRELESS_OPMODE_MASTER) return;
-  throw Failed("the access point is on the air, and a scan would disturb it",
-               "`merowireless ap disable` takes it down; `merowireless scan --cached` shows what was heard last");
+  throw Failure(Exit::kBusy, "the access point is on the air, and a scan would disturb it",
+                "`merowireless ap disable` takes it down; `merowireless scan --cached` shows what was heard last");
 }
 
 void RequireNoBlock() {
