@@ -1,4 +1,4 @@
-// The network start script's boot: every bridge that can be made is made.
+// What happens at boot: the units, and the network start script's part, which makes every bridge that can be made.
 #include <gmock/gmock.h>
 
 #include "kit.h"
@@ -22,6 +22,14 @@ class KitBoot : public Kit {
         .out;
   }
 };
+
+TEST_F(KitBoot, HasUnitsThatSystemdUnderstandsWhole) {
+  WriteScript("/usr/bin/merowireless", "");
+  const std::string units = APPLIANCE_KIT "/systemd/";
+  const Ran ran = RunInShell("systemd-analyze verify --man=no " + units + "*.service " + units + "*.timer");
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_EQ(ran.out, "");
+}
 
 // A bridge that could not be made kept the bridges after it from being made.
 TEST_F(KitBoot, MakesTheOtherBridgesWhenOneCannotBeMade) {

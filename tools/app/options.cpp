@@ -4,6 +4,7 @@
 #include <CLI/App.hpp>
 #include <CLI/Config.hpp>
 #include <CLI/Formatter.hpp>
+#include <chrono>
 #include <limits>
 #include <memory>
 #include <sstream>
@@ -17,6 +18,7 @@
 #include "commands/adapter.h"
 #include "commands/addressing.h"
 #include "commands/connection.h"
+#include "commands/keep.h"
 #include "commands/networks.h"
 #include "commands/watch.h"
 #include "model/ap_settings.h"
@@ -164,6 +166,33 @@ void DescribeJoining(CLI::App& command, NetworkToJoin& values) {
   command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
 }
 
+struct AutoJoining {
+  bool keep = false;
+  std::string patience;
+  std::string longestPause;
+};
+
+void DescribeAutoJoining(CLI::App& command, AutoJoining& values) {
+  auto* keep = command.add_flag("--keep", values.keep, "stay, and join again after each loss");
+  command.add_option("--patience", values.patience, "the supplicant has N seconds to find it again (30)")
+      ->option_text("N")
+      ->needs(keep);
+  command.add_option("--longest-pause", values.longestPause, "N seconds between attempts at most (300)")
+      ->option_text("N")
+      ->needs(keep);
+}
+
+void AutoConnectOrKeep(const Program& program, const AutoJoining& values) {
+  constexpr int kDay = 86400;
+  if (!values.keep) return AutoConnect(program);
+  Keeping keeping;
+  if (!values.patience.empty()) keeping.patience = std::chrono::seconds(NumberOf(values.patience, 0, kDay, "patience"));
+  if (!values.longestPause.empty()) {
+    keeping.longestPause = std::chrono::seconds(NumberOf(values.longestPause, 1, kDay, "longest-pause"));
+  }
+  KeepConnected(program, keeping);
+}
+
 struct Watching {
   std::string times;
 };
@@ -195,7 +224,9 @@ void DescribeCell(CLI::App& command, CellToMake& values) {
 void AddConnectionCommands(Commands& commands) {
   commands.Add<NetworkToJoin>("connect", "Join a network and take an address in it", DescribeJoining,
                               WithAdapter(Connect));
-  commands.AddPlain("autoconnect", "Join the newest known network that can be joined", WithAdapter(AutoConnect));
+  // Without WithAdapter: who keeps a connection waits for the adapter, too.
+  commands.Add<AutoJoining>("autoconnect", "Join the newest known network that can be joined", DescribeAutoJoining,
+                            AutoConnectOrKeep);
   commands.AddPlain("disconnect", "End the connection", Disconnect);
   commands.AddPlain("status", "Show the state of the connection", ShowStatus);
   commands.Add<Watching>("watch", "Show the connection's state whenever it changes", DescribeWatching, WatchSoOften);

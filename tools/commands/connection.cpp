@@ -12,6 +12,7 @@
 #include "model/library.h"
 #include "model/on_air.h"
 #include "model/security.h"
+#include "model/situation.h"
 #include "model/status.h"
 #include "work/supplicant.h"
 
@@ -116,9 +117,7 @@ void RequireInRange(const Program& program, const KnownNetwork& config, const Fo
 
 void SayConnected(const Program& program) {
   const Status status = ReadStatus();
-  const std::string address = status.ip.empty() ? "without an address" : "as " + status.ip;
-  program.output.Done("connected to " + program.output.Name(status.name) + " " + address, "status", StatusFields(),
-                      status);
+  program.output.Done(ConnectionText(program.output, status), "status", StatusFields(), status);
 }
 
 // A static address needs its gateway too, which the library leaves to its caller.
@@ -159,7 +158,7 @@ void AutoConnect(const Program& program) {
   const JoinLock lock;
   RequireFreeAdapter();
   // Called while there is a connection, the library would end it and fail.
-  if (ReadStatus().isConnected()) return SayConnected(program);
+  if (IsLetIn(ReadStatus())) return SayConnected(program);
   if (Known(Order::kByTime).empty()) {
     throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");
   }

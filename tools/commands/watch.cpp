@@ -1,9 +1,7 @@
 // watch: the status as it changes.
 #include "commands/watch.h"
 
-#include <linux/rtnetlink.h>
 #include <poll.h>
-#include <sys/socket.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -14,25 +12,15 @@
 #include <vector>
 
 #include "base/clock.h"
-#include "base/require.h"
 #include "base/signals.h"
 #include "common/descriptor.h"
 #include "model/status.h"
+#include "work/news.h"
 
 namespace {
 
 using std::chrono::milliseconds;
 using std::chrono::steady_clock;
-
-// Readable whenever the kernel has news about links and addresses.
-Descriptor News() {
-  Descriptor socket(Require(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC | SOCK_NONBLOCK, NETLINK_ROUTE), "netlink"));
-  sockaddr_nl address{};
-  address.nl_family = AF_NETLINK;
-  address.nl_groups = RTMGRP_LINK | RTMGRP_IPV4_IFADDR;
-  Require(::bind(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address), "netlink");
-  return socket;
-}
 
 // kEnd when the program is to end: a signal says so, or nobody reads its output any more.
 enum class Heard { kNothing, kNews, kEnd };
@@ -42,8 +30,7 @@ Heard Listen(const Descriptor& news, const Signals& signals, milliseconds patien
   pollfd waited[] = {{news.get(), POLLIN, 0}, {signals.fd(), POLLIN, 0}, {STDOUT_FILENO, 0, 0}};
   if (::poll(waited, std::size(waited), static_cast<int>(patience.count())) <= 0) return Heard::kNothing;
   if (signals.HasCome() || (waited[2].revents & (POLLERR | POLLHUP)) != 0) return Heard::kEnd;
-  char drained[8192];
-  while (::recv(news.get(), drained, sizeof drained, 0) > 0) continue;
+  Drain(news);
   return Heard::kNews;
 }
 

@@ -7,16 +7,11 @@
 #include "model/marker.h"
 #include "platform.h"
 
-namespace {
-
-// The kernel says so, or the daemon that has just been started and is about to tell the kernel.
 bool IsOnAir() {
   WIRELESS_INFO info{};
   if (MEROWirelessCurInfoGet(REQUEST_MODE, &info) == 0 && info.opmode == WIRELESS_OPMODE_MASTER) return true;
   return IsDaemonThere(InterfacePath(kHostapdPidFormat, MEROWirelessInterfaceGet()).c_str(), "hostapd");
 }
-
-}  // namespace
 
 void RequireNoAccessPoint() {
   if (IsUnderWay(kApMarkerPath)) {

@@ -130,3 +130,7 @@ Status ReadStatus() {
 std::span<const Field<Status>> StatusFields() {
   return kStatusFields;
 }
+
+std::string ConnectionText(const Output& output, const Status& status) {
+  return "connected to " + output.Name(status.name) + (status.ip.empty() ? " without an address" : " as " + status.ip);
+}

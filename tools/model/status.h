@@ -30,4 +30,7 @@ Status ReadStatus();
 
 std::span<const Field<Status>> StatusFields();
 
+// A connection in a sentence: the network, and the address there.
+std::string ConnectionText(const Output& output, const Status& status);
+
 #endif  // MERO_TOOLS_STATUS_H

@@ -1,0 +1,45 @@
+// Whether the adapter may be made to join a network.
+#include "model/situation.h"
+
+#include <fstream>
+#include <string>
+
+#include "common/paths.h"
+#include "model/marker.h"
+#include "model/on_air.h"
+#include "platform.h"
+
+namespace {
+
+// A station that the access point has not let in yet is "dormant".
+bool IsDormant(const std::string& interface) {
+  std::ifstream file("/sys/class/net/" + interface + "/operstate");
+  std::string state;
+  return file >> state && state == "dormant";
+}
+
+// By the file that the hot-plug script goes by: the access point may be on its way.
+bool IsSwitchedOn() {
+  const InterfacePath info(kHostapdInfoFormat, MEROWirelessAPInterfaceGet());
+  return PLIBCFileCheckKeyValue(info.c_str(), "enable", "yes", 0) != 0;
+}
+
+}  // namespace
+
+bool IsLetIn(const Status& status) {
+  return status.isConnected() && !IsDormant(status.interface);
+}
+
+bool IsAccessPoints() {
+  return IsSwitchedOn() || IsUnderWay(kApMarkerPath) || IsOnAir();
+}
+
+Situation SituationOf(const Status& status) {
+  if (MEROWirelessAdapterNum() <= 0) return Situation::kNoAdapter;
+  if (IsAccessPoints()) return Situation::kAccessPoint;
+  if (IsLetIn(status)) return Situation::kConnected;
+  if (status.radio != 1) return status.radio == 0 ? Situation::kRadioOff : Situation::kUnannounced;
+  const bool isFree =
+      status.isConnected() || status.state == WIRELESS_STATUS_DOWN || status.state == WIRELESS_STATUS_DISCONNECTED;
+  return isFree ? Situation::kFree : Situation::kUntold;
+}

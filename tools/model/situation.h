@@ -1,0 +1,26 @@
+// Whether the adapter may be made to join a network.
+#ifndef MERO_TOOLS_SITUATION_H
+#define MERO_TOOLS_SITUATION_H
+
+#include "model/status.h"
+
+enum class Situation {
+  kConnected,
+  kFree,
+  kAccessPoint,  // also one that is being set up, or off the air for hours of its schedule
+  kNoAdapter,
+  kRadioOff,
+  kUnannounced,  // it has just been plugged in, and nobody knows whether its radio may be used
+  kUntold        // in another mode, or its driver does not say whether it is connected
+};
+
+Situation SituationOf(const Status& status);
+
+// Whether the adapter is in a network that lets it in. The driver counts a station as connected that has not passed the
+// access point's protection yet, and with a wrong secret is so again and again.
+bool IsLetIn(const Status& status);
+
+// Whether the adapter is an access point's.
+bool IsAccessPoints();
+
+#endif  // MERO_TOOLS_SITUATION_H
