@@ -1,5 +1,7 @@
 // The commands about the adapter as a whole: mode, radio.
+#include <csignal>
 #include <cstring>
+#include <utility>
 
 #include "running.h"
 
@@ -186,6 +188,21 @@ TEST_F(RadioSwitch, EndsTheConnectionAndBringsItBack) {
   EXPECT_EQ(ReadText(kNote), "use=\"network:486f6d65\"\n");
   EXPECT_EQ(Tool({"radio", "off"}).status, 0) << "once more, and what there was is not forgotten";
   EXPECT_EQ(Tool({"radio", "on"}).out, "the radio is on, and connected to Home\n");
+  EXPECT_EQ(ReadText("/tmp/joined"), "Home");
+  EXPECT_EQ(ReadText("/tmp/unblock"), "yes");
+  EXPECT_EQ(Soft(), "0");
+  EXPECT_FALSE(Exists(kNote));
+}
+
+// The switch stood at off, and the connection was left.
+TEST_F(RadioSwitch, ThatIsInterruptedBetweenTwoStepsIsWhereItWas) {
+  Connect();
+  library::PLIBCFileSetSectionValue = [save = library::PLIBCFileSetSectionValue, first = true](auto... all) mutable {
+    const int result = save(all...);
+    if (std::exchange(first, false)) ::raise(SIGTERM);
+    return result;
+  };
+  EXPECT_EQ(Tool({"radio", "off"}).status, 130);
   EXPECT_EQ(ReadText("/tmp/joined"), "Home");
   EXPECT_EQ(ReadText("/tmp/unblock"), "yes");
   EXPECT_EQ(Soft(), "0");

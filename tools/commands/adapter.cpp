@@ -3,6 +3,7 @@
 
 #include <cstring>
 
+#include "base/signals.h"
 #include "commands/connection.h"
 #include "common/paths.h"
 #include "model/ap_files.h"
@@ -237,6 +238,7 @@ void ShowRadio(const Program& program) {
 
 void SwitchRadio(const Program& program, const std::string& state) {
   if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
+  const Signals signals;  // none comes between two steps: the next one that takes time ends with it
   const std::string sentence = state == "on" ? SwitchOn(program) : SwitchOff(program);
   program.output.Done<Radio>(sentence, "radio", kRadioFields, ReadRadio());
 }
