@@ -55,6 +55,15 @@ numbers_of() { # DEVICE
 	fi
 }
 
+# The kernel knows nothing of it after a boot, or of a radio that is new.
+block_if_switched_off() { # INTERFACE
+	unblock=$(setting unblock) || exit 1
+	[ "$unblock" = no ] || return 0
+	for switch in "/sys/class/net/$1/phy80211"/rfkill*/soft; do
+		[ ! -e "$switch" ] || said=$( (echo 1 >"$switch") 2>&1) || fail "cannot block the radio of $1: $said"
+	done
+}
+
 can_be_access_point() { # INTERFACE
 	iw phy "$(cat "/sys/class/net/$1/phy80211/name")" info | awk '
 		/Supported interface modes:/ { inside = 1; next }

@@ -157,12 +157,40 @@ TEST_F(KitMessage, OfTheStateDirectorySaysWhatCannotBeMadeOfIt) {
   EXPECT_THAT(Script("boot").out, HasSubstr("rc.network: cannot open /var/run/rc.network/lock\n"));
 }
 
-TEST_F(KitMessage, OfAnAdapterSaysThatItCannotBeAnAccessPoint) {
-  RunInShell(
-      "sed -i 's,/sys/class/net,/tmp/net,' /usr/mero/lib/network/adapter.sh; mkdir -p /tmp/net/wlan0/phy80211; "
-      "echo phy0 >/tmp/net/wlan0/phy80211/name");
+class KitMessageOfAnAdapter : public KitMessage {
+ protected:
+  KitMessageOfAnAdapter() {
+    RunInShell(
+        "sed -i 's,/sys/class/net,/tmp/net,' /usr/mero/lib/network/adapter.sh; "
+        "mkdir -p /tmp/net/wlan0/phy80211/rfkill7; cd /tmp/net/wlan0/phy80211; echo phy0 >name; echo 0 >rfkill7/soft");
+  }
+
+  static std::string BlockAfter(const std::string& setting) {
+    WriteText("/tmp/wireless.info", "INTERFACE=\"wlan0\"\nPRODUCT=\"Stick\"\n");
+    WriteText("/usr/mero/etc/wireless_ap.conf", "[Stick]\n\tssid=home\n\t" + setting + "\n");
+    EXPECT_EQ(Tells("block_if_switched_off wlan0"), "");
+    return ReadText("/tmp/net/wlan0/phy80211/rfkill7/soft");
+  }
+};
+
+TEST_F(KitMessageOfAnAdapter, SaysThatItCannotBeAnAccessPoint) {
   EXPECT_EQ(Run("/usr/mero/hotplug/usb.wireless.function change-mode ap").out,
             "usb.wireless.function: wlan0 cannot be an access point\n");
+}
+
+TEST_F(KitMessageOfAnAdapter, SaysThatItsRadioCannotBeBlocked) {
+  BlockAfter("unblock=no");
+  RunInShell("cd /tmp/net/wlan0/phy80211/rfkill7; rm soft; mkdir soft");
+  EXPECT_THAT(RunInParts("block_if_switched_off wlan0").out, HasSubstr("cannot block the radio of wlan0: "));
+  EXPECT_THAT(RunInParts("ask() { return 1; }; block_if_switched_off wlan0").out,
+              HasSubstr("cannot read the setting unblock\n"));
+}
+
+// An adapter whose radio was off had it on after a boot, or plugged in anew.
+TEST_F(KitMessageOfAnAdapter, IsSaidOfNoneWhoseRadioIsBlockedAsItIsSwitched) {
+  EXPECT_EQ(BlockAfter(""), "0\n");
+  EXPECT_EQ(BlockAfter("unblock=yes"), "0\n");
+  EXPECT_EQ(BlockAfter("unblock=no"), "1\n");
 }
 
 }  // namespace

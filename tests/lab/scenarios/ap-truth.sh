@@ -64,6 +64,10 @@ on nas merowireless radio off
 within 2 no_station cafe nas || fail 'it is still a station'
 expect_same 'the block of the kernel' 1 "$(block)"
 ends_with 6 'the radio is switched off' connect cafe
+say '-- and plugged in anew meanwhile, when the kernel has no block of it yet'
+inside nas sh -c 'echo 0 | tee /sys/class/net/wlan0/phy80211/rfkill*/soft >/dev/null'
+plug_in nas
+expect_same 'the block of the kernel' 1 "$(block)"
 on nas merowireless radio on
 expect_output <<<'the radio is on, and connected to cafe'
 expect_same 'the block of the kernel' 0 "$(block)"
