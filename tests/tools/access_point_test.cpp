@@ -5,6 +5,7 @@
 #include <csignal>
 #include <cstring>
 #include <ctime>
+#include <filesystem>
 #include <iterator>
 #include <sstream>
 
@@ -32,9 +33,12 @@ void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
   };
 }
 
+constexpr char kPid[] = "/var/run/rc.network/hostapd-wlan0.pid";
+
 class AccessPoint : public ToolTest {
  protected:
   AccessPoint() { library::SavedAp(library::Office()); }
+  ~AccessPoint() override { std::filesystem::remove(kApMarkerPath); }
 };
 
 TEST_F(AccessPoint, IsShownWithoutItsSecrets) {
@@ -458,13 +462,11 @@ TEST_F(AccessPoint, IsEnabledAfterAnAttemptThatWasKilled) {
     return Exists(kApMarkerPath) ? FALSE : (kernel::BecomeAccessPoint("Office"), TRUE);
   };
   Shell(std::string("touch -d '10 minutes ago' ") + kApMarkerPath);
-  library::MEROWirelessTestAPMode = [] { return Exists(kApMarkerPath) ? TRUE : FALSE; };
   EXPECT_EQ(Tool({"ap", "enable"}).status, 0);
 }
 
 // The library would have taken the marker of whoever was at it.
 TEST_F(AccessPoint, ThatSomebodySetsUpIsNotTouched) {
-  library::MEROWirelessTestAPMode = [] { return TRUE; };
   WriteText(kApMarkerPath, "");
   EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("merowireless: an access point is being set up already, or "));
   EXPECT_TRUE(Exists(kApMarkerPath));
@@ -480,6 +482,12 @@ MERO_AP_CONF Scheduled(char digit) {
   schedule.wifiSchedEnabled = 1;
   std::memset(schedule.szWifiSched, digit, sizeof schedule.szWifiSched - 1);
   return conf;
+}
+
+// The marker of an attempt that was killed, from just before this process could have made it.
+void MakeStaleMarker() {
+  const std::string pid = std::to_string(::getpid());
+  Shell("touch -d \"$(($(ps -o etimes= -p " + pid + ") + 2)) seconds ago\" " + kApMarkerPath);
 }
 
 // The first fields of the status in a line.
@@ -533,11 +541,59 @@ TEST_F(AccessPoint, ThatThereIsNoneOfIsOff) {
 // The interface has the type of an access point then, and so it was said to be on the air.
 TEST_F(AccessPoint, ThatItsScheduleKeepsOffTheAirSaysSo) {
   kernel::BecomeAccessPoint("", 0);
+  const StartedDaemon hostapd("hostapd", kPid);
   library::SavedAp(Scheduled('0'));
   EXPECT_EQ(StatusLine(), "off-by-schedule");
   EXPECT_THAT(Tool({"ap", "status"}).out, HasSubstr("off the air at this hour, by its schedule\n"));
+}
+
+TEST_F(AccessPoint, WhoseInterfaceIsDownSaysSo) {
+  kernel::BecomeAccessPoint("", 0);
+  EXPECT_EQ(StatusLine(), "off") << "its daemon is gone";
+  const StartedDaemon hostapd("hostapd", kPid);
   library::SavedAp(Scheduled('1'));
-  EXPECT_EQ(StatusLine(), "off");
+  EXPECT_EQ(StatusLine(), "interface-down");
+  EXPECT_THAT(Tool({"ap", "status"}).out, HasSubstr("off the air, since its interface is down\n"));
+  EXPECT_EQ(Tool({"mode", "ap"}).out,
+            "the adapter is an access point's already: Office is off the air, since its interface is down\n");
+}
+
+// Every state but "off" keeps the adapter from being used otherwise, and "off" does not: `connect` asked the library
+// and the age of a marker, and `ap status` the kernel and the processes.
+TEST_F(AccessPoint, IsTheSameForEveryCommand) {
+  const auto expect = [](const std::string& state) {
+    const int refused = state == "off" ? 0 : 8;
+    EXPECT_EQ(StatusLine(), state);
+    EXPECT_EQ(Tool({"connect", "Home"}).status, refused) << state;
+    EXPECT_EQ(Tool({"scan", "--renew"}).status, refused) << state;
+    EXPECT_EQ(Tool({"status", "--porcelain"}).out.starts_with("access-point\t"), refused != 0) << state;
+    EXPECT_EQ(Tool({"mode", "client"}).out == "the adapter is a client's already\n", refused == 0) << state;
+  };
+  library::Known({library::Home()});
+  library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return FALSE; };
+  expect("off");
+  MakeStaleMarker();
+  expect("off");
+  WriteText(kApMarkerPath, "");
+  expect("setting-up");
+  std::filesystem::remove(kApMarkerPath);
+
+  kernel::BecomeAccessPoint("Office");
+  expect("on-air");
+  kernel::BecomeAccessPoint("", 5260);
+  expect("waiting-for-radar");
+  kernel::BecomeAccessPoint("", 0);
+  expect("off");
+  kernel::Guests() = {.isThere = true, .type = NL80211_IFTYPE_AP, .megahertz = 2437, .szName = "Guests", .stations = 0};
+  expect("interface-down");
+  kernel::Guests() = {};
+
+  const StartedDaemon hostapd("hostapd", kPid);
+  expect("interface-down");
+  library::SavedAp(Scheduled('0'));
+  expect("off-by-schedule");
+  kernel::BecomeClient();
+  expect("setting-up");
 }
 
 TEST_F(AccessPoint, TellsByTheHourOfTheWeekWhetherItsScheduleKeepsItOffTheAir) {
@@ -549,7 +605,9 @@ TEST_F(AccessPoint, TellsByTheHourOfTheWeekWhetherItsScheduleKeepsItOffTheAir) {
   const int hour = utc.tm_wday * 24 + utc.tm_hour;
   for (const int on : {hour, hour + 1}) conf.wifiSchedConf.szWifiSched[on % 168] = '1';  // the hour may end meanwhile
   library::SavedAp(conf);
-  EXPECT_EQ(Tool({"ap", "status", "--porcelain"}, {.environment = {{"TZ", "UTC"}}}).out.substr(0, 4), "off\t");
+  const StartedDaemon hostapd("hostapd", kPid);
+  const std::string line = Tool({"ap", "status", "--porcelain"}, {.environment = {{"TZ", "UTC"}}}).out;
+  EXPECT_THAT(line, testing::StartsWith("interface-down\t"));
 }
 
 TEST_F(AccessPoint, ThatListensForRadarSaysSo) {
@@ -561,7 +619,6 @@ TEST_F(AccessPoint, ThatListensForRadarSaysSo) {
 }
 
 TEST_F(AccessPoint, IsBeingSetUpWhileSomebodyIsAtIt) {
-  library::MEROWirelessTestAPMode = [] { return TRUE; };
   WriteText(kApMarkerPath, "");
   EXPECT_EQ(StatusLine(), "setting-up");
   EXPECT_THAT(Tool({"ap", "status"}).out, testing::StartsWith("access point  being set up\n"));
@@ -569,7 +626,6 @@ TEST_F(AccessPoint, IsBeingSetUpWhileSomebodyIsAtIt) {
 
 // A process that was killed left its marker, and the access point was "being set up" from then on.
 TEST_F(AccessPoint, IsNotBeingSetUpByAProcessThatIsGone) {
-  library::MEROWirelessTestAPMode = [] { return TRUE; };
   Shell(std::string("touch -d '10 minutes ago' ") + kApMarkerPath);
   EXPECT_EQ(StatusLine(), "off");
 }

@@ -135,9 +135,7 @@ const std::vector<std::vector<std::string>> kJoins = {{"connect", "Home"}, {"aut
 
 void MakeAccessPoint() {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_UNKNOWN; };
-  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
-    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
-  };
+  kernel::BecomeAccessPoint("Office");
 }
 
 // Everybody was knocked off the access point, which was called "on the air" afterwards.
@@ -178,7 +176,7 @@ TEST_F(Connection, IsNotTriedWhileAnAccessPointIsBeingSetUp) {
 
 TEST_F(Connection, IsTriedWhenOnlyAnOldMarkerOfAnAccessPointIsLeft) {
   WriteText(kApMarker, "");
-  Shell("touch -d '3 minutes ago' " + std::string(kApMarker));
+  Shell("touch -d '6 minutes ago' " + std::string(kApMarker));
   EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
 }
 

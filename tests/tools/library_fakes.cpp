@@ -15,6 +15,7 @@
 #include "common/text.h"
 #include "kernel_fakes.h"
 #include "tests/support/fake_functions.h"
+#include "tests/support/files.h"
 #include "tests/support/ring.h"
 
 namespace library {
@@ -48,6 +49,7 @@ void Reset() {
   MEROWirelessInterfaceGet = [] { return "wlan0"; };
   MEROWirelessCheckBlock = [] { return 1; };
   MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
+  MEROWirelessTestAPMode = [] { return Exists(kApMarkerPath) ? TRUE : FALSE; };
   MEROWirelessAPEnable = [] { return kernel::BecomeAccessPoint("Office"), TRUE; };
   MEROWirelessAPDisable = [] { return kernel::BecomeClient(), TRUE; };
   MEROWirelessModeChange = [](MERO_WIRELESS_MODE mode) {

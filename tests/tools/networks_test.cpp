@@ -88,11 +88,9 @@ TEST_F(Networks, AreScannedForOrNotAsIsAskedFor) {
 // A scan takes the adapter off the channel on which others rely on it.
 TEST_F(Networks, AreNotScannedForWhileTheAdapterIsAnAccessPoint) {
   RecordScans();
-  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
-    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
-  };
+  kernel::BecomeAccessPoint("Office");
   constexpr char kRefusal[] =
-      "merowireless: the access point is on the air, and a scan would disturb it: `merowireless ap disable` takes it "
+      "merowireless: the adapter is an access point's, and a scan would disturb it: `merowireless ap disable` takes it "
       "down; `merowireless scan --cached` shows what was heard last\n";
   EXPECT_EQ(WayOfScan({}), kRefusal);
   EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 10}}, {"--renew"}), kRefusal);

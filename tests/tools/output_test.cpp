@@ -231,9 +231,7 @@ TEST_F(Output, OfTheStatusLeavesOutAStandardThatNoScanHasTold) {
 TEST_F(Output, OfTheStatusTellsAnAccessPoint) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_UNKNOWN; };
   EXPECT_THAT(Tool({"status"}).out, HasSubstr("status     unknown\n"));
-  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO info) {
-    return info->opmode = WIRELESS_OPMODE_MASTER, 0;
-  };
+  kernel::BecomeAccessPoint("Office");
   EXPECT_THAT(Tool({"status"}).out, HasSubstr("status     an access point (see `merowireless ap status`)\n"));
   EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("state":"access-point","name":null)"));
   EXPECT_EQ(Tool({"status", "--porcelain"}).out, "access-point\t\t\t\t\twlan0\t\t\ton\t\n");

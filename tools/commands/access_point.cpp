@@ -8,7 +8,6 @@
 #include "common/ap_settings.h"
 #include "common/paths.h"
 #include "model/ap_channels.h"
-#include "model/ap_files.h"
 #include "model/ap_former.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"

@@ -12,6 +12,7 @@
 #include "model/kernel_switch.h"
 #include "model/library.h"
 #include "model/radio_use.h"
+#include "model/situation.h"
 #include "model/status.h"
 
 namespace {
@@ -92,9 +93,9 @@ std::string Described(const Program& program, const ApStatus& status) {
 }
 
 // The kernel tells what a change that failed has left.
-Failure NotChanged(const std::string& interface) {
+Failure NotChanged() {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
-  if (IsAccessPoint(interface)) return Failed("the mode could not be changed, and the adapter is an access point's");
+  if (IsAccessPoints()) return Failed("the mode could not be changed, and the adapter is an access point's");
   return Failed("the mode could not be changed, and the adapter is a client's");
 }
 
@@ -113,7 +114,7 @@ void BecomeAccessPoint(const Program& program) {
                   "`merowireless ap enable` makes the adapter one");
   }
   RefuseWhileRadioIsOff();
-  if (!Change(program, WIRELESS_AP_MODE)) throw NotChanged(before.interface);
+  if (!Change(program, WIRELESS_AP_MODE)) throw NotChanged();
   const ApStatus after = ReadApStatus(conf);
   if (!after.isRunning()) throw Failed("the mode was changed, and no access point is on the air");
   Say(program, "the adapter is an access point's now: " + Described(program, after), {"ap", true});
@@ -121,12 +122,9 @@ void BecomeAccessPoint(const Program& program) {
 
 // One that is switched on and does not run would come back by itself.
 void BecomeClient(const Program& program) {
-  const std::string interface = MEROWirelessAPInterfaceGet();
-  if (!IsAccessPoint(interface) && ApSwitchOf(interface) != ApSwitch::kOn) {
-    return Say(program, "the adapter is a client's already", {"client", false});
-  }
-  if (!Change(program, WIRELESS_CLIENT_MODE)) throw NotChanged(interface);
-  if (IsAccessPoint(interface)) throw Failed("the mode was changed, and the adapter is an access point's all the same");
+  if (!IsForAccessPoint()) return Say(program, "the adapter is a client's already", {"client", false});
+  if (!Change(program, WIRELESS_CLIENT_MODE)) throw NotChanged();
+  if (IsAccessPoints()) throw Failed("the mode was changed, and the adapter is an access point's all the same");
   Say(program, "the adapter is a client's now", {"client", true});
 }
 
@@ -150,7 +148,7 @@ void LiftBlock() {
 // An access point that is switched off by the mode can come back with it.
 void EndUse(const Program& program, const RadioUse& use) {
   if (use.isAccessPoint) {
-    if (Change(program, WIRELESS_CLIENT_MODE) && !IsAccessPoint(MEROWirelessAPInterfaceGet())) return;
+    if (Change(program, WIRELESS_CLIENT_MODE) && !IsAccessPoints()) return;
     throw Failed("the radio stays on, since the access point could not be ended");
   }
   if (Run<int>(program.Doing("disconnecting"), [] { return MEROWirelessNetworkDisconnect(); }) >= 0) return;

@@ -6,11 +6,11 @@
 
 #include "common/paths.h"
 #include "model/addressing.h"
+#include "model/ap_state.h"
 #include "model/former_connection.h"
 #include "model/join_failures.h"
 #include "model/join_lock.h"
 #include "model/library.h"
-#include "model/on_air.h"
 #include "model/security.h"
 #include "model/situation.h"
 #include "model/status.h"

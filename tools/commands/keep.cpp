@@ -163,7 +163,7 @@ class Keeper {
     while (ended.revents == 0) {
       ::poll(waited, std::size(waited), static_cast<int>(kGuardInterval.count()));
       if (signals.revents != 0 && signals_.HasCome()) ended_ = true;
-      if (ended_ || IsAccessPoints()) attempt.Interrupt();
+      if (ended_ || IsForAccessPoint()) attempt.Interrupt();
     }
   }
 

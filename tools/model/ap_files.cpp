@@ -1,18 +1,7 @@
-// The files that the access-point daemon is started from, and whether somebody is at it.
+// The files that the access-point daemon is started from.
 #include "model/ap_files.h"
 
-#include <dirent.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
-#include <chrono>
-#include <ctime>
-#include <fstream>
-#include <iterator>
-#include <memory>
-#include <sstream>
-
-#include "base/text.h"
+#include "base/whole_file.h"
 #include "common/hostapd_lines.h"
 #include "common/paths.h"
 #include "platform.h"
@@ -51,57 +40,7 @@ bool HasOtherGuests(const std::string& interface, const MERO_HOSTAP_GUEST_NET& g
   return TextOfFile(PathOf(kHostapdGuestFormat, interface)) != lines.text();
 }
 
-// ---- Who is at it ----
-
-using std::chrono::nanoseconds;
-using std::chrono::seconds;
-
-nanoseconds Duration(const timespec& time) {
-  return seconds(time.tv_sec) + nanoseconds(time.tv_nsec);
-}
-
-nanoseconds Now(clockid_t clock) {
-  timespec now{};
-  ::clock_gettime(clock, &now);
-  return Duration(now);
-}
-
-// The time from the machine's start to that of a process.
-std::optional<nanoseconds> StartOf(const std::string& process) {
-  const auto status = TextOfFile(process + "/stat");
-  if (!status) return std::nullopt;
-  // The name is in brackets, and may hold anything. The start is the 20th word behind it, in ticks.
-  std::istringstream words(status->substr(status->rfind(')') + 1));
-  constexpr int kWords = 19;
-  std::string skipped;
-  for (int i = 0; i < kWords; ++i) words >> skipped;
-  std::int64_t ticks = 0;
-  if (!(words >> ticks)) return std::nullopt;
-  return nanoseconds(seconds(1)) * ticks / ::sysconf(_SC_CLK_TCK);
-}
-
-bool HasLoadedTheLibrary(const std::string& process) {
-  const auto maps = TextOfFile(process + "/maps");
-  return maps && maps->find("/libmerowireless-core.so") != maps->npos;
-}
-
-// Whether a process could have made something that is so old: another one than this, with the library in it.
-bool CouldHaveMade(const char* szPid, nanoseconds age) {
-  constexpr nanoseconds kTick = std::chrono::milliseconds(10);
-  const auto pid = ParseNumber(szPid);
-  if (!pid || *pid == ::getpid()) return false;
-  const std::string process = std::string("/proc/") + szPid;
-  const auto start = StartOf(process);
-  return start && *start <= Now(CLOCK_BOOTTIME) - age + kTick && HasLoadedTheLibrary(process);
-}
-
 }  // namespace
-
-std::optional<std::string> TextOfFile(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  if (!file) return std::nullopt;
-  return std::string(std::istreambuf_iterator<char>(file), {});
-}
 
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf) {
   const auto given = TextOfFile(PathOf(kHostapdHostFormat, interface));
@@ -115,18 +54,4 @@ ApSwitch ApSwitchOf(const std::string& interface) {
   const std::string info = PathOf(kHostapdInfoFormat, interface);
   if (PLIBCFileExist(info.c_str()) == 0) return ApSwitch::kNone;
   return PLIBCFileCheckKeyValue(info.c_str(), "enable", "yes", 0) != 0 ? ApSwitch::kOn : ApSwitch::kOff;
-}
-
-bool IsBeingSetUp() {
-  constexpr nanoseconds kLongest = std::chrono::minutes(5);
-  struct stat marker {};
-  if (MEROWirelessTestAPMode() == FALSE || ::stat(kApMarkerPath, &marker) < 0) return false;
-  const nanoseconds age = Now(CLOCK_REALTIME) - Duration(marker.st_mtim);
-  if (age > kLongest) return false;
-  const std::unique_ptr<DIR, int (*)(DIR*)> processes(::opendir("/proc"), ::closedir);
-  if (!processes) return false;
-  while (const dirent* entry = ::readdir(processes.get())) {
-    if (CouldHaveMade(entry->d_name, age)) return true;
-  }
-  return false;
 }

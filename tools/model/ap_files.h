@@ -1,4 +1,4 @@
-// The files that the access-point daemon is started from, and whether somebody is at it.
+// The files that the access-point daemon is started from.
 #ifndef MERO_TOOLS_AP_FILES_H
 #define MERO_TOOLS_AP_FILES_H
 
@@ -6,9 +6,6 @@
 #include <string>
 
 #include "model/ap_settings.h"
-
-// The whole of a file; nothing when it cannot be read.
-std::optional<std::string> TextOfFile(const std::string& path);
 
 // Whether the daemon of an interface was given other settings than these; nothing when it was given none. What else the
 // settings hold, such as the guests' rights, is not looked at.
@@ -18,8 +15,5 @@ std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& c
 // the adapter's mode switches it off and on.
 enum class ApSwitch { kNone, kOff, kOn };
 ApSwitch ApSwitchOf(const std::string& interface);
-
-// Whether an access point is being set up at this moment. A process that was killed leaves its marker behind.
-bool IsBeingSetUp();
 
 #endif  // MERO_TOOLS_AP_FILES_H

@@ -11,9 +11,9 @@
 #include <cstdlib>
 #include <utility>
 
+#include "base/whole_file.h"
 #include "common/descriptor.h"
 #include "common/paths.h"
-#include "model/ap_files.h"
 #include "platform.h"
 
 namespace {

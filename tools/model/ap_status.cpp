@@ -22,18 +22,17 @@ bool IsOffNow(const MERO_WIFI_SCHED_CONF& schedule) {
   return hour < hours.size() && hours[hour] == '0';
 }
 
-ApState StateOf(const std::optional<Air>& air, const ApConf& conf) {
-  if (IsBeingSetUp()) return ApState::kSettingUp;
-  if (!air || !air->isAccessPoint) return ApState::kOff;
-  if (!air->name.empty()) return ApState::kOnAir;
-  if (air->channel != 0) return ApState::kWaitingForRadar;
-  return IsOffNow(conf.wifiSchedConf) ? ApState::kOffBySchedule : ApState::kOff;
+ApState StateOf(const ApConf& conf) {
+  const ApState state = ReadApState();
+  return state == ApState::kDown && IsOffNow(conf.wifiSchedConf) ? ApState::kOffBySchedule : state;
 }
 
 const char* KeyOf(ApState state) {
   switch (state) {
     case ApState::kOff:
       return "off";
+    case ApState::kDown:
+      return "interface-down";
     case ApState::kOffBySchedule:
       return "off-by-schedule";
     case ApState::kSettingUp:
@@ -50,6 +49,8 @@ Shown ShowState(const ApStatus& status, bool) {
   switch (status.state) {
     case ApState::kOff:
       return {"off", Tone::kFair};
+    case ApState::kDown:
+      return {"off the air, since its interface is down", Tone::kBad};
     case ApState::kOffBySchedule:
       return {"off the air at this hour, by its schedule", Tone::kFair};
     case ApState::kSettingUp:
@@ -95,7 +96,7 @@ ApStatus ReadApStatus(const ApConf& conf) {
   status.enabled = conf.blEnable != FALSE;
   status.interface = MEROWirelessAPInterfaceGet();
   const auto air = AirOf(status.interface);
-  status.state = StateOf(air, conf);
+  status.state = StateOf(conf);
   if (!status.isRunning()) return status;
   status.nameOnAir = air->name;
   status.channel = air->channel;
@@ -111,15 +112,12 @@ std::span<const Field<ApStatus>> ApStatusFields() {
   return kFields;
 }
 
-bool IsAccessPoint(const std::string& interface) {
-  const auto air = AirOf(interface);
-  return air && air->isAccessPoint;
-}
-
 std::string WhatBecameOf(const ApStatus& status) {
   switch (status.state) {
     case ApState::kOff:
       return "is off";
+    case ApState::kDown:
+      return "is off the air, since its interface is down";
     case ApState::kOffBySchedule:
       return "is off the air at this hour, by its schedule";
     case ApState::kSettingUp:

@@ -7,15 +7,8 @@
 #include <string>
 
 #include "model/ap_settings.h"
+#include "model/ap_state.h"
 #include "show/output.h"
-
-enum class ApState {
-  kOff,
-  kOffBySchedule,  // it runs, and has no hour on the air
-  kSettingUp,
-  kWaitingForRadar,  // listens whether its channel is a radar's, which takes a minute or more
-  kOnAir,
-};
 
 struct ApStatus {
   ApState state = ApState::kOff;
@@ -28,18 +21,13 @@ struct ApStatus {
   std::optional<int> stations;    // guests included; on the air only
   std::optional<bool> isPending;  // whether the settings differ from those that it runs with
 
-  bool isRunning() const {
-    return state == ApState::kOnAir || state == ApState::kWaitingForRadar || state == ApState::kOffBySchedule;
-  }
+  bool isRunning() const { return state != ApState::kOff && state != ApState::kSettingUp; }
 };
 
 // The settings of the adapter's model.
 ApStatus ReadApStatus(const ApConf& conf);
 
 std::span<const Field<ApStatus>> ApStatusFields();
-
-// Whether the interface has the type of an access point, on the air or not.
-bool IsAccessPoint(const std::string& interface);
 
 // What became of an access point that has been started, for a sentence, such as "is on the air on channel 6".
 std::string WhatBecameOf(const ApStatus& status);

@@ -2,11 +2,10 @@
 #include "model/former_connection.h"
 
 #include <algorithm>
-#include <fstream>
-#include <iterator>
 
 #include "base/pid_file.h"
 #include "base/signals.h"
+#include "base/whole_file.h"
 #include "common/paths.h"
 #include "common/text.h"
 #include "model/join_failures.h"
@@ -17,14 +16,9 @@ namespace {
 
 // ---- What it was ----
 
-std::string TextOfFile(const char* szPath) {
-  std::ifstream file(szPath);
-  return {std::istreambuf_iterator<char>(file), {}};
-}
-
 // The supplicant's settings are those of the connection, unless somebody else has made it.
 std::optional<KnownNetwork> Joined(const Status& status) {
-  std::optional<KnownNetwork> network = ConfiguredNetwork(TextOfFile(kSupplicantConfigPath));
+  std::optional<KnownNetwork> network = ConfiguredNetwork(TextOfFile(kSupplicantConfigPath).value_or(""));
   if (!network || network->network.szEssid != status.name) return FindKnown(status.name);
   if (status.auth != WIRELESS_AUTH_UNKNOWN) network->network.auth = status.auth;
   network->network.protocol = status.protocol;

@@ -2,12 +2,12 @@
 #include "model/library.h"
 
 #include <search.h>
-#include <unistd.h>
 
 #include <cstddef>
 #include <cstdlib>
 #include <cstring>
 
+#include "model/ap_state.h"
 #include "model/kernel_switch.h"
 #include "model/library_lines.h"
 #include "work/radio.h"
@@ -177,9 +177,8 @@ void RequireAdapter() {
 }
 
 void RequireScanning() {
-  WIRELESS_INFO info{};
-  if (MEROWirelessCurInfoGet(REQUEST_MODE, &info) != 0 || info.opmode != WIRELESS_OPMODE_MASTER) return;
-  throw Failure(Exit::kBusy, "the access point is on the air, and a scan would disturb it",
+  if (!IsAccessPoints()) return;
+  throw Failure(Exit::kBusy, "the adapter is an access point's, and a scan would disturb it",
                 "`merowireless ap disable` takes it down; `merowireless scan --cached` shows what was heard last");
 }
 
@@ -223,8 +222,4 @@ std::string AdapterModel() {
 
 Failure NoAdapter() {
   return {Exit::kNoAdapter, "no adapter is plugged in", "plug in a wireless USB adapter and try again"};
-}
-
-Failure Failed(const std::string& what, const std::string& advice) {
-  return {Exit::kFailed, what, ::geteuid() == 0 ? advice : "run it as root; -v shows what the library reports"};
 }

@@ -9,6 +9,7 @@
 #include <string_view>
 #include <vector>
 
+#include "model/failed.h"
 #include "platform.h"
 #include "wireless.h"
 #include "work/program.h"
@@ -40,7 +41,8 @@ std::vector<KnownNetwork> AllKnown(const std::string& name);
 // Fails when there is no adapter.
 void RequireAdapter();
 
-// Fails while the adapter is an access point, which would have to leave its channel, and whoever is on it, for a scan.
+// Fails while the adapter is an access point's, which would have to leave its channel, and whoever is on it, for a
+// scan.
 void RequireScanning();
 
 // Fails when the kernel lets nobody use the radio.
@@ -60,9 +62,6 @@ std::string AdapterModel();
 
 // The failure of a call when no adapter is plugged in.
 Failure NoAdapter();
-
-// The failure of a call for which the program knows no exit status of its own. A user who is not root is advised to be.
-Failure Failed(const std::string& what, const std::string& advice = "-v shows what the library reports");
 
 // Copies a text into a field; fails when it does not fit. `what` names it in the failure.
 template <std::size_t kSize>

@@ -5,9 +5,8 @@
 
 #include "base/text.h"
 #include "common/paths.h"
-#include "model/ap_files.h"
-#include "model/ap_status.h"
 #include "model/library.h"
+#include "model/situation.h"
 #include "model/status.h"
 
 namespace {
@@ -22,8 +21,7 @@ constexpr std::string_view kNetwork = "network:";
 }  // namespace
 
 RadioUse ReadRadioUse() {
-  const std::string interface = MEROWirelessAPInterfaceGet();
-  if (IsAccessPoint(interface) || ApSwitchOf(interface) == ApSwitch::kOn) return {.isAccessPoint = true, .network = ""};
+  if (IsForAccessPoint()) return {.isAccessPoint = true, .network = ""};
   return {.isAccessPoint = false, .network = ReadStatus().name};
 }
 

@@ -4,9 +4,8 @@
 #include <fstream>
 #include <string>
 
-#include "common/paths.h"
-#include "model/marker.h"
-#include "model/on_air.h"
+#include "model/ap_files.h"
+#include "model/ap_state.h"
 #include "platform.h"
 
 namespace {
@@ -18,10 +17,9 @@ bool IsDormant(const std::string& interface) {
   return file >> state && state == "dormant";
 }
 
-// By the file that the hot-plug script goes by: the access point may be on its way.
+// The access point may be on its way.
 bool IsSwitchedOn() {
-  const InterfacePath info(kHostapdInfoFormat, MEROWirelessAPInterfaceGet());
-  return PLIBCFileCheckKeyValue(info.c_str(), "enable", "yes", 0) != 0;
+  return ApSwitchOf(MEROWirelessAPInterfaceGet()) == ApSwitch::kOn;
 }
 
 }  // namespace
@@ -30,13 +28,13 @@ bool IsLetIn(const Status& status) {
   return status.isConnected() && !IsDormant(status.interface);
 }
 
-bool IsAccessPoints() {
-  return IsSwitchedOn() || IsUnderWay(kApMarkerPath) || IsOnAir();
+bool IsForAccessPoint() {
+  return IsSwitchedOn() || IsAccessPoints();
 }
 
 Situation SituationOf(const Status& status) {
   if (MEROWirelessAdapterNum() <= 0) return Situation::kNoAdapter;
-  if (IsAccessPoints()) return Situation::kAccessPoint;
+  if (IsForAccessPoint()) return Situation::kAccessPoint;
   if (IsLetIn(status)) return Situation::kConnected;
   if (status.radio != 1) return status.radio == 0 ? Situation::kRadioOff : Situation::kUnannounced;
   const bool isFree =

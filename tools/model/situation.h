@@ -20,7 +20,7 @@ Situation SituationOf(const Status& status);
 // access point's protection yet, and with a wrong secret is so again and again.
 bool IsLetIn(const Status& status);
 
-// Whether the adapter is an access point's.
-bool IsAccessPoints();
+// Whether the adapter is an access point's, or is to be one: the hot-plug script or a schedule may start it any time.
+bool IsForAccessPoint();
 
 #endif  // MERO_TOOLS_SITUATION_H

@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <memory>
 
+#include "model/ap_state.h"
 #include "model/security.h"
 #include "platform.h"
 
@@ -115,8 +116,7 @@ Status ReadStatus() {
   status.interface = MEROWirelessInterfaceGet();
   status.radio = MEROWirelessCheckBlock();
   ReadAddress(status);
-  if (status.state == WIRELESS_STATUS_UNKNOWN) Ask(REQUEST_MODE, &WIRELESS_INFO::opmode, status.mode);
-  status.isAccessPoint = status.mode == WIRELESS_OPMODE_MASTER;
+  status.isAccessPoint = !status.isConnected() && IsAccessPoints();
   if (!status.isConnected()) return status;
 
   WIRELESS_INFO info{};

@@ -4,7 +4,7 @@
 #include <net/if.h>
 
 #include "common/nl80211.h"
-#include "model/library.h"
+#include "model/failed.h"
 
 std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool all) {
   const unsigned index = ::if_nametoindex(interface.c_str());
