@@ -17,6 +17,7 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Not;
+using testing::StartsWith;
 
 namespace {
 
@@ -452,6 +453,19 @@ TEST_F(FormerAccessPoint, ThatDoesNotComeBackIsDisabled) {
   EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point could not be enabled: "));
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable", "enabling",
                                             "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
+}
+
+// The file was taken for one that was not there, and would have been removed.
+TEST_F(FormerAccessPoint, IsNotTouchedWhenItCouldNotBeBroughtBack) {
+  SetScript("echo $* >/tmp/started\n");
+  Shell("ln -s ifcfg-lbr0 " + kScripts + "ifcfg-lbr0");
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, StartsWith("merowireless: " + kScripts + "ifcfg-lbr0"));
+  EXPECT_THAT(ran.err, HasSubstr(" cannot be read, and nothing was changed: Too many levels of symbolic links: "));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  EXPECT_EQ(ReadText(kHost), "ssid=Old Office\n");
+  Shell("rm " + kScripts + "ifcfg-lbr0");
 }
 
 // ---- Who is at it ----

@@ -2,11 +2,35 @@
 #include "base/whole_file.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstdio>
+#include <cstdlib>
 
 #include "common/descriptor.h"
+
+namespace {
+
+bool WriteAll(int fd, std::string_view text) {
+  while (!text.empty()) {
+    const ssize_t size = ::write(fd, text.data(), text.size());
+    if (size < 0 && errno == EINTR) continue;
+    if (size < 0) return false;
+    text.remove_prefix(static_cast<std::size_t>(size));
+  }
+  return true;
+}
+
+// A file system that cannot flush directories says EINVAL; there is nothing more to do on it.
+bool FlushDirectoryOf(const std::string& path) {
+  const std::string directory = path.substr(0, path.rfind('/') + 1);
+  const Descriptor file(::open(directory.empty() ? "." : directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  return file.valid() && (::fsync(file.get()) == 0 || errno == EINVAL);
+}
+
+}  // namespace
 
 std::optional<std::string> TextOfFile(const std::string& path) {
   const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
@@ -20,4 +44,16 @@ std::optional<std::string> TextOfFile(const std::string& path) {
     if (size == 0) return text;
     text.append(bytes, static_cast<std::size_t>(size));
   }
+}
+
+bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode) {
+  std::string beside = path + ".XXXXXX";
+  const Descriptor file(::mkostemp(beside.data(), O_CLOEXEC));
+  if (!file.valid()) return false;
+  const bool written = WriteAll(file.get(), text) && ::fchmod(file.get(), mode) == 0 && ::fsync(file.get()) == 0;
+  if (written && std::rename(beside.c_str(), path.c_str()) == 0) return FlushDirectoryOf(path);
+  const int error = errno;
+  ::unlink(beside.c_str());
+  errno = error;
+  return false;
 }

@@ -2,10 +2,18 @@
 #ifndef MERO_TOOLS_WHOLE_FILE_H
 #define MERO_TOOLS_WHOLE_FILE_H
 
+#include <sys/types.h>
+
 #include <optional>
 #include <string>
+#include <string_view>
 
 // The bytes of a file; nothing when it cannot be read, and errno tells why.
 std::optional<std::string> TextOfFile(const std::string& path);
+
+// Puts a file of these bytes and this mode at a path, in one step: whoever reads it, and whoever switches the machine
+// off, finds what there was or all of this. False when that fails; then errno tells why, and what there was is there
+// still.
+bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode);
 
 #endif  // MERO_TOOLS_WHOLE_FILE_H

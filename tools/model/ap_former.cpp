@@ -1,52 +1,20 @@
 // The access point that is on the air before another one is tried in its place.
 #include "model/ap_former.h"
 
-#include <fcntl.h>
 #include <net/if.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <algorithm>
-#include <cstdio>
-#include <cstdlib>
+#include <cerrno>
+#include <cstring>
 #include <utility>
 
 #include "base/whole_file.h"
-#include "common/descriptor.h"
 #include "common/paths.h"
+#include "model/failed.h"
 #include "platform.h"
 
 namespace {
-
-// Removes a file, unless it is to stay.
-class NewFile {
- public:
-  explicit NewFile(std::string path) : path_(std::move(path)) {}
-  NewFile(const NewFile&) = delete;
-  NewFile& operator=(const NewFile&) = delete;
-  ~NewFile() {
-    if (!path_.empty()) ::unlink(path_.c_str());
-  }
-
-  bool Rename(const std::string& path) {
-    if (std::rename(path_.c_str(), path.c_str()) < 0) return false;
-    path_.clear();
-    return true;
-  }
-
- private:
-  std::string path_;
-};
-
-// In one step: whoever reads the file, and whoever switches the machine off, finds the old text or the new one.
-bool Replace(const std::string& path, const std::string& text, mode_t mode) {
-  std::string name = path + ".XXXXXX";
-  const Descriptor file(::mkostemp(name.data(), O_CLOEXEC));
-  if (!file.valid()) return false;
-  NewFile made(name);
-  return ::write(file.get(), text.data(), text.size()) == static_cast<ssize_t>(text.size()) &&
-         ::fchmod(file.get(), mode) == 0 && ::fsync(file.get()) == 0 && made.Rename(path);
-}
 
 bool Remove(const std::string& path) {
   return PLIBCSysUnlink(path.c_str()) == 0;
@@ -74,16 +42,21 @@ FormerAp::FormerAp(std::string interface, const std::string& nextBridge) : inter
   }
 }
 
+// A file that is there and cannot be read could not be put back either.
 void FormerAp::Keep(const std::string& path) {
+  auto text = TextOfFile(path);
   struct stat status {};
-  const bool exists = ::stat(path.c_str(), &status) == 0;
-  files_.push_back({path, exists ? TextOfFile(path) : std::nullopt, status.st_mode & ALLPERMS});
+  if (text ? ::stat(path.c_str(), &status) < 0 : errno != ENOENT) {
+    throw Failed(path + " cannot be read, and nothing was changed: " + std::strerror(errno),
+                 "the access point that is on the air could not be brought back without it");
+  }
+  files_.push_back({path, std::move(text), status.st_mode & ALLPERMS});
 }
 
 bool FormerAp::PutBack() const {
   const bool back = std::ranges::all_of(files_, [](const File& file) {
     if (TextOfFile(file.path) == file.text) return true;
-    return file.text ? Replace(file.path, *file.text, file.mode) : Remove(file.path);
+    return file.text ? ReplaceFile(file.path, *file.text, file.mode) : Remove(file.path);
   });
   return back && PLIBCExec(kNetworkScriptPath, "start", interface_.c_str(), bridge_.c_str(), nullptr) == 0;
 }

@@ -11,7 +11,7 @@
 // Holds the files that it was started from, which the next one overwrites.
 class FormerAp {
  public:
-  // `nextBridge` is that of the next one.
+  // `nextBridge` is that of the next one. Fails when one of the files is there and cannot be read.
   FormerAp(std::string interface, const std::string& nextBridge);
 
   // Puts its files back and starts it again. False when that fails.
