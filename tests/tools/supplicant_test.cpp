@@ -8,6 +8,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <csignal>
 #include <cstring>
 
 #include "running.h"
@@ -65,6 +66,8 @@ TEST(SupplicantEvents, TellWhyAJoinCameToNothing) {
   const std::pair<const char*, Verdict> events[] = {
       {"<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" auth_failures=1 duration=10 reason=WRONG_KEY",
        Verdict::kSecretRefused},
+      {"<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" auth_failures=1 duration=10 reason=AUTH_FAILED",
+       Verdict::kSecretRefused},
       {"<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect", Verdict::kSecretRefused},
       {"<3>CTRL-EVENT-EAP-FAILURE EAP authentication failed", Verdict::kSecretRefused},
       {"<3>CTRL-EVENT-ASSOC-REJECT bssid=02:00:00:00:01:00 status_code=17", Verdict::kRefused},
@@ -81,6 +84,19 @@ TEST(SupplicantEvents, TellWhyAJoinCameToNothing) {
       {"", Verdict::kNone},
   };
   for (const auto& [szEvent, verdict] : events) EXPECT_EQ(VerdictOf(szEvent), verdict) << szEvent;
+}
+
+TEST(SupplicantEvents, AreFinalWhenTheSupplicantPausesForLongerThanAJoinLasts) {
+  for (const std::string reason : {"WRONG_KEY", "AUTH_FAILED"}) {
+    EXPECT_TRUE(IsFinal("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" duration=10 reason=" + reason));
+  }
+  for (const char* szEvent :
+       {"<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect",
+        "<3>CTRL-EVENT-EAP-FAILURE EAP authentication failed", "<3>CTRL-EVENT-NETWORK-NOT-FOUND ",
+        "<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" auth_failures=1 duration=10 reason=CONN_FAILED",
+        "<3>CTRL-EVENT-ASSOC-REJECT bssid=02:00:00:00:01:00 status_code=17", ""}) {
+    EXPECT_FALSE(IsFinal(szEvent)) << szEvent;
+  }
 }
 
 TEST(SupplicantListener, KeepsTheMostTellingEvent) {
@@ -157,7 +173,7 @@ class RefusedJoin : public ToolTest {
 };
 
 TEST_F(RefusedJoin, TellsAWrongSecretFromANetworkOutOfRange) {
-  const Ran wrong = Join("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" reason=WRONG_KEY");
+  const Ran wrong = Join("<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect");
   EXPECT_EQ(wrong.status, 5);
   EXPECT_THAT(wrong.err, HasSubstr("Home does not accept the secret: `merowireless save`"));
 
@@ -170,6 +186,31 @@ TEST_F(RefusedJoin, TellsAWrongSecretFromANetworkOutOfRange) {
   EXPECT_THAT(refused.err, HasSubstr("Home refuses this appliance"));
 }
 
+// It was told when the library had waited for its 15 seconds.
+TEST_F(RefusedJoin, EndsAsSoonAsTheSupplicantKnowsThatTheSecretIsWrong) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
+    WriteText("/var/tmp/.wireless_connecting", "");
+    return ::pause();
+  };
+  for (const char* szReason : {"WRONG_KEY", "AUTH_FAILED"}) {
+    Lifeline lifeline;
+    Supplicant supplicant;
+    StartedTool tool({"connect", "Home"});
+    EXPECT_EQ(supplicant.Request(), "ATTACH");
+    supplicant.Say("<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect");
+    EXPECT_EQ(supplicant.Request(), "PING") << "a handshake that fails ends nothing";
+    supplicant.Say(std::string("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" reason=") + szReason);
+    EXPECT_TRUE(Soon([&] { return lifeline.IsFree(); }));
+    if (!lifeline.IsFree()) ::kill(tool.pid(), SIGTERM);
+    const Ran ran = tool.Wait();
+    EXPECT_EQ(ran.status, 5);
+    EXPECT_THAT(ran.err, HasSubstr("Home does not accept the secret"));
+    EXPECT_FALSE(Exists("/var/tmp/.wireless_connecting"));
+    EXPECT_EQ(library::Calls().back(), "MEROWirelessNetworkDisconnect");
+  }
+}
+
+// The walk goes on to the next network.
 TEST_F(RefusedJoin, ByAutoconnectTellsThemApartToo) {
   const Ran wrong = Join("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" reason=WRONG_KEY", {"autoconnect"});
   EXPECT_EQ(wrong.status, 5);

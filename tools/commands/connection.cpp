@@ -58,9 +58,13 @@ void Join(const Program& program, const KnownNetwork& config) {
   const std::string name = program.output.Name(config.network.szEssid);
   EndFormerSupplicant(program);
   SupplicantListener listener(SupplicantSocket());
-  const int result =
-      Run<int>(Joining(program, "joining " + name, listener), [&] { return MEROWirelessNetworkConnect(&config); });
-  if (result < 0) throw JoinFailed(name, listener.verdict());
+  Task task = Joining(program, "joining " + name, listener);
+  task.isPointless = [&] { return listener.isFinal(); };  // the library would wait on until its time is over
+  try {
+    if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&config); }) >= 0) return;
+  } catch (const Pointless&) {
+  }
+  throw JoinFailed(name, listener.verdict());
 }
 
 // ---- Addressing ----

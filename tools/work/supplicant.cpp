@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <iterator>
 
 #include "base/require.h"
 
@@ -16,10 +17,12 @@ struct Clue {
   std::string_view start;
   std::string_view end;
   Verdict verdict;
+  bool isFinal = false;
 };
 
 constexpr Clue kClues[] = {
-    {"CTRL-EVENT-SSID-TEMP-DISABLED", "reason=WRONG_KEY", Verdict::kSecretRefused},
+    {"CTRL-EVENT-SSID-TEMP-DISABLED", "reason=WRONG_KEY", Verdict::kSecretRefused, true},
+    {"CTRL-EVENT-SSID-TEMP-DISABLED", "reason=AUTH_FAILED", Verdict::kSecretRefused, true},  // of EAP
     {"WPA: 4-Way Handshake failed", "pre-shared key may be incorrect", Verdict::kSecretRefused},
     {"CTRL-EVENT-EAP-FAILURE", "", Verdict::kSecretRefused},
     {"CTRL-EVENT-AUTH-REJECT", "status_code=15", Verdict::kSecretRefused},  // the answer to WEP's challenge was wrong
@@ -36,6 +39,14 @@ std::string_view WithoutLevel(std::string_view event) {
   return event;
 }
 
+const Clue* ClueOf(std::string_view event) {
+  event = WithoutLevel(event);
+  while (event.ends_with(' ')) event.remove_suffix(1);
+  const auto* found = std::ranges::find_if(
+      kClues, [&](const Clue& clue) { return event.starts_with(clue.start) && event.ends_with(clue.end); });
+  return found != std::end(kClues) ? found : nullptr;
+}
+
 bool Send(int fd, std::string_view request) {
   return ::send(fd, request.data(), request.size(), MSG_DONTWAIT | MSG_NOSIGNAL) ==
          static_cast<ssize_t>(request.size());
@@ -44,12 +55,13 @@ bool Send(int fd, std::string_view request) {
 }  // namespace
 
 Verdict VerdictOf(std::string_view event) {
-  event = WithoutLevel(event);
-  while (event.ends_with(' ')) event.remove_suffix(1);
-  for (const auto& [start, end, verdict] : kClues) {
-    if (event.starts_with(start) && event.ends_with(end)) return verdict;
-  }
-  return Verdict::kNone;
+  const Clue* clue = ClueOf(event);
+  return clue != nullptr ? clue->verdict : Verdict::kNone;
+}
+
+bool IsFinal(std::string_view event) {
+  const Clue* clue = ClueOf(event);
+  return clue != nullptr && clue->isFinal;
 }
 
 SupplicantListener::SupplicantListener(std::string path) : path_(std::move(path)) {}
@@ -90,6 +102,7 @@ void SupplicantListener::Receive() {
     }
     const std::string_view text(event, static_cast<std::size_t>(size));
     verdict_ = std::max(verdict_, VerdictOf(text));
+    final_ = final_ || IsFinal(text);
     if (WithoutLevel(text).starts_with(kLeaving)) socket_.Close();
   }
 }

@@ -20,6 +20,10 @@ enum class Verdict {
 // The verdict of one event, such as "<3>CTRL-EVENT-NETWORK-NOT-FOUND".
 Verdict VerdictOf(std::string_view event);
 
+// Whether the supplicant has come to a verdict by itself, and will not try the network again for longer than a join
+// lasts. What it says of a single step, such as a handshake, is none.
+bool IsFinal(std::string_view event);
+
 // Listens to the control socket of the supplicant. Supplicants may come and go meanwhile.
 class SupplicantListener final : public Listener {
  public:
@@ -36,6 +40,9 @@ class SupplicantListener final : public Listener {
   // The greatest so far.
   Verdict verdict() const { return verdict_; }
 
+  // Whether it is final.
+  bool isFinal() const { return final_; }
+
  private:
   bool Attach();
 
@@ -43,6 +50,7 @@ class SupplicantListener final : public Listener {
   Descriptor socket_;
   std::chrono::steady_clock::time_point lastAsked_;
   Verdict verdict_ = Verdict::kNone;
+  bool final_ = false;
 };
 
 #endif  // MERO_TOOLS_SUPPLICANT_H

@@ -91,7 +91,10 @@ class Worker {
 
   std::string Result() {
     end_ = processes_.Watch();
-    while (Wait()) Take();
+    while (Wait()) {
+      Take();
+      if (!result_ && task_.isPointless()) throw Pointless{};
+    }
     Take();
     if (task_.listener != nullptr) task_.listener->Receive();
     if (!result_) {

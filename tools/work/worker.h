@@ -18,14 +18,18 @@ struct Task {
   const char* szMarker = nullptr;      // the file that exists while the library is at it
   Listener* listener = nullptr;        // hears what happens meanwhile
   std::function<void()> undo = [] {};  // takes back what a call has done that did not come to its end
+  std::function<bool()> isPointless = [] { return false; };  // whether nothing is gained by waiting on for the call
 };
+
+// Thrown when a call was ended that had become pointless.
+struct Pointless {};
 
 // Undoes a task. When that fails, a remark says so.
 void Undo(const Task& task);
 
 // Runs `call` in a process of its own and gives its result. Fails when the call breaks off, or cannot be waited for;
-// throws Interrupted when the user ends the program. Then all processes of the call have been ended, and the task has
-// been undone.
+// throws Interrupted when the user ends the program, and Pointless when the call has become so. Then all processes of
+// the call have been ended, and the task has been undone.
 std::string RunBytes(const Task& task, const std::function<std::string()>& call);
 
 template <class Result>
