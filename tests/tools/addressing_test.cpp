@@ -59,14 +59,14 @@ TEST_F(Addresses, ByDhcpBringTheirOwnGateway) {
 TEST_F(Addresses, OfTheNetworkThatAutoconnectHasJoinedComeWithItsGateway) {
   library::Known({Home("10.0.0.9")});
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
-  library::MEROWirelessAutoConnect = [] { return library::Record("joined"), 0; };
   int asked = 0;
   library::MEROWirelessConnStatusGet = [asked]() mutable {
     return asked++ < 1 ? WIRELESS_STATUS_DISCONNECTED : WIRELESS_STATUS_CONNECTED_MANAGED;
   };
   EXPECT_EQ(Tool({"autoconnect"}).status, 0);
   EXPECT_THAT(library::Calls(),
-              ElementsAre("MEROWirelessAutoConnect", "joined", "MEROWirelessDefaultGatewaySet", "10.0.0.1"));
+              ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessIfconfigSet", "wlan0|10.0.0.9|255.255.255.0",
+                          "MEROWirelessDefaultGatewaySet", "10.0.0.1"));
 }
 
 TEST_F(Addresses, ThatNoServerGivesAreAFailureThoughTheNetworkWasJoined) {
@@ -79,9 +79,6 @@ TEST_F(Addresses, ThatNoServerGivesAreAFailureThoughTheNetworkWasJoined) {
   EXPECT_THAT(ran.err, HasSubstr("no DHCP server answered"));
 
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
-  library::MEROWirelessAutoConnect = [] {
-    return library::Report("wireless_ifcfg_set", "Failed to get IP from DHCP"), 0;
-  };
   EXPECT_EQ(Tool({"autoconnect"}).status, 7);
 }
 

@@ -62,7 +62,7 @@ TEST_F(Connection, ToAKnownNetworkTakesItsSecretAndAddress) {
   const Ran ran = Tool({"connect", "Home"});
   EXPECT_EQ(ran.status, 0) << ran.err;
   EXPECT_EQ(ran.out, "connected to Home without an address\n");
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||0",
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||1",
                                             "MEROWirelessIfconfigSet", "wlan0|DHCP|255.255.255.0"));
 }
 
@@ -103,13 +103,13 @@ TEST_F(Connection, IsNotMadeBesideASupplicantThatDoesNotEnd) {
 
 TEST_F(Connection, CanLeaveTheAddressesAlone) {
   EXPECT_EQ(Tool({"connect", "Home", "--no-address"}).status, 0);
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||0"));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||1"));
 }
 
 TEST_F(Connection, ToAnUnknownNetworkScansAndTakesASecret) {
   library::InRange({Network("Office", WIRELESS_AUTH_WPA2EAP)});
   EXPECT_EQ(Tool({"connect", "Office", "--key-stdin", "--user", "ann"}, {.input = "secret"}).status, 0);
-  EXPECT_THAT(library::Calls(), Contains("Office|secret|ann|0"));
+  EXPECT_THAT(library::Calls(), Contains("Office|secret|ann|1"));
   EXPECT_EQ(Tool({"connect", "Office", "--key-stdin"}, {.input = "secret"}).status, 2);
 }
 
@@ -281,11 +281,9 @@ TEST_F(Connection, ThatExistsIsKeptByAutoconnect) {
 
 TEST_F(Connection, IsMadeByAutoconnectOrNotAtAll) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
-  library::MEROWirelessAutoConnect = [] {
-    return library::Report("wireless_auto_connect", "Failed to connect any access point"), -1;
-  };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
   EXPECT_EQ(Tool({"autoconnect"}).status, 4);
-  library::MEROWirelessAutoConnect = [] { return 0; };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return 0; };
   EXPECT_EQ(Tool({"autoconnect"}).status, 0);
 }
 
@@ -302,7 +300,7 @@ TEST_F(Connection, IsMadeByAutoconnectOnlyWhenTheFormerSupplicantHasGone) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
   WriteText(kSupplicantPid, "1\n");
   InstallSupplicantClient("rm /var/run/wpa_supplicant.pid\n");
-  library::MEROWirelessAutoConnect = [] {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) {
     library::Record(std::filesystem::exists(kSupplicantPid) ? "too early" : "joined");
     return 0;
   };

@@ -94,7 +94,9 @@ class Keep : public ToolTest {
     };
     library::MEROWirelessAdapterNum = [] { return Exists(kAbsent) ? 0 : 1; };
     library::MEROWirelessCheckBlock = [] { return Exists(kRadioOff) ? 0 : Exists(kUnannounced) ? -1 : 1; };
-    library::MEROWirelessAutoConnect = Join;
+    library::InRange({library::Network("Home")});
+    library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return Join(); };
+    library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) { return Address(); };
     library::MEROWirelessNetworkDisconnect = [] { return IsNot(kJoined), 0; };
   }
 
@@ -102,6 +104,10 @@ class Keep : public ToolTest {
     while (Exists(kSlow)) ::usleep(10'000);
     if (Exists(kClosed)) return -1;
     Is(kJoined);
+    return 0;
+  }
+
+  static int Address() {
     if (Exists(kWithoutLease)) library::Report("wireless_ifcfg_set", "Failed to get IP from DHCP");
     return 0;
   }
@@ -123,7 +129,7 @@ class Keep : public ToolTest {
     Announce();
   }
 
-  static std::ptrdiff_t Attempts() { return std::ranges::count(library::Calls(), "MEROWirelessAutoConnect"); }
+  static std::ptrdiff_t Attempts() { return std::ranges::count(library::Calls(), "MEROWirelessNetworkConnect"); }
 
   static bool Attempted(std::ptrdiff_t times) {
     return Soon([=] { return Attempts() >= times; });
@@ -163,7 +169,7 @@ TEST_F(Keep, JoinsAtOnceAndLeavesTheConnectionWhenItIsEnded) {
   const Ran ran = Ended(tool);
   EXPECT_EQ(ran.status, 0) << "whoever ends it has not met a failure";
   EXPECT_EQ(ran.out, kConnected);
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessAutoConnect"));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessIfconfigSet"));
 }
 
 TEST_F(Keep, LeavesAConnectionAloneThatIsThereAlready) {
@@ -294,7 +300,7 @@ TEST_F(Keep, GivesWayToAnAccessPointWhileItJoins) {
   ASSERT_TRUE(Attempted(1));
   Is(kApMarker);
   EXPECT_TRUE(Says(tool, "waiting while the adapter is an access point's\n"));
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessAutoConnect", "MEROWirelessNetworkDisconnect"));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessNetworkDisconnect"));
 }
 
 TEST_F(Keep, TellsWhyItWaits) {
@@ -370,12 +376,12 @@ TEST_F(Keep, TakesBackAnAttemptDuringWhichItIsEnded) {
   StartedTool tool = Started();
   ASSERT_TRUE(Attempted(1));
   EXPECT_EQ(Ended(tool).status, 0);
-  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessAutoConnect", "MEROWirelessNetworkDisconnect"));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessNetworkDisconnect"));
 }
 
 // They would be zombies, and deaf to the signal that ends a daemon, if they were children of a program that waits.
 TEST_F(Keep, HasNothingToDoWithTheDaemonsThatItStarts) {
-  library::MEROWirelessAutoConnect = [] { return StartDaemon(), Join(); };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return StartDaemon(), Join(); };
   StartedTool tool = Started();
   EXPECT_TRUE(Says(tool, kConnected));
   ASSERT_TRUE(Soon([] { return !TextOrNothing(kDaemonPid).empty(); }));

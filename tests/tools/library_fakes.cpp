@@ -129,14 +129,9 @@ MERO_AP_CONF Office() {
 }
 
 void InRange(std::vector<WIRELESS_NETWORK> networks) {
-  MEROWirelessNetworkScan = [networks](WIRELESS_SCAN, WIRELESS_LIST* head) { return FillRing(head, networks), 0; };
-  MEROWirelessNetworkGet = [networks](const char* szValue, WIRELESS_FILTER filter, WIRELESS_NETWORK* found) {
-    for (const WIRELESS_NETWORK& network : networks) {
-      const bool matches = filter == WIRELESS_FILTER_ESSID ? std::strcmp(network.szEssid, szValue) == 0
-                                                           : std::memcmp(network.bssid, szValue, 6) == 0;
-      if (matches) return *found = network, 1;
-    }
-    return 0;
+  MEROWirelessNetworkScan = [networks](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
+    if (scan == WIRELESS_SCAN_RENEW) Record("MEROWirelessNetworkScan");
+    return FillRing(head, networks), 0;
   };
 }
 

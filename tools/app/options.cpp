@@ -162,8 +162,9 @@ void DescribeJoining(CLI::App& command, NetworkToJoin& values) {
   DescribeNetwork(command, values.name);
   DescribeSecret(command, values.secret);
   command.add_option("--user", values.user, "who you are, for networks with EAP")->option_text("NAME");
-  command.add_flag("--any-ap", values.anyAccessPoint, "through any access point that bears the name");
+  command.add_flag("--any-ap", values.anyAccessPoint, "with ADDRESS: through any other of the name, too");
   command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
+  command.add_flag("--changed", values.isChanged, "though it is not protected any more as it was saved");
 }
 
 struct AutoJoining {

@@ -162,11 +162,15 @@ std::string BytesOfHex(std::string_view hex) {
   return bytes;
 }
 
-std::string AddressText(const unsigned char (&address)[6]) {
+std::string AddressText(const Address& address) {
   char szText[sizeof "00:11:22:33:44:55"];
   std::snprintf(szText, sizeof szText, "%02X:%02X:%02X:%02X:%02X:%02X", address[0], address[1], address[2], address[3],
                 address[4], address[5]);
   return szText;
+}
+
+std::string AddressText(const unsigned char (&address)[6]) {
+  return AddressText(std::to_array(address));
 }
 
 std::optional<Address> ParseAddress(std::string_view text) {

@@ -41,6 +41,7 @@ std::string BytesOfHex(std::string_view hex);
 using Address = std::array<unsigned char, 6>;
 
 std::string AddressText(const unsigned char (&address)[6]);
+std::string AddressText(const Address& address);
 
 // Six hexadecimal octets between colons, and nothing else.
 std::optional<Address> ParseAddress(std::string_view text);

@@ -176,10 +176,9 @@ std::string BringBackAccessPoint(const Program& program) {
 std::string BringBackConnection(const Program& program, const std::string& network) {
   const std::string name = program.output.Name(network);
   if (ReadStatus().name == network) return ", and connected to " + name;
-  const auto known = FindKnown(network);
-  if (!known) return "; " + name + " is not among the known networks, and was not joined again";
+  if (!FindKnown(network)) return "; " + name + " is not among the known networks, and was not joined again";
   try {
-    JoinAgain(program, *known);
+    JoinAgain(program, network);
   } catch (const Failure& failure) {
     throw Failure(failure.exit(), "the radio is on, and not connected to " + name + " again: " + failure.what(),
                   failure.advice());

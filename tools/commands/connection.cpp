@@ -2,15 +2,19 @@
 #include "commands/connection.h"
 
 #include <chrono>
+#include <optional>
 #include <thread>
+#include <vector>
 
 #include "common/paths.h"
+#include "model/access_points.h"
 #include "model/addressing.h"
 #include "model/ap_state.h"
 #include "model/former_connection.h"
 #include "model/join_failures.h"
 #include "model/join_lock.h"
 #include "model/library.h"
+#include "model/saved_networks.h"
 #include "model/security.h"
 #include "model/situation.h"
 #include "model/status.h"
@@ -77,12 +81,47 @@ void ApplyAddressing(const Program& program, const KnownNetwork& config) {
 
 // ---- What to join ----
 
-KnownNetwork FromTheAir(const Program& program, const NetworkToJoin& wanted) {
+void RequireJoinable(const Program& program, const Network& network) {
+  if (!CanBeJoined(network)) throw Unsupported(program.output.Name(network.szEssid));
+}
+
+// A network that is to be joined.
+struct Target {
+  KnownNetwork config;
+  bool isInRange;
+  std::optional<SavedNetwork> changed;  // what it was saved as, where that is no longer so
+};
+
+// The network of those known by one name that is in range.
+Target TargetAmong(const Program& program, const std::vector<SavedNetwork>& known, const std::vector<Network>& inRange,
+                   bool isChanged) {
+  for (const SavedNetwork& saved : known) {
+    if (const auto config = Through(saved, inRange)) return {*config, true, std::nullopt};
+  }
+  const SavedNetwork& newest = known.front();
+  const auto pretender = Pretender(newest, inRange);
+  if (!pretender) return {AsSaved(newest), false, std::nullopt};
+  if (!isChanged) throw OnlyBearsTheName(program, newest, *pretender);
+  return {AsChanged(newest, *pretender), true, newest};
+}
+
+Target FromWhatIsKnown(const Program& program, const std::vector<SavedNetwork>& known, bool isChanged) {
+  if (known.front().isCell()) return {AsSaved(known.front()), true, std::nullopt};
+  return TargetAmong(program, known, LookFor(program, known.front()), isChanged);
+}
+
+// An access point of a known name, but of an address that it was not saved with, may be one of that network.
+Target FromTheAir(const Program& program, const NetworkToJoin& wanted) {
+  const Network accessPoint = FindInRange(program, wanted.name);
+  auto known = SavedAs(accessPoint.szEssid);
+  for (SavedNetwork& saved : known) saved.LeaveOnly(accessPoint);
+  if (!known.empty()) return TargetAmong(program, known, {accessPoint}, wanted.isChanged);
   KnownNetwork config{};
-  config.network = FindInRange(program, wanted.name);
+  config.network = accessPoint;
   config.network.opmode = WIRELESS_OPMODE_MANAGED;
   SetAddressing(config, Addressing{});
-  return config;
+  config.noneBssid = wanted.name == accessPoint.szEssid ? 1 : 0;
+  return {config, true, std::nullopt};
 }
 
 void SetUser(KnownNetwork& config, const std::string& user) {
@@ -92,14 +131,16 @@ void SetUser(KnownNetwork& config, const std::string& user) {
   SetText(config.szUser, user, "the user");
 }
 
-KnownNetwork NetworkOf(const Program& program, const NetworkToJoin& wanted) {
-  const auto known = FindKnown(wanted.name);
-  KnownNetwork config = known ? *known : FromTheAir(program, wanted);
-  if (!CanBeJoined(config.network)) throw Unsupported(program.output.Name(config.network.szEssid));
+Target TargetOf(const Program& program, const NetworkToJoin& wanted) {
+  const auto known = SavedAs(wanted.name);
+  if (!known.empty() && !wanted.isChanged) RequireJoinable(program, known.front().newest.network);
+  Target target = known.empty() ? FromTheAir(program, wanted) : FromWhatIsKnown(program, known, wanted.isChanged);
+  KnownNetwork& config = target.config;
+  RequireJoinable(program, config.network);
   if (config.szKey[0] == '\0' || wanted.secret.isGiven()) SetSecret(program, config, wanted.secret);
   SetUser(config, wanted.user);
-  config.noneBssid = wanted.anyAccessPoint ? 1 : 0;
-  return config;
+  if (wanted.anyAccessPoint) config.noneBssid = 1;
+  return target;
 }
 
 // One that is given has been looked at.
@@ -110,23 +151,17 @@ void RequireSavedSecret(const Program& program, const KnownNetwork& config) {
                 "`merowireless save` saves the right one");
 }
 
-// A look at the air takes a while. It is worth that where there is a connection to be lost; elsewhere the attempt
-// tells.
-void RequireInRange(const Program& program, const KnownNetwork& config, const FormerConnection& former) {
-  if (!former.exists() || IsInRange(program, config)) return;
+// One that hides, or comes into range, is found by the attempt. It is not worth to lose a connection for.
+void RequireInRange(const Program& program, const Target& target, const FormerConnection& former) {
+  if (!former.exists() || target.isInRange) return;
   throw Failure(Exit::kOutOfRange,
-                program.output.Name(config.network.szEssid) + " is not in range, and nothing was changed",
+                program.output.Name(target.config.network.szEssid) + " is not in range, and nothing was changed",
                 "move closer; `merowireless scan --renew` shows what is");
 }
 
 void SayConnected(const Program& program) {
   const Status status = ReadStatus();
   program.output.Done(ConnectionText(program.output, status), "status", StatusFields(), status);
-}
-
-// A static address needs its gateway too, which the library leaves to its caller.
-void ApplyGatewayOfConnection() {
-  if (const auto known = FindKnown(ReadStatus().name)) ApplySavedGateway(*known);
 }
 
 // The library does not notice when the driver refuses the cell.
@@ -141,41 +176,37 @@ bool IsInCell(const std::string& name) {
 void Connect(const Program& program, const NetworkToJoin& wanted) {
   const JoinLock lock;
   RequireFreeAdapter();
-  const KnownNetwork config = NetworkOf(program, wanted);
-  RequireSavedSecret(program, config);
-  if (!wanted.noAddress) RequireAddressing(config);
+  const Target target = TargetOf(program, wanted);
+  RequireSavedSecret(program, target.config);
+  if (!wanted.noAddress) RequireAddressing(target.config);
   const FormerConnection former(program);
-  RequireInRange(program, config, former);
+  RequireInRange(program, target, former);
   former.Try([&] {
-    Join(program, config);
-    if (!wanted.noAddress) ApplyAddressing(program, config);
+    Join(program, target.config);
+    if (!wanted.noAddress) ApplyAddressing(program, target.config);
   });
+  if (target.changed) (void)SaveNetwork(target.config, !target.changed->isOneAccessPoint);
   SayConnected(program);
 }
 
-void JoinAgain(const Program& program, const KnownNetwork& config) {
-  Join(program, config);
-  ApplyAddressing(program, config);
+void JoinAgain(const Program& program, const std::string& name) {
+  const Target target = FromWhatIsKnown(program, SavedAs(name), false);
+  Join(program, target.config);
+  ApplyAddressing(program, target.config);
 }
 
 void AutoConnect(const Program& program) {
   const JoinLock lock;
   RequireFreeAdapter();
-  // Called while there is a connection, the library would end it and fail.
   if (IsLetIn(ReadStatus())) return SayConnected(program);
-  if (Known(Order::kByTime).empty()) {
+  const auto networks = NetworksToTry();
+  if (networks.empty()) {
     throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");
   }
-
   FormerConnection(program).Try([&] {
-    EndFormerSupplicant(program);
-    SupplicantListener listener(SupplicantSocket());
-    if (Run<int>(Joining(program, "joining a known network", listener), [] { return MEROWirelessAutoConnect(); }) < 0) {
-      throw AutoConnectFailed(listener.verdict());
-    }
+    const auto joined = JoinFirst(program, networks, [&](const KnownNetwork& config) { Join(program, config); });
+    ApplyAddressing(program, joined);
   });
-  RequireLease();
-  ApplyGatewayOfConnection();
   SayConnected(program);
 }
 

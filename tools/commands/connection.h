@@ -14,6 +14,7 @@ struct NetworkToJoin {
   std::string user;
   bool anyAccessPoint = false;
   bool noAddress = false;
+  bool isChanged = false;  // the protection on the air is accepted, whatever was saved
 };
 
 struct CellToMake {
@@ -25,7 +26,7 @@ struct CellToMake {
 void Connect(const Program& program, const NetworkToJoin& wanted);
 
 // Joins a known network, with its address, and says nothing.
-void JoinAgain(const Program& program, const KnownNetwork& config);
+void JoinAgain(const Program& program, const std::string& name);
 
 void AutoConnect(const Program& program);
 void Disconnect(const Program& program);

@@ -2,13 +2,16 @@
 #include "commands/networks.h"
 
 #include <algorithm>
+#include <array>
 #include <chrono>
 #include <functional>
 
 #include "base/clock.h"
 #include "common/paths.h"
+#include "model/access_points.h"
 #include "model/last_scan.h"
 #include "model/library.h"
+#include "model/saved_networks.h"
 #include "model/security.h"
 
 namespace {
@@ -75,29 +78,49 @@ constexpr Field<Found> kFoundFields[] = {
     {"known", "KNOWN", [](const Found& of) { return Value(of.isKnown); }, Layout::kLeft, ShowKnown},
 };
 
-// The secret is the last field, so that it can be left out.
-constexpr Field<KnownNetwork> kKnownFields[] = {
-    {"name", "NAME", [](const KnownNetwork& of) { return Value(of.network.szEssid); }, Layout::kElastic},
-    {"auth", "SECURITY", [](const KnownNetwork& of) { return AuthOf(of.network); }, Layout::kLeft,
-     [](const KnownNetwork& of, bool) { return Shown{SecurityText(of.network.auth, of.network.encrypt)}; }},
-    {"encryption", "", [](const KnownNetwork& of) { return EncryptionOf(of.network); }},
-    {"mode", "", [](const KnownNetwork& of) { return Value(MEROWirelessOpmodeStringGet(of.network.opmode)); }},
-    {"ip", "ADDRESS", [](const KnownNetwork& of) { return Value(of.szIp); }},
-    {"mask", "", [](const KnownNetwork& of) { return Value(of.szMask); }},
-    {"gateway", "", [](const KnownNetwork& of) { return Value(of.szGateway); }},
-    {"saved", "SAVED", [](const KnownNetwork& of) { return of.atime == 0 ? nullptr : Value(UtcText(of.atime)); },
-     Layout::kLeft,
-     [](const KnownNetwork& of, bool) {
-       return of.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{LocalText(of.atime, "%F %R")};
+Value AddressesOf(const SavedNetwork& of) {
+  std::string addresses;
+  for (const Address& address : of.addresses) addresses += (addresses.empty() ? "" : " ") + AddressText(address);
+  return addresses;
+}
+
+// One access point by its address; of several, how many there are.
+Shown ShowAccessPoints(const SavedNetwork& of, bool) {
+  const std::size_t count = of.addresses.size();
+  return {count == 1 ? AddressText(of.addresses.front()) : std::to_string(count) + " access points"};
+}
+
+constexpr Field<SavedNetwork> kWithSecret[] = {
+    {"name", "NAME", [](const SavedNetwork& of) { return Value(of.newest.network.szEssid); }, Layout::kElastic},
+    {"auth", "SECURITY", [](const SavedNetwork& of) { return AuthOf(of.newest.network); }, Layout::kLeft,
+     [](const SavedNetwork& of, bool) {
+       return Shown{SecurityText(of.newest.network.auth, of.newest.network.encrypt)};
      }},
-    {"address", "ACCESS POINT", [](const KnownNetwork& of) { return Value(AddressText(of.network.bssid)); }},
-    {"name_hex", "", [](const KnownNetwork& of) { return NameInHex(of.network.szEssid); }},
-    {"has_secret", "", [](const KnownNetwork& of) { return Value(of.szKey[0] != '\0'); }},
-    {"secret", "SECRET", [](const KnownNetwork& of) { return Value(of.szKey); }},
+    {"encryption", "", [](const SavedNetwork& of) { return EncryptionOf(of.newest.network); }},
+    {"mode", "", [](const SavedNetwork& of) { return Value(MEROWirelessOpmodeStringGet(of.newest.network.opmode)); }},
+    {"ip", "ADDRESS", [](const SavedNetwork& of) { return Value(of.newest.szIp); }},
+    {"mask", "", [](const SavedNetwork& of) { return Value(of.newest.szMask); }},
+    {"gateway", "", [](const SavedNetwork& of) { return Value(of.newest.szGateway); }},
+    {"saved", "SAVED",
+     [](const SavedNetwork& of) { return of.newest.atime == 0 ? nullptr : Value(UtcText(of.newest.atime)); },
+     Layout::kLeft,
+     [](const SavedNetwork& of, bool) {
+       return of.newest.atime == 0 ? Shown{"-", Tone::kFaint} : Shown{LocalText(of.newest.atime, "%F %R")};
+     }},
+    {"address", "ACCESS POINT", [](const SavedNetwork& of) { return Value(AddressText(of.newest.network.bssid)); },
+     Layout::kLeft, ShowAccessPoints},
+    {"name_hex", "", [](const SavedNetwork& of) { return NameInHex(of.newest.network.szEssid); }},
+    {"has_secret", "", [](const SavedNetwork& of) { return Value(of.newest.szKey[0] != '\0'); }},
+    {"secret", "SECRET", [](const SavedNetwork& of) { return Value(of.newest.szKey); }},
+    {"addresses", "", AddressesOf},
 };
 
-constexpr std::span kWithSecret(kKnownFields);
-constexpr std::span kWithoutSecret = kWithSecret.first(kWithSecret.size() - 1);
+constexpr auto kWithoutSecret = [] {
+  std::array<Field<SavedNetwork>, std::size(kWithSecret) - 1> fields{};
+  std::ranges::copy_if(kWithSecret, fields.begin(),
+                       [](const Field<SavedNetwork>& field) { return field.key != "secret"; });
+  return fields;
+}();
 
 // ---- Saving ----
 
@@ -132,8 +155,7 @@ bool AreUsable() {
 
 // One of a known name that is protected otherwise is another network, or pretends to be that one.
 bool IsSame(const Network& one, const Network& other) {
-  return std::string_view(one.szEssid) == other.szEssid &&
-         SecurityText(one.auth, WIRELESS_ENCRYPT_UNKNOWN) == SecurityText(other.auth, WIRELESS_ENCRYPT_UNKNOWN);
+  return std::string_view(one.szEssid) == other.szEssid && IsProtectedAlike(one, other);
 }
 
 // The networks, the strongest first.
@@ -152,8 +174,15 @@ std::vector<Found> FoundAmong(std::vector<Network> networks) {
   return found;
 }
 
-Failure NotSaved() {
-  return Failed("the network could not be saved", "is there room on the disk? -v shows more");
+// The network that is to be saved. One that is known by its name is changed by it only when none of its access points
+// in range is protected as it was: others may only bear the name.
+Network ToBeSaved(const Program& program, const std::string& name) {
+  const Network strongest = FindInRange(program, name);
+  if (name != strongest.szEssid) return strongest;
+  for (const SavedNetwork& saved : SavedAs(name)) {
+    if (const auto config = Through(saved, LookFor(program, saved))) return config->network;
+  }
+  return strongest;
 }
 
 }  // namespace
@@ -167,8 +196,10 @@ void Scan(const Program& program, Results results) {
 }
 
 void ListKnown(const Program& program, bool byTime, bool showSecrets) {
-  const auto known = Known(byTime ? Order::kByTime : Order::kAsSaved);
-  program.output.List<KnownNetwork>("networks", showSecrets ? kWithSecret : kWithoutSecret, known,
+  const auto known = SavedNetworks(byTime ? Order::kByTime : Order::kAsSaved);
+  const std::span<const Field<SavedNetwork>> fields =
+      showSecrets ? std::span<const Field<SavedNetwork>>(kWithSecret) : kWithoutSecret;
+  program.output.List<SavedNetwork>("networks", fields, known,
                                     "no network is known; `merowireless save NAME` saves one");
 }
 
@@ -176,25 +207,28 @@ void Save(const Program& program, const NetworkToSave& wanted) {
   if (wanted.address.empty()) RequireAdapter();  // to look for the network
   KnownNetwork config{};
   SetAddressing(config, wanted.addressing);
-  config.network = wanted.address.empty() ? FindInRange(program, wanted.name) : Described(wanted);
+  config.network = wanted.address.empty() ? ToBeSaved(program, wanted.name) : Described(wanted);
   if (config.network.opmode == WIRELESS_OPMODE_AUTO) config.network.opmode = WIRELESS_OPMODE_MANAGED;
   SetSecret(program, config, wanted.secret);
-  if (MEROWirelessConfSet(&config) < 0) throw NotSaved();
+  const SavedNetwork saved = SaveNetwork(config, wanted.name == config.network.szEssid);
   const std::string name = program.output.Name(config.network.szEssid);
-  program.output.Done<KnownNetwork>("saved " + name + " (" + AddressText(config.network.bssid) + ")", "network",
-                                    kWithoutSecret, config);
+  const std::string which = saved.addresses.size() == 1 ? AddressText(config.network.bssid)
+                                                        : std::to_string(saved.addresses.size()) + " access points";
+  program.output.Done<SavedNetwork>("saved " + name + " (" + which + ")", "network", kWithoutSecret, saved);
 }
 
 void Forget(const Program& program, const std::string& name) {
-  const std::vector<KnownNetwork> known = AllKnown(name);
+  const std::vector<SavedNetwork> known = SavedAs(name);
   const std::string shown = program.output.Name(name);
   if (known.empty()) {
     throw Failure(Exit::kOutOfRange, "no network named " + shown + " is known",
                   "`merowireless known` lists those that are");
   }
-  for (const KnownNetwork& network : known) {
-    if (PLIBCFileRemoveSection(kKnownNetworksPath, AddressText(network.network.bssid).c_str()) > 0) continue;
-    throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworksPath));
+  for (const SavedNetwork& network : known) {
+    for (const Address& address : network.addresses) {
+      if (PLIBCFileRemoveSection(kKnownNetworksPath, AddressText(address).c_str()) > 0) continue;
+      throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworksPath));
+    }
   }
-  program.output.ListDone<KnownNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
+  program.output.ListDone<SavedNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
 }

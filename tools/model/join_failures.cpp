@@ -53,16 +53,6 @@ Failure JoinFailed(const std::string& name, Verdict verdict) {
           "try again closer to it; -v shows what the library reports"};
 }
 
-Failure AutoConnectFailed(Verdict verdict) {
-  if (const auto failure = AttemptFailed("a known network")) return *failure;
-  if (WasReported(Report::kAddressNotSet)) {
-    return Failed("a network was joined, but its address could not be set");
-  }
-  if (verdict > Verdict::kNotFound) return *Refused("one of the known networks", verdict);
-  return {Exit::kOutOfRange, "none of the known networks could be joined",
-          "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
-}
-
 Failure NotEnded() {
   return Failed("the connection could not be ended whole");
 }

@@ -12,7 +12,6 @@ Failure Unsupported(const std::string& name);
 
 // Why an attempt of the library failed, by its reports and by what the supplicant said.
 Failure JoinFailed(const std::string& name, Verdict verdict);
-Failure AutoConnectFailed(Verdict verdict);
 
 // Something of a connection has stayed.
 Failure NotEnded();

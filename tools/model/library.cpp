@@ -69,61 +69,25 @@ Failure ScanFailed() {
   return Failed("the adapter gave no scan results", "try again with --renew; -v shows what the library reports");
 }
 
-bool IsNamed(const Network& network, const std::string& name, const std::optional<Address>& address) {
-  return name == network.szEssid || (address && std::ranges::equal(*address, network.bssid));
-}
-
-// How a search ended: 1 found, 0 not, below 0 failed.
-struct Answer {
-  int result;
-  Network network;
-};
-
-// Searches the results of the adapter's last scan; when there are none, the library scans. Six bytes of an address it
-// takes as a pointer to text.
-Answer LookUpBy(const char* szValue, WIRELESS_FILTER filter) {
-  Answer found{};
-  found.result = MEROWirelessNetworkGet(szValue, filter, &found.network);
-  return found;
-}
-
-Answer LookUp(const Address& address) {
-  return LookUpBy(reinterpret_cast<const char*>(address.data()), WIRELESS_FILTER_BSSID);
-}
-
-Answer LookUp(const std::string& name, const std::optional<Address>& address) {
-  const Answer found = LookUpBy(name.c_str(), WIRELESS_FILTER_ESSID);
-  return found.result == 0 && address ? LookUp(*address) : found;
-}
-
-// The last results may be older than the network.
-bool ScanAfresh() {
+// What a scan gave: its result, and the access points.
+std::string Scanned(WIRELESS_SCAN scan) {
   Ring<Network> ring;
-  return MEROWirelessNetworkScan(WIRELESS_SCAN_RENEW, ring.head()) >= 0;
+  const int result = MEROWirelessNetworkScan(scan, ring.head());
+  return Pack(result, ring.Records());
 }
 
-Answer LookUpAfresh(const std::string& name, const std::optional<Address>& address) {
-  return ScanAfresh() ? LookUp(name, address) : Answer{-1, {}};
-}
-
-// The access point that a network is to be joined through; nothing when any will do.
-std::optional<Address> AccessPointFor(const KnownNetwork& config) {
-  Address address;
-  std::ranges::copy(config.network.bssid, address.begin());
-  return config.noneBssid != 0 || address == Address{} ? std::nullopt : std::optional(address);
+// Fails when the scan did.
+std::vector<Network> AccessPointsOf(const std::string& bytes) {
+  std::vector<Network> networks;
+  if (Unpack(bytes, networks) < 0) throw ScanFailed();
+  std::ranges::stable_sort(networks, std::greater{}, &Network::signal);
+  return networks;
 }
 
 }  // namespace
 
 std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan) {
-  const std::string bytes = RunBytes(program.Doing("scanning"), [scan] {
-    Ring<Network> ring;
-    const int result = MEROWirelessNetworkScan(scan, ring.head());
-    return Pack(result, ring.Records());
-  });
-  std::vector<Network> networks;
-  if (Unpack(bytes, networks) < 0) throw ScanFailed();
-  return networks;
+  return AccessPointsOf(RunBytes(program.Doing("scanning"), [scan] { return Scanned(scan); }));
 }
 
 std::vector<KnownNetwork> Known(Order order) {
@@ -135,35 +99,35 @@ std::vector<KnownNetwork> Known(Order order) {
   return ring.Records();
 }
 
-Network FindInRange(const Program& program, const std::string& name) {
-  RequireScanning();
-  const std::optional<Address> address = ParseAddress(name);
-  const std::string shown = program.output.Name(name);
-  const auto answer = Run<Answer>(program.Doing("looking for " + shown), [&] {
-    const Answer found = LookUp(name, address);
-    return found.result != 0 ? found : LookUpAfresh(name, address);
-  });
-  if (answer.result < 0) throw ScanFailed();
-  if (answer.result == 0) {
-    throw Failure(Exit::kOutOfRange, "no network named " + shown + " is in range",
-                  "`merowireless scan --renew` shows those that are");
-  }
-  return answer.network;
+std::vector<Network> LookFor(const Program& program, const std::string& name,
+                             const std::function<bool(const Network&)>& isWanted) {
+  const Task task = program.Doing("looking for " + program.output.Name(name));
+  auto last = AccessPointsOf(RunBytes(task, [] { return Scanned(WIRELESS_SCAN_LAST); }));
+  if (std::ranges::any_of(last, isWanted)) return last;
+  return AccessPointsOf(RunBytes(task, [&] {
+    const bool called = CallNetwork(MEROWirelessInterfaceGet(), name);
+    return Scanned(called ? WIRELESS_SCAN_LAST : WIRELESS_SCAN_RENEW);
+  }));
 }
 
-bool IsInRange(const Program& program, const KnownNetwork& config) {
-  const std::string name = config.network.szEssid;
-  const std::optional<Address> address = AccessPointFor(config);
-  const auto isListed = [&] { return (address ? LookUp(*address) : LookUp(name, std::nullopt)).result > 0; };
-  return Run<bool>(program.Doing("looking for " + program.output.Name(name)), [&] {
-    return isListed() || ((CallNetwork(MEROWirelessInterfaceGet(), name) || ScanAfresh()) && isListed());
-  });
+bool IsNamed(const Network& network, const std::string& name) {
+  const std::optional<Address> address = ParseAddress(name);
+  return name == network.szEssid || (address && std::ranges::equal(*address, network.bssid));
+}
+
+Network FindInRange(const Program& program, const std::string& name) {
+  RequireScanning();
+  const auto isWanted = [&](const Network& network) { return IsNamed(network, name); };
+  const auto networks = LookFor(program, name, isWanted);
+  const auto found = std::ranges::find_if(networks, isWanted);
+  if (found != networks.end()) return *found;
+  throw Failure(Exit::kOutOfRange, "no network named " + program.output.Name(name) + " is in range",
+                "`merowireless scan --renew` shows those that are");
 }
 
 std::vector<KnownNetwork> AllKnown(const std::string& name) {
   std::vector<KnownNetwork> known = Known(Order::kByTime);
-  const std::optional<Address> address = ParseAddress(name);
-  std::erase_if(known, [&](const KnownNetwork& other) { return !IsNamed(other.network, name, address); });
+  std::erase_if(known, [&](const KnownNetwork& other) { return !IsNamed(other.network, name); });
   return known;
 }
 

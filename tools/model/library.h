@@ -3,6 +3,7 @@
 #define MERO_TOOLS_LIBRARY_H
 
 #include <algorithm>
+#include <functional>
 #include <iterator>
 #include <optional>
 #include <string>
@@ -25,12 +26,16 @@ std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan);
 // The networks that have been saved.
 std::vector<KnownNetwork> Known(Order order);
 
-// A network in range, by its name or the address of its access point; fails when there is none.
-Network FindInRange(const Program& program, const std::string& name);
+// All access points in range, the strongest first. Where the adapter's last results hold none that `isWanted`, the
+// network of this name is called, which it answers even if it hides, or else the adapter scans.
+std::vector<Network> LookFor(const Program& program, const std::string& name,
+                             const std::function<bool(const Network&)>& isWanted);
 
-// Whether a network is in range, also one that hides its name: through any of its access points, or, where the network
-// is to be joined through one, through that.
-bool IsInRange(const Program& program, const KnownNetwork& config);
+// Whether a network has this name, or its access point this address.
+bool IsNamed(const Network& network, const std::string& name);
+
+// The strongest access point in range of this name, or the one of this address; fails when there is none.
+Network FindInRange(const Program& program, const std::string& name);
 
 // The network that was saved last under a name or an address.
 std::optional<KnownNetwork> FindKnown(const std::string& name);

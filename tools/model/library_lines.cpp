@@ -15,7 +15,6 @@ constexpr LibraryLine kLines[] = {
     {Report::kUnknownSecurity, "wireless_network_connect", "Failed to detect authentication/encryption type"},
     {Report::kSupplicantNotConfigured, "wireless_network_connect", "Failed to set [%s]"},
     {Report::kJoinNotRecorded, "wireless_network_connect", "Failed to record this connection."},
-    {Report::kAddressNotSet, "wireless_auto_connect", "Failed to set interface configuration"},
     {Report::kNoLease, "wireless_ifcfg_set", "Failed to get IP from DHCP"},
     {Report::kAnotherAp, "wireless_ap_enable", "Another ap construction is going"},
     {Report::kScriptFailed, "wireless_ap_enable", "Failed to restart /etc/rc.network"},

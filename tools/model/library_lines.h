@@ -11,7 +11,6 @@ enum class Report {
   kUnknownSecurity,
   kSupplicantNotConfigured,
   kJoinNotRecorded,
-  kAddressNotSet,
   kNoLease,
   kAnotherAp,
   kScriptFailed,

@@ -64,6 +64,10 @@ std::string SecurityText(WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt) {
                                                           : " TKIP");
 }
 
+bool IsProtectedAlike(const WIRELESS_NETWORK& one, const WIRELESS_NETWORK& other) {
+  return SecurityOf(one.auth).text == SecurityOf(other.auth).text;
+}
+
 bool NeedsSecret(WIRELESS_AUTH auth) {
   return SecurityOf(auth).secret;
 }

@@ -10,6 +10,9 @@
 // "WPA2 AES", "open".
 std::string SecurityText(WIRELESS_AUTH auth, WIRELESS_ENCRYPT encrypt);
 
+// Whether two networks are protected in the same way, whatever their ciphers.
+bool IsProtectedAlike(const WIRELESS_NETWORK& one, const WIRELESS_NETWORK& other);
+
 bool NeedsSecret(WIRELESS_AUTH auth);
 bool NeedsUser(WIRELESS_AUTH auth);
 

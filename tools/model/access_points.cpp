@@ -1,0 +1,173 @@
+// The access points in range through which a known network can be joined.
+#include "model/access_points.h"
+
+#include <algorithm>
+#include <string_view>
+
+#include "base/terminal.h"
+#include "model/addressing.h"
+#include "model/join_failures.h"
+#include "model/security.h"
+
+namespace {
+
+// Whether an access point is one of the network's, by what it is called.
+bool IsOf(const SavedNetwork& saved, const Network& accessPoint) {
+  const auto isThis = [&](const Address& address) { return std::ranges::equal(address, accessPoint.bssid); };
+  if (saved.isOneAccessPoint) return isThis(saved.addresses.front());
+  return std::string_view(saved.newest.network.szEssid) == accessPoint.szEssid &&
+         std::ranges::none_of(saved.others, isThis);
+}
+
+bool IsAsSaved(const SavedNetwork& saved, const Network& accessPoint) {
+  return IsOf(saved, accessPoint) && IsProtectedAlike(saved.newest.network, accessPoint);
+}
+
+// ---- Trying one after the other ----
+
+// Whether a failure tells more than that a network was not there, or could not have been joined anyway.
+bool TellsMore(const Failure& failure) {
+  return failure.exit() == Exit::kSecretRefused || failure.exit() == Exit::kFailed;
+}
+
+// Whether another network may be tried behind it.
+bool IsOfOneNetwork(const Failure& failure) {
+  return TellsMore(failure) || failure.exit() == Exit::kOutOfRange || failure.exit() == Exit::kTimedOut ||
+         failure.exit() == Exit::kUnsupported;
+}
+
+class Walk {
+ public:
+  Walk(const Program& program, const std::function<void(const KnownNetwork&)>& join) : program_(program), join_(join) {}
+
+  // Tries those in range; the rest waits until the others were tried in vain. A cell waits for nobody.
+  std::optional<KnownNetwork> TryInRange(const SavedNetwork& saved) {
+    if (saved.isCell()) return Try(AsSaved(saved));
+    const auto inRange = Heard(saved);
+    if (const auto config = Through(saved, inRange)) return Try(*config);
+    if (const auto pretender = Pretender(saved, inRange)) {
+      passedOver_.push_back(OnlyBearsTheName(program_, saved, *pretender));
+    } else if (saved.newest.network.auth != WIRELESS_AUTH_UNKNOWN &&
+               saved.newest.network.encrypt != WIRELESS_ENCRYPT_UNKNOWN) {
+      unheard_.push_back(AsSaved(saved));
+    }
+    return std::nullopt;
+  }
+
+  std::optional<KnownNetwork> TryUnheard() {
+    for (const KnownNetwork& config : unheard_) {
+      if (const auto joined = Try(config)) return joined;
+    }
+    return std::nullopt;
+  }
+
+  void TellOfThosePassedOver() const {
+    for (const Failure& failure : passedOver_) Remark("merowireless: " + std::string(failure.what()));
+  }
+
+  // Why no network was joined.
+  Failure Why() {
+    if (failure_) return TellOfThosePassedOver(), *failure_;
+    if (!passedOver_.empty()) {
+      const Failure first = passedOver_.front();
+      passedOver_.erase(passedOver_.begin());
+      return TellOfThosePassedOver(), first;
+    }
+    return {Exit::kOutOfRange, "none of the known networks could be joined",
+            "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
+  }
+
+ private:
+  // Where the adapter gives no results, a network may be in range all the same.
+  std::vector<Network> Heard(const SavedNetwork& saved) const {
+    try {
+      return LookFor(program_, saved);
+    } catch (const Failure& failure) {
+      if (!IsOfOneNetwork(failure)) throw;
+      return {};
+    }
+  }
+
+  std::optional<KnownNetwork> Try(const KnownNetwork& config) {
+    try {
+      if (!CanBeJoined(config.network)) throw Unsupported(program_.output.Name(config.network.szEssid));
+      RequireAddressing(config);
+      join_(config);
+      return config;
+    } catch (const Failure& failure) {
+      if (!IsOfOneNetwork(failure)) throw;
+      if (!failure_ && TellsMore(failure)) failure_ = failure;
+      return std::nullopt;
+    }
+  }
+
+  const Program& program_;
+  const std::function<void(const KnownNetwork&)>& join_;
+  std::vector<KnownNetwork> unheard_;
+  std::vector<Failure> passedOver_;
+  std::optional<Failure> failure_;  // the first that tells more than that a network was not there
+};
+
+}  // namespace
+
+std::vector<Network> LookFor(const Program& program, const SavedNetwork& saved) {
+  return LookFor(program, saved.newest.network.szEssid,
+                 [&](const Network& accessPoint) { return IsAsSaved(saved, accessPoint); });
+}
+
+std::optional<KnownNetwork> Through(const SavedNetwork& saved, const std::vector<Network>& inRange) {
+  const auto found =
+      std::ranges::find_if(inRange, [&](const Network& accessPoint) { return IsAsSaved(saved, accessPoint); });
+  if (found == inRange.end()) return std::nullopt;
+  KnownNetwork config = AsSaved(saved);
+  config.network = *found;
+  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  return config;
+}
+
+KnownNetwork AsSaved(const SavedNetwork& saved) {
+  KnownNetwork config = saved.newest;
+  const bool isRoaming = !saved.isCell() && !saved.isOneAccessPoint && saved.others.empty();
+  config.noneBssid = isRoaming ? 1 : 0;
+  return config;
+}
+
+std::optional<Network> Pretender(const SavedNetwork& saved, const std::vector<Network>& inRange) {
+  const auto found =
+      std::ranges::find_if(inRange, [&](const Network& accessPoint) { return IsOf(saved, accessPoint); });
+  if (found == inRange.end() || Through(saved, inRange)) return std::nullopt;
+  return *found;
+}
+
+KnownNetwork AsChanged(const SavedNetwork& saved, const Network& accessPoint) {
+  KnownNetwork config = AsSaved(saved);
+  config.network = accessPoint;
+  config.network.opmode = WIRELESS_OPMODE_MANAGED;
+  const bool isKept = NeedsSecret(accessPoint.auth) && CanBeSecret(accessPoint.auth, config.szKey);
+  if (!isKept) config.szKey[0] = '\0';
+  return config;
+}
+
+Failure OnlyBearsTheName(const Program& program, const SavedNetwork& saved, const Network& pretender) {
+  const Network& network = saved.newest.network;
+  const std::string name = program.output.Name(network.szEssid);
+  const std::string was = SecurityText(network.auth, network.encrypt);
+  const std::string is = SecurityText(pretender.auth, pretender.encrypt);
+  return {Exit::kOutOfRange,
+          name + " was saved as " + was + " and is " + is + " now, so it may be another one of that name",
+          "it was given no secret; if it is yours, connect with --changed, or save it again"};
+}
+
+KnownNetwork JoinFirst(const Program& program, const std::vector<SavedNetwork>& networks,
+                       const std::function<void(const KnownNetwork&)>& join) {
+  Walk walk(program, join);
+  std::optional<KnownNetwork> joined;
+  for (const SavedNetwork& saved : networks) {
+    joined = walk.TryInRange(saved);
+    if (joined) break;
+  }
+  if (!joined) joined = walk.TryUnheard();
+  if (!joined) throw walk.Why();
+  walk.TellOfThosePassedOver();
+  return *joined;
+}
