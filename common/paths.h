@@ -52,6 +52,11 @@ inline constexpr char kJoinLock[] = "/var/run/merowireless";
 inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
 inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";
 
+// Where the system asks for names, and the lines between which an interface's name servers stand there.
+inline constexpr char kResolverPath[] = "/etc/resolv.conf";
+inline constexpr char kNameServersBegin[] = "# By the DHCP client of %s, until it leaves the network:";
+inline constexpr char kNameServersEnd[] = "# (end of what the DHCP client of %s has added)";
+
 // ---- An access point ----
 
 // Exists while an access point is being set up.

@@ -18,7 +18,6 @@ namespace {
 
 constexpr char kSupplicantPath[] = "/usr/sbin/wpa_supplicant";
 constexpr char kSystemSettingsPath[] = "/etc/meroinfo.conf";
-constexpr char kResolverPath[] = "/etc/resolv.conf";
 
 constexpr int kMediaServiceRestart = 2;
 

@@ -89,6 +89,19 @@ TEST_F(KitPaths, OfTheHotPlugScriptAreTheLibrarys) {
   EXPECT_THAT(RunInShell("/usr/mero/hotplug/usb.wireless.function help").out, HasSubstr(kAdapterInfoPath));
 }
 
+// What a line of the script that applies leases gives a variable, as it stands there.
+std::string LeaseScripts(const std::string& variable) {
+  return RunInShell("sed -n 's/^[[:space:]]*" + variable + "=//p' " APPLIANCE_KIT "/sbin/udhcpc.lease").out;
+}
+
+TEST_F(KitPaths, OfTheLeaseScriptAreTheProgramsAndSoAreTheLinesAroundNameServers) {
+  EXPECT_EQ(LeaseScripts("resolver"), std::string(kResolverPath) + "\n");
+  EXPECT_EQ(LeaseScripts("first_line"),
+            '"' + std::string(InterfacePath(kNameServersBegin, "$interface").c_str()) + "\"\n");
+  EXPECT_EQ(LeaseScripts("last_line"),
+            '"' + std::string(InterfacePath(kNameServersEnd, "$interface").c_str()) + "\"\n");
+}
+
 TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
   const std::string record = kConnectionRecordPath;
   EXPECT_EQ(PathsIn("../debian/libmerowireless-core1.postrm"),

@@ -383,14 +383,14 @@ TEST_F(Connection, IsShownAgainWhenItHasChanged) {
   const Ran ran = Tool({"watch", "--count", "2", "--porcelain"});
   EXPECT_EQ(ran.status, 0);
   EXPECT_EQ(ran.out,
-            "down\t\t\t\t\twlan0\t\t\ton\t\t2026-11-20T11:35:28Z\n"
-            "disconnected\t\t\t\t\twlan0\t\t\ton\t\t2026-11-20T11:35:28Z\n");
+            "down\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\t2026-11-20T11:35:28Z\n"
+            "disconnected\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\t2026-11-20T11:35:28Z\n");
 }
 
 TEST_F(Connection, IsWatchedByTheClockOnTheWall) {
   library::g_now = library::kNow;
   const Surroundings india{.environment = {{"TZ", "XIT-5:30"}}};
-  EXPECT_THAT(Tool({"watch", "--count", "1"}, india).out, HasSubstr("\ntime       17:05:28\n"));
+  EXPECT_THAT(Tool({"watch", "--count", "1"}, india).out, HasSubstr("\ntime          17:05:28\n"));
   EXPECT_THAT(Tool({"watch", "--count", "1", "--json"}, india).out, HasSubstr(R"("time":"2026-11-20T11:35:28Z"}})"));
   EXPECT_THAT(Tool({"status"}, india).out, Not(HasSubstr("time")));
 }
@@ -405,8 +405,9 @@ TEST_F(Connection, IsWatchedWithoutTheAddressesThatItHasOnTheWayToAnother) {
       "ip address add 10.0.0.9/8 dev wlan0 && sleep 0.05 && ip address delete 10.0.0.9/8 dev wlan0 && sleep 0.05 &&"
       "ip address add 10.0.0.9/24 dev wlan0");
   EXPECT_EQ(tool.Wait().out,
-            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\t2026-11-20T11:35:28Z\n"
-            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t10.0.0.9\t255.255.255.0\ton\t\t2026-11-20T11:35:28Z\n");
+            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\t\t\t\t\t\t\t\t2026-11-20T11:35:28Z\n"
+            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t10.0.0.9\t255.255.255.0\ton\t\t\t\t\t\t\t\t\t"
+            "2026-11-20T11:35:28Z\n");
   Shell("ip link delete wlan0");
 }
 

@@ -33,6 +33,7 @@ void Connected() {
   library::Known({Home()});
   library::Connected("Home");
   kernel::Heard({{.address = kernel::kHome, .isJoined = true}});
+  kernel::BecomeJoined();
 }
 
 void InACell() {

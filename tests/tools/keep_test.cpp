@@ -309,12 +309,12 @@ TEST_F(Keep, TellsWhyItWaits) {
     const char* szSentence;
     const char* szPorcelain;
   } rows[] = {
-      {kAbsent, "waiting until an adapter is plugged in", "down\t\t\t\t\twlan0\t\t\ton\t\n"},
-      {kRadioOff, "waiting until the radio is switched on", "down\t\t\t\t\twlan0\t\t\toff\t\n"},
+      {kAbsent, "waiting until an adapter is plugged in", "down\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\n"},
+      {kRadioOff, "waiting until the radio is switched on", "down\t\t\t\t\twlan0\t\t\toff\t\t\t\t\t\t\t\t\n"},
       {kUnannounced, "waiting until the adapter is announced, so that its radio may be used",
-       "down\t\t\t\t\twlan0\t\t\tunknown\t\n"},
+       "down\t\t\t\t\twlan0\t\t\tunknown\t\t\t\t\t\t\t\t\n"},
       {kSilent, "waiting while nobody knows whether the adapter is connected",
-       "not-supported\t\t\t\t\twlan0\t\t\ton\t\n"},
+       "not-supported\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\n"},
   };
   for (const auto& [szWorld, szSentence, szPorcelain] : rows) {
     MakeWorld();

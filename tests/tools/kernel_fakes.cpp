@@ -72,6 +72,19 @@ std::string Station(int number) {
   });
 }
 
+std::string AccessPoint(const Interface& interface) {
+  return MessageOf(NL80211_CMD_NEW_STATION, [&](nl_msg* message) {
+    nla_put(message, NL80211_ATTR_MAC, static_cast<int>(kHome.size()), kHome.data());
+    nlattr* station = nla_nest_start(message, NL80211_ATTR_STA_INFO);
+    nla_put_u8(message, NL80211_STA_INFO_SIGNAL, static_cast<std::uint8_t>(interface.signal));
+    nla_put_u32(message, NL80211_STA_INFO_CONNECTED_TIME, interface.secondsAgo);
+    nlattr* rate = nla_nest_start(message, NL80211_STA_INFO_TX_BITRATE);
+    nla_put_u32(message, NL80211_RATE_INFO_BITRATE32, interface.rate);
+    nla_nest_end(message, rate);
+    nla_nest_end(message, station);
+  });
+}
+
 void PutChannel(nl_msg* message, const Channel& channel) {
   nlattr* description = nla_nest_start(message, 0);
   nla_put_u32(message, NL80211_FREQUENCY_ATTR_FREQ, channel.megahertz);
@@ -121,6 +134,14 @@ void BecomeAccessPoint(std::string_view name, unsigned megahertz) {
   CopyText(Main().szName, name);
 }
 
+void BecomeJoined() {
+  BecomeClient();
+  Main().megahertz = 2437;
+  Main().signal = -52;
+  Main().rate = 65;
+  Main().secondsAgo = 3600;
+}
+
 void AppearWith(const char* szPath, std::string_view name) {
   CopyText(Shared().szAppearsWith, szPath);
   CopyText(Shared().szAppearing, name);
@@ -145,6 +166,7 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
   if (command == NL80211_CMD_GET_INTERFACE) messages.push_back(kernel::Description(asked));
   if (command == NL80211_CMD_GET_STATION) {
     for (int i = 0; i < asked.stations; ++i) messages.push_back(kernel::Station(i));
+    if (asked.signal != 0) messages.push_back(kernel::AccessPoint(asked));
   }
   if (command == NL80211_CMD_GET_WIPHY) {
     for (const kernel::Channel& channel : kernel::g_channels) messages.push_back(kernel::PartOfRadio(channel));

@@ -32,6 +32,9 @@ struct Interface {
   unsigned megahertz;  // of its channel; 0 for none
   char szName[33];
   int stations;
+  int signal = 0;           // of the access point that it is joined to; 0 while it is joined to none
+  unsigned rate = 0;        // in tenths of a megabit
+  unsigned secondsAgo = 0;  // when it was joined
 };
 
 // wlan0 and the guests'. Processes of the program's own see them too, and change them for all.
@@ -51,6 +54,9 @@ void Reset();
 // wlan0 is a client's, or an access point's on the air.
 void BecomeClient();
 void BecomeAccessPoint(std::string_view name, unsigned megahertz = 2437);
+
+// wlan0 is a client's that has been joined to kHome for an hour.
+void BecomeJoined();
 
 // wlan0 is an access point's on the air, too, once there is a file at this path: a script can make one.
 void AppearWith(const char* szPath, std::string_view name);

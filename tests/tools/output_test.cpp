@@ -206,35 +206,45 @@ TEST_F(Output, ThatCannotBeWrittenIsAFailure) {
 TEST_F(Output, OfTheStatusNamesWhatThereIs) {
   library::Connected("Home");
   EXPECT_EQ(Tool({"status"}).out,
-            "status     connected\n"
-            "network    Home\n"
-            "security   WPA2\n"
-            "standard   11b/g/n\n"
-            "interface  wlan0\n"
-            "address    -\n"
-            "netmask    -\n"
-            "radio      on\n");
+            "status        connected\n"
+            "network       Home\n"
+            "security      WPA2\n"
+            "standard      11b/g/n\n"
+            "interface     wlan0\n"
+            "address       -\n"
+            "netmask       -\n"
+            "radio         on\n"
+            "access point  -\n"
+            "signal        -\n"
+            "channel       -\n"
+            "rate          -\n"
+            "gateway       -\n"
+            "name servers  -\n"
+            "since         -\n");
   EXPECT_EQ(Tool({"status", "--json"}).out,
             R"({"result":"ok","status":{"state":"connected","name":"Home","auth":"WPA2PSK","standard":"11b/g/n",)"
-            R"("mode":"MANAGED","interface":"wlan0","ip":null,"mask":null,"radio":"on","name_hex":null}})"
+            R"("mode":"MANAGED","interface":"wlan0","ip":null,"mask":null,"radio":"on","name_hex":null,)"
+            R"("access_point":null,"signal_dbm":null,"channel":null,"rate_kbps":null,"gateway":null,)"
+            R"("name_servers":null,"since":null}})"
             "\n");
-  EXPECT_EQ(Tool({"status", "--porcelain"}).out, "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\n");
+  EXPECT_EQ(Tool({"status", "--porcelain"}).out,
+            "connected\tHome\tWPA2PSK\t11b/g/n\tMANAGED\twlan0\t\t\ton\t\t\t\t\t\t\t\t\n");
 }
 
 TEST_F(Output, OfTheStatusLeavesOutAStandardThatNoScanHasTold) {
   library::Connected("Home");
   library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST, PWIRELESS_INFO) { return 0; };
-  EXPECT_THAT(Tool({"status"}).out, HasSubstr("\nstandard   -\n"));
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("\nstandard      -\n"));
   EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("standard":"unknown")"));
 }
 
 TEST_F(Output, OfTheStatusTellsAnAccessPoint) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_UNKNOWN; };
-  EXPECT_THAT(Tool({"status"}).out, HasSubstr("status     unknown\n"));
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("status        unknown\n"));
   kernel::BecomeAccessPoint("Office");
-  EXPECT_THAT(Tool({"status"}).out, HasSubstr("status     an access point (see `merowireless ap status`)\n"));
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("status        an access point (see `merowireless ap status`)\n"));
   EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("state":"access-point","name":null)"));
-  EXPECT_EQ(Tool({"status", "--porcelain"}).out, "access-point\t\t\t\t\twlan0\t\t\ton\t\n");
+  EXPECT_EQ(Tool({"status", "--porcelain"}).out, "access-point\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\n");
 }
 
 TEST_F(Output, OfAFailureIsASentenceAndInJsonADocumentToo) {

@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <memory>
 
+#include "base/clock.h"
 #include "model/ap_state.h"
 #include "model/security.h"
 #include "platform.h"
@@ -64,6 +65,42 @@ Shown ShowStandard(const Status& status, bool) {
   return {MEROWirelessProtocolStringGet(status.protocol)};
 }
 
+// ---- The link ----
+
+std::string RateText(int kilobits) {
+  const std::string tenths = std::to_string(kilobits % 1000 / 100);
+  return std::to_string(kilobits / 1000) + (tenths == "0" ? "" : "." + tenths) + " Mbit/s";
+}
+
+template <auto Link::*member>
+Value OfLink(const Status& status) {
+  const auto& held = status.link.*member;
+  if constexpr (requires { held.empty(); })
+    return held.empty() ? nullptr : Value(held);
+  else
+    return held ? Value(std::int64_t{*held}) : nullptr;
+}
+
+Shown ShowSignal(const Status& status, bool) {
+  const auto signal = status.link.signal;
+  if (!signal) return {"-", Tone::kFaint};
+  return {std::to_string(*signal) + " dBm", *signal >= -70 ? Tone::kGood : *signal >= -85 ? Tone::kFair : Tone::kBad};
+}
+
+Shown ShowRate(const Status& status, bool) {
+  return status.link.rate ? Shown{RateText(*status.link.rate)} : Shown{"-", Tone::kFaint};
+}
+
+Value SinceOf(const Status& status) {
+  return status.link.since ? Value(UtcText(*status.link.since)) : nullptr;
+}
+
+Shown ShowSince(const Status& status, bool) {
+  return status.link.since ? Shown{LocalText(*status.link.since, "%F %T")} : Shown{"-", Tone::kFaint};
+}
+
+// ---- All of it ----
+
 constexpr Field<Status> kStatusFields[] = {
     {"state", "status", [](const Status& of) { return Value(StateOf(of).szKey); }, Layout::kLeft,
      [](const Status& of, bool) {
@@ -79,6 +116,13 @@ constexpr Field<Status> kStatusFields[] = {
     {"mask", "netmask", [](const Status& of) { return of.mask.empty() ? nullptr : Value(of.mask); }},
     {"radio", "radio", [](const Status& of) { return Value(RadioText(of)); }},
     {"name_hex", "", [](const Status& of) { return IsUtf8(of.name) ? Value(nullptr) : Value(Hex(of.name)); }},
+    {"access_point", "access point", OfLink<&Link::accessPoint>},
+    {"signal_dbm", "signal", OfLink<&Link::signal>, Layout::kLeft, ShowSignal},
+    {"channel", "channel", OfLink<&Link::channel>},
+    {"rate_kbps", "rate", OfLink<&Link::rate>, Layout::kLeft, ShowRate},
+    {"gateway", "gateway", OfLink<&Link::gateway>},
+    {"name_servers", "name servers", OfLink<&Link::nameServers>},
+    {"since", "since", SinceOf, Layout::kLeft, ShowSince},
 };
 
 std::string DottedText(const sockaddr* address) {
@@ -119,6 +163,8 @@ Status ReadStatus() {
   status.isAccessPoint = !status.isConnected() && IsAccessPoints();
   if (!status.isConnected()) return status;
 
+  const bool isCell = status.state == WIRELESS_STATUS_CONNECTED_ADHOC;
+  status.link = LinkOf(status.interface, isCell ? LinkTo::kCell : LinkTo::kAccessPoint);
   WIRELESS_INFO info{};
   if (MEROWirelessCurInfoGet(REQUEST_ESSID, &info) == 0) status.name = info.szEssid;
   Ask(REQUEST_AUTH, &WIRELESS_INFO::auth, status.auth);

@@ -5,6 +5,7 @@
 #include <span>
 #include <string>
 
+#include "model/link.h"
 #include "show/output.h"
 #include "wireless.h"
 
@@ -19,6 +20,7 @@ struct Status {
   std::string mask;
   int radio = -1;
   bool isAccessPoint = false;
+  Link link;
 
   bool operator==(const Status&) const = default;
   bool isConnected() const {

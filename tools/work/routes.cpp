@@ -1,6 +1,7 @@
 // The IPv4 routes that somebody has given an interface. The kernel drops them when the interface goes down.
 #include "work/routes.h"
 
+#include <arpa/inet.h>
 #include <linux/rtnetlink.h>
 #include <net/if.h>
 #include <sys/socket.h>
@@ -9,6 +10,7 @@
 #include <cerrno>
 #include <cstring>
 #include <functional>
+#include <optional>
 
 #include "base/require.h"
 #include "common/descriptor.h"
@@ -52,17 +54,45 @@ std::string AllRoutes() {
   return {reinterpret_cast<const char*>(&request), sizeof request};
 }
 
-// Whether a route is one that somebody has given an interface.
-bool IsGiven(const nlmsghdr& message, int interface) {
-  auto* route = static_cast<rtmsg*>(NLMSG_DATA(const_cast<nlmsghdr*>(&message)));
-  if (message.nlmsg_type != RTM_NEWROUTE || route->rtm_protocol == RTPROT_KERNEL) return false;
+// Calls `visit(attribute)` for each attribute of a route.
+void ForEachOf(const nlmsghdr& message, const std::function<void(const rtattr&)>& visit) {
   auto left = static_cast<unsigned int>(RTM_PAYLOAD(&message));
-  for (auto* value = RTM_RTA(route); RTA_OK(value, left); value = RTA_NEXT(value, left)) {
-    int through = 0;
-    std::memcpy(&through, RTA_DATA(value), std::min(sizeof through, RTA_PAYLOAD(value)));
-    if (value->rta_type == RTA_OIF) return through == interface;
-  }
-  return false;
+  auto* value = RTM_RTA(static_cast<rtmsg*>(NLMSG_DATA(const_cast<nlmsghdr*>(&message))));
+  for (; RTA_OK(value, left); value = RTA_NEXT(value, left)) visit(*value);
+}
+
+std::uint32_t NumberIn(const rtattr& attribute) {
+  std::uint32_t number = 0;
+  std::memcpy(&number, RTA_DATA(&attribute), std::min(sizeof number, RTA_PAYLOAD(&attribute)));
+  return number;
+}
+
+const rtmsg& RouteIn(const nlmsghdr& message) {
+  return *static_cast<const rtmsg*>(NLMSG_DATA(const_cast<nlmsghdr*>(&message)));
+}
+
+// Whether a route is one that somebody has given an interface.
+bool IsGiven(const nlmsghdr& message, unsigned interface) {
+  if (message.nlmsg_type != RTM_NEWROUTE || RouteIn(message).rtm_protocol == RTPROT_KERNEL) return false;
+  unsigned through = 0;
+  ForEachOf(message, [&](const rtattr& attribute) {
+    if (attribute.rta_type == RTA_OIF) through = NumberIn(attribute);
+  });
+  return through == interface;
+}
+
+struct WayOut {
+  in_addr gateway{};
+  std::uint32_t metric = 0;  // the kernel does not tell 0
+};
+
+WayOut WayOutOf(const nlmsghdr& message) {
+  WayOut way;
+  ForEachOf(message, [&](const rtattr& attribute) {
+    if (attribute.rta_type == RTA_GATEWAY) way.gateway.s_addr = NumberIn(attribute);
+    if (attribute.rta_type == RTA_PRIORITY) way.metric = NumberIn(attribute);
+  });
+  return way;
 }
 
 // The message that adds a route which the kernel has told of.
@@ -79,7 +109,7 @@ std::string Addition(const nlmsghdr& told) {
 
 Routes Routes::Of(const std::string& interface) {
   Routes routes;
-  const auto index = static_cast<int>(::if_nametoindex(interface.c_str()));
+  const unsigned index = ::if_nametoindex(interface.c_str());
   (void)Routing().Ask(AllRoutes(), [&](const nlmsghdr& told) {
     if (index != 0 && IsGiven(told, index)) routes.messages_.push_back(Addition(told));
   });
@@ -94,4 +124,17 @@ bool Routes::PutBack() const {
     all = all && (error == 0 || error == EEXIST);
   }
   return all;
+}
+
+std::string GatewayOf(const std::string& interface) {
+  const unsigned index = ::if_nametoindex(interface.c_str());
+  std::optional<WayOut> first;
+  (void)Routing().Ask(AllRoutes(), [&](const nlmsghdr& told) {
+    if (index == 0 || !IsGiven(told, index) || RouteIn(told).rtm_dst_len != 0) return;
+    const WayOut way = WayOutOf(told);
+    if (way.gateway.s_addr != 0 && (!first || way.metric < first->metric)) first = way;
+  });
+  char szGateway[INET_ADDRSTRLEN] = "";
+  if (first) ::inet_ntop(AF_INET, &first->gateway, szGateway, sizeof szGateway);
+  return szGateway;
 }

@@ -19,4 +19,7 @@ class Routes {
   std::vector<std::string> messages_;  // as the kernel tells of them, and takes them
 };
 
+// The gateway of an interface's default route, of the one that counts first where it has several; empty without one.
+std::string GatewayOf(const std::string& interface);
+
 #endif  // MERO_TOOLS_ROUTES_H

@@ -1,0 +1,100 @@
+// What the connection runs over at this moment.
+#include "model/link.h"
+
+#include <netlink/genl/genl.h>
+
+#include <cstdint>
+#include <cstring>
+
+#include "base/failure.h"
+#include "base/text.h"
+#include "model/air.h"
+#include "model/name_servers.h"
+#include "model/wireless_stack.h"
+#include "work/radio.h"
+#include "work/routes.h"
+
+namespace {
+
+// The attributes within another, by their kind; none where there is no such.
+template <int kLast>
+struct Nest {
+  explicit Nest(const nlattr* outer) {
+    if (outer != nullptr) (void)nla_parse_nested(parts, kLast, const_cast<nlattr*>(outer), nullptr);
+  }
+
+  // As a number of so many bits; nothing when it is missing or shorter.
+  template <class Number>
+  std::optional<Number> As(int kind) const {
+    Number number;
+    if (parts[kind] == nullptr || nla_len(parts[kind]) < static_cast<int>(sizeof number)) return std::nullopt;
+    std::memcpy(&number, nla_data(parts[kind]), sizeof number);
+    return number;
+  }
+
+  nlattr* parts[kLast + 1] = {};
+};
+
+// The kernel tells it in tenths of a megabit, and in 16 bits where it is an older one.
+std::optional<int> RateOf(const nlattr* description) {
+  constexpr int kTenth = 100;
+  const Nest<NL80211_RATE_INFO_MAX> rate(description);
+  if (const auto all = rate.As<std::uint32_t>(NL80211_RATE_INFO_BITRATE32)) return static_cast<int>(*all) * kTenth;
+  if (const auto low = rate.As<std::uint16_t>(NL80211_RATE_INFO_BITRATE)) return *low * kTenth;
+  return std::nullopt;
+}
+
+void SetAccessPoint(Link& link, const void* octets) {
+  unsigned char address[6];
+  std::memcpy(address, octets, sizeof address);
+  link.accessPoint = AddressText(address);
+}
+
+void AddStation(Link& link, std::string& message) {
+  auto* header = reinterpret_cast<nlmsghdr*>(message.data());
+  if (!genlmsg_valid_hdr(header, 0)) return;
+  const auto* general = static_cast<const genlmsghdr*>(nlmsg_data(header));
+  const auto attribute = [&](int kind) {
+    return nla_find(genlmsg_attrdata(general, 0), genlmsg_attrlen(general, 0), kind);
+  };
+  const nlattr* address = attribute(NL80211_ATTR_MAC);
+  if (address != nullptr && nla_len(address) == sizeof(Address)) SetAccessPoint(link, nla_data(address));
+  const Nest<NL80211_STA_INFO_MAX> station(attribute(NL80211_ATTR_STA_INFO));
+  link.signal = station.As<std::int8_t>(NL80211_STA_INFO_SIGNAL);
+  link.rate = RateOf(station.parts[NL80211_STA_INFO_TX_BITRATE]);
+  if (const auto seconds = station.As<std::uint32_t>(NL80211_STA_INFO_CONNECTED_TIME)) {
+    link.since = std::time(nullptr) - static_cast<std::time_t>(*seconds);
+  }
+}
+
+// To a client, its access point is the one station that there is; a cell has as many as there are others in it.
+void AddAir(Link& link, const std::string& interface, LinkTo to) {
+  const auto air = AirOf(interface);
+  if (air && air->channel != 0) link.channel = air->channel;
+  if (to == LinkTo::kCell) return;
+  auto stations = AskWirelessStack(NL80211_CMD_GET_STATION, interface, true);
+  if (!stations.empty()) AddStation(link, stations.front());
+}
+
+void AddNameServers(Link& link, const std::string& interface) {
+  for (const std::string& server : NameServersOf(interface)) {
+    link.nameServers.append(link.nameServers.empty() ? "" : " ").append(server);
+  }
+}
+
+}  // namespace
+
+Link LinkOf(const std::string& interface, LinkTo to) {
+  Link link;
+  try {
+    AddAir(link, interface, to);
+  } catch (const Failure&) {
+    // An adapter may be pulled while it is asked: that stays unknown, and the rest is told all the same.
+  }
+  if (link.accessPoint.empty()) {
+    if (const auto address = AccessPointOf(interface)) SetAccessPoint(link, address->data());
+  }
+  link.gateway = GatewayOf(interface);
+  AddNameServers(link, interface);
+  return link;
+}
