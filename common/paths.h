@@ -78,6 +78,9 @@ inline constexpr char kHostapdControlDirectory[] = "/var/run/hostapd";
 inline constexpr char kGuestInterface[] = "gwlan";
 inline constexpr char kGuestBridge[] = "gbr";
 
+// What the rules that are in force let guests reach, by the keys of the settings; there while guests are on the air.
+inline constexpr char kGuestRightsPath[] = "/var/run/rc.network/guest-rights";
+
 // The bridge that translates addresses, which an access point is in when its settings say nothing else.
 inline constexpr char kNatBridge[] = "lbr0";
 

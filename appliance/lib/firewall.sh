@@ -4,6 +4,7 @@
 
 forwarding=/proc/sys/net/ipv4/ip_forward
 forwarding_before=$state/ip_forward
+guest_rights=$state/guest-rights
 
 # The forwarding switch is noted before anything else is done: while the note exists, there may be rules to remove.
 set_firewall() { # BRIDGE
@@ -12,6 +13,7 @@ set_firewall() { # BRIDGE
 		return
 	fi
 	text=$(rules "$1") || exit 1
+	rights=$(rights_of_guests) || exit 1
 	first=''
 	if [ ! -e "$forwarding_before" ]; then
 		first=yes
@@ -21,6 +23,7 @@ set_firewall() { # BRIDGE
 		[ -z "$first" ] || rm -f "$forwarding_before" # none stand
 		fail "cannot set the rules between networks: $said"
 	}
+	note_guest_rights "$rights"
 	echo 1 >"$forwarding" || fail 'cannot pass traffic on between networks'
 }
 
@@ -31,7 +34,27 @@ clear_firewall() {
 	read -r before <"$forwarding_before" || cannot_read "$forwarding_before"
 	echo "$before" >"$forwarding" || fail 'cannot stop passing traffic on between networks'
 	said=$(set_rules '') || fail "cannot remove the rules between networks: $said"
-	remove_files "$forwarding_before"
+	remove_files "$guest_rights" "$guest_rights".* "$forwarding_before"
+}
+
+# rights_of_guests: prints what the settings let guests reach, or keep them from; nothing for a start without guests.
+rights_of_guests() {
+	[ -n "$guests" ] || return 0
+	for key in guest_net_lan_block guest_net_access_ds guest_net_internet_block guest_net_allow_http; do
+		if is_on "$key"; then echo "$key=yes"; else echo "$key=no"; fi
+	done
+}
+
+# note_guest_rights TEXT: notes what the rules were made of, so that others can tell whether the settings say the same
+# still. Without guests there is no note.
+note_guest_rights() {
+	if [ -z "$1" ]; then
+		remove_files "$guest_rights"
+		return
+	fi
+	put "$guest_rights" <<-END
+		$1
+	END
 }
 
 # set_rules TEXT: replaces all rules by the text's in one step, and prints what nft says. The table is added first,

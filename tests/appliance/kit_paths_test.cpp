@@ -36,6 +36,7 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
       {"printf '%s' \"$adapter_info\"", kAdapterInfoPath},
       {"printf '%s' \"$guest_interface\"", kGuestInterface},
       {"printf '%s' \"$guest_bridge\"", kGuestBridge},
+      {"printf '%s' \"$guest_rights\"", kGuestRightsPath},
       {"printf '%s' \"$control\"", kHostapdControlDirectory},
       {"printf '%s' \"$scripts\"", kInterfaceScriptDirectory},
       {"hostapd_pid if0", PathOf(kHostapdPidFormat)},

@@ -87,6 +87,7 @@ fi
     return Daemons() +
            RunInShell(
                "ls -d /sys/class/net/*br0 /sys/class/net/gbr /run/rc.network/hostapd-* /run/rc.network/ip_forward "
+               "/run/rc.network/guest-rights* "
                "/run/rc.network/bridge-* 2>/dev/null; ip -brief -4 address show dev wlan0 | awk '$3 { print $3 }'; "
                "cat /proc/sys/net/ipv4/ip_forward | grep -v 0; ip -brief link show up dev wlan0 | grep -o wlan0; "
                "[ ! -s /tmp/rules ] || grep '^table' /tmp/rules | grep -o 'mero_ap {'")

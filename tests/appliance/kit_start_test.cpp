@@ -212,6 +212,25 @@ TEST_F(KitAccessPoint, AsksOnceWhetherThereAreGuests) {
   EXPECT_EQ(Left(), "");
 }
 
+TEST_F(KitAccessPoint, NotesWhatItsGuestsMayReachAsLongAsThereAreAny) {
+  const std::string note = "/run/rc.network/guest-rights";
+  const std::string settings = "[RT [5370]\n\tguest_net_lan_block=0\n\tguest_net_access_ds=1\n";
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  WriteText("/usr/mero/etc/wireless_ap.conf", settings);
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(ReadText(note),
+            "guest_net_lan_block=no\nguest_net_access_ds=yes\nguest_net_internet_block=no\nguest_net_allow_http=yes\n");
+  WriteText("/usr/mero/etc/wireless_ap.conf", settings + "\tguest_net_internet_block=1\n");
+  EXPECT_THAT(ReadText(note), HasSubstr("guest_net_internet_block=no\n")) << "the rules are the former ones still";
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_THAT(ReadText(note), HasSubstr("guest_net_internet_block=yes\n"));
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"no\"\n");
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_FALSE(fs::exists(note));
+  EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
+}
+
 // The access point was off from the hour on in which its start for the guests had failed.
 TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");

@@ -644,6 +644,22 @@ TEST_F(AccessPoint, IsNotBeingSetUpByAProcessThatIsGone) {
   EXPECT_EQ(StatusLine(), "off");
 }
 
+// What guests may reach was not compared: guests could still get at the appliance, and nothing waited.
+void ExpectGuestRightsCompared() {
+  constexpr char kRights[] = "/var/run/rc.network/guest-rights";
+  const std::string rights =
+      "guest_net_lan_block=yes\nguest_net_access_ds=no\nguest_net_internet_block=no\nguest_net_allow_http=no\n";
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":false})")) << "no guests are on the air";
+  WriteText(kRights, rights);
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":false})"));
+  for (const char* szKey : {"lan_block", "access_ds", "internet_block", "allow_http"}) {
+    Shell(std::string("sed -i '/") + szKey + "=/{s/yes/-/;s/no/yes/;s/-/no/}' " + kRights);
+    EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})")) << szKey;
+    WriteText(kRights, rights);
+  }
+  std::filesystem::remove(kRights);
+}
+
 TEST_F(AccessPoint, TellsWhetherWhatWasSavedIsOnTheAir) {
   const std::string host = "/etc/hostapd/hostapd-wlan0-host.conf";
   kernel::BecomeAccessPoint("Office");
@@ -668,6 +684,8 @@ TEST_F(AccessPoint, TellsWhetherWhatWasSavedIsOnTheAir) {
   conf.hostapConf.guestNet.blEnable = TRUE;
   library::SavedAp(conf);
   EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})")) << "guests, who are not on the air";
+  library::SavedAp(library::Office());
+  ExpectGuestRightsCompared();
 }
 
 TEST_F(AccessPoint, NeedsAnAdapterThatHasBeenAnnounced) {

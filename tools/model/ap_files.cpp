@@ -1,6 +1,8 @@
 // The files that the access-point daemon is started from.
 #include "model/ap_files.h"
 
+#include <algorithm>
+
 #include "base/whole_file.h"
 #include "common/hostapd_lines.h"
 #include "common/paths.h"
@@ -40,6 +42,28 @@ bool HasOtherGuests(const std::string& interface, const MERO_HOSTAP_GUEST_NET& g
   return TextOfFile(PathOf(kHostapdGuestFormat, interface)) != lines.text();
 }
 
+struct GuestRight {
+  const char* szKey;
+  BOOL MERO_AP_ACCESS_RULE::*value;
+};
+
+constexpr GuestRight kGuestRights[] = {
+    {"guest_net_lan_block", &MERO_AP_ACCESS_RULE::blLanBlock},
+    {"guest_net_access_ds", &MERO_AP_ACCESS_RULE::blAccessDS},
+    {"guest_net_internet_block", &MERO_AP_ACCESS_RULE::blInternetBlock},
+    {"guest_net_allow_http", &MERO_AP_ACCESS_RULE::blAllowHttp},
+};
+
+// By the note of the network start script, which stands while guests are on the air: at other hours no rules are in
+// force, and the settings of the next hour will be.
+bool HaveOtherGuestRights(const MERO_AP_ACCESS_RULE& rule) {
+  if (PLIBCFileExist(kGuestRightsPath) == 0) return false;
+  return std::ranges::any_of(kGuestRights, [&](const GuestRight& right) {
+    const char* szValue = rule.*right.value != FALSE ? "yes" : "no";
+    return PLIBCFileCheckKeyValue(kGuestRightsPath, right.szKey, szValue, 0) == 0;
+  });
+}
+
 }  // namespace
 
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf) {
@@ -47,7 +71,8 @@ std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& c
   if (!given) return std::nullopt;
   Lines lines;
   hostapd::WriteMain(lines, interface.c_str(), conf.hostapConf);
-  return *given != lines.text() || HasOtherGuests(interface, conf.hostapConf.guestNet);
+  return *given != lines.text() || HasOtherGuests(interface, conf.hostapConf.guestNet) ||
+         HaveOtherGuestRights(conf.guestNetAccessRule);
 }
 
 ApSwitch ApSwitchOf(const std::string& interface) {

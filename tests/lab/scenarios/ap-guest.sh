@@ -104,6 +104,14 @@ expect_unreachable guest 203.0.113.1
 expect_reads guest 8080
 leaves guest
 
+say '-- what they may reach is told to wait until it is so'
+waits() { inside nas merowireless ap status --porcelain | cut -f 10; }
+expect_same 'whether settings wait' no "$(waits)"
+on nas merowireless ap set --guest-net-internet-block no
+expect_same 'whether settings wait' yes "$(waits)"
+on nas merowireless ap enable
+expect_same 'whether settings wait' no "$(waits)"
+
 say '-- without it'
 serves nas guest_net_enable=0
 fails_on nas test -e /sys/class/net/gwlan
