@@ -178,6 +178,16 @@ TEST_F(RadioSwitch, IsShownWithTheKernelsBlock) {
             "\n");
 }
 
+// The status told the switch in the settings alone.
+TEST_F(RadioSwitch, IsTheSameInTheStatus) {
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("\nradio         on\n"));
+  WriteText(std::string(kSwitch) + "soft", "1");
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("\nradio         off\n"));
+  WriteText(std::string(kSwitch) + "soft", "0");
+  WriteText("/tmp/unblock", "no");
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("\nradio         off\n"));
+}
+
 // The connection stayed, and only the next one was refused.
 TEST_F(RadioSwitch, EndsTheConnectionAndBringsItBack) {
   Connect();

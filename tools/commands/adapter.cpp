@@ -11,6 +11,7 @@
 #include "model/ap_status.h"
 #include "model/kernel_switch.h"
 #include "model/library.h"
+#include "model/radio_state.h"
 #include "model/radio_use.h"
 #include "model/situation.h"
 #include "model/status.h"
@@ -19,20 +20,8 @@ namespace {
 
 // ---- The radio ----
 
-struct Radio {
-  int answer;
-  std::string model;
-  KernelBlock block;
-
-  bool isOff() const { return answer == 0 || block == KernelBlock::kSet || block == KernelBlock::kOfHardware; }
-};
-
-const char* TextOf(const Radio& radio) {
-  return radio.isOff() ? "off" : radio.answer == 1 ? "on" : "unknown";
-}
-
-Value BlockOf(const Radio& radio) {
-  switch (radio.block) {
+Value BlockOf(KernelBlock block) {
+  switch (block) {
     case KernelBlock::kUnknown:
       return nullptr;
     case KernelBlock::kNone:
@@ -45,8 +34,8 @@ Value BlockOf(const Radio& radio) {
   return nullptr;
 }
 
-Shown ShowBlock(const Radio& radio, bool) {
-  switch (radio.block) {
+Shown ShowBlock(KernelBlock block) {
+  switch (block) {
     case KernelBlock::kUnknown:
       return {"-", Tone::kFaint};
     case KernelBlock::kNone:
@@ -60,17 +49,18 @@ Shown ShowBlock(const Radio& radio, bool) {
 }
 
 constexpr Field<Radio> kRadioFields[] = {
-    {"radio", "radio", [](const Radio& of) { return Value(TextOf(of)); }, Layout::kLeft,
+    {"radio", "radio", [](const Radio& of) { return Value(WordOf(of.state)); }, Layout::kLeft,
      [](const Radio& of, bool) {
-       return Shown{TextOf(of), of.isOff() || of.answer != 1 ? Tone::kBad : Tone::kGood};
+       return Shown{WordOf(of.state), of.state == RadioState::kOn ? Tone::kGood : Tone::kBad};
      }},
-    {"adapter", "adapter", [](const Radio& of) { return of.model.empty() ? nullptr : Value(of.model); }},
-    {"kernel_block", "kernel's block", BlockOf, Layout::kLeft, ShowBlock},
+    {"adapter", "adapter",
+     [](const Radio&) {
+       const std::string model = AdapterModelOrNone();
+       return model.empty() ? nullptr : Value(model);
+     }},
+    {"kernel_block", "kernel's block", [](const Radio& of) { return BlockOf(of.block); }, Layout::kLeft,
+     [](const Radio& of, bool) { return ShowBlock(of.block); }},
 };
-
-Radio ReadRadio() {
-  return {MEROWirelessCheckBlock(), AdapterModelOrNone(), KernelBlockOf(MEROWirelessAPInterfaceGet())};
-}
 
 // ---- The mode ----
 

@@ -36,7 +36,8 @@ Situation SituationOf(const Status& status) {
   if (MEROWirelessAdapterNum() <= 0) return Situation::kNoAdapter;
   if (IsForAccessPoint()) return Situation::kAccessPoint;
   if (IsLetIn(status)) return Situation::kConnected;
-  if (status.radio != 1) return status.radio == 0 ? Situation::kRadioOff : Situation::kUnannounced;
+  if (status.radio == RadioState::kOff) return Situation::kRadioOff;
+  if (status.radio == RadioState::kUnknown) return Situation::kUnannounced;
   const bool isFree =
       status.isConnected() || status.state == WIRELESS_STATUS_DOWN || status.state == WIRELESS_STATUS_DISCONNECTED;
   return isFree ? Situation::kFree : Situation::kUntold;

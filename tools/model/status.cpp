@@ -42,10 +42,6 @@ const State& StateOf(const Status& status) {
   return found != std::end(kStates) ? *found : kStates[0];
 }
 
-const char* RadioText(const Status& status) {
-  return status.radio == 1 ? "on" : status.radio == 0 ? "off" : "unknown";
-}
-
 Value AuthOf(const Status& status) {
   return status.isConnected() ? Value(MEROWirelessAuthStringGet(status.auth)) : nullptr;
 }
@@ -114,7 +110,7 @@ constexpr Field<Status> kStatusFields[] = {
     {"interface", "interface", [](const Status& of) { return Value(of.interface); }},
     {"ip", "address", [](const Status& of) { return of.ip.empty() ? nullptr : Value(of.ip); }},
     {"mask", "netmask", [](const Status& of) { return of.mask.empty() ? nullptr : Value(of.mask); }},
-    {"radio", "radio", [](const Status& of) { return Value(RadioText(of)); }},
+    {"radio", "radio", [](const Status& of) { return Value(WordOf(of.radio)); }},
     {"name_hex", "", [](const Status& of) { return IsUtf8(of.name) ? Value(nullptr) : Value(Hex(of.name)); }},
     {"access_point", "access point", OfLink<&Link::accessPoint>},
     {"signal_dbm", "signal", OfLink<&Link::signal>, Layout::kLeft, ShowSignal},
@@ -158,7 +154,7 @@ Status ReadStatus() {
   Status status;
   status.state = MEROWirelessConnStatusGet();
   status.interface = MEROWirelessInterfaceGet();
-  status.radio = MEROWirelessCheckBlock();
+  status.radio = ReadRadio().state;
   ReadAddress(status);
   status.isAccessPoint = !status.isConnected() && IsAccessPoints();
   if (!status.isConnected()) return status;

@@ -6,6 +6,7 @@
 #include <string>
 
 #include "model/link.h"
+#include "model/radio_state.h"
 #include "show/output.h"
 #include "wireless.h"
 
@@ -18,7 +19,7 @@ struct Status {
   WIRELESS_OPMODE mode = WIRELESS_OPMODE_UNKNOWN;
   std::string ip;  // also without a connection
   std::string mask;
-  int radio = -1;
+  RadioState radio = RadioState::kUnknown;
   bool isAccessPoint = false;
   Link link;
 
