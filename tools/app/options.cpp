@@ -165,6 +165,8 @@ void DescribeJoining(CLI::App& command, NetworkToJoin& values) {
   command.add_flag("--any-ap", values.anyAccessPoint, "with ADDRESS: through any other of the name, too");
   command.add_flag("--no-address", values.noAddress, "only join; leave the addresses alone");
   command.add_flag("--changed", values.isChanged, "though it is not protected any more as it was saved");
+  command.add_flag("--no-save", values.noSave, "save nothing, though the network was joined");
+  command.add_option("--wait", values.wait, "wait up to N seconds for the network, or the adapter")->option_text("N");
 }
 
 struct AutoJoining {

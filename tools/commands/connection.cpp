@@ -6,6 +6,7 @@
 #include <thread>
 #include <vector>
 
+#include "base/choices.h"
 #include "common/paths.h"
 #include "model/access_points.h"
 #include "model/addressing.h"
@@ -14,7 +15,9 @@
 #include "model/join_failures.h"
 #include "model/join_lock.h"
 #include "model/library.h"
+#include "model/patience.h"
 #include "model/saved_networks.h"
+#include "model/saving.h"
 #include "model/security.h"
 #include "model/situation.h"
 #include "model/status.h"
@@ -124,21 +127,23 @@ Target FromTheAir(const Program& program, const NetworkToJoin& wanted) {
   return {config, true, std::nullopt};
 }
 
-void SetUser(KnownNetwork& config, const std::string& user) {
-  if (NeedsUser(config.network.auth) && user.empty()) {
-    throw Failure(Exit::kUsage, "this network asks who you are", "add --user NAME");
-  }
-  SetText(config.szUser, user, "the user");
+Failure NotInRange(const Program& program, const Target& target) {
+  return {Exit::kOutOfRange,
+          program.output.Name(target.config.network.szEssid) + " is not in range, and nothing was changed",
+          "move closer; `merowireless scan --renew` shows what is"};
 }
 
+// One that hides, or comes into range, is found by the attempt. It is not worth to lose a connection for, and who waits
+// is asked for nothing as long as it is not there.
 Target TargetOf(const Program& program, const NetworkToJoin& wanted) {
   const auto known = SavedAs(wanted.name);
   if (!known.empty() && !wanted.isChanged) RequireJoinable(program, known.front().newest.network);
   Target target = known.empty() ? FromTheAir(program, wanted) : FromWhatIsKnown(program, known, wanted.isChanged);
   KnownNetwork& config = target.config;
   RequireJoinable(program, config.network);
+  if (!target.isInRange && !wanted.wait.empty()) throw NotInRange(program, target);
+  SetText(config.szUser, UserOf(program, config, wanted.user), "the user");
   if (config.szKey[0] == '\0' || wanted.secret.isGiven()) SetSecret(program, config, wanted.secret);
-  SetUser(config, wanted.user);
   if (wanted.anyAccessPoint) config.noneBssid = 1;
   return target;
 }
@@ -151,17 +156,37 @@ void RequireSavedSecret(const Program& program, const KnownNetwork& config) {
                 "`merowireless save` saves the right one");
 }
 
-// One that hides, or comes into range, is found by the attempt. It is not worth to lose a connection for.
-void RequireInRange(const Program& program, const Target& target, const FormerConnection& former) {
-  if (!former.exists() || target.isInRange) return;
-  throw Failure(Exit::kOutOfRange,
-                program.output.Name(target.config.network.szEssid) + " is not in range, and nothing was changed",
-                "move closer; `merowireless scan --renew` shows what is");
+void SayConnected(const Program& program, const char* szMore = "") {
+  const Status status = ReadStatus();
+  program.output.Done(ConnectionText(program.output, status) + szMore, "status", StatusFields(), status);
 }
 
-void SayConnected(const Program& program) {
-  const Status status = ReadStatus();
-  program.output.Done(ConnectionText(program.output, status), "status", StatusFields(), status);
+// The network that is wanted. Whoever is asked for a secret has been told before that the adapter is used otherwise,
+// and keeps nobody else from it with his answer.
+Target ToBeJoined(const Program& program, const NetworkToJoin& wanted) {
+  {
+    const JoinLock lock;
+    RequireFreeAdapter();
+  }
+  Target target = TargetOf(program, wanted);
+  RequireSavedSecret(program, target.config);
+  if (!wanted.noAddress) RequireAddressing(target.config);
+  return target;
+}
+
+void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target& target) {
+  const JoinLock lock;
+  RequireFreeAdapter();
+  const FormerConnection former(program);
+  if (former.exists() && !target.isInRange) throw NotInRange(program, target);
+  Saving saving = Saving::kNothing;
+  former.Try([&] {
+    Join(program, target.config);
+    if (!wanted.noSave) saving = SaveWhatWorked(target.config, wanted.name == target.config.network.szEssid);
+    if (!wanted.noAddress) ApplyAddressing(program, target.config);
+  });
+  if (saving == Saving::kFailed) throw JoinedAndNotSaved(program.output.Name(target.config.network.szEssid));
+  SayConnected(program, saving == Saving::kDone ? ", and saved" : "");
 }
 
 // The library does not notice when the driver refuses the cell.
@@ -174,19 +199,13 @@ bool IsInCell(const std::string& name) {
 }  // namespace
 
 void Connect(const Program& program, const NetworkToJoin& wanted) {
-  const JoinLock lock;
-  RequireFreeAdapter();
-  const Target target = TargetOf(program, wanted);
-  RequireSavedSecret(program, target.config);
-  if (!wanted.noAddress) RequireAddressing(target.config);
-  const FormerConnection former(program);
-  RequireInRange(program, target, former);
-  former.Try([&] {
-    Join(program, target.config);
-    if (!wanted.noAddress) ApplyAddressing(program, target.config);
+  constexpr int kDay = 86400;
+  const std::chrono::seconds patience(wanted.wait.empty() ? 0 : NumberOf(wanted.wait, 1, kDay, "wait"));
+  std::optional<Target> target;
+  Patiently(program, program.output.Name(wanted.name), patience, [&] {
+    if (!target) target = ToBeJoined(program, wanted);
+    ConnectTo(program, wanted, *target);
   });
-  if (target.changed) (void)SaveNetwork(target.config, !target.changed->isOneAccessPoint);
-  SayConnected(program);
 }
 
 void JoinAgain(const Program& program, const std::string& name) {

@@ -15,6 +15,8 @@ struct NetworkToJoin {
   bool anyAccessPoint = false;
   bool noAddress = false;
   bool isChanged = false;  // the protection on the air is accepted, whatever was saved
+  bool noSave = false;
+  std::string wait;  // so many seconds at most; empty for not at all
 };
 
 struct CellToMake {

@@ -105,7 +105,7 @@ std::vector<Network> LookFor(const Program& program, const std::string& name,
   auto last = AccessPointsOf(RunBytes(task, [] { return Scanned(WIRELESS_SCAN_LAST); }));
   if (std::ranges::any_of(last, isWanted)) return last;
   return AccessPointsOf(RunBytes(task, [&] {
-    const bool called = CallNetwork(MEROWirelessInterfaceGet(), name);
+    const bool called = !ParseAddress(name) && CallNetwork(MEROWirelessInterfaceGet(), name);
     return Scanned(called ? WIRELESS_SCAN_LAST : WIRELESS_SCAN_RENEW);
   }));
 }

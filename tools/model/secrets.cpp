@@ -92,17 +92,23 @@ std::string ReadLine(int terminal) {
   return {line, static_cast<std::size_t>(size)};
 }
 
-std::string Prompt(int terminal, const std::string& prompt) {
+std::string Prompt(int terminal, const std::string& prompt, bool isSecret) {
   const Signals signals({SIGCONT});
   const Silence silence(terminal);
   // When the program is stopped, the shell makes the terminal show again what is typed, so each round begins anew.
   do {
-    silence.Begin();
+    if (isSecret) silence.Begin();
     Say(terminal, prompt + ": ");
   } while (!WaitForInput(terminal, signals));
   std::string line = ReadLine(terminal);
-  Say(terminal, "\n");
+  if (isSecret) Say(terminal, "\n");
   return Checked(std::move(line), "what was typed");
+}
+
+std::optional<std::string> AskOnTerminal(const std::string& prompt, bool isSecret) {
+  const Descriptor terminal(::open("/dev/tty", O_RDWR | O_CLOEXEC));
+  if (!terminal.valid()) return std::nullopt;
+  return Prompt(terminal.get(), prompt, isSecret);
 }
 
 }  // namespace
@@ -112,9 +118,14 @@ std::optional<std::string> ReadSecret(const SecretSource& source, const std::str
   // A standard input that is a terminal is not read: it would show the secret while it is typed. The prompt does not.
   if (source.standardInput && ::isatty(STDIN_FILENO) == 0)
     return Checked(ReadAll(STDIN_FILENO, "the standard input"), "the standard input");
-  const Descriptor terminal(::open("/dev/tty", O_RDWR | O_CLOEXEC));
-  if (!terminal.valid()) return std::nullopt;
-  return Prompt(terminal.get(), prompt);
+  return AskOnTerminal(prompt, true);
+}
+
+std::string UserOf(const Program& program, const KnownNetwork& config, const std::string& given) {
+  if (!NeedsUser(config.network.auth) || !given.empty()) return given;
+  std::string user = AskOnTerminal("user of " + program.output.Name(config.network.szEssid), false).value_or("");
+  if (user.empty()) throw Failure(Exit::kUsage, "this network asks who you are", "add --user NAME");
+  return user;
 }
 
 void SetSecret(const Program& program, KnownNetwork& config, const SecretSource& source) {

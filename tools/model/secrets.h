@@ -19,6 +19,9 @@ struct SecretSource {
 // secret does not belong to it.
 std::optional<std::string> ReadSecret(const SecretSource& source, const std::string& prompt);
 
+// Who the user of a network is, if it asks for one: the given one, or else the answer to a prompt.
+std::string UserOf(const Program& program, const KnownNetwork& config, const std::string& given);
+
 // Puts a secret into a network that needs one; from a prompt when no source is given.
 void SetSecret(const Program& program, KnownNetwork& config, const SecretSource& source);
 

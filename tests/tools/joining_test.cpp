@@ -1,0 +1,239 @@
+// connect: what it asks for, waits for and saves.
+#include <linux/wireless.h>
+#include <sys/ioctl.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <chrono>
+#include <csignal>
+#include <cstdarg>
+#include <cstring>
+#include <filesystem>
+
+#include "running.h"
+#include "tests/support/ring.h"
+
+using library::Network;
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+
+namespace {
+
+constexpr char kInRange[] = "/tmp/in-range";
+constexpr char kCalled[] = "/tmp/called";
+constexpr char kSecret[] = "/tmp/secret";
+constexpr char kJoinMarker[] = "/var/tmp/.wireless_connecting";
+
+bool g_canCall = false;
+
+class Joining : public ToolTest {
+ protected:
+  Joining() {
+    for (const char* szPath : {kInRange, kCalled, kJoinMarker}) std::filesystem::remove(szPath);
+    WriteText(kSecret, "open sesame\n");
+    library::InRange({Network("cafe")});
+    library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return 0; };
+    library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) { return 0; };
+    library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG* config) {
+      return library::Record(std::string(config->network.szEssid) + "|" + config->szKey + "|" + config->szIp), 0;
+    };
+  }
+
+  // The networks are in range once there is a file at this path.
+  static void ComeIntoRangeWith(const char* szPath) {
+    library::MEROWirelessNetworkScan = [szPath](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
+      if (scan == WIRELESS_SCAN_RENEW) library::Record("MEROWirelessNetworkScan");
+      FillRing(head, Exists(szPath) ? std::vector{Network("cafe"), Network("Home")} : std::vector<WIRELESS_NETWORK>());
+      return 0;
+    };
+  }
+};
+
+// It took two commands, and the network was forgotten when somebody gave the second one alone.
+TEST_F(Joining, SavesWhatWorked) {
+  const Ran ran = Tool({"connect", "cafe", "--key-file", kSecret});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_THAT(ran.out, testing::EndsWith("without an address, and saved\n"));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessConfSet",
+                                            "cafe|open sesame|DHCP", "MEROWirelessIfconfigSet"));
+}
+
+TEST_F(Joining, SavesANetworkThatGivesNoAddressYet) {
+  library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) {
+    return library::Report("wireless_ifcfg_set", "Failed to get IP from DHCP"), 0;
+  };
+  EXPECT_EQ(Tool({"connect", "cafe", "--key-file", kSecret}).status, 7);
+  EXPECT_THAT(library::Calls(), Contains("cafe|open sesame|DHCP"));
+}
+
+TEST_F(Joining, SavesNothingWhereThatIsNotWanted) {
+  const Ran ran = Tool({"connect", "cafe", "--key-file", kSecret, "--no-save"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_THAT(ran.out, Not(HasSubstr("saved")));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessIfconfigSet"));
+}
+
+TEST_F(Joining, SavesNothingThatDidNotWork) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
+  EXPECT_EQ(Tool({"connect", "cafe", "--key-file", kSecret}).status, 9);
+  EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessConfSet")));
+}
+
+TEST_F(Joining, BringsAKnownNetworkUpToDateWhenAnotherSecretWorked) {
+  library::Known({library::Home()});
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
+  EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessConfSet"))) << "there is nothing new";
+  EXPECT_EQ(Tool({"connect", "Home", "--key-stdin"}, {.input = "another secret"}).status, 0);
+  EXPECT_THAT(library::Calls(), Contains("Home|another secret|DHCP"));
+}
+
+TEST_F(Joining, KeepsTheConnectionWhenItCannotBeSaved) {
+  library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
+  const Ran ran = Tool({"connect", "cafe", "--key-file", kSecret});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.out, "");
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: cafe is joined, but could not be saved: "));
+  EXPECT_THAT(library::Calls(),
+              ElementsAre("MEROWirelessNetworkConnect", "MEROWirelessConfSet", "MEROWirelessIfconfigSet"));
+}
+
+TEST_F(Joining, AsksForTheSecret) {
+  const Ran ran = ToolOnTerminal({"connect", "cafe"}, 80, {}, {.prompt = "secret of cafe: ", .text = "open sesame\n"});
+  EXPECT_EQ(ran.status, 0) << ran.out;
+  EXPECT_THAT(ran.out, Not(HasSubstr("sesame")));
+  EXPECT_THAT(library::Calls(), Contains("cafe|open sesame|DHCP"));
+}
+
+TEST_F(Joining, AsksForTheUserAndShowsWhatIsTyped) {
+  library::InRange({Network("cafe", WIRELESS_AUTH_WPA2EAP)});
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG* config) {
+    return library::Record(config->szUser), 0;
+  };
+  const Ran ran =
+      ToolOnTerminal({"connect", "cafe", "--key-file", kSecret}, 80, {}, {.prompt = "user of cafe: ", .text = "ann\n"});
+  EXPECT_EQ(ran.status, 0) << ran.out;
+  EXPECT_THAT(ran.out, HasSubstr("user of cafe: ann"));
+  EXPECT_THAT(library::Calls(), Contains("ann"));
+}
+
+// A command that is asking kept all others from joining.
+TEST_F(Joining, KeepsNobodyElseFromItWhileItAsks) {
+  library::Known({library::Home()});
+  int ends[2];
+  ASSERT_EQ(::pipe(ends), 0);
+  StartedTool asking({"connect", "cafe", "--key-stdin"}, {.before = [&] { ::dup2(ends[0], STDIN_FILENO); }});
+  ASSERT_EQ(::write(ends[1], "open ", 5), 5);
+  ASSERT_TRUE(Soon([&] {
+    int left = -1;
+    return ::ioctl(ends[0], FIONREAD, &left) == 0 && left == 0;
+  }));
+  EXPECT_EQ(Tool({"connect", "Home"}).status, 0);
+  ::kill(asking.pid(), SIGINT);
+  EXPECT_EQ(asking.Wait().status, 130);
+}
+
+TEST_F(Joining, WithoutATerminalFailsBeforeAnythingIsTouched) {
+  const Ran ran = Tool({"connect", "cafe"});
+  EXPECT_EQ(ran.status, 2);
+  EXPECT_THAT(ran.err, HasSubstr("cafe needs a secret, and there is no terminal to ask on"));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+// ---- Waiting ----
+
+TEST_F(Joining, WaitsUntilTheNetworkIsInRange) {
+  library::Known({library::Home()});
+  ComeIntoRangeWith(kInRange);
+  for (const char* szName : {"cafe", "Home"}) {
+    std::filesystem::remove(kInRange);
+    StartedTool tool({"connect", szName, "--key-file", kSecret, "--wait", "60"});
+    const std::ptrdiff_t scans = std::ranges::count(library::Calls(), "MEROWirelessNetworkScan");
+    ASSERT_TRUE(Soon([=] { return std::ranges::count(library::Calls(), "MEROWirelessNetworkScan") > scans; }));
+    WriteText(kInRange, "");
+    const Ran ran = tool.Wait();
+    EXPECT_EQ(ran.status, 0) << ran.err;
+    EXPECT_EQ(ran.err, "");
+  }
+}
+
+TEST_F(Joining, WaitsUntilNobodyElseJoins) {
+  WriteText(kJoinMarker, "");
+  StartedTool tool({"connect", "cafe", "--key-file", kSecret, "--wait", "60"});
+  ::usleep(300'000);
+  EXPECT_THAT(library::Calls(), IsEmpty());
+  std::filesystem::remove(kJoinMarker);
+  EXPECT_EQ(tool.Wait().status, 0);
+}
+
+TEST_F(Joining, WaitsNoLongerThanItIsTold) {
+  ComeIntoRangeWith(kInRange);
+  const auto began = std::chrono::steady_clock::now();
+  EXPECT_EQ(Tool({"connect", "cafe"}).status, 4);
+  EXPECT_LT(std::chrono::steady_clock::now() - began, std::chrono::seconds(1)) << "without --wait";
+  const Ran ran = Tool({"connect", "cafe", "--wait", "1"});
+  EXPECT_EQ(ran.status, 4);
+  EXPECT_THAT(ran.err, HasSubstr("no network named cafe is in range"));
+  EXPECT_GE(std::chrono::steady_clock::now() - began, std::chrono::seconds(1));
+  EXPECT_EQ(Tool({"connect", "cafe", "--wait", "0"}).status, 2);
+}
+
+TEST_F(Joining, DoesNotWaitWhereWaitingDoesNotHelp) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return -1; };
+  EXPECT_EQ(Tool({"connect", "cafe", "--key-file", kSecret, "--wait", "60"}).status, 9);
+}
+
+TEST_F(Joining, CanBeEndedWhileItWaits) {
+  ComeIntoRangeWith(kInRange);
+  StartedTool tool({"connect", "cafe", "--wait", "60"});
+  ASSERT_TRUE(Soon([] { return !library::Calls().empty(); }));
+  ::usleep(300'000);
+  ::kill(tool.pid(), SIGINT);
+  const Ran ran = tool.Wait();
+  EXPECT_EQ(ran.status, 130);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkScan")) << "nothing was touched";
+}
+
+TEST_F(Joining, ShowsThatItWaits) {
+  ComeIntoRangeWith(kInRange);
+  EXPECT_THAT(ToolOnTerminal({"connect", "cafe", "--wait", "2"}).out, HasSubstr("waiting for cafe  "));
+}
+
+// ---- Networks that hide ----
+
+// They had to be saved first, with their address and their protection.
+TEST_F(Joining, FindsANetworkThatHidesByItsNameAlone) {
+  g_canCall = true;
+  ComeIntoRangeWith(kCalled);
+  const Ran ran = Tool({"connect", "cafe", "--key-file", kSecret});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_THAT(library::Calls(), Contains("cafe|open sesame|DHCP"));
+  EXPECT_EQ(ReadText(kCalled), "cafe");
+  std::filesystem::remove(kCalled);
+  EXPECT_EQ(Tool({"save", "cafe", "--key-file", kSecret}).status, 0);
+}
+
+TEST_F(Joining, CallsNoAddress) {
+  g_canCall = true;
+  ComeIntoRangeWith(kInRange);
+  EXPECT_EQ(Tool({"connect", "02:00:00:00:01:00"}).status, 4);
+  EXPECT_FALSE(Exists(kCalled));
+}
+
+}  // namespace
+
+// The program comes upon this one before libc's. A network that is called has the name of the call as a file.
+extern "C" int ioctl(int fd, unsigned long request, ...) noexcept {
+  va_list arguments;
+  va_start(arguments, request);
+  void* argument = va_arg(arguments, void*);
+  va_end(arguments);
+  if (g_canCall && request == SIOCGIWSCAN) return 0;
+  if (!g_canCall || request != SIOCSIWSCAN) return static_cast<int>(::syscall(SYS_ioctl, fd, request, argument));
+  const auto* call = static_cast<const iw_scan_req*>(static_cast<const iwreq*>(argument)->u.data.pointer);
+  WriteText(kCalled, std::string(reinterpret_cast<const char*>(call->essid), call->essid_len));
+  return 0;
+}
