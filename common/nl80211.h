@@ -1,5 +1,5 @@
-// Questions to the kernel's wireless stack, which the listing tool and the management program have. Nothing here
-// changes anything, or waits for the radio.
+// Questions to the kernel's wireless stack, which the listing tool and the management program have, and one request.
+// Nothing here waits for the radio, and but for that request nothing changes anything.
 #ifndef MERO_COMMON_NL80211_H
 #define MERO_COMMON_NL80211_H
 
@@ -12,6 +12,7 @@
 #include <memory>
 #include <new>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace nl80211 {
@@ -26,8 +27,9 @@ using Callbacks = std::unique_ptr<nl_cb, Releaser<nl_cb_put>>;
 
 struct Question {
   nl80211_commands command;
-  bool dump;  // asks for all that there is of a kind
-  unsigned interface;
+  bool dump;                      // asks for all that there is of a kind
+  unsigned interface;             // 0 for what concerns none
+  std::string_view country = {};  // whose rules are asked for: two letters
 };
 
 struct Answer {
@@ -66,7 +68,9 @@ inline Message Request(int family, const Question& question) {
   if (!message) throw std::bad_alloc();
   if (genlmsg_put(message.get(), NL_AUTO_PORT, NL_AUTO_SEQ, family, 0, question.dump ? NLM_F_DUMP : 0, question.command,
                   0) == nullptr ||
-      nla_put_u32(message.get(), NL80211_ATTR_IFINDEX, question.interface) < 0) {
+      (question.interface != 0 && nla_put_u32(message.get(), NL80211_ATTR_IFINDEX, question.interface) < 0) ||
+      (!question.country.empty() &&
+       nla_put_string(message.get(), NL80211_ATTR_REG_ALPHA2, std::string(question.country).c_str()) < 0)) {
     throw std::bad_alloc();
   }
   // What a radio can do does not fit one message, and older kernels cut it unless they are asked for several.

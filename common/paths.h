@@ -17,6 +17,9 @@ inline constexpr char kApSettingsPath[] = "/usr/mero/etc/wireless_ap.conf";
 // What used the radio when it was switched off, until it is switched on again.
 inline constexpr char kRadioUsePath[] = "/usr/mero/etc/wireless_radio.conf";
 
+// The country whose rules the radio is to keep to, while one is set.
+inline constexpr char kCountryPath[] = "/usr/mero/etc/wireless_country.conf";
+
 // A line of a section, in both of the first files.
 inline constexpr char kSectionLineFormat[] = "\t%s=%s\n";
 
@@ -70,7 +73,8 @@ inline constexpr char kHostapdGuestFormat[] = "/etc/hostapd/hostapd-%s-guest.con
 inline constexpr char kHostapdGuestInfoFormat[] = "/etc/hostapd/hostapd-%s-guest.info";
 inline constexpr char kHostapdInfoFormat[] = "/etc/hostapd/hostapd-%s.info";
 
-// The pid of the access-point daemon of an interface, and where it has a control socket for each.
+// What the access-point daemon of an interface was started with, its pid, and where it has a control socket for each.
+inline constexpr char kHostapdStartedFormat[] = "/var/run/rc.network/hostapd-%s.conf";
 inline constexpr char kHostapdPidFormat[] = "/var/run/rc.network/hostapd-%s.pid";
 inline constexpr char kHostapdControlDirectory[] = "/var/run/hostapd";
 

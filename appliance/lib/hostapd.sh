@@ -63,14 +63,16 @@ hostapd_pid() { # INTERFACE
 	printf '%s/hostapd-%s.pid' "$state" "$1"
 }
 
-# Writes the daemon's configuration: the main network's file and, for a start with guests, the guest network's. Features
-# that the card lacks are left out, since the daemon does not start with them.
+# Writes the daemon's configuration: the main network's file, the country and, for a start with guests, the guest
+# network's file. Features that the card lacks are left out, since the daemon does not start with them.
 write_configuration() { # INTERFACE FILE
 	host=$hostapd_files-$1-host.conf
 	[ -s "$host" ] || fail "$host is missing or empty"
 	band=$(band_of "$host") || exit 1
 	unable=$(what_is_unable "$1" "$band") || exit 1
 	networks=$(sed "$unable" "$host") || cannot_read "$host"
+	there=$(country_lines "$band") || exit 1
+	networks=$networks${there:+$newline$there}
 	if [ -n "$guests" ]; then
 		second=$(guest_configuration "$1") || exit 1
 		networks=$networks$newline$second

@@ -34,6 +34,8 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
     std::string path;
   } rows[] = {
       {"printf '%s' \"$adapter_info\"", kAdapterInfoPath},
+      {"printf '%s' \"$country_settings\"", kCountryPath},
+      {"write_configuration() { printf '%s' \"$2\"; exit; }; start_hostapd if0", PathOf(kHostapdStartedFormat)},
       {"printf '%s' \"$guest_interface\"", kGuestInterface},
       {"printf '%s' \"$guest_bridge\"", kGuestBridge},
       {"printf '%s' \"$guest_rights\"", kGuestRightsPath},

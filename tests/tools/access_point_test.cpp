@@ -344,7 +344,9 @@ void GiveChannels() {
                         {5860}};  // which no access point of this program uses
 }
 
-constexpr char kUsable[] = "it may use 1, 6, 11 in the 2.4 GHz band, and 36, 52 (radar) in the 5 GHz band\n";
+constexpr char kUsable[] =
+    "`merowireless country CC` tells the country; it may use 1, 6, 11 in the 2.4 GHz band, and 36, 52 (radar) in the 5 "
+    "GHz band\n";
 
 // It was saved, and the access point that was on the air went off it when it was enabled.
 TEST_F(AccessPoint, TakesNoChannelThatTheRadioMayNotUse) {
@@ -353,7 +355,7 @@ TEST_F(AccessPoint, TakesNoChannelThatTheRadioMayNotUse) {
     const Ran ran = Tool(Words(std::string("ap set ") + szOptions));
     EXPECT_EQ(ran.status, 2) << szOptions;
     EXPECT_THAT(ran.err, testing::StartsWith("merowireless: this radio may not use channel ")) << szOptions;
-    EXPECT_THAT(ran.err, testing::EndsWith(std::string(" here and now: ") + kUsable)) << szOptions;
+    EXPECT_THAT(ran.err, testing::EndsWith(std::string(" without a country: ") + kUsable)) << szOptions;
   }
   EXPECT_THAT(library::Calls(), IsEmpty());
   for (const char* szOptions : {"--channel 11", "--channel auto", "--band 5", "--band 5 --channel 52"}) {
@@ -368,7 +370,8 @@ TEST_F(AccessPoint, IsNotTriedOnAChannelThatTheRadioMayNotUse) {
   MERO_AP_CONF conf = library::Office();
   conf.hostapConf.channel = 13;
   library::SavedAp(conf);
-  EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("merowireless: this radio may not use channel 13 here and now: "));
+  EXPECT_THAT(Tool({"ap", "enable"}).err,
+              HasSubstr("merowireless: this radio may not use channel 13 without a country: "));
   EXPECT_THAT(library::Calls(), IsEmpty());
   EXPECT_EQ(Tool({"ap", "set", "--ssid", "New"}).status, 0) << "what has nothing to do with the channel";
 }
@@ -660,6 +663,19 @@ void ExpectGuestRightsCompared() {
   std::filesystem::remove(kRights);
 }
 
+void ExpectCountryCompared() {
+  constexpr char kStartedWith[] = "/var/run/rc.network/hostapd-wlan0.conf";
+  constexpr char kCountry[] = "/usr/mero/etc/wireless_country.conf";
+  WriteText(kStartedWith, "interface=wlan0\ncountry_code=DE\nieee80211d=1\n");
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})")) << "a country that is not set any more";
+  WriteText(kCountry, "country=\"DE\"\n");
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":false})"));
+  WriteText(kStartedWith, "interface=wlan0\n");
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})")) << "a country that is not told yet";
+  std::filesystem::remove(kStartedWith);
+  std::filesystem::remove(kCountry);
+}
+
 TEST_F(AccessPoint, TellsWhetherWhatWasSavedIsOnTheAir) {
   const std::string host = "/etc/hostapd/hostapd-wlan0-host.conf";
   kernel::BecomeAccessPoint("Office");
@@ -686,6 +702,7 @@ TEST_F(AccessPoint, TellsWhetherWhatWasSavedIsOnTheAir) {
   EXPECT_THAT(StatusDocument(), HasSubstr(R"("pending":true})")) << "guests, who are not on the air";
   library::SavedAp(library::Office());
   ExpectGuestRightsCompared();
+  ExpectCountryCompared();
 }
 
 TEST_F(AccessPoint, NeedsAnAdapterThatHasBeenAnnounced) {

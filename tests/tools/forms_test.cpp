@@ -58,6 +58,11 @@ void OnTheAir() {
   kernel::Main().stations = 2;
 }
 
+void InACountry() {
+  OnTheAir();
+  CopyText(kernel::RulesNow().szKernel, "DE");
+}
+
 // ---- What each command says ----
 
 struct Command {
@@ -86,6 +91,8 @@ const Command kCommands[] = {
     {Connected, {"mode", "ap"}},
     {Connected, {"radio"}},
     {Connected, {"radio", "off"}},
+    {InACountry, {"country"}},
+    {InACountry, {"country", "DE"}},
     {WithAGateway, {"gateway", "10.0.0.1"}},  // the last one: its interface stays
 };
 
@@ -112,6 +119,7 @@ class Forms : public ToolTest {
     Shell("mkdir -p /etc/hostapd");
     WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
     WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "ssid=Old Office\n");
+    WriteText("/usr/mero/etc/wireless_country.conf", "country=\"DE\"\n");
   }
 };
 

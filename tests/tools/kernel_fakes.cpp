@@ -13,12 +13,14 @@
 
 #include "common/paths.h"
 #include "common/text.h"
+#include "library_fakes.h"
 #include "model/wireless_stack.h"
 #include "tests/support/files.h"
 
 namespace kernel {
 
 std::vector<Channel> g_channels;
+std::map<std::string, std::vector<Channel>> g_channelsIn;
 
 namespace {
 
@@ -27,6 +29,7 @@ struct State {
   Interface guests;
   char szAppearsWith[64];
   char szAppearing[33];
+  Rules rules;
 };
 
 State& Shared() {
@@ -105,6 +108,16 @@ std::string PartOfRadio(const Channel& channel) {
   });
 }
 
+// The rules of a radio bear its number.
+std::string Description(const char* szCountry, bool isRadios) {
+  return MessageOf(NL80211_CMD_GET_REG, [&](nl_msg* message) {
+    nla_put_string(message, NL80211_ATTR_REG_ALPHA2, szCountry);
+    if (!isRadios) return;
+    nla_put_u32(message, NL80211_ATTR_WIPHY, 0);
+    nla_put_flag(message, NL80211_ATTR_WIPHY_SELF_MANAGED_REG);
+  });
+}
+
 }  // namespace
 
 void Heard(std::vector<Result> results) {
@@ -119,9 +132,15 @@ Interface& Guests() {
   return Shared().guests;
 }
 
+Rules& RulesNow() {
+  return Shared().rules;
+}
+
 void Reset() {
   Shared() = {};
+  RulesNow() = {.szKernel = "00", .szRadio = "", .szTaken = "", .szKnown = "00 DE US"};
   g_channels.clear();
+  g_channelsIn.clear();
   BecomeClient();
 }
 
@@ -169,7 +188,26 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
     if (asked.signal != 0) messages.push_back(kernel::AccessPoint(asked));
   }
   if (command == NL80211_CMD_GET_WIPHY) {
-    for (const kernel::Channel& channel : kernel::g_channels) messages.push_back(kernel::PartOfRadio(channel));
+    const auto there = kernel::g_channelsIn.find(kernel::RulesNow().szKernel);
+    for (const kernel::Channel& channel : there != kernel::g_channelsIn.end() ? there->second : kernel::g_channels) {
+      messages.push_back(kernel::PartOfRadio(channel));
+    }
   }
   return messages;
+}
+
+std::vector<std::string> AskForRules() {
+  const kernel::Rules& rules = kernel::RulesNow();
+  std::vector<std::string> messages;
+  if (rules.szKernel[0] != '\0') messages.push_back(kernel::Description(rules.szKernel, false));
+  if (rules.szRadio[0] != '\0') messages.push_back(kernel::Description(rules.szRadio, true));
+  return messages;
+}
+
+int RequestRules(std::string_view country) {
+  kernel::Rules& rules = kernel::RulesNow();
+  library::Record("rules of " + std::string(country));
+  if (std::string_view(rules.szKnown).find(country) == std::string_view::npos) return 0;
+  CopyText(rules.szKernel, rules.szTaken[0] != '\0' ? rules.szTaken : country);
+  return 0;
 }

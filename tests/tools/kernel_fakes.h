@@ -5,6 +5,8 @@
 #include <linux/nl80211.h>
 
 #include <cstdint>
+#include <map>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -48,7 +50,20 @@ struct Channel {
 };
 extern std::vector<Channel> g_channels;
 
-// wlan0 is a client's, and the radio tells of no channels.
+// Those of a country, where they are others.
+extern std::map<std::string, std::vector<Channel>> g_channelsIn;
+
+// Whose rules radios keep to: the kernel's, those of wlan0's radio where it has its own, and those that the kernel
+// takes when it is asked for a country that it knows, where that is not that country.
+struct Rules {
+  char szKernel[3];
+  char szRadio[3];
+  char szTaken[3];
+  char szKnown[16];
+};
+Rules& RulesNow();
+
+// wlan0 is a client's, the radio tells of no channels, and its rules are the world's.
 void Reset();
 
 // wlan0 is a client's, or an access point's on the air.

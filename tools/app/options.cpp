@@ -7,6 +7,7 @@
 #include <chrono>
 #include <limits>
 #include <memory>
+#include <optional>
 #include <sstream>
 #include <vector>
 
@@ -18,6 +19,7 @@
 #include "commands/adapter.h"
 #include "commands/addressing.h"
 #include "commands/connection.h"
+#include "commands/country.h"
 #include "commands/keep.h"
 #include "commands/networks.h"
 #include "commands/watch.h"
@@ -295,6 +297,14 @@ void AddAdapterCommands(Commands& commands) {
       },
       [](const Program& program, const std::string& state) {
         state.empty() ? ShowRadio(program) : SwitchRadio(program, Lower(state));
+      });
+  commands.Add<std::optional<std::string>>(
+      "country", "Show the country of the radio's rules, or set it",
+      [](CLI::App& command, std::optional<std::string>& country) {
+        command.add_option("country", country, "its two letters, or none; nothing shows it")->option_text("[CC|none]");
+      },
+      [](const Program& program, const std::optional<std::string>& country) {
+        country ? SetCountry(program, *country) : ShowCountry(program);
       });
 }
 

@@ -50,7 +50,7 @@ _merowireless_choices() { # TAKES
   local word
   for word in ${1//[][|]/ }; do
     case $word in
-      NAME | ADDRESS | FILE | N | A.B.C.D) ;;
+      NAME | ADDRESS | FILE | N | CC | A.B.C.D) ;;
       *) echo "$word" ;;
     esac
   done

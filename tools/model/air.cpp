@@ -32,21 +32,18 @@ void ForEachIn(const nlattr* outer, Visit visit) {
     visit(attribute);
 }
 
-// A channel that is disabled cannot be used, and where nobody may radiate first, no access point may begin.
 void AddChannel(std::vector<Channel>& channels, const nlattr* description) {
   nla_policy policy[NL80211_FREQUENCY_ATTR_MAX + 1] = {};
   policy[NL80211_FREQUENCY_ATTR_FREQ].type = NLA_U32;
   std::array<nlattr*, NL80211_FREQUENCY_ATTR_MAX + 1> channel;
   if (nla_parse_nested(channel.data(), NL80211_FREQUENCY_ATTR_MAX, const_cast<nlattr*>(description), policy) < 0)
     return;
-  if (channel[NL80211_FREQUENCY_ATTR_FREQ] == nullptr || channel[NL80211_FREQUENCY_ATTR_DISABLED] != nullptr ||
-      channel[NL80211_FREQUENCY_ATTR_NO_IR] != nullptr) {
-    return;
-  }
+  if (channel[NL80211_FREQUENCY_ATTR_FREQ] == nullptr || channel[NL80211_FREQUENCY_ATTR_DISABLED] != nullptr) return;
   const unsigned megahertz = nla_get_u32(channel[NL80211_FREQUENCY_ATTR_FREQ]);
   channels.push_back({.number = ChannelOf(megahertz),
                       .megahertz = static_cast<int>(megahertz),
-                      .isRadars = channel[NL80211_FREQUENCY_ATTR_RADAR] != nullptr});
+                      .isRadars = channel[NL80211_FREQUENCY_ATTR_RADAR] != nullptr,
+                      .isPassive = channel[NL80211_FREQUENCY_ATTR_NO_IR] != nullptr});
 }
 
 void AddChannels(std::vector<Channel>& channels, const nlattr* bands) {

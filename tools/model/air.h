@@ -16,11 +16,12 @@ struct Air {
 // Nothing without such an interface, or a wireless one.
 std::optional<Air> AirOf(const std::string& interface);
 
-// A channel of 2.4 or 5 GHz that an access point may use, by the rules of the place where the radio is.
+// A channel of 2.4 or 5 GHz that the radio may use, by the rules of the place where it is.
 struct Channel {
   int number;
   int megahertz;
-  bool isRadars;  // it has to be listened to for radar first
+  bool isRadars;   // it has to be listened to for radar first
+  bool isPassive;  // nobody may radiate there first, so that no access point may begin
 
   bool is5GHz() const { return megahertz >= 5000; }
 };

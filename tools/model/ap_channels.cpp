@@ -4,6 +4,7 @@
 #include <algorithm>
 
 #include "model/air.h"
+#include "model/country.h"
 #include "model/library.h"
 
 namespace {
@@ -22,12 +23,13 @@ std::string ListOf(const std::vector<Channel>& channels, bool is5GHz) {
 ChannelCheck CheckChannel(const ApConf& conf) {
   const int number = conf.hostapConf.channel;
   if (number == 0) return ChannelCheck::kPassed;
-  const std::vector<Channel> channels = ChannelsOf(MEROWirelessAPInterfaceGet());
+  std::vector<Channel> channels = ChannelsOf(MEROWirelessAPInterfaceGet());
   if (channels.empty()) return ChannelCheck::kNobodyCanTell;
+  std::erase_if(channels, [](const Channel& channel) { return channel.isPassive; });
   const bool isAllowed = std::ranges::any_of(
       channels, [&](const Channel& channel) { return channel.number == number && channel.is5GHz() == Is5GHz(conf); });
   if (isAllowed) return ChannelCheck::kPassed;
-  throw Wrong("this radio may not use channel " + std::to_string(number) + " here and now",
-              "it may use " + ListOf(channels, false) + " in the 2.4 GHz band, and " + ListOf(channels, true) +
-                  " in the 5 GHz band");
+  throw Wrong("this radio may not use channel " + std::to_string(number) + WhereRulesHold(),
+              HintAtCountry() + "it may use " + ListOf(channels, false) + " in the 2.4 GHz band, and " +
+                  ListOf(channels, true) + " in the 5 GHz band");
 }

@@ -2,10 +2,12 @@
 #include "model/ap_files.h"
 
 #include <algorithm>
+#include <string_view>
 
 #include "base/whole_file.h"
 #include "common/hostapd_lines.h"
 #include "common/paths.h"
+#include "model/country.h"
 #include "platform.h"
 
 namespace {
@@ -64,6 +66,16 @@ bool HaveOtherGuestRights(const MERO_AP_ACCESS_RULE& rule) {
   });
 }
 
+// The start script adds the country to what the library has written.
+bool HasOtherCountry(const std::string& interface) {
+  constexpr std::string_view kLine = "\ncountry_code=";
+  const auto started = TextOfFile(PathOf(kHostapdStartedFormat, interface));
+  if (!started) return false;
+  const std::size_t line = started->find(kLine);
+  const std::string country = SavedCountry();
+  return line == started->npos ? !country.empty() : started->compare(line + kLine.size(), 2, country) != 0;
+}
+
 }  // namespace
 
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf) {
@@ -72,7 +84,7 @@ std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& c
   Lines lines;
   hostapd::WriteMain(lines, interface.c_str(), conf.hostapConf);
   return *given != lines.text() || HasOtherGuests(interface, conf.hostapConf.guestNet) ||
-         HaveOtherGuestRights(conf.guestNetAccessRule);
+         HaveOtherGuestRights(conf.guestNetAccessRule) || HasOtherCountry(interface);
 }
 
 ApSwitch ApSwitchOf(const std::string& interface) {

@@ -7,8 +7,8 @@
 
 #include "model/ap_settings.h"
 
-// Whether the daemon of an interface, and the rules for guests, were given other settings than these; nothing when the
-// daemon was given none.
+// Whether the daemon of an interface, and the rules for guests, were given other settings than these, or another
+// country than that of the appliance; nothing when the daemon was given none.
 std::optional<bool> WasGivenOthers(const std::string& interface, const ApConf& conf);
 
 // Whether an access point was set up on an interface and not disabled since, and whether it is switched on: a change of

@@ -3,6 +3,8 @@
 
 #include <net/if.h>
 
+#include <cerrno>
+
 #include "common/nl80211.h"
 #include "model/failed.h"
 
@@ -15,4 +17,19 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
     throw Failed("the kernel does not say what " + interface + " does: " + answer.reason());
   }
   return std::move(answer.messages);
+}
+
+std::vector<std::string> AskForRules() {
+  nl80211::Answer answer = nl80211::Ask({.command = NL80211_CMD_GET_REG, .dump = true, .interface = 0});
+  if (answer.saysNotWireless()) return {};
+  if (answer.error != 0 || answer.failure < 0) {
+    throw Failed(std::string("the kernel does not say whose rules radios keep to: ") + answer.reason());
+  }
+  return std::move(answer.messages);
+}
+
+int RequestRules(std::string_view country) {
+  const nl80211::Answer answer =
+      nl80211::Ask({.command = NL80211_CMD_REQ_SET_REG, .dump = false, .interface = 0, .country = country});
+  return answer.failure < 0 ? EIO : answer.error;
 }
