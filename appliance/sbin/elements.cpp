@@ -176,15 +176,52 @@ WIRELESS_AUTH AuthOf(Bytes keys, const Generation& generation) {
   return WIRELESS_AUTH_UNKNOWN;
 }
 
-// The security that a WPA or RSN element announces, from its version on.
-Security SecurityOfSuites(Bytes body, const Generation& generation) {
+// What a WPA or RSN element announces.
+struct Announced {
+  Security security;
+  Bytes keys;
+  bool protectsFrames = false;  // those of management; whoever does not is kept out
+
+  // Whether the client can be configured for it.
+  bool IsUsable() const {
+    return security.auth != WIRELESS_AUTH_UNKNOWN && security.auth != WIRELESS_AUTH_WPANONE &&
+           security.encrypt != WIRELESS_ENCRYPT_UNKNOWN && !protectsFrames;
+  }
+};
+
+// From its version on. WPA has no word for the protection of frames.
+Announced AnnouncedBy(Bytes body, const Generation& generation) {
+  constexpr unsigned kFramesAreProtected = 0x0040;
   SuiteReader reader(body);
   const unsigned version = reader.Number();
   const Bytes group = reader.Suite();
   const Bytes pairwise = reader.SuiteList();
   const Bytes keys = reader.SuiteList();
   if (!reader.Whole() || version != 1) return {};
-  return {AuthOf(keys, generation), CiphersOf(pairwise, group, generation)};
+  const bool protectsFrames = &generation == &kWpa2 && (reader.Number() & kFramesAreProtected) != 0;
+  return {{AuthOf(keys, generation), CiphersOf(pairwise, group, generation)}, keys, protectsFrames};
+}
+
+// The key types that tell what a network is that cannot be joined, those that tell most first.
+struct KeyOfObstacle {
+  std::uint8_t type;
+  Obstacle obstacle;
+};
+
+constexpr KeyOfObstacle kKeysOfObstacles[] = {
+    {8, Obstacle::kWpa3},           {9, Obstacle::kWpa3},    {24, Obstacle::kWpa3},
+    {25, Obstacle::kWpa3},          {18, Obstacle::kOwe},    {12, Obstacle::kWpa3Eap192},
+    {13, Obstacle::kWpa3Eap192},    {5, Obstacle::kWpa3Eap}, {3, Obstacle::kFastTransition},
+    {4, Obstacle::kFastTransition}, {6, Obstacle::kSha256},
+};
+
+Obstacle ObstacleOf(const Announced& rsn) {
+  if (rsn.IsUsable()) return Obstacle::kNone;
+  for (const auto& [type, obstacle] : kKeysOfObstacles) {
+    if (Lists(rsn.keys, kWpa2, type)) return obstacle;
+  }
+  if (rsn.security.auth == WIRELESS_AUTH_UNKNOWN) return Obstacle::kUnknown;
+  return rsn.protectsFrames ? Obstacle::kProtectedFrames : Obstacle::kCiphers;
 }
 
 // A network that offers both generations is joined by the newer one with the ciphers of either.
@@ -196,19 +233,26 @@ Security Combine(const Security& wpa, const Security& wpa2) {
 
 // The security that the elements of one network announce.
 struct SecurityElements {
-  std::optional<Security> wpa;
-  std::optional<Security> wpa2;
+  std::optional<Announced> wpa;
+  std::optional<Announced> wpa2;
   bool allRead = false;
 };
 
 Security SecurityOf(const SecurityElements& elements, unsigned capability) {
-  if (elements.wpa && elements.wpa2) return Combine(*elements.wpa, *elements.wpa2);
-  if (elements.wpa2) return *elements.wpa2;
-  if (elements.wpa) return *elements.wpa;
+  if (elements.wpa && elements.wpa2) return Combine(elements.wpa->security, elements.wpa2->security);
+  if (elements.wpa2) return elements.wpa2->security;
+  if (elements.wpa) return elements.wpa->security;
   if ((capability & kCapabilityPrivacy) == 0) return {WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE};
   // The element that says WPA may be among those that could not be read.
   if (!elements.allRead) return {};
   return {WIRELESS_AUTH_SHARED, WIRELESS_ENCRYPT_WEP};
+}
+
+// A network with WPA beside what cannot be joined is joined by WPA. What only WPA or a cell announces is as it has
+// always been.
+Obstacle ObstacleOf(const SecurityElements& elements) {
+  const bool byWpa = elements.wpa && elements.wpa->IsUsable();
+  return elements.wpa2 && !byWpa ? ObstacleOf(*elements.wpa2) : Obstacle::kNone;
 }
 
 }  // namespace
@@ -232,14 +276,14 @@ Description Describe(Bytes elements, unsigned capability, unsigned megahertz) {
         if (body.size() >= kHtCapabilitiesSize) standards |= band.ht;
         break;
       case kRsn:
-        if (!security.wpa2) security.wpa2 = SecurityOfSuites(body, kWpa2);
+        if (!security.wpa2) security.wpa2 = AnnouncedBy(body, kWpa2);
         break;
       case kVendorSpecific:
-        if (IsWpa(body) && !security.wpa) security.wpa = SecurityOfSuites(body.subspan(std::size(kWpaPrefix)), kWpa);
+        if (IsWpa(body) && !security.wpa) security.wpa = AnnouncedBy(body.subspan(std::size(kWpaPrefix)), kWpa);
         break;
     }
   });
-  return {name.value_or(""), ProtocolOf(standards), SecurityOf(security, capability)};
+  return {name.value_or(""), ProtocolOf(standards), SecurityOf(security, capability), ObstacleOf(security)};
 }
 
 }  // namespace iwlist

@@ -1,6 +1,6 @@
-// iwlist with one form more: `iwlist INTERFACE scanning mero` (or `scan mero`) lists the scan results that the radio's
-// driver holds, in the fixed columns of listing.h, and does not scan for them. Every other form is the ordinary
-// tool's, which the package system has moved aside.
+// iwlist with two forms more: `iwlist INTERFACE scanning mero` (or `scan mero`) lists the scan results that the radio's
+// driver holds, in the fixed columns of listing.h, and does not scan for them; with `unsupported` behind it, it tells
+// which of them cannot be joined. Every other form is the ordinary tool's, which the package system has moved aside.
 //
 // Exit status: 0 listed, also when nothing is in range; 1 not listed, with the reason in one line on standard error
 // and nothing on standard output; 127 the ordinary tool is not there, 126 it cannot be run; else the ordinary tool's.
@@ -21,15 +21,18 @@ namespace {
 constexpr char kOrdinaryTool[] = "/sbin/iwlist.distrib";
 
 bool AsksForListing(int argc, char* argv[]) {
-  if (argc != 4) return false;
+  if (argc != 4 && argc != 5) return false;
   const std::string_view verb = argv[2];
-  return (verb == "scanning" || verb == "scan") && std::string_view(argv[3]) == "mero";
+  if ((verb != "scanning" && verb != "scan") || std::string_view(argv[3]) != "mero") return false;
+  return argc == 4 || std::string_view(argv[4]) == "unsupported";
 }
 
-int List(const char* interface) {
+int List(const char* interface, bool unsupported) {
   try {
     const auto reader = isatty(STDOUT_FILENO) != 0 ? iwlist::Reader::kTerminal : iwlist::Reader::kProgram;
-    iwlist::Write(STDOUT_FILENO, iwlist::Listing(iwlist::ReadScanResults(interface), reader));
+    const auto networks = iwlist::ReadScanResults(interface);
+    iwlist::Write(STDOUT_FILENO,
+                  unsupported ? iwlist::ListingOfObstacles(networks) : iwlist::Listing(networks, reader));
     return EXIT_SUCCESS;
   } catch (const std::exception& failure) {
     std::fprintf(stderr, "iwlist: %s\n", failure.what());
@@ -48,5 +51,5 @@ int HandOver(char* argv[]) {
 }  // namespace
 
 int main(int argc, char* argv[]) {
-  return AsksForListing(argc, argv) ? List(argv[1]) : HandOver(argv);
+  return AsksForListing(argc, argv) ? List(argv[1], argc == 5) : HandOver(argv);
 }

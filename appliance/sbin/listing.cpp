@@ -46,6 +46,32 @@ std::string Token(const Security& security) {
          MEROWirelessEncryptStringGet(security.encrypt, 0);
 }
 
+const char* TextOf(Obstacle obstacle) {
+  switch (obstacle) {
+    case Obstacle::kNone:
+      break;
+    case Obstacle::kWpa3:
+      return "WPA3";
+    case Obstacle::kOwe:
+      return "OWE";
+    case Obstacle::kWpa3Eap192:
+      return "WPA3 EAP 192";
+    case Obstacle::kWpa3Eap:
+      return "WPA3 EAP";
+    case Obstacle::kFastTransition:
+      return "WPA2 FT";
+    case Obstacle::kSha256:
+      return "WPA2 SHA256";
+    case Obstacle::kProtectedFrames:
+      return "WPA2 PMF";
+    case Obstacle::kCiphers:
+      return "WPA2 with other ciphers";
+    case Obstacle::kUnknown:
+      return "unknown";
+  }
+  return "";
+}
+
 // Leaves one description of each address.
 void DropDuplicates(std::vector<Network>& networks) {
   std::ranges::sort(networks, {}, [](const Network& network) {
@@ -74,6 +100,20 @@ std::string Listing(std::vector<Network> networks, Reader reader) {
 
   std::string listing(kHeadings);
   for (const Network& network : networks) listing += Row(network, reader);
+  return listing;
+}
+
+std::string ListingOfObstacles(std::vector<Network> networks) {
+  DropDuplicates(networks);
+  std::string listing;
+  for (const Network& network : networks) {
+    if (network.description.obstacle == Obstacle::kNone) continue;
+    char address[kAddressTextSize];
+    listing += MEROWirelessBssidStringGet(network.bssid.data(), address, sizeof(address));
+    listing += ' ';
+    listing += TextOf(network.description.obstacle);
+    listing += '\n';
+  }
   return listing;
 }
 

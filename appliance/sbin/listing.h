@@ -27,6 +27,9 @@ std::string Row(const Network& network, Reader reader);
 // name. Networks with a strong signal come first, so that the first row of a name is its best access point.
 std::string Listing(std::vector<Network> networks, Reader reader);
 
+// The access points that cannot be joined, whatever the secret: a line for each, its address and how it is protected.
+std::string ListingOfObstacles(std::vector<Network> networks);
+
 // Writes all of `text`; throws std::system_error when it cannot.
 void Write(int fd, std::string_view text);
 

@@ -207,6 +207,39 @@ TEST(NetworkSecurity, IsUnknownAndNeverWepOrNoneWhenItsElementCannotBeRead) {
   }
 }
 
+TEST(NetworkObstacle, IsWhatKeepsTheClientOutWhateverItsSecret) {
+  const struct {
+    const char* what;
+    std::string elements;
+    Obstacle obstacle;
+  } kCases[] = {
+      {"open or WEP", "", Obstacle::kNone},
+      {"WPA2", kRsnPskAes, Obstacle::kNone},
+      {"WPA", kWpaPskTkip, Obstacle::kNone},
+      {"WPA2 EAP", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC01 0000", Obstacle::kNone},
+      {"WPA2 without capabilities", "30 12 0100 000FAC04 0100 000FAC02 0100 000FAC02", Obstacle::kNone},
+      {"WPA3", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC08 C000", Obstacle::kWpa3},
+      {"WPA3 with the key type of newer devices", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC18 C000",
+       Obstacle::kWpa3},
+      {"WPA2 and WPA3", "30 18 0100 000FAC04 0100 000FAC04 0200 000FAC02 000FAC08 8000", Obstacle::kNone},
+      {"WPA2 and WPA3 that insists on protected frames",
+       "30 18 0100 000FAC04 0100 000FAC04 0200 000FAC02 000FAC08 C000", Obstacle::kWpa3},
+      {"WPA3 beside WPA", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC08 C000" + kWpaPskTkip, Obstacle::kNone},
+      {"opportunistic encryption", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC12 C000", Obstacle::kOwe},
+      {"WPA3 EAP of 192 bits", "30 14 0100 000FAC09 0100 000FAC09 0100 000FAC0C C000", Obstacle::kWpa3Eap192},
+      {"WPA3 EAP", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC05 C000", Obstacle::kWpa3Eap},
+      {"fast transition only", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC04 0000", Obstacle::kFastTransition},
+      {"WPA2 with SHA-256 only", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC06 0000", Obstacle::kSha256},
+      {"WPA2 that insists on protected frames", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC02 C000",
+       Obstacle::kProtectedFrames},
+      {"WPA2 that may protect frames", "30 14 0100 000FAC04 0100 000FAC04 0100 000FAC02 8000", Obstacle::kNone},
+      {"WPA2 with a cipher without a name", "30 14 0100 000FAC09 0100 000FAC09 0100 000FAC02 0000", Obstacle::kCiphers},
+      {"a maker's own key type", "30 14 0100 000FAC04 0100 000FAC04 0100 00409602 0000", Obstacle::kUnknown},
+      {"an element that is cut short", "30 12 0100 000FAC04 0100 000FAC04 0200 000FAC02", Obstacle::kUnknown},
+  };
+  for (const auto& row : kCases) EXPECT_EQ(Read(row.elements, kPrivate).obstacle, row.obstacle) << row.what;
+}
+
 // ---- Malformed frames
 
 TEST(MalformedFrame, KeepsWhatStandsBeforeTheFault) {

@@ -45,6 +45,8 @@ TEST_F(ListingTool, HandsEveryOtherFormToTheOrdinaryToolAsItIs) {
       {"wlan0", "scanning", "last"},
       {"wlan0", "scanning", "essid", "two words"},
       {"wlan0", "scanning", "mero", "more"},
+      {"wlan0", "scanning", "mero", "unsupported", "more"},
+      {"wlan0", "frequency", "mero", "unsupported"},
       {"wlan0", "scanning", "MERO"},
       {"wlan0", "frequency", "mero"},
       {"scanning", "mero"},

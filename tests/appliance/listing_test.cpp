@@ -224,6 +224,26 @@ TEST(Listing, ShowsAccessPointsOfOneNameEachByItself) {
   EXPECT_EQ(RowsOf(Listing({AccessPoint("home", 1), AccessPoint("home", 2)}, Reader::kProgram)).size(), 2U);
 }
 
+TEST(ListingOfObstacles, NamesThoseThatCannotBeJoinedAndNoOthers) {
+  const std::pair<Obstacle, std::string> kTexts[] = {
+      {Obstacle::kWpa3, "WPA3"},
+      {Obstacle::kOwe, "OWE"},
+      {Obstacle::kWpa3Eap192, "WPA3 EAP 192"},
+      {Obstacle::kWpa3Eap, "WPA3 EAP"},
+      {Obstacle::kFastTransition, "WPA2 FT"},
+      {Obstacle::kSha256, "WPA2 SHA256"},
+      {Obstacle::kProtectedFrames, "WPA2 PMF"},
+      {Obstacle::kCiphers, "WPA2 with other ciphers"},
+      {Obstacle::kUnknown, "unknown"},
+  };
+  for (const auto& [obstacle, text] : kTexts) {
+    Network strange = AccessPoint("strange", 0x0C);
+    strange.description.obstacle = obstacle;
+    EXPECT_EQ(ListingOfObstacles({AccessPoint("home"), strange}), "02:00:A0:0C:FF:0C " + text + "\n");
+  }
+  EXPECT_EQ(ListingOfObstacles({AccessPoint("home")}), "");
+}
+
 TEST(WritingTheListing, DeliversAllOfItThroughAPipeThatIsReadSlowly) {
   int ends[2];
   ASSERT_EQ(pipe(ends), 0);

@@ -127,14 +127,15 @@ TEST_F(Networks, AreMarkedThatAreJoinedOrKnown) {
             "Strange  ▂▁▁▁  20   6  WPA2 AES  11b/g/n   0A:0A:0A:0A:0A:0C  -\n");
   WriteText("/tmp/list", Tool({"scan", "--porcelain"}).out);
   EXPECT_EQ(Shell("cut -f 1,9,10 /tmp/list"), "Home\tyes\tyes\nHome\tno\tyes\nStrange\tno\tno\n");
-  EXPECT_THAT(Tool({"scan", "--json"}).out, HasSubstr(R"("joined":true,"known":true},{"name":"Home","signal":50)"));
+  EXPECT_THAT(Tool({"scan", "--json"}).out,
+              HasSubstr(R"("joined":true,"known":true,"unsupported":null},{"name":"Home","signal":50)"));
 }
 
 // Anybody can put up an open network with a name that is known.
 TEST_F(Networks, AreNotMarkedAsKnownThatOnlyBearAKnownName) {
   library::Known({Home()});
   library::InRange({Network("Home", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE)});
-  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::EndsWith("\tno\tno\n"));
+  EXPECT_THAT(Tool({"scan", "--porcelain"}).out, testing::EndsWith("\tno\tno\t\n"));
 }
 
 TEST_F(Networks, CannotBeScannedForWithoutAnAdapter) {

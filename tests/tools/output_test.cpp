@@ -43,16 +43,16 @@ TEST_F(Output, OfAScanIsOneDocumentInJson) {
   EXPECT_EQ(Tool({"scan", "--json"}).out,
             R"({"result":"ok","networks":[)"
             R"({"name":"Café du coin","signal":74,"channel":6,"auth":"WPA2PSK","encryption":"AES",)"
-            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false},)"
+            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false,"unsupported":null},)"
             R"({"name":"guests","signal":9,"channel":11,"auth":"OPEN","encryption":"NONE",)"
-            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false}]})"
+            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false,"unsupported":null}]})"
             "\n");
 }
 
 TEST_F(Output, OfAScanIsARecordALineForScripts) {
   EXPECT_EQ(Tool({"--porcelain", "scan"}).out,
-            "Café du coin\t74\t6\tWPA2PSK\tAES\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\tno\tno\n"
-            "guests\t9\t11\tOPEN\tNONE\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\tno\tno\n");
+            "Café du coin\t74\t6\tWPA2PSK\tAES\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\tno\tno\t\n"
+            "guests\t9\t11\tOPEN\tNONE\t11b/g/n\t0A:0A:0A:0A:0A:0A\t\tno\tno\t\n");
 }
 
 TEST_F(Output, KeepsNamesFromBreakingALineForScripts) {

@@ -260,4 +260,64 @@ TEST_F(SavedNetworks, AreForgottenByAddressButForTheirOtherAccessPoints) {
   EXPECT_THAT(library::Calls(), ElementsAre("PLIBCFileRemoveSection", "0A:0A:0A:0A:0A:02"));
 }
 
+// ---- What cannot be joined ----
+
+// What the listing tool tells of access points that cannot be joined.
+class Obstacle {
+ public:
+  explicit Obstacle(const std::string& lines) {
+    WriteScript("/sbin/iwlist", "[ \"$*\" = 'wlan0 scanning mero unsupported' ] && printf '" + lines + "'");
+  }
+  Obstacle(const Obstacle&) = delete;
+  Obstacle& operator=(const Obstacle&) = delete;
+  ~Obstacle() { std::filesystem::remove("/sbin/iwlist"); }
+};
+
+WIRELESS_NETWORK Strange(unsigned char last, int signal, std::string_view name = "Home") {
+  return Heard(last, signal, name, WIRELESS_AUTH_UNKNOWN, WIRELESS_ENCRYPT_AES);
+}
+
+// It was said of WPA3 that it is open and takes no secret.
+TEST_F(SavedNetworks, ThatCannotBeJoinedAreCalledWhatTheyAre) {
+  library::InRange({Strange(1, -40), Strange(2, -50, "Guests"), Strange(3, -60, "Odd")});
+  const Obstacle obstacle("0A:0A:0A:0A:0A:01 WPA3\\n0A:0A:0A:0A:0A:02 OWE\\nno address\\n0A:0A:0A:0A:0A:03 unknown\\n");
+  WriteText("/tmp/list", Tool({"scan"}).out);
+  EXPECT_EQ(Shell("awk 'NR > 1 { print $1, $5 }' /tmp/list"), "Home WPA3\nGuests OWE\nOdd unknown\n");
+  WriteText("/tmp/list", Tool({"scan", "--porcelain"}).out);
+  EXPECT_EQ(Shell("cut -f 1,4,11 /tmp/list"), "Home\tUNKNOWN\tWPA3\nGuests\tUNKNOWN\tOWE\nOdd\tUNKNOWN\tunknown\n");
+  for (const std::string command : {"save", "connect"}) {
+    const Ran ran = Tool({command, "Home", "--key-file", kSecretPath});
+    EXPECT_EQ(ran.status, 10);
+    EXPECT_EQ(ran.err,
+              "merowireless: Home is protected by WPA3, and cannot be joined: it can when its access point takes "
+              "plain WPA2 as well\n");
+    EXPECT_THAT(Tool({command, "Guests"}).err, HasSubstr("Guests is protected by OWE, and cannot be joined"));
+    EXPECT_THAT(Tool({command, "Odd"}).err, HasSubstr("Odd is protected in a way that cannot be joined"));
+  }
+  EXPECT_EQ(Tried(), "");
+}
+
+// The router has a new program now.
+TEST_F(SavedNetworks, ThatCannotBeJoinedAnyMoreAreCalledWhatTheyAre) {
+  const Obstacle obstacle("0A:0A:0A:0A:0A:01 WPA3\\n");
+  library::Known({Saved(Heard(1, 0), 7)});
+  library::InRange({Strange(1, -40)});
+  for (const auto& words :
+       std::vector<std::vector<std::string>>{{"connect", "Home"}, {"connect", "Home", "--changed"}, {"autoconnect"}}) {
+    const Ran ran = Tool(words);
+    EXPECT_EQ(ran.status, 10);
+    EXPECT_THAT(ran.err, HasSubstr("Home is protected by WPA3, and cannot be joined"));
+  }
+  EXPECT_EQ(Tried(), "");
+}
+
+// The library takes it for WPA2, and the attempt ended when its time was over.
+TEST_F(SavedNetworks, AreNotJoinedThroughAnAccessPointThatLetsNobodyInForItsProtection) {
+  const Obstacle obstacle("0A:0A:0A:0A:0A:01 WPA2 PMF\\n");
+  const auto home = Saved(Heard(1, -50), 7);
+  EXPECT_EQ(Tried({"connect", "Home"}, {home}, {Heard(1, -40), Heard(2, -70)}), "Home|2|open sesame|any");
+  library::InRange({Heard(1, -40)});
+  EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("Home is protected by WPA2 PMF, and cannot be joined"));
+}
+
 }  // namespace

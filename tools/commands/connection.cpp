@@ -84,10 +84,6 @@ void ApplyAddressing(const Program& program, const KnownNetwork& config) {
 
 // ---- What to join ----
 
-void RequireJoinable(const Program& program, const Network& network) {
-  if (!CanBeJoined(network)) throw Unsupported(program.output.Name(network.szEssid));
-}
-
 // A network that is to be joined.
 struct Target {
   KnownNetwork config;
@@ -104,7 +100,7 @@ Target TargetAmong(const Program& program, const std::vector<SavedNetwork>& know
   const SavedNetwork& newest = known.front();
   const auto pretender = Pretender(newest, inRange);
   if (!pretender) return {AsSaved(newest), false, std::nullopt};
-  if (!isChanged) throw OnlyBearsTheName(program, newest, *pretender);
+  if (!isChanged) throw NotAsSaved(program, newest, *pretender);
   return {AsChanged(newest, *pretender), true, newest};
 }
 

@@ -9,8 +9,10 @@
 #include "base/clock.h"
 #include "common/paths.h"
 #include "model/access_points.h"
+#include "model/join_failures.h"
 #include "model/last_scan.h"
 #include "model/library.h"
+#include "model/obstacles.h"
 #include "model/saved_networks.h"
 #include "model/security.h"
 
@@ -56,11 +58,17 @@ struct Found {
   Network network;
   bool isJoined;  // through this access point
   bool isKnown;
+  std::string obstacle;  // how it is protected, where that cannot be joined
 };
 
 Shown ShowKnown(const Found& of, bool) {
   if (of.isJoined) return {"joined", Tone::kGood};
   return of.isKnown ? Shown{"yes"} : Shown{"-", Tone::kFaint};
+}
+
+Shown ShowSecurity(const Found& of) {
+  if (of.obstacle.empty()) return {SecurityText(of.network.auth, of.network.encrypt)};
+  return {of.obstacle, Tone::kFaint};
 }
 
 constexpr Field<Found> kFoundFields[] = {
@@ -69,13 +77,14 @@ constexpr Field<Found> kFoundFields[] = {
      [](const Found& of, bool utf8) { return ShowSignal(of.network.signal, utf8); }},
     {"channel", "CH", [](const Found& of) { return Value(int64_t{of.network.channel}); }, Layout::kRight},
     {"auth", "SECURITY", [](const Found& of) { return AuthOf(of.network); }, Layout::kLeft,
-     [](const Found& of, bool) { return Shown{SecurityText(of.network.auth, of.network.encrypt)}; }},
+     [](const Found& of, bool) { return ShowSecurity(of); }},
     {"encryption", "", [](const Found& of) { return EncryptionOf(of.network); }},
     {"standard", "STANDARD", [](const Found& of) { return Value(MEROWirelessProtocolStringGet(of.network.protocol)); }},
     {"address", "ACCESS POINT", [](const Found& of) { return Value(AddressText(of.network.bssid)); }},
     {"name_hex", "", [](const Found& of) { return NameInHex(of.network.szEssid); }},
     {"joined", "", [](const Found& of) { return Value(of.isJoined); }},
     {"known", "KNOWN", [](const Found& of) { return Value(of.isKnown); }, Layout::kLeft, ShowKnown},
+    {"unsupported", "", [](const Found& of) { return Value(of.obstacle); }},
 };
 
 Value AddressesOf(const SavedNetwork& of) {
@@ -158,18 +167,18 @@ bool IsSame(const Network& one, const Network& other) {
   return std::string_view(one.szEssid) == other.szEssid && IsProtectedAlike(one, other);
 }
 
-// The networks, the strongest first.
-std::vector<Found> FoundAmong(std::vector<Network> networks) {
+std::vector<Found> FoundAmong(const std::vector<Network>& networks) {
   const auto known = Known(Order::kAsSaved);
   const auto joined = ReadLastScan(MEROWirelessInterfaceGet()).joined;
-  std::ranges::stable_sort(networks, std::greater{}, &Network::signal);
+  const Obstacles obstacles = Obstacles::Read();
   std::vector<Found> found;
   found.reserve(networks.size());
   for (const Network& network : networks) {
     found.push_back({.network = network,
                      .isJoined = joined && std::ranges::equal(*joined, network.bssid),
                      .isKnown = std::ranges::any_of(
-                         known, [&](const KnownNetwork& other) { return IsSame(other.network, network); })});
+                         known, [&](const KnownNetwork& other) { return IsSame(other.network, network); }),
+                     .obstacle = obstacles.Of(network)});
   }
   return found;
 }
@@ -208,6 +217,7 @@ void Save(const Program& program, const NetworkToSave& wanted) {
   KnownNetwork config{};
   SetAddressing(config, wanted.addressing);
   config.network = wanted.address.empty() ? ToBeSaved(program, wanted.name) : Described(wanted);
+  RequireJoinable(program, config.network);
   if (config.network.opmode == WIRELESS_OPMODE_AUTO) config.network.opmode = WIRELESS_OPMODE_MANAGED;
   SetSecret(program, config, wanted.secret);
   const SavedNetwork saved = SaveNetwork(config, wanted.name == config.network.szEssid);

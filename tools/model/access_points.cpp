@@ -46,7 +46,7 @@ class Walk {
     const auto inRange = Heard(saved);
     if (const auto config = Through(saved, inRange)) return Try(*config);
     if (const auto pretender = Pretender(saved, inRange)) {
-      passedOver_.push_back(OnlyBearsTheName(program_, saved, *pretender));
+      passedOver_.push_back(NotAsSaved(program_, saved, *pretender));
     } else if (saved.newest.network.auth != WIRELESS_AUTH_UNKNOWN &&
                saved.newest.network.encrypt != WIRELESS_ENCRYPT_UNKNOWN) {
       unheard_.push_back(AsSaved(saved));
@@ -90,7 +90,7 @@ class Walk {
 
   std::optional<KnownNetwork> Try(const KnownNetwork& config) {
     try {
-      if (!CanBeJoined(config.network)) throw Unsupported(program_.output.Name(config.network.szEssid));
+      RequireJoinable(program_, config.network);
       RequireAddressing(config);
       join_(config);
       return config;
@@ -148,7 +148,8 @@ KnownNetwork AsChanged(const SavedNetwork& saved, const Network& accessPoint) {
   return config;
 }
 
-Failure OnlyBearsTheName(const Program& program, const SavedNetwork& saved, const Network& pretender) {
+Failure NotAsSaved(const Program& program, const SavedNetwork& saved, const Network& pretender) {
+  if (!CanBeJoined(pretender)) return Unsupported(program, pretender);
   const Network& network = saved.newest.network;
   const std::string name = program.output.Name(network.szEssid);
   const std::string was = SecurityText(network.auth, network.encrypt);

@@ -27,7 +27,7 @@ std::optional<Network> Pretender(const SavedNetwork& saved, const std::vector<Ne
 KnownNetwork AsChanged(const SavedNetwork& saved, const Network& accessPoint);
 
 // The failure of a join when there is one.
-Failure OnlyBearsTheName(const Program& program, const SavedNetwork& saved, const Network& pretender);
+Failure NotAsSaved(const Program& program, const SavedNetwork& saved, const Network& pretender);
 
 // Joins the first network that lets the appliance in, and gives how; fails with the failure that tells most. `join`
 // fails when one does not. Those that no scan shows are tried behind the others. A remark tells of each network that is

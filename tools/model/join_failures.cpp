@@ -5,6 +5,8 @@
 
 #include "model/library.h"
 #include "model/library_lines.h"
+#include "model/obstacles.h"
+#include "model/security.h"
 
 namespace {
 
@@ -44,6 +46,18 @@ std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
 
 Failure Unsupported(const std::string& name) {
   return {Exit::kUnsupported, name + " is protected in a way that cannot be joined", "`merowireless scan` shows how"};
+}
+
+Failure Unsupported(const Program& program, const Network& accessPoint) {
+  const std::string name = program.output.Name(accessPoint.szEssid);
+  const std::string how = Obstacles::Read().Of(accessPoint);
+  if (how.empty() || how == "unknown") return Unsupported(name);
+  return {Exit::kUnsupported, name + " is protected by " + how + ", and cannot be joined",
+          "it can when its access point takes plain WPA2 as well"};
+}
+
+void RequireJoinable(const Program& program, const Network& network) {
+  if (!CanBeJoined(network)) throw Unsupported(program, network);
 }
 
 Failure JoinFailed(const std::string& name, Verdict verdict) {

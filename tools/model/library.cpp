@@ -10,6 +10,7 @@
 #include "model/ap_state.h"
 #include "model/kernel_switch.h"
 #include "model/library_lines.h"
+#include "model/obstacles.h"
 #include "work/radio.h"
 
 namespace {
@@ -76,6 +77,15 @@ std::string Scanned(WIRELESS_SCAN scan) {
   return Pack(result, ring.Records());
 }
 
+// The same, of access points that are to be joined.
+std::string ScannedToJoin(WIRELESS_SCAN scan) {
+  Ring<Network> ring;
+  const int result = MEROWirelessNetworkScan(scan, ring.head());
+  std::vector<Network> networks = ring.Records();
+  HideProtectionOfObstacles(networks);
+  return Pack(result, networks);
+}
+
 // Fails when the scan did.
 std::vector<Network> AccessPointsOf(const std::string& bytes) {
   std::vector<Network> networks;
@@ -102,11 +112,11 @@ std::vector<KnownNetwork> Known(Order order) {
 std::vector<Network> LookFor(const Program& program, const std::string& name,
                              const std::function<bool(const Network&)>& isWanted) {
   const Task task = program.Doing("looking for " + program.output.Name(name));
-  auto last = AccessPointsOf(RunBytes(task, [] { return Scanned(WIRELESS_SCAN_LAST); }));
+  auto last = AccessPointsOf(RunBytes(task, [] { return ScannedToJoin(WIRELESS_SCAN_LAST); }));
   if (std::ranges::any_of(last, isWanted)) return last;
   return AccessPointsOf(RunBytes(task, [&] {
     const bool called = !ParseAddress(name) && CallNetwork(MEROWirelessInterfaceGet(), name);
-    return Scanned(called ? WIRELESS_SCAN_LAST : WIRELESS_SCAN_RENEW);
+    return ScannedToJoin(called ? WIRELESS_SCAN_LAST : WIRELESS_SCAN_RENEW);
   }));
 }
 

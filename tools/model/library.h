@@ -20,14 +20,15 @@ using KnownNetwork = WIRELESS_NETWORK_CONFIG;
 
 enum class Order { kAsSaved, kByTime };
 
-// The networks in range.
+// The networks in range, the strongest first.
 std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan);
 
 // The networks that have been saved.
 std::vector<KnownNetwork> Known(Order order);
 
 // All access points in range, the strongest first. Where the adapter's last results hold none that `isWanted`, the
-// network of this name is called, which it answers even if it hides, or else the adapter scans.
+// network of this name is called, which it answers even if it hides, or else the adapter scans. The protection of those
+// that cannot be joined is unknown.
 std::vector<Network> LookFor(const Program& program, const std::string& name,
                              const std::function<bool(const Network&)>& isWanted);
 

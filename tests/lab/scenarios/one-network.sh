@@ -89,3 +89,25 @@ on nas merowireless disconnect
 on nas merowireless forget home
 on nas merowireless known --porcelain
 expect_same 'what is known' '' "$OUTPUT"
+
+say '-- what cannot be joined is called what it is, and is not tried'
+switch_off open
+modern=(ssid=modern wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP)
+access_point sae "${modern[@]}" channel=1 wpa_key_mgmt=SAE ieee80211w=2
+access_point owe ssid=guests channel=6 wpa=2 wpa_key_mgmt=OWE rsn_pairwise=CCMP ieee80211w=2
+access_point strict ssid=strict wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP channel=6 ieee80211w=2
+access_point both ssid=both wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP channel=11 \
+  wpa_key_mgmt='WPA-PSK SAE' ieee80211w=1
+on nas merowireless scan --renew --porcelain
+expect_same 'what cannot be joined' 'both=
+guests=OWE
+modern=WPA3
+strict=WPA2 PMF' "$(awk -F '\t' '$1 != "home" { print $1 "=" $11 }' <<<"$OUTPUT" | sort)"
+for name in modern guests strict; do
+  ends_with nas 10 save "$name"
+  ends_with nas 10 connect "$name"
+done
+on nas merowireless connect both --key-file /var/lib/home.key --no-address
+expect_joined both
+on nas merowireless disconnect
+expect_nothing_left nas
