@@ -40,13 +40,14 @@ TEST_F(Output, OfAScanIsATableWithAlignedColumnsAndSignalBars) {
 }
 
 TEST_F(Output, OfAScanIsOneDocumentInJson) {
-  EXPECT_EQ(Tool({"scan", "--json"}).out,
-            R"({"result":"ok","networks":[)"
-            R"({"name":"Café du coin","signal":74,"channel":6,"auth":"WPA2PSK","encryption":"AES",)"
-            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false,"unsupported":null},)"
-            R"({"name":"guests","signal":9,"channel":11,"auth":"OPEN","encryption":"NONE",)"
-            R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false,"unsupported":null}]})"
-            "\n");
+  EXPECT_EQ(
+      Tool({"scan", "--json"}).out,
+      R"({"result":"ok","networks":[)"
+      R"({"name":"Café du coin","signal":74,"channel":6,"auth":"WPA2PSK","encryption":"AES",)"
+      R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false,"unsupported":null},)"
+      R"({"name":"guests","signal":9,"channel":11,"auth":"OPEN","encryption":"NONE",)"
+      R"("standard":"11b/g/n","address":"0A:0A:0A:0A:0A:0A","name_hex":null,"joined":false,"known":false,"unsupported":null}]})"
+      "\n");
 }
 
 TEST_F(Output, OfAScanIsARecordALineForScripts) {

@@ -220,4 +220,31 @@ TEST_F(RefusedJoin, ByAutoconnectTellsThemApartToo) {
   EXPECT_THAT(absent.err, HasSubstr("none of the known networks could be joined"));
 }
 
+// The supplicant goes to the strongest again and again, so whoever bore the name could keep the appliance out.
+TEST_F(RefusedJoin, ByAStrangerOfTheNameIsTriedThroughTheAccessPointsThatTheNetworkWasSavedWith) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG* config) {
+    library::Record(AddressText(config->network.bssid) + (config->noneBssid != 0 ? " or any" : " alone"));
+    return config->noneBssid != 0 ? ::pause() : 0;
+  };
+  library::InRange({Network("Home")});
+  const auto wayOf = [](const std::string& command, const std::string& accessPoint) {
+    const std::size_t before = library::Calls().size();
+    Supplicant supplicant;
+    StartedTool tool(command == "connect" ? std::vector<std::string>{command, "Home"} : std::vector{command});
+    EXPECT_EQ(supplicant.Request(), "ATTACH");
+    EXPECT_TRUE(Soon([&] { return library::Calls().size() > before + 1; }));
+    supplicant.Say("<3>Associated with " + accessPoint);
+    supplicant.Say("<3>CTRL-EVENT-SSID-TEMP-DISABLED id=0 ssid=\"Home\" reason=WRONG_KEY");
+    const int status = tool.Wait().status;
+    const auto calls = library::Calls();
+    return std::to_string(status) + " " + *std::find_if(calls.rbegin(), calls.rend(), [](const std::string& call) {
+             return call.find(':') != call.npos;
+           });
+  };
+  for (const char* szCommand : {"connect", "autoconnect"}) {
+    EXPECT_EQ(wayOf(szCommand, "0a:0a:0a:0a:0a:0b"), "0 0A:0A:0A:0A:0A:0A alone");
+    EXPECT_EQ(wayOf(szCommand, "0a:0a:0a:0a:0a:0a"), "5 0A:0A:0A:0A:0A:0A or any") << "its own need not be asked twice";
+  }
+}
+
 }  // namespace

@@ -71,7 +71,8 @@ void Join(const Program& program, const KnownNetwork& config) {
     if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&config); }) >= 0) return;
   } catch (const Pointless&) {
   }
-  throw JoinFailed(name, listener.verdict());
+  if (listener.verdict() != Verdict::kSecretRefused) throw JoinFailed(name, listener.verdict());
+  throw SecretRefused(JoinFailed(name, listener.verdict()), listener.accessPoint());
 }
 
 // ---- Addressing ----
@@ -88,24 +89,30 @@ void ApplyAddressing(const Program& program, const KnownNetwork& config) {
 struct Target {
   KnownNetwork config;
   bool isInRange;
-  std::optional<SavedNetwork> changed;  // what it was saved as, where that is no longer so
+  std::vector<Network> trusted = {};  // access points that are tried alone where another one refuses the secret
 };
+
+void Join(const Program& program, const Target& target) {
+  JoinTrusting(target.config, target.trusted, [&](const KnownNetwork& config) { Join(program, config); });
+}
 
 // The network of those known by one name that is in range.
 Target TargetAmong(const Program& program, const std::vector<SavedNetwork>& known, const std::vector<Network>& inRange,
                    bool isChanged) {
   for (const SavedNetwork& saved : known) {
-    if (const auto config = Through(saved, inRange)) return {*config, true, std::nullopt};
+    if (const auto config = Through(saved, inRange)) {
+      return {.config = *config, .isInRange = true, .trusted = Trusted(saved, inRange)};
+    }
   }
   const SavedNetwork& newest = known.front();
   const auto pretender = Pretender(newest, inRange);
-  if (!pretender) return {AsSaved(newest), false, std::nullopt};
+  if (!pretender) return {.config = AsSaved(newest), .isInRange = false};
   if (!isChanged) throw NotAsSaved(program, newest, *pretender);
-  return {AsChanged(newest, *pretender), true, newest};
+  return {.config = AsChanged(newest, *pretender), .isInRange = true};
 }
 
 Target FromWhatIsKnown(const Program& program, const std::vector<SavedNetwork>& known, bool isChanged) {
-  if (known.front().isCell()) return {AsSaved(known.front()), true, std::nullopt};
+  if (known.front().isCell()) return {.config = AsSaved(known.front()), .isInRange = true};
   return TargetAmong(program, known, LookFor(program, known.front()), isChanged);
 }
 
@@ -120,7 +127,7 @@ Target FromTheAir(const Program& program, const NetworkToJoin& wanted) {
   config.network.opmode = WIRELESS_OPMODE_MANAGED;
   SetAddressing(config, Addressing{});
   config.noneBssid = wanted.name == accessPoint.szEssid ? 1 : 0;
-  return {config, true, std::nullopt};
+  return {.config = config, .isInRange = true};
 }
 
 Failure NotInRange(const Program& program, const Target& target) {
@@ -177,7 +184,7 @@ void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target
   if (former.exists() && !target.isInRange) throw NotInRange(program, target);
   Saving saving = Saving::kNothing;
   former.Try([&] {
-    Join(program, target.config);
+    Join(program, target);
     if (!wanted.noSave) saving = SaveWhatWorked(target.config, wanted.name == target.config.network.szEssid);
     if (!wanted.noAddress) ApplyAddressing(program, target.config);
   });
@@ -206,7 +213,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
 
 void JoinAgain(const Program& program, const std::string& name) {
   const Target target = FromWhatIsKnown(program, SavedAs(name), false);
-  Join(program, target.config);
+  Join(program, target);
   ApplyAddressing(program, target.config);
 }
 

@@ -2,6 +2,7 @@
 #include "model/access_points.h"
 
 #include <algorithm>
+#include <iterator>
 #include <string_view>
 
 #include "base/terminal.h"
@@ -21,6 +22,11 @@ bool IsOf(const SavedNetwork& saved, const Network& accessPoint) {
 
 bool IsAsSaved(const SavedNetwork& saved, const Network& accessPoint) {
   return IsOf(saved, accessPoint) && IsProtectedAlike(saved.newest.network, accessPoint);
+}
+
+bool WasSavedWith(const SavedNetwork& saved, const Network& accessPoint) {
+  return std::ranges::any_of(saved.addresses,
+                             [&](const Address& address) { return std::ranges::equal(address, accessPoint.bssid); });
 }
 
 // ---- Trying one after the other ----
@@ -44,7 +50,7 @@ class Walk {
   std::optional<KnownNetwork> TryInRange(const SavedNetwork& saved) {
     if (saved.isCell()) return Try(AsSaved(saved));
     const auto inRange = Heard(saved);
-    if (const auto config = Through(saved, inRange)) return Try(*config);
+    if (const auto config = Through(saved, inRange)) return Try(*config, Trusted(saved, inRange));
     if (const auto pretender = Pretender(saved, inRange)) {
       passedOver_.push_back(NotAsSaved(program_, saved, *pretender));
     } else if (saved.newest.network.auth != WIRELESS_AUTH_UNKNOWN &&
@@ -88,11 +94,11 @@ class Walk {
     }
   }
 
-  std::optional<KnownNetwork> Try(const KnownNetwork& config) {
+  std::optional<KnownNetwork> Try(const KnownNetwork& config, const std::vector<Network>& trusted = {}) {
     try {
       RequireJoinable(program_, config.network);
       RequireAddressing(config);
-      join_(config);
+      JoinTrusting(config, trusted, join_);
       return config;
     } catch (const Failure& failure) {
       if (!IsOfOneNetwork(failure)) throw;
@@ -123,6 +129,38 @@ std::optional<KnownNetwork> Through(const SavedNetwork& saved, const std::vector
   config.network = *found;
   config.network.opmode = WIRELESS_OPMODE_MANAGED;
   return config;
+}
+
+std::vector<Network> Trusted(const SavedNetwork& saved, const std::vector<Network>& inRange) {
+  std::vector<Network> trusted;
+  std::ranges::copy_if(inRange, std::back_inserter(trusted), [&](const Network& accessPoint) {
+    return IsAsSaved(saved, accessPoint) && WasSavedWith(saved, accessPoint);
+  });
+  return trusted;
+}
+
+void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& trusted,
+                  const std::function<void(const KnownNetwork&)>& join) {
+  std::optional<SecretRefused> refusal;
+  const auto isJoined = [&](const KnownNetwork& way) {
+    try {
+      join(way);
+      return true;
+    } catch (const SecretRefused& failure) {
+      if (!failure.IsByStranger(trusted)) throw;
+      refusal = failure;
+      return false;
+    }
+  };
+  if (isJoined(config)) return;
+  for (const Network& accessPoint : trusted) {
+    KnownNetwork alone = config;
+    alone.network = accessPoint;
+    alone.network.opmode = WIRELESS_OPMODE_MANAGED;
+    alone.noneBssid = 0;
+    if (isJoined(alone)) return;
+  }
+  throw SecretRefused(*refusal);
 }
 
 KnownNetwork AsSaved(const SavedNetwork& saved) {

@@ -16,6 +16,14 @@ std::vector<Network> LookFor(const Program& program, const SavedNetwork& saved);
 // supplicant may change to another one. Nothing when none is among those in range.
 std::optional<KnownNetwork> Through(const SavedNetwork& saved, const std::vector<Network>& inRange);
 
+// Those in range that it was saved with, the strongest first.
+std::vector<Network> Trusted(const SavedNetwork& saved, const std::vector<Network>& inRange);
+
+// Joins a network, and where none of these access points refuses its secret, but another one, through each of them
+// alone: the other may only pretend to be one of the network.
+void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& trusted,
+                  const std::function<void(const KnownNetwork&)>& join);
+
 // How a network is joined that no scan shows: it may hide, or come into range.
 KnownNetwork AsSaved(const SavedNetwork& saved);
 

@@ -2,9 +2,13 @@
 #ifndef MERO_TOOLS_JOIN_FAILURES_H
 #define MERO_TOOLS_JOIN_FAILURES_H
 
+#include <algorithm>
+#include <optional>
 #include <string>
+#include <vector>
 
 #include "base/failure.h"
+#include "base/text.h"
 #include "model/library.h"
 #include "work/program.h"
 #include "work/supplicant.h"
@@ -20,6 +24,21 @@ void RequireJoinable(const Program& program, const Network& network);
 
 // Why an attempt of the library failed, by its reports and by what the supplicant said.
 Failure JoinFailed(const std::string& name, Verdict verdict);
+
+// A join that has failed since an access point refused the secret.
+class SecretRefused : public Failure {
+ public:
+  SecretRefused(const Failure& failure, const std::optional<Address>& by) : Failure(failure), by_(by) {}
+
+  // Whether it was another one than these. The supplicant may not have told.
+  bool IsByStranger(const std::vector<Network>& known) const {
+    return by_ && std::ranges::none_of(
+                      known, [&](const Network& accessPoint) { return std::ranges::equal(*by_, accessPoint.bssid); });
+  }
+
+ private:
+  std::optional<Address> by_;
+};
 
 // Something of a connection has stayed.
 Failure NotEnded();

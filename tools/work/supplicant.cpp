@@ -64,6 +64,13 @@ bool IsFinal(std::string_view event) {
   return clue != nullptr && clue->isFinal;
 }
 
+std::optional<Address> AccessPointIn(std::string_view event) {
+  constexpr std::string_view kStart = "Associated with ";
+  constexpr std::size_t kAddressSize = std::string_view("00:11:22:33:44:55").size();
+  event = WithoutLevel(event);
+  return event.starts_with(kStart) ? ParseAddress(event.substr(kStart.size(), kAddressSize)) : std::nullopt;
+}
+
 SupplicantListener::SupplicantListener(std::string path) : path_(std::move(path)) {}
 
 // The kernel chooses the address to which the answers come, so that no file is left behind.
@@ -103,6 +110,7 @@ void SupplicantListener::Receive() {
     const std::string_view text(event, static_cast<std::size_t>(size));
     verdict_ = std::max(verdict_, VerdictOf(text));
     final_ = final_ || IsFinal(text);
+    if (const auto asked = AccessPointIn(text)) accessPoint_ = asked;
     if (WithoutLevel(text).starts_with(kLeaving)) socket_.Close();
   }
 }

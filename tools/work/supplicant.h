@@ -3,9 +3,11 @@
 #define MERO_TOOLS_SUPPLICANT_H
 
 #include <chrono>
+#include <optional>
 #include <string>
 #include <string_view>
 
+#include "base/text.h"
 #include "common/descriptor.h"
 #include "work/listener.h"
 
@@ -23,6 +25,9 @@ Verdict VerdictOf(std::string_view event);
 // Whether the supplicant has come to a verdict by itself, and will not try the network again for longer than a join
 // lasts. What it says of a single step, such as a handshake, is none.
 bool IsFinal(std::string_view event);
+
+// The access point of an event that tells of being its station, such as "<3>Associated with 02:00:00:00:01:00".
+std::optional<Address> AccessPointIn(std::string_view event);
 
 // Listens to the control socket of the supplicant. Supplicants may come and go meanwhile.
 class SupplicantListener final : public Listener {
@@ -43,6 +48,9 @@ class SupplicantListener final : public Listener {
   // Whether it is final.
   bool isFinal() const { return final_; }
 
+  // The one that the supplicant was the station of last.
+  const std::optional<Address>& accessPoint() const { return accessPoint_; }
+
  private:
   bool Attach();
 
@@ -51,6 +59,7 @@ class SupplicantListener final : public Listener {
   std::chrono::steady_clock::time_point lastAsked_;
   Verdict verdict_ = Verdict::kNone;
   bool final_ = false;
+  std::optional<Address> accessPoint_;
 };
 
 #endif  // MERO_TOOLS_SUPPLICANT_H

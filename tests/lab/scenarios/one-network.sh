@@ -63,6 +63,11 @@ expect_same 'the secrets that were saved' 2 "$(inside nas grep -c 'KEY=the old p
 
 say '-- who only bears the name gets no station'
 switch_off far
+access_point other ssid=home channel=6 wpa=2 wpa_passphrase='another secret' rsn_pairwise=CCMP signal=-20
+on nas merowireless connect home
+expect_joined near
+on nas merowireless disconnect
+switch_off other
 access_point open ssid=home channel=6 signal=-20
 access_point old ssid=home channel=6 wpa=1 wpa_passphrase='the old printer' wpa_pairwise=TKIP signal=-20
 on nas merowireless connect home
