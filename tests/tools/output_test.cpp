@@ -239,6 +239,34 @@ TEST_F(Output, OfTheStatusLeavesOutAStandardThatNoScanHasTold) {
   EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("standard":"unknown")"));
 }
 
+// It was "UNKNOWN" once the supplicant had changed to another access point of the network: the library notes the
+// protection of the one that it joined.
+TEST_F(Output, OfTheStatusTellsTheProtectionWhicheverAccessPointItIs) {
+  library::Connected("Home");
+  library::MEROWirelessCurInfoGet = [](WIRELESS_REQUEST request, PWIRELESS_INFO info) {
+    if (request == REQUEST_ESSID) std::strcpy(info->szEssid, "Home");
+    if (request == REQUEST_AUTH) info->auth = WIRELESS_AUTH_UNKNOWN;
+    return 0;
+  };
+  const auto isTold = [](const char* szAuth) {
+    return HasSubstr(std::string(R"("name":"Home","auth":")") + szAuth + '"');
+  };
+  EXPECT_THAT(Tool({"status", "--json"}).out, isTold("UNKNOWN"));
+  const std::string settings =
+      "network={\n\tssid=\"Home\"\n\tkey_mgmt=WPA-PSK\n\tpairwise=CCMP\n\tpsk=\"open sesame\"\n}\n";
+  WriteText("/usr/mero/etc/wpa_supplicant.conf", settings);
+  EXPECT_THAT(Tool({"status", "--json"}).out, isTold("WPA2PSK"));
+  WIRELESS_NETWORK_CONFIG newest = library::Home();
+  newest.network.auth = WIRELESS_AUTH_OPEN;
+  newest.szKey[0] = '\0';
+  WIRELESS_NETWORK_CONFIG old = library::Home();
+  old.network.auth = WIRELESS_AUTH_WPAPSK;
+  library::Known({newest, old});
+  EXPECT_THAT(Tool({"status", "--json"}).out, isTold("WPAPSK"));
+  WriteText("/usr/mero/etc/wpa_supplicant.conf", "network={\n\tssid=\"Office\"\n\tkey_mgmt=NONE\n}\n");
+  EXPECT_THAT(Tool({"status", "--json"}).out, isTold("UNKNOWN"));
+}
+
 TEST_F(Output, OfTheStatusTellsAnAccessPoint) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_UNKNOWN; };
   EXPECT_THAT(Tool({"status"}).out, HasSubstr("status        unknown\n"));

@@ -5,11 +5,17 @@
 #include <ifaddrs.h>
 
 #include <algorithm>
+#include <cstring>
 #include <memory>
 
 #include "base/clock.h"
+#include "base/failure.h"
+#include "base/whole_file.h"
+#include "common/paths.h"
 #include "model/ap_state.h"
+#include "model/library.h"
 #include "model/security.h"
+#include "model/supplicant_settings.h"
 #include "platform.h"
 
 namespace {
@@ -148,6 +154,23 @@ void Ask(WIRELESS_REQUEST request, Answer WIRELESS_INFO::*member, Answer& answer
   if (MEROWirelessCurInfoGet(request, &info) == 0) answer = info.*member;
 }
 
+// The library has noted it of the access point that it joined. The supplicant, which may be with another one of the
+// network by now, has it as it was saved.
+WIRELESS_AUTH AuthOfSupplicant(const std::string& name) {
+  const auto given = ConfiguredNetwork(TextOfFile(kSupplicantConfigPath).value_or(""));
+  if (!given || name != given->network.szEssid) return WIRELESS_AUTH_UNKNOWN;
+  try {
+    for (const KnownNetwork& known : AllKnown(name)) {
+      const bool isSame =
+          known.network.encrypt == given->network.encrypt && std::strcmp(known.szKey, given->szKey) == 0;
+      if (isSame) return known.network.auth;
+    }
+  } catch (const Failure&) {
+    // The known networks cannot be read: the supplicant's settings tell all but the kind of WPA.
+  }
+  return given->network.auth;
+}
+
 }  // namespace
 
 Status ReadStatus() {
@@ -164,6 +187,7 @@ Status ReadStatus() {
   WIRELESS_INFO info{};
   if (MEROWirelessCurInfoGet(REQUEST_ESSID, &info) == 0) status.name = info.szEssid;
   Ask(REQUEST_AUTH, &WIRELESS_INFO::auth, status.auth);
+  if (status.auth == WIRELESS_AUTH_UNKNOWN) status.auth = AuthOfSupplicant(status.name);
   Ask(REQUEST_PROTOCOL, &WIRELESS_INFO::protocol, status.protocol);
   Ask(REQUEST_MODE, &WIRELESS_INFO::opmode, status.mode);
   return status;
