@@ -93,6 +93,9 @@ inline constexpr char kDhcpDirectory[] = "/etc/dhcpd";
 inline constexpr char kDhcpConfFormat[] = "/etc/dhcpd/dhcpd-%s-%s.conf";
 inline constexpr char kDhcpInfoFormat[] = "/etc/dhcpd/dhcpd-%s-%s.info";
 
+// What the DHCP server of a bridge has leased, unless its settings name another file.
+inline constexpr char kLeasesFormat[] = "/var/run/rc.network/dnsmasq-%s.leases";
+
 // The file from which the network start script knows an interface or a bridge.
 inline constexpr char kInterfaceScriptDirectory[] = "/etc/sysconfig/network-scripts";
 inline constexpr char kInterfaceScriptFormat[] = "/etc/sysconfig/network-scripts/ifcfg-%s";

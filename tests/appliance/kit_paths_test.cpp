@@ -50,6 +50,8 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
       {"fail() { printf '%s' \"$host\"; exit; }; write_configuration if0 /tmp/file", PathOf(kHostapdHostFormat)},
       {"end_dnsmasq() { :; }; " + asks + "serve_addresses if0", PathOf(kDhcpInfoFormat)},
       {serves + "serve_addresses if0", PathOf(kDhcpConfFormat)},
+      {"ask() { return 1; }; dnsmasq() { printf '%s' \"${6#*=}\"; exit; }; run_dnsmasq if0 file",
+       PathOf(kLeasesFormat)},
       {ends + "end_client if0", kSupplicantPidPath},
       {ends + "end_lease if0", PathOf(kDhcpClientPidFormat)},
       {"attempt() { eval \"printf '%s' \\\"\\${$#}\\\"\"; }; lease_address if0", kLeaseScript},

@@ -543,6 +543,8 @@ TEST_F(AccessPoint, CountsItsGuestsAmongItsStations) {
   kernel::Main().stations = 2;
   kernel::Guests() = kernel::Main();
   EXPECT_THAT(StatusDocument(), HasSubstr(R"("stations":4,)"));
+  kernel::Guests().joining = 1;
+  EXPECT_THAT(StatusDocument(), HasSubstr(R"("stations":3,)")) << "who is not let in is none";
 }
 
 TEST_F(AccessPoint, ThatThereIsNoneOfIsOff) {

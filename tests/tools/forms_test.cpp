@@ -10,6 +10,7 @@
 #include <sstream>
 
 #include "common/text.h"
+#include "hostapd_fake.h"
 #include "running.h"
 
 namespace {
@@ -63,6 +64,17 @@ void InACountry() {
   CopyText(kernel::RulesNow().szKernel, "DE");
 }
 
+void WithStations() {
+  OnTheAir();
+  kernel::Guests() = kernel::Main();
+  kernel::Guests().joining = 1;
+}
+
+void WithoutStations() {
+  OnTheAir();
+  kernel::Main().stations = 0;
+}
+
 // ---- What each command says ----
 
 struct Command {
@@ -87,6 +99,9 @@ const Command kCommands[] = {
     {OnTheAir, {"ap", "enable"}},
     {OffTheAir, {"ap", "disable"}},
     {OnTheAir, {"ap", "status"}},
+    {WithStations, {"ap", "stations"}},
+    {WithoutStations, {"ap", "stations"}},
+    {OnTheAir, {"ap", "kick", "02:00:00:00:00:01"}},
     {OnTheAir, {"mode", "client"}},
     {Connected, {"mode", "ap"}},
     {Connected, {"radio"}},
@@ -120,7 +135,11 @@ class Forms : public ToolTest {
     WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
     WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "ssid=Old Office\n");
     WriteText("/usr/mero/etc/wireless_country.conf", "country=\"DE\"\n");
+    kernel::PutInBridge();
+    WriteText("/var/run/rc.network/dnsmasq-lbr0.leases", "0 02:00:00:00:00:00 10.1.14.23 tablet *\n");
   }
+
+  Hostapd hostapd_;
 };
 
 TEST_F(Forms, OfEveryCommandAreAsTheyAlwaysWere) {

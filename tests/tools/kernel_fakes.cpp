@@ -16,6 +16,7 @@
 #include "library_fakes.h"
 #include "model/wireless_stack.h"
 #include "tests/support/files.h"
+#include "tests/support/shell.h"
 
 namespace kernel {
 
@@ -68,10 +69,20 @@ std::string Description(const Interface& interface) {
   });
 }
 
-std::string Station(int number) {
+// The first one has been there for an hour, and each one after it for a minute.
+std::string Station(int number, bool isLetIn) {
   return MessageOf(NL80211_CMD_NEW_STATION, [&](nl_msg* message) {
     const unsigned char address[] = {2, 0, 0, 0, 0, static_cast<unsigned char>(number)};
+    const nl80211_sta_flag_update flags{1U << NL80211_STA_FLAG_AUTHORIZED,
+                                        isLetIn ? 1U << NL80211_STA_FLAG_AUTHORIZED : 0};
     nla_put(message, NL80211_ATTR_MAC, sizeof address, address);
+    nlattr* nest = nla_nest_start(message, NL80211_ATTR_STA_INFO);
+    nla_put_u8(message, NL80211_STA_INFO_SIGNAL, static_cast<std::uint8_t>(-40 - 5 * number));
+    nla_put_u64(message, NL80211_STA_INFO_RX_BYTES64, number == 0 ? 123'456'789 : 900);
+    nla_put_u64(message, NL80211_STA_INFO_TX_BYTES64, number == 0 ? 5'000'000'000 : 1'234);
+    nla_put_u32(message, NL80211_STA_INFO_CONNECTED_TIME, number == 0 ? 3600 : 60);
+    nla_put(message, NL80211_STA_INFO_STA_FLAGS, sizeof flags, &flags);
+    nla_nest_end(message, nest);
   });
 }
 
@@ -166,6 +177,12 @@ void AppearWith(const char* szPath, std::string_view name) {
   CopyText(Shared().szAppearing, name);
 }
 
+void PutInBridge() {
+  Shell(
+      "mountpoint -q /sys/class/net || { mount -t tmpfs scratch /sys/class/net &&"
+      "mkdir /sys/class/net/wlan0 && ln -s ../lbr0 /sys/class/net/wlan0/master; }");
+}
+
 void Appear() {
   State& state = Shared();
   if (state.szAppearsWith[0] != '\0' && Exists(state.szAppearsWith)) BecomeAccessPoint(state.szAppearing);
@@ -184,7 +201,7 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
   if (!asked.isThere) return messages;
   if (command == NL80211_CMD_GET_INTERFACE) messages.push_back(kernel::Description(asked));
   if (command == NL80211_CMD_GET_STATION) {
-    for (int i = 0; i < asked.stations; ++i) messages.push_back(kernel::Station(i));
+    for (int i = 0; i < asked.stations; ++i) messages.push_back(kernel::Station(i, i < asked.stations - asked.joining));
     if (asked.signal != 0) messages.push_back(kernel::AccessPoint(asked));
   }
   if (command == NL80211_CMD_GET_WIPHY) {

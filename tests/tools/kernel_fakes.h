@@ -33,10 +33,11 @@ struct Interface {
   nl80211_iftype type;
   unsigned megahertz;  // of its channel; 0 for none
   char szName[33];
-  int stations;
+  int stations = 0;         // that it has as an access point, 02:00:00:00:00:00 and so on
   int signal = 0;           // of the access point that it is joined to; 0 while it is joined to none
   unsigned rate = 0;        // in tenths of a megabit
   unsigned secondsAgo = 0;  // when it was joined
+  int joining = 0;          // how many of its stations, the last ones, it has not let in yet
 };
 
 // wlan0 and the guests'. Processes of the program's own see them too, and change them for all.
@@ -75,6 +76,9 @@ void BecomeJoined();
 
 // wlan0 is an access point's on the air, too, once there is a file at this path: a script can make one.
 void AppearWith(const char* szPath, std::string_view name);
+
+// wlan0 is in the bridge lbr0, as the kernel shows it among its files, from now on.
+void PutInBridge();
 
 }  // namespace kernel
 

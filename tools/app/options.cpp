@@ -22,6 +22,7 @@
 #include "commands/country.h"
 #include "commands/keep.h"
 #include "commands/networks.h"
+#include "commands/stations.h"
 #include "commands/watch.h"
 #include "model/ap_settings.h"
 #include "model/library.h"
@@ -277,6 +278,13 @@ void AddApCommands(Commands& commands, CLI::App& app) {
   commands.AddPlain(*ap, "enable", "Put the access point on the air", WithAdapter(EnableAp));
   commands.AddPlain(*ap, "disable", "Take the access point down", DisableAp);
   commands.AddPlain(*ap, "status", "Show whether the access point is on the air", ShowApStatus);
+  commands.AddPlain(*ap, "stations", "List the stations of the access point", WithAdapter(ShowStations));
+  commands.Add<std::string>(
+      *ap, "kick", "Make a station leave, which may come back",
+      [](CLI::App& command, std::string& address) {
+        command.add_option("station", address, "its address")->required()->option_text("ADDRESS");
+      },
+      WithAdapter(KickStation));
 }
 
 void ChangeModeTo(const Program& program, const std::string& mode) {

@@ -88,7 +88,3 @@ std::vector<Channel> ChannelsOf(const std::string& interface) {
   std::ranges::sort(channels, {}, &Channel::megahertz);
   return channels;
 }
-
-int StationsOf(const std::string& interface) {
-  return static_cast<int>(AskWirelessStack(NL80211_CMD_GET_STATION, interface, true).size());
-}

@@ -29,7 +29,4 @@ struct Channel {
 // In ascending order; nothing without such an interface, or a wireless one.
 std::vector<Channel> ChannelsOf(const std::string& interface);
 
-// How many stations an access point has.
-int StationsOf(const std::string& interface);
-
 #endif  // MERO_TOOLS_AIR_H

@@ -7,6 +7,7 @@
 #include "common/paths.h"
 #include "model/air.h"
 #include "model/ap_files.h"
+#include "model/stations.h"
 
 namespace {
 
@@ -101,9 +102,7 @@ ApStatus ReadApStatus(const ApConf& conf) {
   status.nameOnAir = air->name;
   status.channel = air->channel;
   status.megahertz = air->megahertz;
-  if (status.state == ApState::kOnAir) {
-    status.stations = StationsOf(status.interface) + StationsOf(kGuestInterface);
-  }
+  if (status.state == ApState::kOnAir) status.stations = CountStations();
   status.isPending = WasGivenOthers(status.interface, conf);
   return status;
 }

@@ -2,13 +2,12 @@
 #include "work/supplicant.h"
 
 #include <sys/socket.h>
-#include <sys/un.h>
 
 #include <algorithm>
 #include <cstring>
 #include <iterator>
 
-#include "base/require.h"
+#include "work/control_socket.h"
 
 namespace {
 
@@ -47,11 +46,6 @@ const Clue* ClueOf(std::string_view event) {
   return found != std::end(kClues) ? found : nullptr;
 }
 
-bool Send(int fd, std::string_view request) {
-  return ::send(fd, request.data(), request.size(), MSG_DONTWAIT | MSG_NOSIGNAL) ==
-         static_cast<ssize_t>(request.size());
-}
-
 }  // namespace
 
 Verdict VerdictOf(std::string_view event) {
@@ -73,17 +67,9 @@ std::optional<Address> AccessPointIn(std::string_view event) {
 
 SupplicantListener::SupplicantListener(std::string path) : path_(std::move(path)) {}
 
-// The kernel chooses the address to which the answers come, so that no file is left behind.
 bool SupplicantListener::Attach() {
-  sockaddr_un address{};
-  address.sun_family = AF_UNIX;
-  if (path_.size() >= sizeof address.sun_path) return false;
-  std::copy(path_.begin(), path_.end(), address.sun_path);
-
-  socket_ = Descriptor(Require(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0), "socket"));
-  const auto* any = reinterpret_cast<const sockaddr*>(&address);
-  return ::bind(socket_.get(), any, sizeof address.sun_family) == 0 &&
-         ::connect(socket_.get(), any, sizeof address) == 0 && Send(socket_.get(), "ATTACH");
+  socket_ = ConnectToDaemon(path_);
+  return socket_.valid() && SendToDaemon(socket_, "ATTACH");
 }
 
 void SupplicantListener::Tick() {
@@ -96,7 +82,7 @@ void SupplicantListener::Tick() {
   }
   if (now - lastAsked_ < kPatience) return;
   lastAsked_ = now;
-  if (!Send(socket_.get(), "PING") && errno != EAGAIN) socket_.Close();
+  if (!SendToDaemon(socket_, "PING") && errno != EAGAIN) socket_.Close();
 }
 
 void SupplicantListener::Receive() {

@@ -72,6 +72,10 @@ on nas merowireless disconnect
 
 recipe nas 'Become an access point'
 guest_of nas shelf essid='My NAS' auth=WPA2PSK encrypt=AES key='the old printer'
+
+recipe nas 'See who is on the access point'
+grep -qi "^.* $(address_of shelf)  *10\.1\.14\." <<<"$OUTPUT" || fail "shelf is not listed: $OUTPUT"
+grep -qi "$(address_of shelf).* has left the access point" <<<"$OUTPUT" || fail "shelf has not left: $OUTPUT"
 leaves shelf
 
 # A Wednesday.

@@ -1,0 +1,198 @@
+// The stations of the access point, by the kernel, and what they have leased.
+#include "model/stations.h"
+
+#include <netlink/genl/genl.h>
+
+#include <algorithm>
+#include <array>
+#include <chrono>
+#include <cstring>
+#include <filesystem>
+#include <system_error>
+
+#include "base/clock.h"
+#include "common/paths.h"
+#include "model/leases.h"
+#include "model/wireless_stack.h"
+#include "wireless.h"
+
+namespace {
+
+// ---- By the kernel ----
+
+// What there is about a station, by its kind. The attributes lie within the message.
+using Facts = std::array<nlattr*, NL80211_STA_INFO_MAX + 1>;
+
+nlattr* AttributeOf(std::string& message, int kind) {
+  auto* header = reinterpret_cast<nlmsghdr*>(message.data());
+  if (!genlmsg_valid_hdr(header, 0)) return nullptr;
+  const auto* body = static_cast<const genlmsghdr*>(nlmsg_data(header));
+  return nla_find(genlmsg_attrdata(body, 0), genlmsg_attrlen(body, 0), kind);
+}
+
+bool ReadFacts(std::string& message, Facts& facts) {
+  nla_policy policy[NL80211_STA_INFO_MAX + 1] = {};
+  policy[NL80211_STA_INFO_SIGNAL].type = NLA_U8;
+  policy[NL80211_STA_INFO_RX_BYTES64].type = NLA_U64;
+  policy[NL80211_STA_INFO_TX_BYTES64].type = NLA_U64;
+  policy[NL80211_STA_INFO_CONNECTED_TIME].type = NLA_U32;
+  policy[NL80211_STA_INFO_ASSOC_AT_BOOTTIME].type = NLA_U64;
+  policy[NL80211_STA_INFO_STA_FLAGS].minlen = sizeof(nl80211_sta_flag_update);
+  nlattr* nest = AttributeOf(message, NL80211_ATTR_STA_INFO);
+  return nest != nullptr && nla_parse_nested(facts.data(), NL80211_STA_INFO_MAX, nest, policy) == 0;
+}
+
+std::int64_t NumberOf(const nlattr* attribute) {
+  return attribute != nullptr ? static_cast<std::int64_t>(nla_get_u64(attribute)) : 0;
+}
+
+std::chrono::nanoseconds Now(clockid_t clock) {
+  timespec now{};
+  ::clock_gettime(clock, &now);
+  return std::chrono::seconds(now.tv_sec) + std::chrono::nanoseconds(now.tv_nsec);
+}
+
+// When it has come, by the clock on the wall. The kernel tells how long ago that is in whole seconds, or by the
+// machine's own clock, so that each look gives the same.
+std::time_t SinceOf(const Station& station, const nlattr* seconds) {
+  if (station.associatedAt != 0) {
+    const auto ago = Now(CLOCK_BOOTTIME) - std::chrono::nanoseconds(station.associatedAt);
+    return std::chrono::duration_cast<std::chrono::seconds>(Now(CLOCK_REALTIME) - ago).count();
+  }
+  return seconds != nullptr ? std::time(nullptr) - static_cast<std::time_t>(nla_get_u32(seconds)) : 0;
+}
+
+// A driver that does not tell has let it in.
+bool IsLetIn(const nlattr* attribute) {
+  constexpr auto kLetIn = 1U << NL80211_STA_FLAG_AUTHORIZED;
+  if (attribute == nullptr) return true;
+  nl80211_sta_flag_update flags;
+  std::memcpy(&flags, nla_data(attribute), sizeof flags);
+  return (flags.mask & kLetIn) == 0 || (flags.set & kLetIn) != 0;
+}
+
+std::optional<Station> StationIn(std::string& message) {
+  const nlattr* address = AttributeOf(message, NL80211_ATTR_MAC);
+  Facts facts;
+  if (address == nullptr || nla_len(address) != sizeof(Address) || !ReadFacts(message, facts)) return std::nullopt;
+  Station station;
+  std::memcpy(station.address.data(), nla_data(address), sizeof(Address));
+  station.isLetIn = IsLetIn(facts[NL80211_STA_INFO_STA_FLAGS]);
+  if (const nlattr* signal = facts[NL80211_STA_INFO_SIGNAL]) station.signal = static_cast<int8_t>(nla_get_u8(signal));
+  station.received = NumberOf(facts[NL80211_STA_INFO_RX_BYTES64]);
+  station.sent = NumberOf(facts[NL80211_STA_INFO_TX_BYTES64]);
+  station.associatedAt = static_cast<std::uint64_t>(NumberOf(facts[NL80211_STA_INFO_ASSOC_AT_BOOTTIME]));
+  station.since = SinceOf(station, facts[NL80211_STA_INFO_CONNECTED_TIME]);
+  return station;
+}
+
+std::vector<Station> StationsOn(const std::string& interface) {
+  std::vector<Station> stations;
+  for (std::string& message : AskWirelessStack(NL80211_CMD_GET_STATION, interface, true)) {
+    auto station = StationIn(message);
+    if (!station) continue;
+    station->interface = interface;
+    stations.push_back(*std::move(station));
+  }
+  std::ranges::sort(stations, {}, &Station::address);
+  return stations;
+}
+
+// ---- By their leases ----
+
+// The bridge that an interface is in; empty when it is in none.
+std::string BridgeOf(const std::string& interface) {
+  std::error_code error;
+  return std::filesystem::read_symlink("/sys/class/net/" + interface + "/master", error).filename();
+}
+
+void AddLeases(std::vector<Station>& stations, const std::string& interface) {
+  const auto leases = LeasesOf(BridgeOf(interface));
+  for (Station& station : stations) {
+    const auto lease = std::ranges::find(leases, station.address, &Lease::address);
+    if (lease == leases.end()) continue;
+    station.ip = lease->ip;
+    station.name = lease->name;
+  }
+}
+
+// ---- As they are shown ----
+
+std::string TextOf(const Address& address) {
+  unsigned char octets[std::tuple_size_v<Address>];
+  std::ranges::copy(address, octets);
+  return AddressText(octets);
+}
+
+// A size in four characters at most, such as "340k".
+std::string ShortSize(std::int64_t bytes) {
+  constexpr std::string_view kUnits = "kMGTPE";
+  constexpr std::int64_t kThousand = 1000;
+  if (bytes < kThousand) return std::to_string(bytes);
+  std::size_t unit = 0;
+  while (bytes >= kThousand * kThousand) {
+    bytes /= kThousand;
+    ++unit;
+  }
+  std::string text = std::to_string(bytes / kThousand);
+  if (bytes < 10 * kThousand) text += "." + std::to_string(bytes % kThousand / 100);
+  return text + kUnits[unit];
+}
+
+// A duration in its greatest unit, such as "5 min".
+std::string ShortDuration(std::time_t seconds) {
+  constexpr std::time_t kMinute = 60, kHour = 60 * kMinute, kDay = 24 * kHour;
+  if (seconds < kMinute) return std::to_string(seconds) + " s";
+  if (seconds < kHour) return std::to_string(seconds / kMinute) + " min";
+  return seconds < kDay ? std::to_string(seconds / kHour) + " h" : std::to_string(seconds / kDay) + " d";
+}
+
+Shown ShowSince(const Station& station, bool) {
+  if (!station.isLetIn) return {"joining", Tone::kFair};
+  if (station.since == 0) return {"-", Tone::kFaint};
+  return {ShortDuration(std::time(nullptr) - station.since)};
+}
+
+constexpr Field<Station> kFields[] = {
+    {"name", "NAME", [](const Station& of) { return Value(of.name); }, Layout::kElastic},
+    {"address", "ADDRESS", [](const Station& of) { return Value(TextOf(of.address)); }},
+    {"ip", "IP", [](const Station& of) { return Value(of.ip); }},
+    {"signal", "SIGNAL", [](const Station& of) { return of.signal ? Value(std::int64_t{*of.signal}) : nullptr; },
+     Layout::kRight},
+    {"rx_bytes", "FROM", [](const Station& of) { return Value(of.received); }, Layout::kRight,
+     [](const Station& of, bool) { return Shown{ShortSize(of.received)}; }},
+    {"tx_bytes", "TO", [](const Station& of) { return Value(of.sent); }, Layout::kRight,
+     [](const Station& of, bool) { return Shown{ShortSize(of.sent)}; }},
+    {"since", "FOR", [](const Station& of) { return of.since != 0 ? Value(UtcText(of.since)) : nullptr; },
+     Layout::kLeft, ShowSince},
+    {"guest", "GUEST", [](const Station& of) { return Value(of.isGuest()); }, Layout::kLeft,
+     [](const Station& of, bool) {
+       return of.isGuest() ? Shown{"yes"} : Shown{"-", Tone::kFaint};
+     }},
+    {"state", "", [](const Station& of) { return Value(of.isLetIn ? "joined" : "joining"); }},
+};
+
+}  // namespace
+
+bool Station::isGuest() const {
+  return interface == kGuestInterface;
+}
+
+std::vector<Station> Stations() {
+  std::vector<Station> all;
+  for (const std::string& interface : {std::string(MEROWirelessAPInterfaceGet()), std::string(kGuestInterface)}) {
+    std::vector<Station> stations = StationsOn(interface);
+    AddLeases(stations, interface);
+    all.insert(all.end(), stations.begin(), stations.end());
+  }
+  return all;
+}
+
+int CountStations() {
+  const auto stations = Stations();
+  return static_cast<int>(std::ranges::count_if(stations, &Station::isLetIn));
+}
+
+std::span<const Field<Station>> StationFields() {
+  return kFields;
+}
