@@ -87,6 +87,7 @@ const Command kCommands[] = {
     {Connected, {"known"}},
     {Connected, {"save", "square"}},
     {Connected, {"forget", "Home"}},
+    {Connected, {"share", "Home"}},
     {Connected, {"connect", "Home"}},
     {Connected, {"autoconnect"}},
     {Connected, {"disconnect"}},
@@ -157,7 +158,7 @@ TEST_F(Forms, OfEveryCommandAreAsTheyAlwaysWere) {
 
 // The words on a screen of so many columns, where all lines have room.
 std::set<std::string> WordsOnScreen(const std::vector<std::string>& words, unsigned short columns) {
-  std::istringstream screen(ToolOnTerminal(words, columns, {.environment = {{"NO_COLOR", "1"}}}).out);
+  std::istringstream screen(ToolOnTerminal(words, columns, {.environment = {{"NO_COLOR", "1"}, {"TERM", "dumb"}}}).out);
   std::set<std::string> shown;
   for (std::string line; std::getline(screen, line);) {
     if (line.ends_with('\r')) line.pop_back();

@@ -22,6 +22,7 @@
 #include "commands/country.h"
 #include "commands/keep.h"
 #include "commands/networks.h"
+#include "commands/share.h"
 #include "commands/stations.h"
 #include "commands/watch.h"
 #include "model/ap_settings.h"
@@ -149,6 +150,17 @@ void DescribeSaving(CLI::App& command, NetworkToSave& values) {
   security->needs(bssid);  // a network that does not hide tells how it is protected
 }
 
+void DescribeSharing(CLI::App& command, NetworkToShare& values) {
+  command
+      .add_option("network", values.name, "a known network, or ap; without it the one that is joined, or on the air")
+      ->option_text("[NAME|ADDRESS|ap]");
+  command.add_flag("--guest", values.guests, "the access point's guest network");
+  command.add_option("--png", values.png, "write the picture to FILE")->option_text("FILE")->check(HasName);
+  command.add_option("--svg", values.svg, "write the drawing to FILE")->option_text("FILE")->check(HasName);
+  command.add_flag("--hidden", values.isHidden, "the network hides its name");
+  command.add_flag("--show-secrets", values.showSecrets, "show the code's text, with the secret, too");
+}
+
 void AddNetworkCommands(Commands& commands) {
   commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
                          [](const Program& program, const Scanning& values) { Scan(program, values.results()); });
@@ -157,6 +169,7 @@ void AddNetworkCommands(Commands& commands) {
       [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });
   commands.Add<NetworkToSave>("save", "Save a network, so that it can be joined", DescribeSaving, Save);
   commands.Add<std::string>("forget", "Forget a network that has been saved", DescribeNetwork, Forget);
+  commands.Add<NetworkToShare>("share", "Draw the code by which a phone joins a network", DescribeSharing, Share);
 }
 
 // ---- The connection ----

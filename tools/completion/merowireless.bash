@@ -64,7 +64,7 @@ _merowireless_words() { # COMMAND ITS-HELP CURRENT-WORD
   _merowireless_names_listed Subcommands <<<"$2"
   [[ ! $1 ]] || _merowireless_names_listed Options <<<"$2"
   while read -r _ takes; do _merowireless_choices "$takes"; done < <(_merowireless_listed Positionals <<<"$2")
-  [[ $1 != @(connect|forget) ]] || _merowireless_names
+  [[ $1 != @(connect|forget|share) ]] || _merowireless_names
 }
 
 # Writes how the words that it reads go on after a beginning that has been typed, which may have opened quotes.

@@ -254,6 +254,10 @@ void Output::WriteOne(std::string_view name, Table table) const {
   WritePairs(table, 0);
 }
 
+void Output::Picture(const std::string& lines) const {
+  if (form_ == Form::kHuman) ::Put(lines);
+}
+
 void Output::Done(const std::string& sentence) const {
   if (form_ == Form::kHuman) ::Put(Wrapped(sentence, terminal_.width, kSentenceIndent, terminal_.utf8) + "\n");
   if (form_ == Form::kJson) PutDocument({{"result", "ok"}}, MachinesSeeUtf8());

@@ -94,6 +94,9 @@ class Output {
     List(name, fields, records, "");
   }
 
+  // A picture, for people alone: lines that are shown as they are.
+  void Picture(const std::string& lines) const;
+
   // A command was done that has no records to show.
   void Done(const std::string& sentence) const;
 

@@ -78,6 +78,12 @@ grep -qi "^.* $(address_of shelf)  *10\.1\.14\." <<<"$OUTPUT" || fail "shelf is 
 grep -qi "$(address_of shelf).* has left the access point" <<<"$OUTPUT" || fail "shelf has not left: $OUTPUT"
 leaves shelf
 
+recipe nas 'Share a network with a phone'
+expect_line 'whoever sees this can join My NAS'
+for file in nas.png home.svg; do expect_mode nas "/usr/mero/etc/$file" 600; done
+[[ $(inside nas head -c 4 /usr/mero/etc/nas.png) == $'\x89PNG' ]] || fail 'nas.png is no picture'
+inside nas grep -q '<svg xmlns' /usr/mero/etc/home.svg
+
 # A Wednesday.
 date -s '2026-11-18 12:30' >/dev/null
 recipe nas 'Let guests in, at some hours'
