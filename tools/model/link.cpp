@@ -1,39 +1,19 @@
 // What the connection runs over at this moment.
 #include "model/link.h"
 
-#include <netlink/genl/genl.h>
-
 #include <cstdint>
 #include <cstring>
 
 #include "base/failure.h"
 #include "base/text.h"
 #include "model/air.h"
+#include "model/attributes.h"
 #include "model/name_servers.h"
 #include "model/wireless_stack.h"
 #include "work/radio.h"
 #include "work/routes.h"
 
 namespace {
-
-// The attributes within another, by their kind; none where there is no such.
-template <int kLast>
-struct Nest {
-  explicit Nest(const nlattr* outer) {
-    if (outer != nullptr) (void)nla_parse_nested(parts, kLast, const_cast<nlattr*>(outer), nullptr);
-  }
-
-  // As a number of so many bits; nothing when it is missing or shorter.
-  template <class Number>
-  std::optional<Number> As(int kind) const {
-    Number number;
-    if (parts[kind] == nullptr || nla_len(parts[kind]) < static_cast<int>(sizeof number)) return std::nullopt;
-    std::memcpy(&number, nla_data(parts[kind]), sizeof number);
-    return number;
-  }
-
-  nlattr* parts[kLast + 1] = {};
-};
 
 // The kernel tells it in tenths of a megabit, and in 16 bits where it is an older one.
 std::optional<int> RateOf(const nlattr* description) {
@@ -51,15 +31,9 @@ void SetAccessPoint(Link& link, const void* octets) {
 }
 
 void AddStation(Link& link, std::string& message) {
-  auto* header = reinterpret_cast<nlmsghdr*>(message.data());
-  if (!genlmsg_valid_hdr(header, 0)) return;
-  const auto* general = static_cast<const genlmsghdr*>(nlmsg_data(header));
-  const auto attribute = [&](int kind) {
-    return nla_find(genlmsg_attrdata(general, 0), genlmsg_attrlen(general, 0), kind);
-  };
-  const nlattr* address = attribute(NL80211_ATTR_MAC);
+  const nlattr* address = AttributeOf(message, NL80211_ATTR_MAC);
   if (address != nullptr && nla_len(address) == sizeof(Address)) SetAccessPoint(link, nla_data(address));
-  const Nest<NL80211_STA_INFO_MAX> station(attribute(NL80211_ATTR_STA_INFO));
+  const Nest<NL80211_STA_INFO_MAX> station(AttributeOf(message, NL80211_ATTR_STA_INFO));
   link.signal = station.As<std::int8_t>(NL80211_STA_INFO_SIGNAL);
   link.rate = RateOf(station.parts[NL80211_STA_INFO_TX_BITRATE]);
   if (const auto seconds = station.As<std::uint32_t>(NL80211_STA_INFO_CONNECTED_TIME)) {

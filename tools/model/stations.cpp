@@ -1,10 +1,7 @@
 // The stations of the access point, by the kernel, and what they have leased.
 #include "model/stations.h"
 
-#include <netlink/genl/genl.h>
-
 #include <algorithm>
-#include <array>
 #include <chrono>
 #include <cstring>
 #include <filesystem>
@@ -12,6 +9,7 @@
 
 #include "base/clock.h"
 #include "common/paths.h"
+#include "model/attributes.h"
 #include "model/leases.h"
 #include "model/wireless_stack.h"
 #include "wireless.h"
@@ -19,32 +17,6 @@
 namespace {
 
 // ---- By the kernel ----
-
-// What there is about a station, by its kind. The attributes lie within the message.
-using Facts = std::array<nlattr*, NL80211_STA_INFO_MAX + 1>;
-
-nlattr* AttributeOf(std::string& message, int kind) {
-  auto* header = reinterpret_cast<nlmsghdr*>(message.data());
-  if (!genlmsg_valid_hdr(header, 0)) return nullptr;
-  const auto* body = static_cast<const genlmsghdr*>(nlmsg_data(header));
-  return nla_find(genlmsg_attrdata(body, 0), genlmsg_attrlen(body, 0), kind);
-}
-
-bool ReadFacts(std::string& message, Facts& facts) {
-  nla_policy policy[NL80211_STA_INFO_MAX + 1] = {};
-  policy[NL80211_STA_INFO_SIGNAL].type = NLA_U8;
-  policy[NL80211_STA_INFO_RX_BYTES64].type = NLA_U64;
-  policy[NL80211_STA_INFO_TX_BYTES64].type = NLA_U64;
-  policy[NL80211_STA_INFO_CONNECTED_TIME].type = NLA_U32;
-  policy[NL80211_STA_INFO_ASSOC_AT_BOOTTIME].type = NLA_U64;
-  policy[NL80211_STA_INFO_STA_FLAGS].minlen = sizeof(nl80211_sta_flag_update);
-  nlattr* nest = AttributeOf(message, NL80211_ATTR_STA_INFO);
-  return nest != nullptr && nla_parse_nested(facts.data(), NL80211_STA_INFO_MAX, nest, policy) == 0;
-}
-
-std::int64_t NumberOf(const nlattr* attribute) {
-  return attribute != nullptr ? static_cast<std::int64_t>(nla_get_u64(attribute)) : 0;
-}
 
 std::chrono::nanoseconds Now(clockid_t clock) {
   timespec now{};
@@ -54,35 +26,32 @@ std::chrono::nanoseconds Now(clockid_t clock) {
 
 // When it has come, by the clock on the wall. The kernel tells how long ago that is in whole seconds, or by the
 // machine's own clock, so that each look gives the same.
-std::time_t SinceOf(const Station& station, const nlattr* seconds) {
+std::time_t SinceOf(const Station& station, std::optional<std::uint32_t> seconds) {
   if (station.associatedAt != 0) {
     const auto ago = Now(CLOCK_BOOTTIME) - std::chrono::nanoseconds(station.associatedAt);
     return std::chrono::duration_cast<std::chrono::seconds>(Now(CLOCK_REALTIME) - ago).count();
   }
-  return seconds != nullptr ? std::time(nullptr) - static_cast<std::time_t>(nla_get_u32(seconds)) : 0;
+  return seconds ? std::time(nullptr) - static_cast<std::time_t>(*seconds) : 0;
 }
 
 // A driver that does not tell has let it in.
-bool IsLetIn(const nlattr* attribute) {
+bool IsLetIn(std::optional<nl80211_sta_flag_update> flags) {
   constexpr auto kLetIn = 1U << NL80211_STA_FLAG_AUTHORIZED;
-  if (attribute == nullptr) return true;
-  nl80211_sta_flag_update flags;
-  std::memcpy(&flags, nla_data(attribute), sizeof flags);
-  return (flags.mask & kLetIn) == 0 || (flags.set & kLetIn) != 0;
+  return !flags || (flags->mask & kLetIn) == 0 || (flags->set & kLetIn) != 0;
 }
 
 std::optional<Station> StationIn(std::string& message) {
   const nlattr* address = AttributeOf(message, NL80211_ATTR_MAC);
-  Facts facts;
-  if (address == nullptr || nla_len(address) != sizeof(Address) || !ReadFacts(message, facts)) return std::nullopt;
+  if (address == nullptr || nla_len(address) != sizeof(Address)) return std::nullopt;
+  const Nest<NL80211_STA_INFO_MAX> facts(AttributeOf(message, NL80211_ATTR_STA_INFO));
   Station station;
   std::memcpy(station.address.data(), nla_data(address), sizeof(Address));
-  station.isLetIn = IsLetIn(facts[NL80211_STA_INFO_STA_FLAGS]);
-  if (const nlattr* signal = facts[NL80211_STA_INFO_SIGNAL]) station.signal = static_cast<int8_t>(nla_get_u8(signal));
-  station.received = NumberOf(facts[NL80211_STA_INFO_RX_BYTES64]);
-  station.sent = NumberOf(facts[NL80211_STA_INFO_TX_BYTES64]);
-  station.associatedAt = static_cast<std::uint64_t>(NumberOf(facts[NL80211_STA_INFO_ASSOC_AT_BOOTTIME]));
-  station.since = SinceOf(station, facts[NL80211_STA_INFO_CONNECTED_TIME]);
+  station.isLetIn = IsLetIn(facts.As<nl80211_sta_flag_update>(NL80211_STA_INFO_STA_FLAGS));
+  station.signal = facts.As<std::int8_t>(NL80211_STA_INFO_SIGNAL);
+  station.received = facts.As<std::int64_t>(NL80211_STA_INFO_RX_BYTES64).value_or(0);
+  station.sent = facts.As<std::int64_t>(NL80211_STA_INFO_TX_BYTES64).value_or(0);
+  station.associatedAt = facts.As<std::uint64_t>(NL80211_STA_INFO_ASSOC_AT_BOOTTIME).value_or(0);
+  station.since = SinceOf(station, facts.As<std::uint32_t>(NL80211_STA_INFO_CONNECTED_TIME));
   return station;
 }
 
