@@ -59,6 +59,12 @@ void OnTheAir() {
   kernel::Main().stations = 2;
 }
 
+void WithChannels() {
+  Connected();
+  kernel::Heard({{.address = kernel::kHome, .msAgo = 10}});
+  kernel::g_channels = {{2412}, {2437}, {2472, NL80211_FREQUENCY_ATTR_NO_IR}, {5260, NL80211_FREQUENCY_ATTR_RADAR}};
+}
+
 void InACountry() {
   OnTheAir();
   CopyText(kernel::RulesNow().szKernel, "DE");
@@ -84,6 +90,7 @@ struct Command {
 
 const Command kCommands[] = {
     {Connected, {"scan"}},
+    {WithChannels, {"channels"}},
     {Connected, {"known"}},
     {Connected, {"save", "square"}},
     {Connected, {"forget", "Home"}},

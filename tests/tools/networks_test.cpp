@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include "common/text.h"
 #include "running.h"
 #include "tests/support/ring.h"
 
@@ -80,7 +81,10 @@ TEST_F(Networks, AreScannedForOrNotAsIsAskedFor) {
   RecordScans();
   EXPECT_EQ(WayOfScan({}, {"--cached"}), "read");
   EXPECT_EQ(WayOfScan({{.address = kCafe, .msAgo = 10}}, {"--renew"}), "renewed");
-  EXPECT_EQ(Tool({"scan", "--cached"}).out, "no network is in range\n");
+  EXPECT_EQ(Tool({"scan", "--cached"}).out,
+            "no network is in range without a country; `merowireless country CC` sets it\n");
+  CopyText(kernel::RulesNow().szKernel, "DE");
+  EXPECT_THAT(Tool({"scan", "--cached"}).out, testing::StartsWith("no network is in range in DE"));
   EXPECT_EQ(Tool({"scan", "--renew", "--json"}).out, "{\"result\":\"ok\",\"networks\":[]}\n");
   EXPECT_EQ(Tool({"scan", "--renew", "--cached"}).status, 2);
 }

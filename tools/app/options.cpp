@@ -18,6 +18,7 @@
 #include "commands/access_point.h"
 #include "commands/adapter.h"
 #include "commands/addressing.h"
+#include "commands/channels.h"
 #include "commands/connection.h"
 #include "commands/country.h"
 #include "commands/keep.h"
@@ -164,6 +165,9 @@ void DescribeSharing(CLI::App& command, NetworkToShare& values) {
 void AddNetworkCommands(Commands& commands) {
   commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
                          [](const Program& program, const Scanning& values) { Scan(program, values.results()); });
+  commands.Add<Scanning>(
+      "channels", "Show what is on the air, channel by channel", DescribeScanning,
+      [](const Program& program, const Scanning& values) { ShowChannels(program, values.results()); });
   commands.Add<Listing>(
       "known", "List the networks that have been saved", DescribeListing,
       [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });

@@ -5,6 +5,8 @@
 #include <optional>
 
 #include "base/signals.h"
+#include "base/text.h"
+#include "commands/channels.h"
 #include "common/ap_settings.h"
 #include "common/paths.h"
 #include "model/ap_channels.h"
@@ -70,6 +72,19 @@ bool ConcernsChannel(const ApChanges& changes) {
   return std::ranges::any_of(changes.settings, [](const auto& change) {
     return change.first == "channel" || change.first == "band" || change.first == "hw_mode";
   });
+}
+
+bool AsksForQuietest(const ApChanges& changes) {
+  const auto change = changes.settings.find("channel");
+  return change != changes.settings.end() && IsWord(change->second, "auto");
+}
+
+// Tells what became of the channel, for a sentence; nothing when it is as it was given.
+std::string ChooseChannel(const Program& program, ApConf& conf) {
+  const auto quietest = QuietestChannel(program, Is5GHz(conf));
+  conf.hostapConf.channel = quietest.value_or(0);
+  if (!quietest) return " with the channel left to the daemon, since the radio does not tell which it knows";
+  return " with channel " + std::to_string(*quietest) + ", the quietest";
 }
 
 // Takes the access point down. The library fails when none has ever been set up; the command does not, since there is
@@ -164,12 +179,13 @@ void SetAp(const Program& program, const ApChanges& changes) {
   ApplySettings(conf, changes);
   ApplySecrets(program, conf, changes);
   RequireComplete(conf);
+  const std::string chosen = AsksForQuietest(changes) ? ChooseChannel(program, conf) : "";
   const bool checked = !ConcernsChannel(changes) || CheckChannel(conf) == ChannelCheck::kPassed;
   SaveKeepingSwitch(conf);
   if (!checked) Remark("merowireless: the channel could not be checked, since no radio is there to tell");
   const auto fields = ApFields(false);
-  program.output.Done<ApConf>("saved; `merowireless ap enable` puts the settings on the air", "access_point", fields,
-                              conf);
+  program.output.Done<ApConf>("saved" + chosen + "; `merowireless ap enable` puts the settings on the air",
+                              "access_point", fields, conf);
 }
 
 void EnableAp(const Program& program) {

@@ -84,7 +84,8 @@ Failure NoRules(const std::string& country) {
 
 bool MayGoOn(const Air& air, const std::vector<Channel>& channels) {
   return std::ranges::any_of(channels, [&](const Channel& channel) {
-    return channel.megahertz == air.megahertz && !(air.isAccessPoint && channel.isPassive);
+    return channel.megahertz == air.megahertz &&
+           (air.isAccessPoint ? channel.isForAccessPoints() : channel.use != ChannelUse::kNone);
   });
 }
 
@@ -116,7 +117,7 @@ bool Follow(const Task& task, const std::string& country) {
 
 std::string WhatBecame(const Country& now) {
   if (now.saved.empty()) return "no country is set";
-  const std::string sentence = "the country is " + now.saved;
+  std::string sentence = "the country is " + now.saved;
   if (!now.rules.areThere()) return sentence + ", and holds once an adapter is plugged in";
   if (now.isInForce() == false) {
     return sentence +

@@ -9,38 +9,20 @@
 #include "base/clock.h"
 #include "common/paths.h"
 #include "model/access_points.h"
+#include "model/country.h"
 #include "model/join_failures.h"
 #include "model/last_scan.h"
 #include "model/library.h"
 #include "model/obstacles.h"
 #include "model/saved_networks.h"
 #include "model/security.h"
+#include "show/signal.h"
 
 namespace {
 
 // A name in hexadecimal, for one that is no UTF-8 and so cannot be given as text.
 Value NameInHex(std::string_view name) {
   return IsUtf8(name) ? Value(nullptr) : Value(Hex(name));
-}
-
-// ---- Signals ----
-
-// In per cent. Some drivers give dBm, which is below 0: by custom -50 dBm is all and -100 dBm nothing.
-int QualityOf(int signal) {
-  return std::clamp(signal < 0 ? 2 * (signal + 100) : signal, 0, 100);
-}
-
-Shown ShowSignal(int signal, bool utf8) {
-  constexpr std::string_view kBars[] = {"▂", "▄", "▆", "█"};
-  const int quality = QualityOf(signal);
-  const auto lit = static_cast<std::size_t>((quality + 24) / 25);
-  std::string text;
-  for (std::size_t i = 0; i < std::size(kBars); ++i) {
-    text += utf8 ? (i < lit ? kBars[i] : "▁") : (i < lit ? "#" : ".");
-  }
-  const std::string figure = std::to_string(signal);
-  text += std::string(figure.size() < 4 ? 4 - figure.size() : 1, ' ') + figure;
-  return {text, quality >= 60 ? Tone::kGood : quality >= 30 ? Tone::kFair : Tone::kBad};
 }
 
 // ---- Rows ----
@@ -194,14 +176,23 @@ Network ToBeSaved(const Program& program, const std::string& name) {
   return strongest;
 }
 
+std::string NoneInRange() {
+  const std::string more = SavedCountry().empty() ? "; `merowireless country CC` sets it" : "";
+  return "no network is in range" + WhereRulesHold() + more;
+}
+
 }  // namespace
+
+std::vector<Network> NetworksInRange(const Program& program, Results results) {
+  const bool renew = results == Results::kNew || (results == Results::kUsable && !AreUsable());
+  if (renew) RequireScanning();
+  return InRange(program, renew ? WIRELESS_SCAN_RENEW : WIRELESS_SCAN_LAST);
+}
 
 void Scan(const Program& program, Results results) {
   RequireAdapter();
-  const bool renew = results == Results::kNew || (results == Results::kUsable && !AreUsable());
-  if (renew) RequireScanning();
-  const auto networks = InRange(program, renew ? WIRELESS_SCAN_RENEW : WIRELESS_SCAN_LAST);
-  program.output.List<Found>("networks", kFoundFields, FoundAmong(networks), "no network is in range");
+  const auto found = FoundAmong(NetworksInRange(program, results));
+  program.output.List<Found>("networks", kFoundFields, found, found.empty() ? NoneInRange() : "");
 }
 
 void ListKnown(const Program& program, bool byTime, bool showSecrets) {

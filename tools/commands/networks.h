@@ -3,8 +3,10 @@
 #define MERO_TOOLS_NETWORKS_H
 
 #include <string>
+#include <vector>
 
 #include "model/addressing.h"
+#include "model/library.h"
 #include "model/secrets.h"
 #include "wireless.h"
 #include "work/program.h"
@@ -19,6 +21,9 @@ struct NetworkToSave {
 
 // The results that a list of what is in range is made of. Those that are used are at most half a minute old.
 enum class Results { kUsable, kThoseThereAre, kNew };
+
+// The networks in range. Fails when they would have to be scanned for, and that would disturb an access point.
+std::vector<Network> NetworksInRange(const Program& program, Results results);
 
 void Scan(const Program& program, Results results);
 void ListKnown(const Program& program, bool byTime, bool showSecrets);

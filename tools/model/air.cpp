@@ -13,6 +13,7 @@ namespace {
 
 // The attributes of a message, by their kind. They lie within the message.
 using Attributes = std::array<nlattr*, NL80211_ATTR_MAX + 1>;
+using ChannelAttributes = std::array<nlattr*, NL80211_FREQUENCY_ATTR_MAX + 1>;
 
 std::optional<Attributes> AttributesOf(std::string& message) {
   nla_policy policy[NL80211_ATTR_MAX + 1] = {};
@@ -32,18 +33,21 @@ void ForEachIn(const nlattr* outer, Visit visit) {
     visit(attribute);
 }
 
+ChannelUse UseOf(const ChannelAttributes& channel) {
+  if (channel[NL80211_FREQUENCY_ATTR_DISABLED] != nullptr) return ChannelUse::kNone;
+  if (channel[NL80211_FREQUENCY_ATTR_NO_IR] != nullptr) return ChannelUse::kListening;
+  return channel[NL80211_FREQUENCY_ATTR_RADAR] != nullptr ? ChannelUse::kAllAfterRadar : ChannelUse::kAll;
+}
+
 void AddChannel(std::vector<Channel>& channels, const nlattr* description) {
   nla_policy policy[NL80211_FREQUENCY_ATTR_MAX + 1] = {};
   policy[NL80211_FREQUENCY_ATTR_FREQ].type = NLA_U32;
-  std::array<nlattr*, NL80211_FREQUENCY_ATTR_MAX + 1> channel;
+  ChannelAttributes channel;
   if (nla_parse_nested(channel.data(), NL80211_FREQUENCY_ATTR_MAX, const_cast<nlattr*>(description), policy) < 0)
     return;
-  if (channel[NL80211_FREQUENCY_ATTR_FREQ] == nullptr || channel[NL80211_FREQUENCY_ATTR_DISABLED] != nullptr) return;
+  if (channel[NL80211_FREQUENCY_ATTR_FREQ] == nullptr) return;
   const unsigned megahertz = nla_get_u32(channel[NL80211_FREQUENCY_ATTR_FREQ]);
-  channels.push_back({.number = ChannelOf(megahertz),
-                      .megahertz = static_cast<int>(megahertz),
-                      .isRadars = channel[NL80211_FREQUENCY_ATTR_RADAR] != nullptr,
-                      .isPassive = channel[NL80211_FREQUENCY_ATTR_NO_IR] != nullptr});
+  channels.push_back({.number = ChannelOf(megahertz), .megahertz = static_cast<int>(megahertz), .use = UseOf(channel)});
 }
 
 void AddChannels(std::vector<Channel>& channels, const nlattr* bands) {

@@ -16,17 +16,25 @@ struct Air {
 // Nothing without such an interface, or a wireless one.
 std::optional<Air> AirOf(const std::string& interface);
 
-// A channel of 2.4 or 5 GHz that the radio may use, by the rules of the place where it is.
+// What a radio may do on a channel, by the rules of the place where it is.
+enum class ChannelUse {
+  kAll,
+  kAllAfterRadar,  // it has to be listened to for radar first
+  kListening,      // nobody may radiate there first, so that no access point may begin
+  kNone,
+};
+
+// A channel of 2.4 or 5 GHz.
 struct Channel {
   int number;
   int megahertz;
-  bool isRadars;   // it has to be listened to for radar first
-  bool isPassive;  // nobody may radiate there first, so that no access point may begin
+  ChannelUse use;
 
   bool is5GHz() const { return megahertz >= 5000; }
+  bool isForAccessPoints() const { return use == ChannelUse::kAll || use == ChannelUse::kAllAfterRadar; }
 };
 
-// In ascending order; nothing without such an interface, or a wireless one.
+// Those that the radio knows, in ascending order; nothing without such an interface, or a wireless one.
 std::vector<Channel> ChannelsOf(const std::string& interface);
 
 #endif  // MERO_TOOLS_AIR_H

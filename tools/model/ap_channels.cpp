@@ -13,7 +13,8 @@ std::string ListOf(const std::vector<Channel>& channels, bool is5GHz) {
   std::string list;
   for (const Channel& channel : channels) {
     if (channel.is5GHz() != is5GHz || !IsChannelOfBand(channel.number, is5GHz)) continue;
-    list += (list.empty() ? "" : ", ") + std::to_string(channel.number) + (channel.isRadars ? " (radar)" : "");
+    list += (list.empty() ? "" : ", ") + std::to_string(channel.number) +
+            (channel.use == ChannelUse::kAllAfterRadar ? " (radar)" : "");
   }
   return list.empty() ? "none" : list;
 }
@@ -25,7 +26,7 @@ ChannelCheck CheckChannel(const ApConf& conf) {
   if (number == 0) return ChannelCheck::kPassed;
   std::vector<Channel> channels = ChannelsOf(MEROWirelessAPInterfaceGet());
   if (channels.empty()) return ChannelCheck::kNobodyCanTell;
-  std::erase_if(channels, [](const Channel& channel) { return channel.isPassive; });
+  std::erase_if(channels, [](const Channel& channel) { return !channel.isForAccessPoints(); });
   const bool isAllowed = std::ranges::any_of(
       channels, [&](const Channel& channel) { return channel.number == number && channel.is5GHz() == Is5GHz(conf); });
   if (isAllowed) return ChannelCheck::kPassed;

@@ -75,7 +75,7 @@ void RequireChannel(const ApConf& conf) {
 
 void SetChannel(ApConf& conf, const std::string& text) {
   constexpr int kLast = k5GHzChannels[std::size(k5GHzChannels) - 1];
-  conf.hostapConf.channel = IsWord(text, "auto") ? 0 : NumberOf(text, 1, kLast, "channel");
+  conf.hostapConf.channel = IsWord(text, "auto") ? 0 : NumberOf(text, 0, kLast, "channel");
 }
 
 bool HasEap(const ApConf& conf) {
@@ -246,9 +246,9 @@ constexpr ApSetting kSettings[] = {
     {Told(
          "channel", [](const ApConf& of) { return Value(int64_t{of.hostapConf.channel}); },
          [](const ApConf& of, bool) {
-           return Shown{of.hostapConf.channel == 0 ? "auto" : std::to_string(of.hostapConf.channel)};
+           return Shown{of.hostapConf.channel == 0 ? "left to the daemon" : std::to_string(of.hostapConf.channel)};
          }),
-     "N|auto", "the channel", SetChannel},
+     "N|auto", "the channel; auto takes the quietest", SetChannel},
     {Told(
          "ieee80211n_wireless_width",
          [](const ApConf& of) { return Value(NameOf(kWidths, of.hostapConf.wirelessWidth)); },

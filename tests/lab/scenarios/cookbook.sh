@@ -70,6 +70,11 @@ within 20 in_cell Workbench || fail 'it is in no cell'
 expect_address nas 10.9.0.1/24
 on nas merowireless disconnect
 
+recipe nas 'Say where it is'
+expect_same 'the country of the kernel' DE "$(ip netns exec nas iw reg get | sed -n 's/^country \(..\):.*/\1/p;/^$/q')"
+grep -q '^in force  *yes$' <<<"$OUTPUT" || fail "the country is not in force: $OUTPUT"
+grep -q '^2\.4 GHz .* quietest$' <<<"$OUTPUT" || fail "no channel is the quietest: $OUTPUT"
+
 recipe nas 'Become an access point'
 guest_of nas shelf essid='My NAS' auth=WPA2PSK encrypt=AES key='the old printer'
 

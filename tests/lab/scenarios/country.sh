@@ -1,4 +1,4 @@
-# The country is what the kernel keeps to, what the access point tells and what the program shows, also after a re-plug.
+# The country is what the kernel keeps to, what the access point tells and what the program shows; and so are channels.
 # Plain only
 # Rules of countries
 # shellcheck shell=bash
@@ -24,8 +24,19 @@ expect_country() {
 }
 
 # The channel's state, as iw tells it: nothing, "(disabled)", "(no IR)" ...
-state_of() { # MEGAHERTZ
-  ip netns exec nas iw phy "${RADIO_OF[nas]}" info | sed -n "s/.* $1 MHz [^(]*([^)]* dBm) *//p; s/.* $1 MHz .*\((disabled)\)/\1/p"
+state_of() {  # MEGAHERTZ
+  ip netns exec nas iw phy "${RADIO_OF[nas]}" info |
+    sed -n "s/.* $1 MHz [^(]*([^)]* dBm) *//p; s/.* $1 MHz .*\((disabled)\)/\1/p"
+}
+
+# use_of MEGAHERTZ: the same in the program's words.
+use_of() {
+  case $(state_of "$1") in
+    '') echo all ;;
+    *disabled*) echo none ;;
+    *'no IR'*) echo listening ;;
+    *radar*) echo after-radar ;;
+  esac
 }
 
 # tells NAME: the country that the access point of that name tells, as another radio hears it.
@@ -33,13 +44,18 @@ tells() {
   ip -n guest link set wlan0 up
   ip netns exec guest iw dev wlan0 scan freq "$(ip netns exec nas iw dev wlan0 info |
     awk '$1 == "channel" { print substr($3, 2) }')" flush | awk -v name="$1" '
-    $1 == "BSS" { told = "" } $1 == "SSID:" { ssid = $2 } $1 == "Country:" && ssid == name { print $2 }'
+    $1 == "SSID:" { ssid = $2 } $1 == "Country:" && ssid == name { print $2 }'
 }
 
 # refuses STATUS TEXT COMMAND...: a command of the program ends with that status, and gives that reason.
 refuses() {
   ends_with nas "$1" "${@:3}"
   [[ $ERRORS == *"$2"* ]] || fail "this should be said: $2"
+}
+
+# row CHANNEL: what the program tells of it in $picture: networks, strongest, load, use, quietest.
+row() {
+  awk -F '\t' -v channel="$1" '$2 == channel { print $3, $4, $5, $6, $7 }' <<<"$picture"
 }
 
 pending() {
@@ -107,6 +123,26 @@ say '-- in a network that tells of another country'
 access_point cafe ssid=cafe channel=1 country_code=US ieee80211d=1
 on nas merowireless country FR
 expect_country FR FR yes
+
+say '-- channel by channel'
+access_point kiosk ssid=kiosk channel=6 signal=-60
+picture=$(inside nas merowireless channels --renew --porcelain)
+show <<<"$picture"
+expect_same 'how many networks there are' "$(ip netns exec nas iw dev wlan0 scan dump | grep -c '^BSS')" \
+  "$(awk -F '\t' '{ count += $3 } END { print count }' <<<"$picture")"
+expect_same 'channel 6' '1 -60' "$(row 6 | cut -d ' ' -f 1,2)"
+expect_same 'channel 11' '0  0 all yes' "$(row 11)"
+expect_same 'channel 36' '0  0 all yes' "$(row 36)"
+expect_same 'channel 52' '0  0 after-radar no' "$(row 52)"
+for channel in 1:2412 13:2472 14:2484 36:5180 100:5500 165:5825; do
+  told=$(row "${channel%:*}" | awk '{ print $(NF - 1) }')
+  expect_same "the use of channel $channel" "$(use_of "${channel#*:}")" "$told"
+done
+on nas merowireless ap set --band 2.4 --channel auto
+# shellcheck disable=SC2016  # the program says so
+expect_line 'saved with channel 11, the quietest; `merowireless ap enable` puts the settings on the air'
+
+say '-- joined'
 on nas merowireless connect --no-address cafe
 within 5 test_kernels US || fail 'the kernel does not listen to the access point'
 expect_country FR US no
