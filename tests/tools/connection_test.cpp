@@ -387,6 +387,19 @@ TEST_F(Connection, IsShownAgainWhenItHasChanged) {
             "disconnected\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\t2026-11-20T11:35:28Z\n");
 }
 
+// A station that the access point had not let in, as with a wrong secret, was called connected.
+TEST_F(Connection, IsCalledOneOnlyOnceTheAccessPointLetsTheStationIn) {
+  Shell("ip link add wlan0 type veth peer name air && ip link set air up && ip link set wlan0 mode dormant up");
+  EXPECT_THAT(Tool({"status"}).out, HasSubstr("joining (the access point has not let it in yet)"));
+  EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("state":"joining","name":"Home")"));
+  StartedTool tool({"watch", "--count", "2", "--porcelain"});
+  ASSERT_TRUE(Soon([&] { return !tool.OutputSoFar().empty(); }));
+  Shell("ip link set wlan0 mode default down && ip link set wlan0 up");
+  EXPECT_THAT(tool.Wait().out, testing::MatchesRegex("joining\tHome\t[^\n]*\nconnected\tHome\t[^\n]*\n"));
+  EXPECT_THAT(Tool({"status", "--json"}).out, HasSubstr(R"("state":"connected","name":"Home")"));
+  Shell("ip link delete wlan0");
+}
+
 TEST_F(Connection, IsWatchedByTheClockOnTheWall) {
   library::g_now = library::kNow;
   const Surroundings india{.environment = {{"TZ", "XIT-5:30"}}};

@@ -220,7 +220,7 @@ void JoinAgain(const Program& program, const std::string& name) {
 void AutoConnect(const Program& program) {
   const JoinLock lock;
   RequireFreeAdapter();
-  if (IsLetIn(ReadStatus())) return SayConnected(program);
+  if (ReadStatus().isLetIn) return SayConnected(program);
   const auto networks = NetworksToTry();
   if (networks.empty()) {
     throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");

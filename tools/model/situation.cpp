@@ -1,21 +1,11 @@
 // Whether the adapter may be made to join a network.
 #include "model/situation.h"
 
-#include <fstream>
-#include <string>
-
 #include "model/ap_files.h"
 #include "model/ap_state.h"
 #include "platform.h"
 
 namespace {
-
-// A station that the access point has not let in yet is "dormant".
-bool IsDormant(const std::string& interface) {
-  std::ifstream file("/sys/class/net/" + interface + "/operstate");
-  std::string state;
-  return file >> state && state == "dormant";
-}
 
 // The access point may be on its way.
 bool IsSwitchedOn() {
@@ -24,10 +14,6 @@ bool IsSwitchedOn() {
 
 }  // namespace
 
-bool IsLetIn(const Status& status) {
-  return status.isConnected() && !IsDormant(status.interface);
-}
-
 bool IsForAccessPoint() {
   return IsSwitchedOn() || IsAccessPoints();
 }
@@ -35,7 +21,7 @@ bool IsForAccessPoint() {
 Situation SituationOf(const Status& status) {
   if (MEROWirelessAdapterNum() <= 0) return Situation::kNoAdapter;
   if (IsForAccessPoint()) return Situation::kAccessPoint;
-  if (IsLetIn(status)) return Situation::kConnected;
+  if (status.isLetIn) return Situation::kConnected;
   if (status.radio == RadioState::kOff) return Situation::kRadioOff;
   if (status.radio == RadioState::kUnknown) return Situation::kUnannounced;
   const bool isFree =

@@ -16,10 +16,6 @@ enum class Situation {
 
 Situation SituationOf(const Status& status);
 
-// Whether the adapter is in a network that lets it in. The driver counts a station as connected that has not passed the
-// access point's protection yet, and with a wrong secret is so again and again.
-bool IsLetIn(const Status& status);
-
 // Whether the adapter is an access point's, or is to be one: the hot-plug script or a schedule may start it any time.
 bool IsForAccessPoint();
 

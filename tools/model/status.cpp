@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <fstream>
 #include <memory>
 
 #include "base/clock.h"
@@ -42,8 +43,13 @@ constexpr State kStates[] = {
 constexpr State kAccessPoint = {"access-point", "an access point (see `merowireless ap status`)",
                                 WIRELESS_STATUS_UNKNOWN, Tone::kGood};
 
+// To the library, and to the driver, it is connected.
+constexpr State kJoining = {"joining", "joining (the access point has not let it in yet)",
+                            WIRELESS_STATUS_CONNECTED_MANAGED, Tone::kFair};
+
 const State& StateOf(const Status& status) {
   if (status.isAccessPoint) return kAccessPoint;
+  if (status.isConnected() && !status.isLetIn) return kJoining;
   const auto* found = std::ranges::find(kStates, status.state, &State::value);
   return found != std::end(kStates) ? *found : kStates[0];
 }
@@ -147,6 +153,13 @@ void ReadAddress(Status& status) {
   }
 }
 
+// A station that the access point has not let in yet is "dormant".
+bool IsDormant(const std::string& interface) {
+  std::ifstream file("/sys/class/net/" + interface + "/operstate");
+  std::string state;
+  return file >> state && state == "dormant";
+}
+
 // Asks the library one thing about the connection; without an answer `answer` stays as it is.
 template <class Answer>
 void Ask(WIRELESS_REQUEST request, Answer WIRELESS_INFO::*member, Answer& answer) {
@@ -182,6 +195,7 @@ Status ReadStatus() {
   status.isAccessPoint = !status.isConnected() && IsAccessPoints();
   if (!status.isConnected()) return status;
 
+  status.isLetIn = !IsDormant(status.interface);
   const bool isCell = status.state == WIRELESS_STATUS_CONNECTED_ADHOC;
   status.link = LinkOf(status.interface, isCell ? LinkTo::kCell : LinkTo::kAccessPoint);
   WIRELESS_INFO info{};

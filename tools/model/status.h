@@ -21,6 +21,10 @@ struct Status {
   std::string mask;
   RadioState radio = RadioState::kUnknown;
   bool isAccessPoint = false;
+
+  // Whether the network that it is connected to lets it in. The driver counts a station as connected that has not
+  // passed the access point's protection yet, and with a wrong secret is so again and again.
+  bool isLetIn = false;
   Link link;
 
   bool operator==(const Status&) const = default;

@@ -98,7 +98,9 @@ function state(type) {
   if (type == "monitor") return type
   if (!now["up"]) return "down"
   if (!now["joined"]) return "disconnected"
-  return type == "IBSS" ? "connected-adhoc" : "connected"
+  if (type == "IBSS") return "connected-adhoc"
+  if (("supplicant's wpa_state" in now) && now["supplicant's wpa_state"] != "COMPLETED") return "joining"
+  return "connected"
 }
 
 function check_status(type, radio,    connected) {
@@ -107,15 +109,15 @@ function check_status(type, radio,    connected) {
   expect("status", "ip", substr(now["address"], 1, index(now["address"], "/") - 1), "the kernel's is")
   expect("status", "mask", now["address"] ? mask_of(now["address"]) : "", "the kernel's is")
   expect("status", "radio", radio, "by the settings and the kernel it is")
-  connected = state(type) ~ /^connected/
+  connected = state(type) ~ /^connected|^joining/
   expect("status", "name", connected ? now["joined name"] : "", "the kernel's is")
   expect("status", "mode", connected ? type == "IBSS" ? "ADHOC" : "MANAGED" : "", "by the kernel it is")
-  if (state(type) == "connected" && ("supplicant's wpa_state" in now)) check_supplicant()
+  if (state(type) ~ /^(connected|joining)$/ && ("supplicant's wpa_state" in now)) check_supplicant()
 }
 
 function check_supplicant(    auth) {
   expect("status", "name", now["supplicant's ssid"], "the supplicant's is")
-  expect("status", "state", now["supplicant's wpa_state"] == "COMPLETED" ? "connected" : "disconnected",
+  expect("status", "state", now["supplicant's wpa_state"] == "COMPLETED" ? "connected" : "joining",
          "by the supplicant, which is in " now["supplicant's wpa_state"] ", it is")
   auth = now["supplicant's key_mgmt"]
   if (auth ~ /^WPA2?-PSK$/) sub(/-/, "", auth)

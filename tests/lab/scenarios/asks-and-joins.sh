@@ -57,7 +57,14 @@ expect_station home nas
 expect_same 'what is saved' 'home the old printer' "$(saved)"
 on nas merowireless disconnect
 expect_nothing_left nas
-within_seconds 9 ends_with nas 5 connect home --key-file /var/lib/trois.key
+within_seconds 9 ends_with nas 5 connect home --key-file /var/lib/trois.key &
+attempt=$!
+says() {  # STATE
+  [[ $(inside nas merowireless --porcelain status) == "$1	"* ]]
+}
+within 8 says joining || fail 'it is not said that it is joining'
+no_station home nas || fail 'it is let in'
+wait "$attempt" || exit 1
 expect_same 'what is saved' 'home the old printer' "$(saved)"
 expect_nothing_left nas
 
