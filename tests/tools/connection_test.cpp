@@ -194,9 +194,19 @@ TEST_F(Connection, IsMadeByOneCommandAtATime) {
   for (const auto& command : kJoins) {
     const Ran ran = Tool(command);
     EXPECT_EQ(ran.status, 8);
-    EXPECT_THAT(ran.err, HasSubstr("another command is joining or leaving a network"));
+    EXPECT_THAT(ran.err, HasSubstr("another command is at work with the adapter"));
   }
-  EXPECT_EQ(Tool({"disconnect"}).status, 8);
+  for (const auto& command : std::vector<std::vector<std::string>>{{"disconnect"},
+                                                                   {"ap", "enable"},
+                                                                   {"ap", "disable"},
+                                                                   {"mode", "ap"},
+                                                                   {"mode", "client"},
+                                                                   {"radio", "off"},
+                                                                   {"radio", "on"},
+                                                                   {"address", "DHCP"},
+                                                                   {"gateway", "10.0.0.1"}}) {
+    EXPECT_EQ(Tool(command).status, 8) << testing::PrintToString(command);
+  }
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "joining"));
   EXPECT_FALSE(Exists("/tmp/told-in-between"));
   std::filesystem::remove(kSupplicantPid);

@@ -269,6 +269,32 @@ TEST_F(Keep, TakesAStationThatIsNotLetInForNoConnection) {
   Shell("ip link delete wlan0");
 }
 
+// Whoever wanted to do something during an attempt was refused.
+TEST_F(Keep, GivesWayToWhateverSomebodyWants) {
+  Is(kSlow);
+  StartedTool tool = Started();
+  ASSERT_TRUE(Attempted(1));
+  const Ran ran = Tool({"radio", "off"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(library::Calls().back(), "MEROWirelessNetworkDisconnect");
+  EXPECT_EQ(Attempts(), 1);
+  IsNot(kSlow);
+  Pass(5);
+  EXPECT_TRUE(Attempted(2)) << "the pause is no longer for it";
+}
+
+TEST_F(Keep, LetsAnAddressWaitForTheEndOfAnAttempt) {
+  Is(kSlow);
+  StartedTool tool = Started();
+  ASSERT_TRUE(Attempted(1));
+  StartedTool addressing({"address", "DHCP"});
+  ::usleep(500'000);
+  EXPECT_THAT(library::Calls(), Not(testing::Contains("MEROWirelessIfconfigSet")));
+  IsNot(kSlow);
+  EXPECT_EQ(addressing.Wait().status, 0);
+  EXPECT_TRUE(Says(tool, kConnected)) << "the attempt was not cut off";
+}
+
 TEST_F(Keep, NeverDisturbsAnAccessPoint) {
   const struct {
     const char* szName;

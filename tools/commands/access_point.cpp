@@ -13,6 +13,7 @@
 #include "model/ap_former.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
+#include "model/join_lock.h"
 #include "model/library.h"
 #include "model/library_lines.h"
 
@@ -189,6 +190,7 @@ void SetAp(const Program& program, const ApChanges& changes) {
 }
 
 void EnableAp(const Program& program) {
+  const JoinLock lock;
   const ApConf conf = SettingsToEnable();
   RequireAdapter();
   RefuseWhileRadioIsOff();
@@ -211,6 +213,7 @@ void EnableAp(const Program& program) {
 }
 
 void DisableAp(const Program& program) {
+  const JoinLock lock;
   Disable(program, ReadApSettings());
   const ApStatus status = ReadApStatus(ReadApSettings());
   if (status.isRunning()) {

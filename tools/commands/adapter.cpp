@@ -9,6 +9,7 @@
 #include "model/ap_files.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
+#include "model/join_lock.h"
 #include "model/kernel_switch.h"
 #include "model/library.h"
 #include "model/radio_state.h"
@@ -225,6 +226,7 @@ void ShowRadio(const Program& program) {
 
 void SwitchRadio(const Program& program, const std::string& state) {
   if (state != "on" && state != "off") throw Wrong("the radio cannot be this", "switch it on or off");
+  const JoinLock lock;
   const Signals signals;  // none comes between two steps: the next one that takes time ends with it
   const std::string sentence = state == "on" ? SwitchOn(program) : SwitchOff(program);
   program.output.Done<Radio>(sentence, "radio", kRadioFields, ReadRadio());
@@ -233,5 +235,6 @@ void SwitchRadio(const Program& program, const std::string& state) {
 void ChangeMode(const Program& program, const std::string& mode) {
   if (mode != "ap" && mode != "client") throw Wrong("there is no such mode", "it is ap or client");
   RequireAdapter();
+  const JoinLock lock;
   mode == "ap" ? BecomeAccessPoint(program) : BecomeClient(program);
 }

@@ -2,6 +2,7 @@
 #include "commands/addressing.h"
 
 #include "base/text.h"
+#include "model/join_lock.h"
 #include "model/status.h"
 
 void SetAddress(const Program& program, const Addressing& addressing) {
@@ -10,6 +11,7 @@ void SetAddress(const Program& program, const Addressing& addressing) {
   KnownNetwork config{};
   SetAddressing(config, addressing);
   RequireAdapter();
+  const JoinLock lock(JoinLockFor::kAddressing);
   ApplyAddress(SettingAddress(program, config), config);
   const Status status = ReadStatus();
   program.output.Done("the address is " + (status.ip.empty() ? "not known yet" : status.ip), "status", StatusFields(),
@@ -19,6 +21,7 @@ void SetAddress(const Program& program, const Addressing& addressing) {
 void SetGateway(const Program& program, const std::string& gateway) {
   RequireGateway(gateway);
   RequireAdapter();
+  const JoinLock lock(JoinLockFor::kAddressing);
   ApplyGateway(gateway);
   program.output.Done("the gateway is " + gateway);
 }

@@ -164,13 +164,16 @@ void SayConnected(const Program& program, const char* szMore = "") {
   program.output.Done(ConnectionText(program.output, status) + szMore, "status", StatusFields(), status);
 }
 
-// The network that is wanted. Whoever is asked for a secret has been told before that the adapter is used otherwise,
-// and keeps nobody else from it with his answer.
+// Whoever is asked for a secret is told before that the adapter is used otherwise, and keeps nobody else from it with
+// his answer.
+void RequireFreeAdapterNow() {
+  const JoinLock lock;
+  RequireFreeAdapter();
+}
+
+// The network that is wanted.
 Target ToBeJoined(const Program& program, const NetworkToJoin& wanted) {
-  {
-    const JoinLock lock;
-    RequireFreeAdapter();
-  }
+  RequireFreeAdapterNow();
   Target target = TargetOf(program, wanted);
   RequireSavedSecret(program, target.config);
   if (!wanted.noAddress) RequireAddressing(target.config);
@@ -217,8 +220,8 @@ void JoinAgain(const Program& program, const std::string& name) {
   ApplyAddressing(program, target.config);
 }
 
-void AutoConnect(const Program& program) {
-  const JoinLock lock;
+void AutoConnect(const Program& program, JoinLockFor who) {
+  const JoinLock lock(who);
   RequireFreeAdapter();
   if (ReadStatus().isLetIn) return SayConnected(program);
   const auto networks = NetworksToTry();
@@ -245,14 +248,15 @@ void ShowStatus(const Program& program) {
 }
 
 void MakeCell(const Program& program, const CellToMake& wanted) {
-  const JoinLock lock;
-  RequireFreeAdapter();
+  RequireFreeAdapterNow();
   KnownNetwork config{};
   SetNetworkName(config.network.szEssid, wanted.name);
   config.network.opmode = WIRELESS_OPMODE_ADHOC;
   config.network.auth = wanted.wep ? WIRELESS_AUTH_SHARED : WIRELESS_AUTH_OPEN;
   config.network.encrypt = wanted.wep ? WIRELESS_ENCRYPT_WEP : WIRELESS_ENCRYPT_NONE;
   SetSecret(program, config, wanted.secret);
+  const JoinLock lock;
+  RequireFreeAdapter();
   const std::string name = program.output.Name(wanted.name);
   FormerConnection(program).Try([&] {
     EndFormerSupplicant(program);

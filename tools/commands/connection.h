@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "model/join_lock.h"
 #include "model/library.h"
 #include "model/secrets.h"
 #include "work/program.h"
@@ -30,7 +31,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted);
 // Joins a known network, with its address, and says nothing.
 void JoinAgain(const Program& program, const std::string& name);
 
-void AutoConnect(const Program& program);
+void AutoConnect(const Program& program, JoinLockFor who = JoinLockFor::kCommand);
 void Disconnect(const Program& program);
 void ShowStatus(const Program& program);
 void MakeCell(const Program& program, const CellToMake& wanted);

@@ -147,24 +147,30 @@ class Keeper {
       Tell("the connection to " + connection_ + " is lost, and a known network is joined anew", ReadStatus());
       connection_.clear();
     }
-    Attempt attempt([this] { AutoConnect(program_); });
-    Guard(attempt);
+    Attempt attempt([this] { AutoConnect(program_, JoinLockFor::kKeeper); });
+    const bool gaveWay = Guard(attempt);
     const auto failure = attempt.Result();
     due_ = Clock::now() + pause_;
+    if (gaveWay) return;
     if (failure && failure->exit() == Exit::kBusy) return;  // somebody else joins a network: that was no attempt
     if (failure) TellFailure(*failure);
     pause_ = std::min(2 * pause_, keeping_.longestPause);
   }
 
-  // Until the attempt has ended. An access point goes before it, and the end of the program.
-  void Guard(Attempt& attempt) {
+  // Until the attempt has ended. An access point goes before it, the end of the program, and what somebody wants to do
+  // with the adapter; whether that was so.
+  bool Guard(Attempt& attempt) {
+    bool gaveWay = false;
     pollfd waited[] = {{attempt.fd(), POLLIN, 0}, {signals_.fd(), POLLIN, 0}};
     const auto& [ended, signals] = waited;
     while (ended.revents == 0) {
       ::poll(waited, std::size(waited), static_cast<int>(kGuardInterval.count()));
       if (signals.revents != 0 && signals_.HasCome()) ended_ = true;
-      if (ended_ || IsForAccessPoint()) attempt.Interrupt();
+      if (!ended_ && !IsForAccessPoint() && !IsKeeperInTheWay()) continue;
+      attempt.Interrupt();
+      gaveWay = true;
     }
+    return gaveWay;
   }
 
   // ---- What is told ----

@@ -4,15 +4,27 @@
 
 #include "common/descriptor.h"
 
-// Held from before a join touches anything to its end. Fails when another command holds one. It ends with its process
-// and the worker of that, which goes on when the process is killed; programs that are run do not hold it.
+// Who wants the lock. An attempt of `autoconnect --keep` gives way to whatever somebody else wants.
+enum class JoinLockFor {
+  kCommand,
+  kAddressing,  // a command that waits for the end of an attempt, which gives the interface an address, too
+  kKeeper
+};
+
+// Held from before a command touches the adapter to its end. Fails when another command holds one; an attempt of the
+// keeper is waited for. It ends with its process and the worker of that, which goes on when the process is killed;
+// programs that are run do not hold it.
 class JoinLock {
  public:
-  JoinLock();
+  explicit JoinLock(JoinLockFor who = JoinLockFor::kCommand);
 
  private:
+  Descriptor keeper_;
   Descriptor held_;
 };
+
+// Whether a command waits until the keeper's attempt gives way.
+bool IsKeeperInTheWay();
 
 // Fails when the library joins a network for another program. Removes a marker that tells of nothing any more: the
 // library would take it for another join.
