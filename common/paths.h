@@ -55,10 +55,13 @@ inline constexpr char kJoinLock[] = "/var/run/merowireless";
 inline constexpr char kDhcpClientPidFormat[] = "/var/run/udhcpc-%s.pid";
 inline constexpr char kLeaseScript[] = "/usr/mero/sbin/udhcpc.lease";
 
-// Where the system asks for names, and the lines between which an interface's name servers stand there.
+// Where the system asks for names, and the lines between which an interface's name servers stand there: those of its
+// lease, or those that were saved for its network.
 inline constexpr char kResolverPath[] = "/etc/resolv.conf";
-inline constexpr char kNameServersBegin[] = "# By the DHCP client of %s, until it leaves the network:";
-inline constexpr char kNameServersEnd[] = "# (end of what the DHCP client of %s has added)";
+inline constexpr char kLeasedServersBegin[] = "# By the DHCP client of %s, until it leaves the network:";
+inline constexpr char kLeasedServersEnd[] = "# (end of what the DHCP client of %s has added)";
+inline constexpr char kSavedServersBegin[] = "# As saved for the network of %s, until it leaves the network:";
+inline constexpr char kSavedServersEnd[] = "# (end of what was saved for the network of %s)";
 
 // ---- An access point ----
 

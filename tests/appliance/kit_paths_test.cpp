@@ -101,10 +101,15 @@ std::string LeaseScripts(const std::string& variable) {
 
 TEST_F(KitPaths, OfTheLeaseScriptAreTheProgramsAndSoAreTheLinesAroundNameServers) {
   EXPECT_EQ(LeaseScripts("resolver"), std::string(kResolverPath) + "\n");
-  EXPECT_EQ(LeaseScripts("first_line"),
-            '"' + std::string(InterfacePath(kNameServersBegin, "$interface").c_str()) + "\"\n");
-  EXPECT_EQ(LeaseScripts("last_line"),
-            '"' + std::string(InterfacePath(kNameServersEnd, "$interface").c_str()) + "\"\n");
+  const auto lines = [](const char* szLeased, const char* szSaved) {
+    std::string both;
+    for (const char* szFormat : {szLeased, szSaved}) {
+      both += '"' + std::string(InterfacePath(szFormat, "$interface").c_str()) + "\"\n";
+    }
+    return both;
+  };
+  EXPECT_EQ(LeaseScripts("first_line"), lines(kLeasedServersBegin, kSavedServersBegin));
+  EXPECT_EQ(LeaseScripts("last_line"), lines(kLeasedServersEnd, kSavedServersEnd));
 }
 
 TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {

@@ -392,6 +392,49 @@ TEST_F(ALease, SaysWhichStepCannotBeTaken) {
   ExpectLogged("'a b' is no name of an interface\n");
 }
 
+// The block of the servers that were saved for a network.
+std::string SavedBlock(const std::string& lines) {
+  return "# As saved for the network of net0, until it leaves the network:\n" + lines +
+         "# (end of what was saved for the network of net0)\n";
+}
+
+TEST_F(ALease, GivesWayToTheNameServersThatWereSavedUntilTheNetworkIsLeft) {
+  const std::string others = "nameserver 192.0.2.1\n";
+  const std::string saved = others + SavedBlock("nameserver 10.1.0.8\nnameserver 10.1.0.9\n");
+  WriteText(kResolver, others, 0644);
+  EXPECT_EQ(Bound({"dns=10.1.0.2", "domain=home.example"}), 0);
+  EXPECT_EQ(Run({"servers", "net0", "10.1.0.8 10.1.0.9"}), 0);
+  EXPECT_EQ(ReadText(kResolver), saved);
+  for (const char* szEvent : {"renew", "deconfig", "bound"}) {
+    EXPECT_EQ(Run({szEvent}, Usual({"dns=10.1.0.2"})), 0);
+    EXPECT_EQ(ReadText(kResolver), saved) << szEvent;
+  }
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(ReadText(kResolver), others);
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+  EXPECT_EQ(ReadText(kResolver), others + Block("nameserver 10.1.0.2\n"));
+  ExpectNothingLogged();
+}
+
+TEST_F(ALease, KeepsItsNameServersWhereNoneWereSaved) {
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+  EXPECT_EQ(Run({"servers", "net0", ""}), 0);
+  EXPECT_EQ(Run({"servers", "net0"}), 0);
+  EXPECT_EQ(ReadText(kResolver), Block("nameserver 10.1.0.2\n"));
+}
+
+TEST_F(ALease, TakesNoSavedNameServerThatIsNone) {
+  WriteText(kResolver, "", 0644);
+  for (const char* szText :
+       {"home", "127.0.0.1", "10.1.0.2 $(touch /tmp/platform/made)", "10.1.0.2\nnameserver x", "*"}) {
+    EXPECT_EQ(Run({"servers", "net0", szText}), 1) << szText;
+    ExpectLogged("a name server that was saved for the network of net0 is no host's address\n");
+    EXPECT_EQ(ReadText(kResolver), "");
+  }
+  EXPECT_FALSE(fs::exists("/tmp/platform/made"));
+  EXPECT_EQ(Run({"servers", "a b", "10.1.0.2"}), 1);
+}
+
 TEST_F(ALease, OfAnInterfaceThatIsGoneIsGivenBack) {
   WriteText(kResolver, "nameserver 192.0.2.1\n" + Block("nameserver 10.1.0.2\n", "wlan9"), 0644);
   EXPECT_EQ(Run({"left", "wlan9"}), 0);

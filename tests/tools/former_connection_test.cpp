@@ -148,9 +148,8 @@ TEST_F(FormerConnection, ThatIsBackInPartIsCalledSo) {
   Shell("ip address add 10.0.0.9/24 dev wlan0 && ip route add default via 10.0.0.1 dev wlan0");
   library::MEROWirelessNetworkDisconnect = [] { return Shell("ip address flush dev wlan0"), 0; };
   library::MEROWirelessIfconfigSet = [](const char*, WIRELESS_NETWORK_CONFIG) { return 0; };
-  EXPECT_THAT(
-      Tool({"connect", "Office"}).err,
-      HasSubstr("merowireless: the former connection, to Home, is back, but not all of its address and routes\n"));
+  EXPECT_THAT(Tool({"connect", "Office"}).err,
+              HasSubstr("merowireless: the former connection, to Home, is back, but not all that came with it\n"));
 }
 
 TEST_F(FormerConnection, IsBackWhenTheNewOneGetsNoAddress) {

@@ -9,8 +9,10 @@
 #include <set>
 #include <sstream>
 
+#include "common/paths.h"
 #include "common/text.h"
 #include "hostapd_fake.h"
+#include "real_store.h"
 #include "running.h"
 
 namespace {
@@ -35,6 +37,17 @@ void Connected() {
   library::Connected("Home");
   kernel::Heard({{.address = kernel::kHome, .isJoined = true}});
   kernel::BecomeJoined();
+}
+
+void WriteStore() {
+  WriteText(kKnownNetworksPath,
+            "[0A:0A:0A:0A:0A:0A]\n\tKEY=open sesame\n\tIPADDR=DHCP\n\tNETMASK=\n\tGATEWAY=\n\tESSID=Home\n"
+            "\tBSSID=0A:0A:0A:0A:0A:0A\n\tMODE=MANAGED\n\tACCESS_TIME=86400\n\tAUTH=WPA2PSK\n\tENCRYPT=AES\n");
+}
+
+void WithAStore() {
+  UseRealStore();
+  WriteStore();
 }
 
 void InACell() {
@@ -117,6 +130,7 @@ const Command kCommands[] = {
     {InACountry, {"country"}},
     {InACountry, {"country", "DE"}},
     {WithAGateway, {"gateway", "10.0.0.1"}},  // the last one: its interface stays
+    {WithAStore, {"edit", "Home", "--priority", "5"}},
 };
 
 std::vector<std::string> With(std::vector<std::string> words, const char* szOption) {
@@ -139,7 +153,8 @@ class Forms : public ToolTest {
  protected:
   Forms() {
     ::setenv("TZ", "UTC", 1);
-    Shell("mkdir -p /etc/hostapd");
+    Shell("mkdir -p /etc/hostapd /usr/mero/etc");
+    WriteStore();
     WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
     WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "ssid=Old Office\n");
     WriteText("/usr/mero/etc/wireless_country.conf", "country=\"DE\"\n");

@@ -154,16 +154,17 @@ TEST_F(Networks, ThatAreKnownAreListedWithoutTheirSecrets) {
   library::Known({Home()});
   const Surroundings utc{.environment = {{"TZ", "UTC"}}};
   EXPECT_EQ(Tool({"known"}, utc).out,
-            "NAME  SECURITY  ADDRESS  SAVED             ACCESS POINT\n"
-            "Home  WPA2 AES  DHCP     2026-11-20 11:35  0A:0A:0A:0A:0A:0A\n");
+            "NAME  SECURITY  ADDRESS  SAVED             ACCESS POINT       AUTO\n"
+            "Home  WPA2 AES  DHCP     2026-11-20 11:35  0A:0A:0A:0A:0A:0A  yes\n");
   EXPECT_EQ(Tool({"known", "--json"}).out,
             R"({"result":"ok","networks":[{"name":"Home","auth":"WPA2PSK","encryption":"AES","mode":"MANAGED",)"
             R"("ip":"DHCP","mask":null,"gateway":null,"saved":"2026-11-20T11:35:28Z","address":"0A:0A:0A:0A:0A:0A",)"
-            R"("name_hex":null,"has_secret":true,"addresses":"0A:0A:0A:0A:0A:0A"}]})"
+            R"("name_hex":null,"has_secret":true,"addresses":"0A:0A:0A:0A:0A:0A",)"
+            R"("name_servers":null,"priority":0,"autojoin":true}]})"
             "\n");
-  EXPECT_EQ(
-      Tool({"known", "--porcelain"}).out,
-      "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t2026-11-20T11:35:28Z\t0A:0A:0A:0A:0A:0A\t\tyes\t0A:0A:0A:0A:0A:0A\n");
+  EXPECT_EQ(Tool({"known", "--porcelain"}).out,
+            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t2026-11-20T11:35:28Z\t0A:0A:0A:0A:0A:0A\t\tyes\t0A:0A:0A:0A:0A:"
+            "0A\t\t0\tyes\n");
 }
 
 TEST_F(Networks, ShowTheirSecretsOnRequest) {
@@ -200,9 +201,9 @@ TEST_F(Networks, AreForgottenByNameWithAllTheirAccessPoints) {
 
 TEST_F(Networks, AreForgottenByAddressAndToldToMachines) {
   library::Known({Home()});
-  EXPECT_EQ(
-      Tool({"forget", "0a:0a:0a:0a:0a:0a", "--porcelain"}).out,
-      "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t2026-11-20T11:35:28Z\t0A:0A:0A:0A:0A:0A\t\tyes\t0A:0A:0A:0A:0A:0A\n");
+  EXPECT_EQ(Tool({"forget", "0a:0a:0a:0a:0a:0a", "--porcelain"}).out,
+            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t2026-11-20T11:35:28Z\t0A:0A:0A:0A:0A:0A\t\tyes\t0A:0A:0A:0A:0A:"
+            "0A\t\t0\tyes\n");
   EXPECT_THAT(Tool({"forget", "Home", "--json"}).out, StartsWith(R"({"result":"ok","networks":[{"name":"Home")"));
 }
 
@@ -228,7 +229,7 @@ TEST_F(Networks, AreSavedAsTheScanDescribesThem) {
 
 TEST_F(Networks, ThatHaveJustBeenSavedAreToldToMachines) {
   EXPECT_EQ(Tool({"save", "Home", "--key-file", kSecretPath, "--porcelain"}).out,
-            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t\t0A:0A:0A:0A:0A:0A\t\tyes\t0A:0A:0A:0A:0A:0A\n");
+            "Home\tWPA2PSK\tAES\tMANAGED\tDHCP\t\t\t\t0A:0A:0A:0A:0A:0A\t\tyes\t0A:0A:0A:0A:0A:0A\t\t0\tyes\n");
 }
 
 TEST_F(Networks, AreSavedByTheAddressOfTheirAccessPoint) {

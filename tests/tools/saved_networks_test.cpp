@@ -213,12 +213,12 @@ TEST_F(SavedNetworks, AreListedOnceHoweverManyAccessPointsTheyHave) {
                   Saved(Open(4, 0), 86400), Saved(Heard(5, 0), 86400, "another secret")});
   const Surroundings utc{.environment = {{"TZ", "UTC"}}};
   EXPECT_EQ(Tool({"known"}, utc).out,
-            "NAME  SECURITY  ADDRESS  SAVED             ACCESS POINT\n"
-            "Home  WPA2 AES  DHCP     1970-01-03 00:00  2 access points\n"
-            "Cafe  WPA2 AES  DHCP     1970-01-02 00:00  0A:0A:0A:0A:0A:03\n"
-            "Home  open      DHCP     1970-01-02 00:00  0A:0A:0A:0A:0A:04\n"
-            "Home  WPA2 AES  DHCP     1970-01-02 00:00  0A:0A:0A:0A:0A:05\n");
-  EXPECT_THAT(Tool({"known", "--json"}).out, HasSubstr(R"("addresses":"0A:0A:0A:0A:0A:02 0A:0A:0A:0A:0A:01"})"));
+            "NAME  SECURITY  ADDRESS  SAVED             ACCESS POINT       AUTO\n"
+            "Home  WPA2 AES  DHCP     1970-01-03 00:00  2 access points    yes\n"
+            "Cafe  WPA2 AES  DHCP     1970-01-02 00:00  0A:0A:0A:0A:0A:03  yes\n"
+            "Home  open      DHCP     1970-01-02 00:00  0A:0A:0A:0A:0A:04  yes\n"
+            "Home  WPA2 AES  DHCP     1970-01-02 00:00  0A:0A:0A:0A:0A:05  yes\n");
+  EXPECT_THAT(Tool({"known", "--json"}).out, HasSubstr(R"("addresses":"0A:0A:0A:0A:0A:02 0A:0A:0A:0A:0A:01",)"));
 }
 
 // The field behind it stood where scripts look for the secret.

@@ -21,6 +21,7 @@
 #include "commands/channels.h"
 #include "commands/connection.h"
 #include "commands/country.h"
+#include "commands/edit.h"
 #include "commands/keep.h"
 #include "commands/networks.h"
 #include "commands/share.h"
@@ -162,6 +163,27 @@ void DescribeSharing(CLI::App& command, NetworkToShare& values) {
   command.add_flag("--show-secrets", values.showSecrets, "show the code's text, with the secret, too");
 }
 
+// An option whose value stays absent when it is not given.
+CLI::Option* AddChange(CLI::App& command, const char* szName, std::optional<std::string>& value, const char* szHelp) {
+  return command.add_option_function<std::string>(
+      szName, [&value](const std::string& text) { value = text; }, szHelp);
+}
+
+void DescribeEditing(CLI::App& command, NetworkToEdit& values) {
+  DescribeNetwork(command, values.name);
+  AddChange(command, "--ip", values.ip, "DHCP, a static address, or none")->option_text("DHCP|A.B.C.D|none");
+  AddChange(command, "--mask", values.mask, "netmask of a static address")->option_text("A.B.C.D");
+  AddChange(command, "--gateway", values.gateway, "default gateway of a static address")->option_text("A.B.C.D|none");
+  AddChange(command, "--dns", values.nameServers, "up to three name servers, in place of the DHCP server's; or none")
+      ->option_text("A.B.C.D,...|none");
+  AddChange(command, "--priority", values.priority, "0 to 1000: the network with the greatest is tried first")
+      ->option_text("N");
+  AddChange(command, "--auto", values.autojoin, "no: it is joined only when asked for")->option_text("yes|no");
+  auto* ask = command.add_flag("--key", values.askSecret, "ask for the secret");
+  DescribeSecret(command, values.secret);
+  ask->excludes("--key-file", "--key-stdin");
+}
+
 void AddNetworkCommands(Commands& commands) {
   commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
                          [](const Program& program, const Scanning& values) { Scan(program, values.results()); });
@@ -172,6 +194,7 @@ void AddNetworkCommands(Commands& commands) {
       "known", "List the networks that have been saved", DescribeListing,
       [](const Program& program, const Listing& values) { ListKnown(program, values.byTime, values.showSecrets); });
   commands.Add<NetworkToSave>("save", "Save a network, so that it can be joined", DescribeSaving, Save);
+  commands.Add<NetworkToEdit>("edit", "Change what was saved of a network; the rest stays", DescribeEditing, Edit);
   commands.Add<std::string>("forget", "Forget a network that has been saved", DescribeNetwork, Forget);
   commands.Add<NetworkToShare>("share", "Draw the code by which a phone joins a network", DescribeSharing, Share);
 }

@@ -3,6 +3,7 @@
 
 #include "base/text.h"
 #include "model/join_lock.h"
+#include "model/network_extras.h"
 #include "model/status.h"
 
 void SetAddress(const Program& program, const Addressing& addressing) {
@@ -13,6 +14,7 @@ void SetAddress(const Program& program, const Addressing& addressing) {
   RequireAdapter();
   const JoinLock lock(JoinLockFor::kAddressing);
   ApplyAddress(SettingAddress(program, config), config);
+  if (const auto known = FindKnown(ReadStatus().name)) ApplyNameServers(*known);
   const Status status = ReadStatus();
   program.output.Done("the address is " + (status.ip.empty() ? "not known yet" : status.ip), "status", StatusFields(),
                       status);

@@ -15,6 +15,7 @@
 #include "model/join_failures.h"
 #include "model/join_lock.h"
 #include "model/library.h"
+#include "model/network_extras.h"
 #include "model/patience.h"
 #include "model/saved_networks.h"
 #include "model/saving.h"
@@ -78,9 +79,11 @@ void Join(const Program& program, const KnownNetwork& config) {
 // ---- Addressing ----
 
 void ApplyAddressing(const Program& program, const KnownNetwork& config) {
-  if (config.szIp[0] == '\0') return;
-  ApplyAddress(SettingAddress(program, config), config);
-  ApplySavedGateway(config);
+  if (config.szIp[0] != '\0') {
+    ApplyAddress(SettingAddress(program, config), config);
+    ApplySavedGateway(config);
+  }
+  ApplyNameServers(config);
 }
 
 // ---- What to join ----
@@ -202,6 +205,14 @@ bool IsInCell(const std::string& name) {
          MEROWirelessCurInfoGet(REQUEST_ESSID, &info) == 0 && name == info.szEssid;
 }
 
+Failure NothingToJoin() {
+  if (Known(Order::kAsSaved).empty()) {
+    return {Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one"};
+  }
+  return {Exit::kOutOfRange, "none of the known networks is to be joined by itself",
+          "`merowireless edit NAME --auto yes` lets one be"};
+}
+
 }  // namespace
 
 void Connect(const Program& program, const NetworkToJoin& wanted) {
@@ -225,9 +236,7 @@ void AutoConnect(const Program& program, JoinLockFor who) {
   RequireFreeAdapter();
   if (ReadStatus().isLetIn) return SayConnected(program);
   const auto networks = NetworksToTry();
-  if (networks.empty()) {
-    throw Failure(Exit::kOutOfRange, "no network is known", "`merowireless save NAME` saves one");
-  }
+  if (networks.empty()) throw NothingToJoin();
   FormerConnection(program).Try([&] {
     const auto joined = JoinFirst(program, networks, [&](const KnownNetwork& config) { Join(program, config); });
     ApplyAddressing(program, joined);

@@ -13,6 +13,7 @@
 #include "model/join_failures.h"
 #include "model/last_scan.h"
 #include "model/library.h"
+#include "model/network_extras.h"
 #include "model/obstacles.h"
 #include "model/saved_networks.h"
 #include "model/security.h"
@@ -81,6 +82,13 @@ Shown ShowAccessPoints(const SavedNetwork& of, bool) {
   return {count == 1 ? AddressText(of.addresses.front()) : std::to_string(count) + " access points"};
 }
 
+// Whether a network is joined by itself, and with which priority where it has one.
+Shown ShowAutojoin(const SavedNetwork& of, bool) {
+  const Extras extras = ExtrasOf(of.newest);
+  if (!extras.autojoin) return {"no", Tone::kFair};
+  return {extras.priority == 0 ? "yes" : "yes, " + std::to_string(extras.priority)};
+}
+
 constexpr Field<SavedNetwork> kWithSecret[] = {
     {"name", "NAME", [](const SavedNetwork& of) { return Value(of.newest.network.szEssid); }, Layout::kElastic},
     {"auth", "SECURITY", [](const SavedNetwork& of) { return AuthOf(of.newest.network); }, Layout::kLeft,
@@ -104,6 +112,10 @@ constexpr Field<SavedNetwork> kWithSecret[] = {
     {"has_secret", "", [](const SavedNetwork& of) { return Value(of.newest.szKey[0] != '\0'); }},
     {"secret", "SECRET", [](const SavedNetwork& of) { return Value(of.newest.szKey); }},
     {"addresses", "", AddressesOf},
+    {"name_servers", "", [](const SavedNetwork& of) { return Value(ExtrasOf(of.newest).nameServers); }},
+    {"priority", "", [](const SavedNetwork& of) { return Value(int64_t{ExtrasOf(of.newest).priority}); }},
+    {"autojoin", "AUTO", [](const SavedNetwork& of) { return Value(ExtrasOf(of.newest).autojoin); }, Layout::kLeft,
+     ShowAutojoin},
 };
 
 constexpr auto kWithoutSecret = [] {
@@ -218,18 +230,19 @@ void Save(const Program& program, const NetworkToSave& wanted) {
   program.output.Done<SavedNetwork>("saved " + name + " (" + which + ")", "network", kWithoutSecret, saved);
 }
 
+void SayChanged(const Program& program, const std::string& sentence, const std::vector<SavedNetwork>& networks) {
+  program.output.ListDone<SavedNetwork>(sentence, "networks", kWithoutSecret, networks);
+}
+
 void Forget(const Program& program, const std::string& name) {
   const std::vector<SavedNetwork> known = SavedAs(name);
   const std::string shown = program.output.Name(name);
-  if (known.empty()) {
-    throw Failure(Exit::kOutOfRange, "no network named " + shown + " is known",
-                  "`merowireless known` lists those that are");
-  }
+  if (known.empty()) throw NotKnown(program, name);
   for (const SavedNetwork& network : known) {
     for (const Address& address : network.addresses) {
       if (PLIBCFileRemoveSection(kKnownNetworksPath, AddressText(address).c_str()) > 0) continue;
       throw Failed(shown + " could not be forgotten", "its section is in " + std::string(kKnownNetworksPath));
     }
   }
-  program.output.ListDone<SavedNetwork>("forgot " + shown, "networks", kWithoutSecret, known);
+  SayChanged(program, "forgot " + shown, known);
 }

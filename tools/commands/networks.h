@@ -7,6 +7,7 @@
 
 #include "model/addressing.h"
 #include "model/library.h"
+#include "model/saved_networks.h"
 #include "model/secrets.h"
 #include "wireless.h"
 #include "work/program.h"
@@ -31,5 +32,8 @@ void Save(const Program& program, const NetworkToSave& wanted);
 
 // Forgets every known network of a name, or the one of an access point's address.
 void Forget(const Program& program, const std::string& name);
+
+// Tells what was done to known networks.
+void SayChanged(const Program& program, const std::string& sentence, const std::vector<SavedNetwork>& networks);
 
 #endif  // MERO_TOOLS_NETWORKS_H

@@ -92,16 +92,24 @@ void SetAddressing(KnownNetwork& config, const Addressing& addressing) {
   SetText(config.szGateway, addressing.gateway, "the gateway");
 }
 
-void RequireAddressing(const KnownNetwork& config) {
+Soundness SoundnessOf(const KnownNetwork& config) {
   const auto& [ip, mask, gateway] =
       std::tuple<std::string, std::string, std::string>(config.szIp, config.szMask, config.szGateway);
-  if (ip.empty() || IsDhcp(config)) return;
+  if (ip.empty() || IsDhcp(config)) return Soundness::kSound;
+  if (!IsIpAddress(ip) || !IsNetmask(mask) || !IsHost(ip, mask)) return Soundness::kNoHost;
+  if (gateway.empty() || (IsIpAddress(gateway) && IsInSubnet(gateway, ip, mask))) return Soundness::kSound;
+  return Soundness::kGatewayOutside;
+}
+
+void RequireAddressing(const KnownNetwork& config) {
   const std::string advice = "`merowireless save` saves it with another one, or with DHCP";
-  if (!IsIpAddress(ip) || !IsNetmask(mask) || !IsHost(ip, mask)) {
-    throw Failed("the network was saved with an address that no host can have", advice);
-  }
-  if (!gateway.empty() && (!IsIpAddress(gateway) || !IsInSubnet(gateway, ip, mask))) {
-    throw Failed("the network was saved with a gateway that is not in its subnet", advice);
+  switch (SoundnessOf(config)) {
+    case Soundness::kSound:
+      return;
+    case Soundness::kNoHost:
+      throw Failed("the network was saved with an address that no host can have", advice);
+    case Soundness::kGatewayOutside:
+      throw Failed("the network was saved with a gateway that is not in its subnet", advice);
   }
 }
 

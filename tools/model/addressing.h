@@ -17,6 +17,10 @@ struct Addressing {
 // Puts it into a network; fails when it is not sound.
 void SetAddressing(KnownNetwork& config, const Addressing& addressing);
 
+// Whether a network can have its address and gateway.
+enum class Soundness { kSound, kNoHost, kGatewayOutside };
+Soundness SoundnessOf(const KnownNetwork& config);
+
 // Fails when a network was saved with an address that it cannot have.
 void RequireAddressing(const KnownNetwork& config);
 

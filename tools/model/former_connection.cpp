@@ -9,6 +9,7 @@
 #include "common/paths.h"
 #include "common/text.h"
 #include "model/join_failures.h"
+#include "model/name_servers.h"
 #include "model/supplicant_settings.h"
 #include "work/radio.h"
 
@@ -61,7 +62,11 @@ bool StaysAsItIs(const Failure& failure) {
 }  // namespace
 
 FormerConnection::FormerConnection(const Program& program)
-    : program_(program), status_(ReadStatus()), network_(NetworkOf(status_)), routes_(Routes::Of(status_.interface)) {}
+    : program_(program),
+      status_(ReadStatus()),
+      network_(NetworkOf(status_)),
+      routes_(Routes::Of(status_.interface)),
+      nameServers_(SavedNameServersOf(status_.interface)) {}
 
 // Signals are held all the time, so that none comes between two steps; each step that takes time ends with one.
 void FormerConnection::Try(const std::function<void()>& attempt) const {
@@ -105,6 +110,15 @@ bool FormerConnection::Rejoin() const {
   return status.state == status_.state && status.name == status_.name;
 }
 
+bool FormerConnection::PutNameServersBack() const {
+  try {
+    SetNameServers(status_.interface, nameServers_);
+    return true;
+  } catch (const Failure&) {
+    return false;
+  }
+}
+
 // A lease brings its own routes, and those of another one may not fit.
 bool FormerConnection::Readdress() const {
   if (network_->szIp[0] == '\0') return routes_.PutBack();
@@ -118,10 +132,11 @@ bool FormerConnection::Readdress() const {
 
 void FormerConnection::SayItIsBack() const {
   const std::string name = program_.output.Name(status_.name);
-  if (Readdress()) {
+  const bool addressed = Readdress();
+  if (PutNameServersBack() && addressed) {
     Remark("merowireless: the former connection, to " + name + ", is back");
   } else {
-    Remark("merowireless: the former connection, to " + name + ", is back, but not all of its address and routes");
+    Remark("merowireless: the former connection, to " + name + ", is back, but not all that came with it");
   }
 }
 

@@ -27,12 +27,14 @@ class FormerConnection {
   void BringBack() const;
   bool Rejoin() const;
   bool Readdress() const;
+  bool PutNameServersBack() const;
   void SayItIsBack() const;
 
   const Program& program_;
   Status status_;
   std::optional<KnownNetwork> network_;  // with its address; nothing when it cannot be told what was joined
   Routes routes_;
+  std::string nameServers_;  // that were saved for the network
 };
 
 // Ends all that a connection is made of; fails when something of it stays.

@@ -2,9 +2,12 @@
 #include "model/saved_networks.h"
 
 #include <algorithm>
+#include <functional>
 #include <string_view>
+#include <utility>
 
 #include "common/text.h"
+#include "model/network_extras.h"
 #include "model/security.h"
 
 namespace {
@@ -113,16 +116,35 @@ std::vector<SavedNetwork> SavedAs(const std::string& name) {
 }
 
 std::vector<SavedNetwork> NetworksToTry() {
-  return SavedNetworks(Order::kByTime);
+  struct Turn {
+    int priority;
+    SavedNetwork network;
+  };
+  std::vector<Turn> turns;
+  for (SavedNetwork& network : SavedNetworks(Order::kByTime)) {
+    const Extras extras = ExtrasOf(network.newest);
+    if (extras.autojoin) turns.push_back({extras.priority, std::move(network)});
+  }
+  std::ranges::stable_sort(turns, std::greater{}, &Turn::priority);
+  std::vector<SavedNetwork> networks;
+  for (Turn& turn : turns) networks.push_back(std::move(turn.network));
+  return networks;
 }
 
 SavedNetwork SaveNetwork(const KnownNetwork& config, bool isWhole) {
   SavedNetwork saved{.newest = config, .addresses = {AddressOf(config)}, .others = {}};
   const auto others = isWhole ? Others(config) : std::vector<KnownNetwork>();
+  const bool isAdded = !HasSection(config);
   Save(config);
+  if (isAdded && !others.empty()) CopyExtras(others.front(), config);
   for (const KnownNetwork& section : others) {
     Save(Renewed(section, config));
     saved.addresses.push_back(AddressOf(section));
   }
   return saved;
+}
+
+Failure NotKnown(const Program& program, const std::string& name) {
+  return {Exit::kOutOfRange, "no network named " + program.output.Name(name) + " is known",
+          "`merowireless known` lists those that are"};
 }

@@ -28,11 +28,15 @@ std::vector<SavedNetwork> SavedNetworks(Order order);
 // Those that were saved under a name, the newest first; or else the access point of this address alone.
 std::vector<SavedNetwork> SavedAs(const std::string& name);
 
-// Those that are joined without being asked for, in the order in which they are tried.
+// Those that are joined without being asked for, in the order in which they are tried: by their priority, and then the
+// newest first.
 std::vector<SavedNetwork> NetworksToTry();
 
 // Saves a network by its access point's address. With `isWhole` the network is changed as one thing: all access points
 // that were saved with its name and protection are saved anew, or, when its protection has changed, all of its name.
 SavedNetwork SaveNetwork(const KnownNetwork& config, bool isWhole);
+
+// The failure of a search for a network that was not saved.
+Failure NotKnown(const Program& program, const std::string& name);
 
 #endif  // MERO_TOOLS_SAVED_NETWORKS_H

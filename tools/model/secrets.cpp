@@ -131,7 +131,7 @@ std::string UserOf(const Program& program, const KnownNetwork& config, const std
 void SetSecret(const Program& program, KnownNetwork& config, const SecretSource& source) {
   const std::string name = program.output.Name(config.network.szEssid);
   if (!NeedsSecret(config.network.auth)) {
-    if (source.isGiven()) throw Failure(Exit::kUsage, name + " is open and takes no secret", "give none");
+    if (source.isGiven()) throw TakesNoSecret(name);
     return;
   }
   const auto secret = ReadSecret(source, "secret of " + name);
@@ -141,4 +141,8 @@ void SetSecret(const Program& program, KnownNetwork& config, const SecretSource&
   }
   RequireSecretFor(config.network.auth, *secret);
   SetText(config.szKey, *secret, "the secret");
+}
+
+Failure TakesNoSecret(const std::string& name) {
+  return Wrong(name + " is open and takes no secret", "give none");
 }

@@ -25,4 +25,7 @@ std::string UserOf(const Program& program, const KnownNetwork& config, const std
 // Puts a secret into a network that needs one; from a prompt when no source is given.
 void SetSecret(const Program& program, KnownNetwork& config, const SecretSource& source);
 
+// The failure of whoever gives a secret for a network that is not protected.
+Failure TakesNoSecret(const std::string& name);
+
 #endif  // MERO_TOOLS_SECRETS_H

@@ -1,0 +1,35 @@
+// Several changes of a settings file as one: it holds what it held, or all that was changed.
+#ifndef MERO_TOOLS_SETTINGS_CHANGE_H
+#define MERO_TOOLS_SETTINGS_CHANGE_H
+
+#include <string>
+
+#include "common/descriptor.h"
+
+// The platform's operations make the changes, in a copy beside the file. Until this ends it has the file's lock, as
+// mero-wireless.conf(5) tells of it, so that nobody else's change is lost.
+class SettingsChange {
+ public:
+  explicit SettingsChange(const std::string& path);
+  SettingsChange(const SettingsChange&) = delete;
+  SettingsChange& operator=(const SettingsChange&) = delete;
+  ~SettingsChange();
+
+  const char* copy() const { return copy_.c_str(); }
+
+  // Sets one key of a section in the copy.
+  void Set(const std::string& section, const char* szKey, const std::string& value) const;
+
+  // Puts the copy in the file's place.
+  void Commit();
+
+ private:
+  void Copy() const;
+
+  std::string path_;  // where the file really is
+  std::string copy_;
+  std::string lockPath_;
+  Descriptor lock_;
+};
+
+#endif  // MERO_TOOLS_SETTINGS_CHANGE_H
