@@ -17,12 +17,19 @@ reading == "flags" { note("up", $1 ~ /[13579bdf]$/) }
 reading == "block" { note("block", $2 ? "hardware" : $1 ? "set" : "none") }
 reading == "link" && /^(Connected to|Joined IBSS) / { note("joined", toupper($3)) }
 reading == "link" && $1 == "SSID:" { note("joined name", behind("SSID:")) }
+reading == "link" && $1 == "signal:" { note("signal", $2) }
+reading == "link" && /tx bitrate:/ { note("rate", int($3 * 1000 + 0.5)) }
 reading == "address" && $3 == "inet" { note("address", $4) }
-reading == "way-out" && $2 == "via" { note("gateway", $3) }
+reading == "way-out" && $2 == "via" && !ways[phase]++ { note("gateway", $3) }
 reading == "stations" && $1 == "Station" { note("stations", ++stations[phase]) }
 reading ~ /^(supplicant|hostapd)$/ && /^(wpa_state|ssid|bssid|key_mgmt|state|channel|freq|ssid\[0\])=/ {
   note(reading "'s " substr($0, 1, index($0, "=") - 1), substr($0, index($0, "=") + 1))
 }
+
+# The name servers that the connection has brought stand between two remarks.
+reading == "resolv.conf" && /^# By the DHCP client of wlan0,/ { brought = 1 }
+reading == "resolv.conf" && /^# \(end of what/ { brought = 0 }
+reading == "resolv.conf" && brought && $1 == "nameserver" { servers = servers (servers == "" ? "" : " ") $2 }
 
 # ---- What is saved --------------------------------------------------------------------------------------------------
 
@@ -112,7 +119,17 @@ function check_status(type, radio,    connected) {
   connected = state(type) ~ /^connected|^joining/
   expect("status", "name", connected ? now["joined name"] : "", "the kernel's is")
   expect("status", "mode", connected ? type == "IBSS" ? "ADHOC" : "MANAGED" : "", "by the kernel it is")
+  if (state(type) == "connected") check_link()
   if (state(type) ~ /^(connected|joining)$/ && ("supplicant's wpa_state" in now)) check_supplicant()
+}
+
+function check_link() {
+  expect("status", "access_point", now["joined"], "the kernel's is")
+  expect("status", "channel", now["channel of wlan0"], "the kernel's is")
+  expect("status", "signal_dbm", now["signal"], "the kernel's is")
+  expect("status", "rate_kbps", now["rate"], "the kernel's is")
+  expect("status", "gateway", now["gateway"], "the kernel's is")
+  expect("status", "name_servers", servers, "the resolver's are")
 }
 
 function check_supplicant(    auth) {
