@@ -5,14 +5,30 @@ declare -A RADIO_OF=()
 
 # give_radio NAME: makes a network namespace of that name, with a radio in it.
 give_radio() {
-  local name=$1 radio=phy${#RADIO_OF[@]} interface
-  [[ -d /sys/class/ieee80211/$radio/device/net ]] || fail "no radio is left for $name: the lab has $RADIOS"
+  local radio=phy${#RADIO_OF[@]}
+  [[ -d /sys/class/ieee80211/$radio/device/net ]] || fail "no radio is left for $1: the lab has $RADIOS"
+  put_radio "$1" "$radio"
+  RADIO_OF[$1]=$radio
+}
+
+put_radio() {  # NAME RADIO
+  local name=$1 radio=$2 interface
   interface=$(ls "/sys/class/ieee80211/$radio/device/net")
   ip netns add "$name"
   iw phy "$radio" set netns name "$name"
   ip -n "$name" -batch - <<<"link set lo up
     link set $interface name wlan0"
-  RADIO_OF[$name]=$radio
+}
+
+# unplug NAME, plug NAME: an appliance's adapter is pulled, and plugged in again; nobody has told the appliance yet.
+unplug() {
+  say "the adapter of $1: pulled"
+  ip netns exec "$1" iw phy "${RADIO_OF[$1]}" set netns 1
+}
+
+plug() {
+  say "the adapter of $1: plugged in"
+  iw phy "${RADIO_OF[$1]}" set netns name "$1"
 }
 
 # address_of NAME: the hardware address of an access point or an appliance.

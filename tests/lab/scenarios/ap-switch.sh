@@ -82,13 +82,13 @@ else
 fi
 
 say '-- no adapter'
-ip netns exec nas iw phy "${RADIO_OF[nas]}" set netns 1
+unplug nas
 on nas mero-call ap-save channel=6
 fails_to_start "there is no interface 'wlan0'"
 fails_on nas mero-call mode ap
 # The program finds that out by itself, too.
 if through_functions; then expect_message nas 'no adapter is plugged in'; fi
-iw phy "${RADIO_OF[nas]}" set netns name nas
+plug nas
 
 say '-- somebody else answers names'
 on nas mero-call mode client

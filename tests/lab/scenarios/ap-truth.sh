@@ -124,6 +124,6 @@ expect_truth on-air
 expect_same 'whether settings wait' no "$pending"
 
 say '-- without its adapter'
-ip netns exec nas iw phy "${RADIO_OF[nas]}" set netns 1
+unplug nas
 ends_with 3 'no adapter is plugged in' ap status
 ends_with 3 'no adapter is plugged in' mode client

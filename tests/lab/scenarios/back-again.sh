@@ -82,11 +82,11 @@ on nas merowireless ap disable
 comes_back 6 $((pause + attempt))
 
 say '-- the adapter is pulled, and plugged in again'
-ip netns exec nas iw phy "${RADIO_OF[nas]}" set netns 1
+unplug nas
 on nas /usr/mero/hotplug/usb.wireless.function remove
 within 10 told 7 || fail 'nothing is said of the adapter'
 expect_same 'what it says' 'waiting until an adapter is plugged in' "$(tail -n 1 "$lines")"
-iw phy "${RADIO_OF[nas]}" set netns name nas
+plug nas
 plug_in nas
 comes_back 8 $((pause + attempt))
 

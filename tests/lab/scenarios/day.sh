@@ -78,12 +78,12 @@ does nas radio off
 does_not nas 6 connect cafe
 does nas radio on
 expect_station cafe nas
-ip netns exec nas iw phy "${RADIO_OF[nas]}" set netns 1
+unplug nas
 expect_no_lie nas
 on nas /usr/mero/hotplug/usb.wireless.function remove
 expect_no_lie nas
 does_not nas 3 connect cafe
-iw phy "${RADIO_OF[nas]}" set netns name nas
+plug nas
 plug_in nas
 expect_no_lie nas
 does nas connect cafe
