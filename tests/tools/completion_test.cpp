@@ -121,7 +121,7 @@ TEST_P(Completion, OffersEveryCommand) {
   ASSERT_THAT(commands, testing::Contains("scan"));
   const std::string offered = Given(kAll);
   for (const std::string& command : commands) EXPECT_THAT(offered, HasSubstr(In(command)));
-  EXPECT_EQ(Given(std::string("ap ") + kAll), "<ap><disable><enable><set><show><status>");
+  EXPECT_EQ(Given(std::string("ap ") + kAll), "<ap><disable><enable><kick><set><show><stations><status>");
 }
 
 // Behind the last one zsh has the sign that a value follows.

@@ -325,6 +325,14 @@ TEST_F(Connection, Ends) {
   EXPECT_EQ(Tool({"disconnect"}).status, 1);
 }
 
+TEST_F(Connection, ThatEndsUnnotedSaysSo) {
+  Shell("mkdir -p " + std::string(kJoinLock) + " && mount -t tmpfs -o ro none " + kJoinLock);
+  const Ran ran = Tool({"disconnect"});
+  Shell("umount " + std::string(kJoinLock));
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("disconnected, but `autoconnect --keep` does not know that it is to stay so"));
+}
+
 TEST_F(Connection, OfEqualsIsACell) {
   library::InCell("cell");
   library::MEROWirelessAdhocCreate = [](const WIRELESS_NETWORK_CONFIG* config) {

@@ -84,6 +84,7 @@ class Keep : public ToolTest {
     later_ = 0;
     std::filesystem::remove_all("/tmp/world");
     std::filesystem::create_directory("/tmp/world");
+    std::filesystem::remove_all("/var/run/merowireless");
     for (const char* szPath : {kJoinMarker, kApMarker, kApInfo, kSupplicantPid}) IsNot(szPath);
     library::Known({library::Home()});
     library::Connected("Home");
@@ -267,6 +268,44 @@ TEST_F(Keep, TakesAStationThatIsNotLetInForNoConnection) {
   Shell("ip link set wlan0 mode default down && ip link set wlan0 up");
   EXPECT_TRUE(Says(tool, kConnected));
   Shell("ip link delete wlan0");
+}
+
+// It joined again once its patience was over.
+TEST_F(Keep, LeavesAnApplianceAloneThatSomebodyHasDisconnected) {
+  constexpr char kWaiting[] =
+      "waiting since somebody has disconnected; `merowireless connect` or `autoconnect` joins again\n";
+  StartedTool tool = Started({"--patience", "0"});
+  ASSERT_TRUE(Says(tool, kConnected));
+  for (const auto& again : std::vector<std::vector<std::string>>{{"connect", "Home"}, {"autoconnect"}}) {
+    const std::ptrdiff_t attempts = Attempts();
+    EXPECT_EQ(Tool({"disconnect"}).status, 0);
+    EXPECT_TRUE(Says(tool, kWaiting));
+    Pass(1000);
+    ExpectNoAttemptAfter(attempts);
+    StartedTool anew = Started({"--patience", "0"});
+    EXPECT_TRUE(Says(anew, kWaiting)) << "also one that is started later";
+    Ended(anew);
+    EXPECT_EQ(Tool(again).status, 0);
+    LetLook();
+    const std::ptrdiff_t joins = Attempts();
+    IsNot(kJoined);
+    LetLook();
+    Pass(5);
+    EXPECT_TRUE(Attempted(joins + 1)) << "a connection that is lost is joined again";
+    ASSERT_TRUE(Soon([] { return Exists(kJoined); }));
+    AwaitEnd(tool);
+  }
+}
+
+TEST_F(Keep, TakesAJoinOfAnotherProgramForAnEndOfThat) {
+  EXPECT_EQ(Tool({"disconnect"}).status, 0);
+  StartedTool tool = Started();
+  ExpectNoAttemptAfter(0);
+  WriteText("/var/tmp/.wireless_current_connection", "");
+  LetLook();
+  Pass(5);
+  EXPECT_TRUE(Attempted(1));
+  std::filesystem::remove("/var/tmp/.wireless_current_connection");
 }
 
 // Whoever wanted to do something during an attempt was refused.

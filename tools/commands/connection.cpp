@@ -14,6 +14,7 @@
 #include "model/former_connection.h"
 #include "model/join_failures.h"
 #include "model/join_lock.h"
+#include "model/left_alone.h"
 #include "model/library.h"
 #include "model/network_extras.h"
 #include "model/patience.h"
@@ -191,6 +192,7 @@ void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target
   Saving saving = Saving::kNothing;
   former.Try([&] {
     Join(program, target);
+    LeaveAloneNoMore();
     if (!wanted.noSave) saving = SaveWhatWorked(target.config, wanted.name == target.config.network.szEssid);
     if (!wanted.noAddress) ApplyAddressing(program, target.config);
   });
@@ -234,6 +236,8 @@ void JoinAgain(const Program& program, const std::string& name) {
 void AutoConnect(const Program& program, JoinLockFor who) {
   const JoinLock lock(who);
   RequireFreeAdapter();
+  if (who == JoinLockFor::kCommand) LeaveAloneNoMore();
+  if (IsLeftAlone()) return;  // the keeper has looked before it had the lock
   if (ReadStatus().isLetIn) return SayConnected(program);
   const auto networks = NetworksToTry();
   if (networks.empty()) throw NothingToJoin();
@@ -249,6 +253,7 @@ void Disconnect(const Program& program) {
   if (Run<int>(program.Doing("disconnecting"), [] { return MEROWirelessNetworkDisconnect(); }) < 0) {
     throw NotEnded();
   }
+  LeaveAlone();
   program.output.Done("disconnected");
 }
 
@@ -270,7 +275,7 @@ void MakeCell(const Program& program, const CellToMake& wanted) {
   FormerConnection(program).Try([&] {
     EndFormerSupplicant(program);
     const int result = Run<int>(program.Doing("starting " + name), [&] { return MEROWirelessAdhocCreate(&config); });
-    if (result >= 0 && IsInCell(wanted.name)) return;
+    if (result >= 0 && IsInCell(wanted.name)) return LeaveAloneNoMore();
     throw Failed("the cell " + name + " could not be started",
                  "not every adapter can; -v shows what the library reports");
   });

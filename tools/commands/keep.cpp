@@ -46,6 +46,8 @@ const char* WaitingText(Situation situation) {
       return "waiting until the radio is switched on";
     case Situation::kAccessPoint:
       return "waiting while the adapter is an access point's";
+    case Situation::kLeftAlone:
+      return "waiting since somebody has disconnected; `merowireless connect` or `autoconnect` joins again";
     case Situation::kUntold:
       return "waiting while nobody knows whether the adapter is connected";
     case Situation::kUnannounced:

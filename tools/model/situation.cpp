@@ -3,6 +3,7 @@
 
 #include "model/ap_files.h"
 #include "model/ap_state.h"
+#include "model/left_alone.h"
 #include "platform.h"
 
 namespace {
@@ -26,5 +27,6 @@ Situation SituationOf(const Status& status) {
   if (status.radio == RadioState::kUnknown) return Situation::kUnannounced;
   const bool isFree =
       status.isConnected() || status.state == WIRELESS_STATUS_DOWN || status.state == WIRELESS_STATUS_DISCONNECTED;
-  return isFree ? Situation::kFree : Situation::kUntold;
+  if (!isFree) return Situation::kUntold;
+  return IsLeftAlone() ? Situation::kLeftAlone : Situation::kFree;
 }

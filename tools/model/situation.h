@@ -7,6 +7,7 @@
 enum class Situation {
   kConnected,
   kFree,
+  kLeftAlone,    // the same, and somebody has disconnected it
   kAccessPoint,  // also one that is being set up, or off the air for hours of its schedule
   kNoAdapter,
   kRadioOff,
