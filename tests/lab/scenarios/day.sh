@@ -20,7 +20,9 @@ expect_no_lie nas
 plug_in nas
 expect_no_lie nas
 does nas radio
+does nas country
 does nas scan
+does nas channels
 does nas save home --key-file /var/lib/home.key
 does nas save park
 does nas save cafe --key-file /var/lib/wrong.key
@@ -35,8 +37,16 @@ does nas connect cafe
 expect_station cafe nas
 does nas connect park --no-address
 does nas disconnect
+does nas forget cafe
+does nas connect cafe --key-file /var/lib/cafe.key
+does nas share --svg /var/lib/cafe.svg
+does nas disconnect
+does nas edit park --auto no
+does nas edit home --priority 5
 does nas autoconnect
-expect_station cafe nas
+expect_station home nas
+does nas edit home --priority 0
+does nas connect cafe
 inside nas merowireless connect home >/dev/null 2>&1 &
 first=$!
 within 5 inside nas test -e /var/tmp/.wireless_connecting || fail 'the first does not begin'
@@ -55,11 +65,15 @@ does_not nas 4 connect nowhere
 does nas disconnect
 
 say '-- an access point'
-does nas ap set --ssid office --encryption wpa2 --key-file /var/lib/home.key --channel 11
+does nas ap set --ssid office --encryption wpa2 --key-file /var/lib/home.key --channel auto
 does nas ap enable
 guest_of nas guest essid=office auth=WPA2PSK encrypt=AES key='the old printer'
 expect_no_lie nas
 does nas ap status
+does nas ap stations
+does nas ap kick "$(address_of guest)"
+expect_no_lie nas
+does nas share ap --svg /var/lib/office.svg
 does_not nas 8 connect cafe
 does_not nas 8 scan --renew
 does nas ap set --ssid bureau --channel 6
