@@ -3,31 +3,27 @@
 
 #include <chrono>
 #include <optional>
-#include <thread>
-#include <vector>
 
 #include "base/choices.h"
-#include "common/paths.h"
 #include "model/access_points.h"
 #include "model/addressing.h"
 #include "model/ap_state.h"
 #include "model/former_connection.h"
 #include "model/join_failures.h"
 #include "model/join_lock.h"
+#include "model/joining.h"
 #include "model/left_alone.h"
 #include "model/library.h"
 #include "model/network_extras.h"
 #include "model/patience.h"
 #include "model/saved_networks.h"
 #include "model/saving.h"
-#include "model/security.h"
-#include "model/situation.h"
 #include "model/status.h"
-#include "work/supplicant.h"
+#include "model/target.h"
 
 namespace {
 
-// ---- Joining ----
+// ---- What is known beforehand ----
 
 // Fails when the adapter cannot be used, or is used otherwise.
 void RequireFreeAdapter() {
@@ -37,142 +33,23 @@ void RequireFreeAdapter() {
   RequireNoOtherJoin();
 }
 
-Task Joining(const Program& program, const std::string& what, SupplicantListener& listener) {
-  Task task = program.Doing(what);
-  task.szMarker = kJoinMarkerPath;
-  task.listener = &listener;
-  return task;
-}
-
-std::string SupplicantSocket() {
-  return std::string(kSupplicantControlDirectory) + "/" + MEROWirelessInterfaceGet();
-}
-
-// The library tells a running supplicant to end and starts the next one at once. That one gives up while the control
-// socket of the former one is still there, so the program waits for its end before it calls the library.
-void EndFormerSupplicant(const Program& program) {
-  if (PLIBCFileExist(kSupplicantPidPath) == 0) return;
-  const bool gone = Run<bool>(program.Doing("leaving the former network"), [] {
-    if (PLIBCExec("/usr/sbin/wpa_cli", "terminate", nullptr, nullptr, nullptr) != 0)
-      return true;  // no supplicant runs, and only the file of one is left
-    for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPidPath) != 0; --tries) {
-      std::this_thread::sleep_for(std::chrono::milliseconds(100));
-    }
-    return PLIBCFileExist(kSupplicantPidPath) == 0;
-  });
-  if (!gone) throw Failed("the former connection does not end", "`merowireless disconnect` ends it by force");
-}
-
-void Join(const Program& program, const KnownNetwork& config) {
-  const std::string name = program.output.Name(config.network.szEssid);
-  EndFormerSupplicant(program);
-  SupplicantListener listener(SupplicantSocket());
-  Task task = Joining(program, "joining " + name, listener);
-  task.isPointless = [&] { return listener.isFinal(); };  // the library would wait on until its time is over
-  try {
-    if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&config); }) >= 0) return;
-  } catch (const Pointless&) {
-  }
-  if (listener.verdict() != Verdict::kSecretRefused) throw JoinFailed(name, listener.verdict());
-  throw SecretRefused(JoinFailed(name, listener.verdict()), listener.accessPoint());
-}
-
-// ---- Addressing ----
-
-void ApplyAddressing(const Program& program, const KnownNetwork& config) {
-  if (config.szIp[0] != '\0') {
-    ApplyAddress(SettingAddress(program, config), config);
-    ApplySavedGateway(config);
-  }
-  ApplyNameServers(config);
-}
-
-// ---- What to join ----
-
-// A network that is to be joined.
-struct Target {
-  KnownNetwork config;
-  bool isInRange;
-  std::vector<Network> trusted = {};  // access points that are tried alone where another one refuses the secret
-};
-
-void Join(const Program& program, const Target& target) {
-  JoinTrusting(target.config, target.trusted, [&](const KnownNetwork& config) { Join(program, config); });
-}
-
-// The network of those known by one name that is in range.
-Target TargetAmong(const Program& program, const std::vector<SavedNetwork>& known, const std::vector<Network>& inRange,
-                   bool isChanged) {
-  for (const SavedNetwork& saved : known) {
-    if (const auto config = Through(saved, inRange)) {
-      return {.config = *config, .isInRange = true, .trusted = Trusted(saved, inRange)};
-    }
-  }
-  const SavedNetwork& newest = known.front();
-  const auto pretender = Pretender(newest, inRange);
-  if (!pretender) return {.config = AsSaved(newest), .isInRange = false};
-  if (!isChanged) throw NotAsSaved(program, newest, *pretender);
-  return {.config = AsChanged(newest, *pretender), .isInRange = true};
-}
-
-Target FromWhatIsKnown(const Program& program, const std::vector<SavedNetwork>& known, bool isChanged) {
-  if (known.front().isCell()) return {.config = AsSaved(known.front()), .isInRange = true};
-  return TargetAmong(program, known, LookFor(program, known.front()), isChanged);
-}
-
-// An access point of a known name, but of an address that it was not saved with, may be one of that network.
-Target FromTheAir(const Program& program, const NetworkToJoin& wanted) {
-  const Network accessPoint = FindInRange(program, wanted.name);
-  auto known = SavedAs(accessPoint.szEssid);
-  for (SavedNetwork& saved : known) saved.LeaveOnly(accessPoint);
-  if (!known.empty()) return TargetAmong(program, known, {accessPoint}, wanted.isChanged);
-  KnownNetwork config{};
-  config.network = accessPoint;
-  config.network.opmode = WIRELESS_OPMODE_MANAGED;
-  SetAddressing(config, Addressing{});
-  config.noneBssid = wanted.name == accessPoint.szEssid ? 1 : 0;
-  return {.config = config, .isInRange = true};
-}
-
-Failure NotInRange(const Program& program, const Target& target) {
-  return {Exit::kOutOfRange,
-          program.output.Name(target.config.network.szEssid) + " is not in range, and nothing was changed",
-          "move closer; `merowireless scan --renew` shows what is"};
-}
-
-// One that hides, or comes into range, is found by the attempt. It is not worth to lose a connection for, and who waits
-// is asked for nothing as long as it is not there.
-Target TargetOf(const Program& program, const NetworkToJoin& wanted) {
-  const auto known = SavedAs(wanted.name);
-  if (!known.empty() && !wanted.isChanged) RequireJoinable(program, known.front().newest.network);
-  Target target = known.empty() ? FromTheAir(program, wanted) : FromWhatIsKnown(program, known, wanted.isChanged);
-  KnownNetwork& config = target.config;
-  RequireJoinable(program, config.network);
-  if (!target.isInRange && !wanted.wait.empty()) throw NotInRange(program, target);
-  SetText(config.szUser, UserOf(program, config, wanted.user), "the user");
-  if (config.szKey[0] == '\0' || wanted.secret.isGiven()) SetSecret(program, config, wanted.secret);
-  if (wanted.anyAccessPoint) config.noneBssid = 1;
-  return target;
-}
-
-// One that is given has been looked at.
-void RequireSavedSecret(const Program& program, const KnownNetwork& config) {
-  if (CanBeSecret(config.network.auth, config.szKey)) return;
-  throw Failure(Exit::kSecretRefused,
-                "the secret that was saved for " + program.output.Name(config.network.szEssid) + " can be none",
-                "`merowireless save` saves the right one");
-}
-
-void SayConnected(const Program& program, const char* szMore = "") {
-  const Status status = ReadStatus();
-  program.output.Done(ConnectionText(program.output, status) + szMore, "status", StatusFields(), status);
-}
-
 // Whoever is asked for a secret is told before that the adapter is used otherwise, and keeps nobody else from it with
 // his answer.
 void RequireFreeAdapterNow() {
   const JoinLock lock;
   RequireFreeAdapter();
+}
+
+// One that hides, or comes into range, is found by the attempt. It is not worth to lose a connection for, and who waits
+// is asked for nothing as long as it is not there.
+Target TargetOf(const Program& program, const NetworkToJoin& wanted) {
+  Target target = FindTarget(program, wanted.name, wanted.isChanged);
+  KnownNetwork& config = target.config;
+  if (!target.isInRange && !wanted.wait.empty()) throw NotInRange(program, target);
+  SetText(config.szUser, UserOf(program, config, wanted.user), "the user");
+  if (config.szKey[0] == '\0' || wanted.secret.isGiven()) SetSecret(program, config, wanted.secret);
+  if (wanted.anyAccessPoint) config.noneBssid = 1;
+  return target;
 }
 
 // The network that is wanted.
@@ -182,6 +59,21 @@ Target ToBeJoined(const Program& program, const NetworkToJoin& wanted) {
   RequireSavedSecret(program, target.config);
   if (!wanted.noAddress) RequireAddressing(target.config);
   return target;
+}
+
+// ---- The connection ----
+
+void ApplyAddressing(const Program& program, const KnownNetwork& config) {
+  if (config.szIp[0] != '\0') {
+    ApplyAddress(SettingAddress(program, config), config);
+    ApplySavedGateway(config);
+  }
+  ApplyNameServers(config);
+}
+
+void SayConnected(const Program& program, const char* szMore = "") {
+  const Status status = ReadStatus();
+  program.output.Done(ConnectionText(program.output, status) + szMore, "status", StatusFields(), status);
 }
 
 void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target& target) {
@@ -228,7 +120,7 @@ void Connect(const Program& program, const NetworkToJoin& wanted) {
 }
 
 void JoinAgain(const Program& program, const std::string& name) {
-  const Target target = FromWhatIsKnown(program, SavedAs(name), false);
+  const Target target = SavedTarget(program, name);
   Join(program, target);
   ApplyAddressing(program, target.config);
 }
