@@ -283,6 +283,22 @@ void AddConnectionCommands(Commands& commands) {
 
 // ---- The access point and the adapter ----
 
+void DescribeApChanges(CLI::App& command, ApChanges& values) {
+  for (const ApSetting& setting : ApSettings()) {
+    if (!setting.hasOption()) continue;
+    const auto key = setting.field.key;
+    command
+        .add_option_function<std::string>(
+            "--" + OptionOf(key), [&values, key](const std::string& text) { values.settings[key] = text; },
+            setting.szHelp)
+        ->option_text(setting.szValue);
+  }
+  DescribeSecret(command, values.secret);
+  command.add_option("--guest-net-key-file", values.guestKeyFile, "read the guest network's secret from FILE")
+      ->option_text("FILE")
+      ->check(HasName);
+}
+
 void AddApCommands(Commands& commands, CLI::App& app) {
   CLI::App* ap = app.add_subcommand("ap", "Show, change and switch the access point");
   ap->require_subcommand(1);
@@ -297,24 +313,7 @@ void AddApCommands(Commands& commands, CLI::App& app) {
         command.add_flag("--show-secrets", values.secrets, "show the secrets too");
       },
       [](const Program& program, const Showing& values) { ShowAp(program, values.secrets); });
-  commands.Add<ApChanges>(
-      *ap, "set", "Change settings; the others stay",
-      [](CLI::App& command, ApChanges& values) {
-        for (const ApSetting& setting : ApSettings()) {
-          if (!setting.hasOption()) continue;
-          const auto key = setting.field.key;
-          command
-              .add_option_function<std::string>(
-                  "--" + OptionOf(key), [&values, key](const std::string& text) { values.settings[key] = text; },
-                  setting.szHelp)
-              ->option_text(setting.szValue);
-        }
-        DescribeSecret(command, values.secret);
-        command.add_option("--guest-net-key-file", values.guestKeyFile, "read the guest network's secret from FILE")
-            ->option_text("FILE")
-            ->check(HasName);
-      },
-      SetAp);
+  commands.Add<ApChanges>(*ap, "set", "Change settings; the others stay", DescribeApChanges, SetAp);
   commands.AddPlain(*ap, "enable", "Put the access point on the air", WithAdapter(EnableAp));
   commands.AddPlain(*ap, "disable", "Take the access point down", DisableAp);
   commands.AddPlain(*ap, "status", "Show whether the access point is on the air", ShowApStatus);

@@ -127,6 +127,7 @@ std::vector<SavedNetwork> NetworksToTry() {
   }
   std::ranges::stable_sort(turns, std::greater{}, &Turn::priority);
   std::vector<SavedNetwork> networks;
+  networks.reserve(turns.size());
   for (Turn& turn : turns) networks.push_back(std::move(turn.network));
   return networks;
 }

@@ -87,8 +87,9 @@ std::string CodePicture::Svg() const {
       if (!IsDark(row, column)) continue;
       const std::size_t first = column;
       while (IsDark(row, column)) ++column;
+      path.append("M").append(std::to_string(first)).append(" ").append(std::to_string(row));
       const std::string run = std::to_string(column - first);
-      path += "M" + std::to_string(first) + " " + std::to_string(row) + "h" + run + "v1h-" + run + "z";
+      path.append("h").append(run).append("v1h-").append(run).append("z");
     }
   }
   return "<svg xmlns=\"http://www.w3.org/2000/svg\" viewBox=\"0 0 " + side + " " + side +
