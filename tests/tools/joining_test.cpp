@@ -25,15 +25,18 @@ namespace {
 
 constexpr char kInRange[] = "/tmp/in-range";
 constexpr char kCalled[] = "/tmp/called";
+constexpr char kCalls[] = "/tmp/calls";
 constexpr char kSecret[] = "/tmp/secret";
 constexpr char kJoinMarker[] = "/var/tmp/.wireless_connecting";
+
+constexpr int kMany = 20;
 
 bool g_canCall = false;
 
 class Joining : public ToolTest {
  protected:
   Joining() {
-    for (const char* szPath : {kInRange, kCalled, kJoinMarker}) std::filesystem::remove(szPath);
+    for (const char* szPath : {kInRange, kCalled, kCalls, kJoinMarker}) std::filesystem::remove(szPath);
     WriteText(kSecret, "open sesame\n");
     library::InRange({Network("cafe")});
     library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG*) { return 0; };
@@ -41,6 +44,18 @@ class Joining : public ToolTest {
     library::MEROWirelessConfSet = [](const WIRELESS_NETWORK_CONFIG* config) {
       return library::Record(std::string(config->network.szEssid) + "|" + config->szKey + "|" + config->szIp), 0;
     };
+  }
+
+  // Many networks, of which "Home" was saved before all the others.
+  static void KnowMany() {
+    std::vector<WIRELESS_NETWORK_CONFIG> known;
+    for (int i = 1; i <= kMany; ++i) {
+      WIRELESS_NETWORK_CONFIG& config = known.emplace_back(library::Home());
+      config.atime = i;
+      config.network.bssid[5] = static_cast<unsigned char>(i);
+      if (i > 1) std::snprintf(config.network.szEssid, sizeof config.network.szEssid, "away %d", i);
+    }
+    library::Known(known);
   }
 
   // The networks are in range once there is a file at this path.
@@ -216,6 +231,39 @@ TEST_F(Joining, FindsANetworkThatHidesByItsNameAlone) {
   EXPECT_EQ(Tool({"save", "cafe", "--key-file", kSecret}).status, 0);
 }
 
+// Each network that was not there was called for some seconds, and everybody in range learned its name.
+TEST_F(Joining, ByItselfScansOnceForAllThatAreKnownAndCallsNone) {
+  g_canCall = true;
+  KnowMany();
+  library::MEROWirelessNetworkScan = [](WIRELESS_SCAN scan, WIRELESS_LIST* head) {
+    if (scan == WIRELESS_SCAN_RENEW) library::Record("MEROWirelessNetworkScan"), WriteText(kInRange, "");
+    FillRing(head, Exists(kInRange) ? std::vector{Network("Home")} : std::vector<WIRELESS_NETWORK>());
+    return 0;
+  };
+  const Ran ran = Tool({"autoconnect"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_THAT(library::Calls(),
+              ElementsAre("MEROWirelessNetworkScan", "MEROWirelessNetworkConnect", "MEROWirelessIfconfigSet"));
+  EXPECT_EQ(TextOrNothing(kCalls), "");
+}
+
+// Each was joined in vain for fifteen seconds then, while the one that came into range had to wait.
+TEST_F(Joining, ByItselfCallsThoseThatMayHideOnceAndLast) {
+  g_canCall = true;
+  KnowMany();
+  ComeIntoRangeWith(kInRange);
+  EXPECT_EQ(Tool({"autoconnect"}).status, 4);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkScan", "MEROWirelessNetworkDisconnect"));
+  std::string all;
+  for (int i = kMany; i > 1; --i) all += "away " + std::to_string(i) + "\n";
+  EXPECT_EQ(TextOrNothing(kCalls), all + "Home\n");
+
+  ComeIntoRangeWith(kCalled);  // by now it is as if the call of another one has shown it
+  std::filesystem::remove(kCalled);
+  EXPECT_EQ(Tool({"autoconnect"}).status, 0);
+  EXPECT_THAT(library::Calls(), Contains("MEROWirelessNetworkConnect"));
+}
+
 TEST_F(Joining, CallsNoAddress) {
   g_canCall = true;
   ComeIntoRangeWith(kInRange);
@@ -225,7 +273,8 @@ TEST_F(Joining, CallsNoAddress) {
 
 }  // namespace
 
-// The program comes upon this one before libc's. A network that is called has the name of the call as a file.
+// The program comes upon this one before libc's. A network that is called has the name of the call as a file, and the
+// names of all calls are lines of another.
 extern "C" int ioctl(int fd, unsigned long request, ...) noexcept {
   va_list arguments;
   va_start(arguments, request);
@@ -234,6 +283,8 @@ extern "C" int ioctl(int fd, unsigned long request, ...) noexcept {
   if (g_canCall && request == SIOCGIWSCAN) return 0;
   if (!g_canCall || request != SIOCSIWSCAN) return static_cast<int>(::syscall(SYS_ioctl, fd, request, argument));
   const auto* call = static_cast<const iw_scan_req*>(static_cast<const iwreq*>(argument)->u.data.pointer);
-  WriteText(kCalled, std::string(reinterpret_cast<const char*>(call->essid), call->essid_len));
+  const std::string name(reinterpret_cast<const char*>(call->essid), call->essid_len);
+  WriteText(kCalled, name);
+  WriteText(kCalls, TextOrNothing(kCalls) + name + "\n");
   return 0;
 }

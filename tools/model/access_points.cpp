@@ -46,52 +46,101 @@ class Walk {
  public:
   Walk(const Program& program, const std::function<void(const KnownNetwork&)>& join) : program_(program), join_(join) {}
 
-  // Tries those in range; the rest waits until the others were tried in vain. A cell waits for nobody.
-  std::optional<KnownNetwork> TryInRange(const SavedNetwork& saved) {
+  // Tries a network if it is heard. A cell waits for nobody.
+  std::optional<KnownNetwork> TryHeard(const SavedNetwork& saved) {
     if (saved.isCell()) return Try(AsSaved(saved));
-    const auto inRange = Heard(saved);
-    if (const auto config = Through(saved, inRange)) return Try(*config, Trusted(saved, inRange));
-    if (const auto pretender = Pretender(saved, inRange)) {
-      passedOver_.push_back(NotAsSaved(program_, saved, *pretender));
-    } else if (saved.newest.network.auth != WIRELESS_AUTH_UNKNOWN &&
-               saved.newest.network.encrypt != WIRELESS_ENCRYPT_UNKNOWN) {
-      unheard_.push_back(AsSaved(saved));
-    }
+    if (const auto config = Heard(saved)) return Try(*config, Trusted(saved, inRange_));
+    missed_.push_back({saved, Pretender(saved, inRange_)});
     return std::nullopt;
   }
 
-  std::optional<KnownNetwork> TryUnheard() {
-    for (const KnownNetwork& config : unheard_) {
+  // Calls those that were not heard, since they may hide, and tries those that answer. It takes a scan for each, and
+  // tells everybody in range their names, so it is the last that is done.
+  std::optional<KnownNetwork> TryCalled() {
+    std::vector<KnownNetwork> uncalled;
+    for (Missed& missed : missed_) {
+      const SavedNetwork& saved = missed.saved;
+      const bool called = Through(saved, inRange_) || Call(saved);
+      missed.pretender = Pretender(saved, inRange_);
+      if (const auto config = Through(saved, inRange_)) {
+        if (const auto joined = Try(*config, Trusted(saved, inRange_))) return joined;
+      } else if (!called && !missed.pretender && HasProtection(saved)) {
+        uncalled.push_back(AsSaved(saved));
+      }
+    }
+    for (const KnownNetwork& config : uncalled) {
       if (const auto joined = Try(config)) return joined;
     }
     return std::nullopt;
   }
 
-  void TellOfThosePassedOver() const {
-    for (const Failure& failure : passedOver_) Remark("merowireless: " + std::string(failure.what()));
+  // A remark for each network that is only pretended to be there.
+  void TellOfPretenders() const {
+    for (const Failure& failure : Pretenders()) Remark("merowireless: " + std::string(failure.what()));
   }
 
   // Why no network was joined.
-  Failure Why() {
-    if (failure_) return TellOfThosePassedOver(), *failure_;
-    if (!passedOver_.empty()) {
-      const Failure first = passedOver_.front();
-      passedOver_.erase(passedOver_.begin());
-      return TellOfThosePassedOver(), first;
+  Failure Why() const {
+    if (failure_) return TellOfPretenders(), *failure_;
+    const auto pretenders = Pretenders();
+    if (pretenders.empty()) {
+      return {Exit::kOutOfRange, "none of the known networks could be joined",
+              "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
     }
-    return {Exit::kOutOfRange, "none of the known networks could be joined",
-            "`merowireless scan --renew` shows what is in range; `merowireless connect NAME` says why one fails"};
+    for (std::size_t i = 1; i < pretenders.size(); ++i) Remark("merowireless: " + std::string(pretenders[i].what()));
+    return pretenders.front();
   }
 
  private:
+  // A network that is not heard as it was saved.
+  struct Missed {
+    SavedNetwork saved;
+    std::optional<Network> pretender;
+  };
+
+  // The adapter's last results serve as long as they hold each network that is looked for; then it scans, once for all.
+  std::optional<KnownNetwork> Heard(const SavedNetwork& saved) {
+    if (looks_ == 0) Look(WIRELESS_SCAN_LAST);
+    const auto config = Through(saved, inRange_);
+    if (config || looks_ > 1) return config;
+    Look(WIRELESS_SCAN_RENEW);
+    return Through(saved, inRange_);
+  }
+
   // Where the adapter gives no results, a network may be in range all the same.
-  std::vector<Network> Heard(const SavedNetwork& saved) const {
+  void Look(WIRELESS_SCAN scan) {
+    ++looks_;
     try {
-      return LookFor(program_, saved);
+      inRange_ = InRangeToJoin(program_.Doing("looking for known networks"), scan);
     } catch (const Failure& failure) {
       if (!IsOfOneNetwork(failure)) throw;
-      return {};
+      inRange_.clear();
     }
+  }
+
+  std::vector<Failure> Pretenders() const {
+    std::vector<Failure> failures;
+    for (const Missed& missed : missed_) {
+      if (missed.pretender) failures.push_back(NotAsSaved(program_, missed.saved, *missed.pretender));
+    }
+    return failures;
+  }
+
+  // Whether it would have answered.
+  bool Call(const SavedNetwork& saved) {
+    try {
+      auto answers = InRangeOnCall(program_, saved.newest.network.szEssid);
+      if (answers) inRange_ = *std::move(answers);
+      return answers.has_value();
+    } catch (const Failure& failure) {
+      if (!IsOfOneNetwork(failure)) throw;
+      return false;
+    }
+  }
+
+  static bool HasProtection(const SavedNetwork& saved) {
+    return saved.newest.network.auth != WIRELESS_AUTH_UNKNOWN &&
+           saved.newest.network.encrypt != WIRELESS_ENCRYPT_UNKNOWN;
   }
 
   std::optional<KnownNetwork> Try(const KnownNetwork& config, const std::vector<Network>& trusted = {}) {
@@ -109,8 +158,9 @@ class Walk {
 
   const Program& program_;
   const std::function<void(const KnownNetwork&)>& join_;
-  std::vector<KnownNetwork> unheard_;
-  std::vector<Failure> passedOver_;
+  std::vector<Network> inRange_;
+  int looks_ = 0;
+  std::vector<Missed> missed_;
   std::optional<Failure> failure_;  // the first that tells more than that a network was not there
 };
 
@@ -202,11 +252,11 @@ KnownNetwork JoinFirst(const Program& program, const std::vector<SavedNetwork>& 
   Walk walk(program, join);
   std::optional<KnownNetwork> joined;
   for (const SavedNetwork& saved : networks) {
-    joined = walk.TryInRange(saved);
+    joined = walk.TryHeard(saved);
     if (joined) break;
   }
-  if (!joined) joined = walk.TryUnheard();
+  if (!joined) joined = walk.TryCalled();
   if (!joined) throw walk.Why();
-  walk.TellOfThosePassedOver();
+  walk.TellOfPretenders();
   return *joined;
 }

@@ -38,8 +38,8 @@ KnownNetwork AsChanged(const SavedNetwork& saved, const Network& accessPoint);
 Failure NotAsSaved(const Program& program, const SavedNetwork& saved, const Network& pretender);
 
 // Joins the first network that lets the appliance in, and gives how; fails with the failure that tells most. `join`
-// fails when one does not. Those that no scan shows are tried behind the others. A remark tells of each network that is
-// passed over.
+// fails when one does not. Those that no scan shows are called behind the others. A remark tells of each network that
+// is passed over.
 KnownNetwork JoinFirst(const Program& program, const std::vector<SavedNetwork>& networks,
                        const std::function<void(const KnownNetwork&)>& join);
 

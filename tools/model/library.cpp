@@ -100,6 +100,20 @@ std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan) {
   return AccessPointsOf(RunBytes(program.Doing("scanning"), [scan] { return Scanned(scan); }));
 }
 
+std::vector<Network> InRangeToJoin(const Task& task, WIRELESS_SCAN scan) {
+  return AccessPointsOf(RunBytes(task, [scan] { return ScannedToJoin(scan); }));
+}
+
+std::optional<std::vector<Network>> InRangeOnCall(const Program& program, const std::string& name) {
+  if (ParseAddress(name)) return std::nullopt;
+  const Task task = program.Doing("looking for " + program.output.Name(name));
+  const std::string answers = RunBytes(task, [&] {
+    return CallNetwork(MEROWirelessInterfaceGet(), name) ? ScannedToJoin(WIRELESS_SCAN_LAST) : std::string();
+  });
+  if (answers.empty()) return std::nullopt;
+  return AccessPointsOf(answers);
+}
+
 std::vector<KnownNetwork> Known(Order order) {
   Ring<KnownNetwork> ring;
   const auto list = order == Order::kByTime ? MEROWirelessConfEnumByAtime : MEROWirelessConfEnum;
@@ -112,12 +126,10 @@ std::vector<KnownNetwork> Known(Order order) {
 std::vector<Network> LookFor(const Program& program, const std::string& name,
                              const std::function<bool(const Network&)>& isWanted) {
   const Task task = program.Doing("looking for " + program.output.Name(name));
-  auto last = AccessPointsOf(RunBytes(task, [] { return ScannedToJoin(WIRELESS_SCAN_LAST); }));
+  auto last = InRangeToJoin(task, WIRELESS_SCAN_LAST);
   if (std::ranges::any_of(last, isWanted)) return last;
-  return AccessPointsOf(RunBytes(task, [&] {
-    const bool called = !ParseAddress(name) && CallNetwork(MEROWirelessInterfaceGet(), name);
-    return ScannedToJoin(called ? WIRELESS_SCAN_LAST : WIRELESS_SCAN_RENEW);
-  }));
+  if (auto answers = InRangeOnCall(program, name)) return *std::move(answers);
+  return InRangeToJoin(task, WIRELESS_SCAN_RENEW);
 }
 
 bool IsNamed(const Network& network, const std::string& name) {

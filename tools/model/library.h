@@ -26,9 +26,15 @@ std::vector<Network> InRange(const Program& program, WIRELESS_SCAN scan);
 // The networks that have been saved.
 std::vector<KnownNetwork> Known(Order order);
 
-// All access points in range, the strongest first. Where the adapter's last results hold none that `isWanted`, the
-// network of this name is called, which it answers even if it hides, or else the adapter scans. The protection of those
-// that cannot be joined is unknown.
+// The same, for a join: the protection of those that cannot be joined is unknown.
+std::vector<Network> InRangeToJoin(const Task& task, WIRELESS_SCAN scan);
+
+// The same behind a call of the network of this name, which answers even if it hides. Whoever listens learns the name.
+// Nothing when the driver does not call.
+std::optional<std::vector<Network>> InRangeOnCall(const Program& program, const std::string& name);
+
+// The same. Where the adapter's last results hold none that `isWanted`, the network of this name is called, or else the
+// adapter scans.
 std::vector<Network> LookFor(const Program& program, const std::string& name,
                              const std::function<bool(const Network&)>& isWanted);
 
