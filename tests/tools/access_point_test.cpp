@@ -643,6 +643,20 @@ TEST_F(AccessPoint, IsBeingSetUpWhileSomebodyIsAtIt) {
   EXPECT_THAT(Tool({"ap", "status"}).out, testing::StartsWith("access point  being set up\n"));
 }
 
+// Whoever has an account could keep the adapter from everybody for ever, with a file and a program that has the
+// library.
+TEST_F(AccessPoint, IsNotBeingSetUpByAMarkerThatIsNotRoots) {
+  WriteText(kApMarkerPath, "");
+  Shell(std::string("chown 65534 ") + kApMarkerPath);
+  EXPECT_EQ(StatusLine(), "off");
+}
+
+// The clock was put back at a start.
+TEST_F(AccessPoint, IsNotBeingSetUpByAMarkerFromTheFuture) {
+  Shell(std::string("touch -d tomorrow ") + kApMarkerPath);
+  EXPECT_EQ(StatusLine(), "off");
+}
+
 // A process that was killed left its marker, and the access point was "being set up" from then on.
 TEST_F(AccessPoint, IsNotBeingSetUpByAProcessThatIsGone) {
   Shell(std::string("touch -d '10 minutes ago' ") + kApMarkerPath);

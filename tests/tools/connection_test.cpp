@@ -10,6 +10,7 @@
 #include <filesystem>
 
 #include "running.h"
+#include "tests/support/local_user.h"
 
 using library::Network;
 using testing::AllOf;
@@ -234,8 +235,26 @@ TEST_F(Connection, IsMadeWhenOnlyTheMarkerOfOneIsLeft) {
     EXPECT_EQ(Tool({"connect", "Home"}).status, 0) << change;
     EXPECT_FALSE(Exists(kJoinMarker)) << change;
   }
-  WriteText(kJoinMarker + std::string("/file"), "");
+}
+
+// A directory that was not empty stayed, and kept the appliance from every network.
+TEST_F(Connection, IsMadeWhateverLocalUsersHavePutInItsWay) {
+  if (!HasLocalUsers()) GTEST_SKIP() << "this machine has no other users";
+  const std::string victim = "/tmp/victim";
+  WriteText(victim, "as was");
+  ObstructEachWay(
+      kJoinMarker, victim, [] { std::filesystem::remove_all(kJoinMarker); },
+      [] {
+        const Ran ran = Tool({"connect", "Home"});
+        EXPECT_EQ(ran.status, 0) << ran.err;
+        EXPECT_FALSE(Exists(kJoinMarker));
+      });
+}
+
+TEST_F(Connection, IsNotMadeWhileTheMarkerOfAnotherCannotBeRemoved) {
+  Shell("mkdir " + std::string(kJoinMarker) + " && mount -t tmpfs none " + kJoinMarker);
   const Ran ran = Tool({"connect", "Home"});
+  Shell("umount " + std::string(kJoinMarker));
   EXPECT_EQ(ran.status, 1);
   EXPECT_THAT(ran.err, HasSubstr("an old marker of a join cannot be removed"));
 }

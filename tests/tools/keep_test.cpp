@@ -308,6 +308,17 @@ TEST_F(Keep, TakesAJoinOfAnotherProgramForAnEndOfThat) {
   std::filesystem::remove("/var/tmp/.wireless_current_connection");
 }
 
+// Whoever has an account could undo what the administrator wanted.
+TEST_F(Keep, TakesNoFileOfALocalUserForAJoin) {
+  EXPECT_EQ(Tool({"disconnect"}).status, 0);
+  WriteText("/var/tmp/.wireless_current_connection", "");
+  Shell("chown 65534 /var/tmp/.wireless_current_connection");
+  StartedTool tool = Started();
+  LetLook();
+  ExpectNoAttemptAfter(0);
+  std::filesystem::remove("/var/tmp/.wireless_current_connection");
+}
+
 // Whoever wanted to do something during an attempt was refused.
 TEST_F(Keep, GivesWayToWhateverSomebodyWants) {
   Is(kSlow);

@@ -2,7 +2,6 @@
 #include "model/ap_state.h"
 
 #include <dirent.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -16,6 +15,7 @@
 #include <system_error>
 
 #include "base/failure.h"
+#include "base/marker.h"
 #include "base/pid_file.h"
 #include "base/text.h"
 #include "base/whole_file.h"
@@ -30,14 +30,10 @@ namespace {
 using std::chrono::nanoseconds;
 using std::chrono::seconds;
 
-nanoseconds Duration(const timespec& time) {
-  return seconds(time.tv_sec) + nanoseconds(time.tv_nsec);
-}
-
-nanoseconds Now(clockid_t clock) {
+nanoseconds SinceStart() {
   timespec now{};
-  ::clock_gettime(clock, &now);
-  return Duration(now);
+  ::clock_gettime(CLOCK_BOOTTIME, &now);
+  return seconds(now.tv_sec) + nanoseconds(now.tv_nsec);
 }
 
 // The time from the machine's start to that of a process.
@@ -73,8 +69,7 @@ bool CouldHaveMade(const char* szPid, nanoseconds age) {
   if (!pid || *pid == ::getpid()) return false;
   const std::string process = std::string("/proc/") + szPid;
   const auto start = StartOf(process);
-  return start && *start <= Now(CLOCK_BOOTTIME) - age + kTick && IsOfThisNetwork(process) &&
-         HasLoadedTheLibrary(process);
+  return start && *start <= SinceStart() - age + kTick && IsOfThisNetwork(process) && HasLoadedTheLibrary(process);
 }
 
 // ---- What runs ----
@@ -95,14 +90,12 @@ bool IsRunning(const std::string& interface) {
 
 bool IsBeingSetUp() {
   constexpr nanoseconds kLongest = std::chrono::minutes(5);
-  struct stat marker {};
-  if (MEROWirelessTestAPMode() == FALSE || ::stat(kApMarkerPath, &marker) < 0) return false;
-  const nanoseconds age = Now(CLOCK_REALTIME) - Duration(marker.st_mtim);
-  if (age > kLongest) return false;
+  const auto age = AgeOfMarker(kApMarkerPath);
+  if (MEROWirelessTestAPMode() == FALSE || !age || *age < nanoseconds(0) || *age > kLongest) return false;
   const std::unique_ptr<DIR, int (*)(DIR*)> processes(::opendir("/proc"), ::closedir);
   if (!processes) return false;
   while (const dirent* entry = ::readdir(processes.get())) {
-    if (CouldHaveMade(entry->d_name, age)) return true;
+    if (CouldHaveMade(entry->d_name, *age)) return true;
   }
   return false;
 }

@@ -8,14 +8,14 @@
 
 #include <cerrno>
 #include <chrono>
-#include <cstdio>
-#include <ctime>
 #include <string>
 #include <thread>
 
 #include "base/failure.h"
+#include "base/marker.h"
 #include "common/paths.h"
 #include "model/library.h"
+#include "platform.h"
 
 namespace {
 
@@ -58,14 +58,11 @@ bool TakeFromKeeper(const Descriptor& lock, JoinLockFor who) {
 }
 
 // Whether the marker tells of a join that is under way. One that was cut off, as by a power cut, leaves its marker
-// behind; a join does not last long, so an old marker tells of nothing. Nor does one that is not root's, since anyone
-// may make files where it stands.
+// behind; a join does not last long, so an old marker tells of nothing.
 bool IsUnderWay() {
-  constexpr std::time_t kLongest = 120;  // seconds
-  struct stat marker {};
-  if (::lstat(kJoinMarkerPath, &marker) < 0 || !S_ISREG(marker.st_mode) || marker.st_uid != 0) return false;
-  const std::time_t age = std::time(nullptr) - marker.st_mtime;
-  return age >= 0 && age < kLongest;
+  constexpr std::chrono::seconds kLongest{120};
+  const auto age = AgeOfMarker(kJoinMarkerPath);
+  return age && *age >= std::chrono::seconds(0) && *age < kLongest;
 }
 
 }  // namespace
@@ -88,6 +85,6 @@ bool IsKeeperInTheWay() {
 
 void RequireNoOtherJoin() {
   if (IsUnderWay()) throw Failure(Exit::kBusy, "another program is joining a network", kAdvice);
-  if (std::remove(kJoinMarkerPath) == 0 || errno == ENOENT) return;
+  if (PLIBCSysUnlink(kJoinMarkerPath) == 0) return;
   throw Failed("an old marker of a join cannot be removed", "look at " + std::string(kJoinMarkerPath));
 }

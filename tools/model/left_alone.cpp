@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <string>
 
+#include "base/marker.h"
 #include "common/paths.h"
 #include "model/failed.h"
 
@@ -15,10 +16,6 @@ namespace {
 // A directory, like the lock in which it is: nothing can be left half written.
 std::string Note() {
   return std::string(kJoinLock) + "/left-alone";
-}
-
-bool Exists(const std::string& path) {
-  return ::access(path.c_str(), F_OK) == 0;
 }
 
 }  // namespace
@@ -35,5 +32,5 @@ void LeaveAloneNoMore() {
 
 // The record of a connection is made by each join, and goes with the connection that somebody ends.
 bool IsLeftAlone() {
-  return Exists(Note()) && !Exists(kConnectionRecordPath);
+  return ::access(Note().c_str(), F_OK) == 0 && !AgeOfMarker(kConnectionRecordPath);
 }
