@@ -82,8 +82,17 @@ on nas merowireless connect 'not told'
 expect_station shy nas
 on nas merowireless disconnect
 
-say '-- a network that is not there yet'
+say '-- a network that hides, by itself, behind all those that are not there'
 switch_off home
+for number in {1..3}; do
+  on nas merowireless save "away $number" --bssid "02:00:5e:00:00:0$number" --security open
+done
+on nas merowireless autoconnect
+expect_station shy nas
+on nas merowireless disconnect
+for number in {1..3}; do on nas merowireless forget "away $number"; done
+
+say '-- a network that is not there yet'
 inside nas sh -c 'merowireless connect home --wait 60 >/var/lib/output 2>&1; echo $? >/var/lib/status' &
 waiting=$!
 sleep 3
