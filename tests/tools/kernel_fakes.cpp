@@ -70,7 +70,7 @@ std::string Description(const Interface& interface) {
 }
 
 // The first one has been there for an hour, and each one after it for a minute.
-std::string Station(int number, bool isLetIn) {
+std::string Station(int number, bool isLetIn, Driver driver) {
   return MessageOf(NL80211_CMD_NEW_STATION, [&](nl_msg* message) {
     const unsigned char address[] = {2, 0, 0, 0, 0, static_cast<unsigned char>(number)};
     const nl80211_sta_flag_update flags{1U << NL80211_STA_FLAG_AUTHORIZED,
@@ -78,8 +78,13 @@ std::string Station(int number, bool isLetIn) {
     nla_put(message, NL80211_ATTR_MAC, sizeof address, address);
     nlattr* nest = nla_nest_start(message, NL80211_ATTR_STA_INFO);
     nla_put_u8(message, NL80211_STA_INFO_SIGNAL, static_cast<std::uint8_t>(-40 - 5 * number));
-    nla_put_u64(message, NL80211_STA_INFO_RX_BYTES64, number == 0 ? 123'456'789 : 900);
-    nla_put_u64(message, NL80211_STA_INFO_TX_BYTES64, number == 0 ? 5'000'000'000 : 1'234);
+    if (driver == Driver::kTellsAll) {
+      nla_put_u64(message, NL80211_STA_INFO_RX_BYTES64, number == 0 ? 123'456'789 : 900);
+      nla_put_u64(message, NL80211_STA_INFO_TX_BYTES64, number == 0 ? 5'000'000'000 : 1'234);
+    } else if (driver == Driver::kCountsTo32Bits) {
+      nla_put_u32(message, NL80211_STA_INFO_RX_BYTES, 900);
+      nla_put_u32(message, NL80211_STA_INFO_TX_BYTES, 4'000'000'000);
+    }
     nla_put_u32(message, NL80211_STA_INFO_CONNECTED_TIME, number == 0 ? 3600 : 60);
     nla_put(message, NL80211_STA_INFO_STA_FLAGS, sizeof flags, &flags);
     nla_nest_end(message, nest);
@@ -201,7 +206,9 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
   if (!asked.isThere) return messages;
   if (command == NL80211_CMD_GET_INTERFACE) messages.push_back(kernel::Description(asked));
   if (command == NL80211_CMD_GET_STATION) {
-    for (int i = 0; i < asked.stations; ++i) messages.push_back(kernel::Station(i, i < asked.stations - asked.joining));
+    for (int i = 0; i < asked.stations; ++i) {
+      messages.push_back(kernel::Station(i, i < asked.stations - asked.joining, asked.driver));
+    }
     if (asked.signal != 0) messages.push_back(kernel::AccessPoint(asked));
   }
   if (command == NL80211_CMD_GET_WIPHY) {
@@ -211,6 +218,12 @@ std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::s
     }
   }
   return messages;
+}
+
+std::optional<std::vector<std::string>> AskForStations(const std::string& interface) {
+  const kernel::Interface& asked = interface == kGuestInterface ? kernel::Guests() : kernel::Main();
+  if (asked.isThere && asked.driver == kernel::Driver::kListsNone) return std::nullopt;
+  return AskWirelessStack(NL80211_CMD_GET_STATION, interface, true);
 }
 
 std::vector<std::string> AskForRules() {

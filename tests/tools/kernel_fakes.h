@@ -27,6 +27,9 @@ struct Result {
 // Those that there are from now on; at first there are none.
 void Heard(std::vector<Result> results);
 
+// How much a driver tells of stations: all, their traffic in 32 bits, no traffic, or not even which there are.
+enum class Driver { kTellsAll, kCountsTo32Bits, kDoesNotCount, kListsNone };
+
 // An interface, as the kernel tells of it; on the air as an access point when it has a name.
 struct Interface {
   bool isThere;
@@ -38,6 +41,7 @@ struct Interface {
   unsigned rate = 0;        // in tenths of a megabit
   unsigned secondsAgo = 0;  // when it was joined
   int joining = 0;          // how many of its stations, the last ones, it has not let in yet
+  Driver driver = Driver::kTellsAll;
 };
 
 // wlan0 and the guests'. Processes of the program's own see them too, and change them for all.

@@ -86,6 +86,26 @@ TEST_F(Stations, AreNoneWithoutAnAccessPoint) {
   EXPECT_EQ(Tool({"ap", "stations"}).out, "no station is on the access point\n");
 }
 
+// Their traffic was said to be 0 then.
+TEST_F(Stations, HaveTheTrafficThatADriverOfAnyKindCounts) {
+  kernel::Main().stations = 1;
+  kernel::Main().driver = kernel::Driver::kCountsTo32Bits;
+  EXPECT_THAT(First(), HasSubstr("\t-40\t900\t4000000000\t"));
+  kernel::Main().driver = kernel::Driver::kDoesNotCount;
+  EXPECT_THAT(Tool({"ap", "stations"}).out, HasSubstr("  -40     -   -  1 h"));
+  EXPECT_THAT(Tool({"ap", "stations", "--json"}).out, HasSubstr(R"("signal":-40,"rx_bytes":null,"tx_bytes":null,)"));
+}
+
+// It was said that there were none.
+TEST_F(Stations, AreNotDeniedWhereTheDriverCannotListThem) {
+  kernel::Main().driver = kernel::Driver::kListsNone;
+  const Ran ran = Tool({"ap", "stations"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, StartsWith("merowireless: the adapter's driver cannot list the stations: "));
+  EXPECT_THAT(Tool({"ap", "status"}).out, HasSubstr("stations      -\n"));
+  EXPECT_THAT(Tool({"ap", "status", "--json"}).out, HasSubstr(R"("stations":null,)"));
+}
+
 // ---- Sending one away ----
 
 TEST_F(Stations, AreSentAway) {

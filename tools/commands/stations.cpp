@@ -5,6 +5,7 @@
 #include <chrono>
 #include <optional>
 #include <thread>
+#include <vector>
 
 #include "common/paths.h"
 #include "model/ap_state.h"
@@ -19,8 +20,15 @@ void RequireAccessPoint() {
   throw Failed("there is no access point, and so no station", "`merowireless ap enable` puts one on the air");
 }
 
+std::vector<Station> ListedStations() {
+  auto stations = Stations();
+  if (stations) return *std::move(stations);
+  throw Failure(Exit::kFailed, "the adapter's driver cannot list the stations",
+                "`merowireless ap status` tells whether the access point is on the air");
+}
+
 std::optional<Station> Find(const Address& address) {
-  const auto stations = Stations();
+  const auto stations = ListedStations();
   const auto found = std::ranges::find(stations, address, &Station::address);
   return found != stations.end() ? std::optional(*found) : std::nullopt;
 }
@@ -54,7 +62,7 @@ bool IsGoneSoon(const Station& station) {
 
 void ShowStations(const Program& program) {
   RequireAccessPoint();
-  program.output.List("stations", StationFields(), Stations(), "no station is on the access point");
+  program.output.List("stations", StationFields(), ListedStations(), "no station is on the access point");
 }
 
 void KickStation(const Program& program, const std::string& address) {

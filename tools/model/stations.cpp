@@ -29,7 +29,8 @@ std::chrono::nanoseconds Now(clockid_t clock) {
 std::time_t SinceOf(const Station& station, std::optional<std::uint32_t> seconds) {
   if (station.associatedAt != 0) {
     const auto ago = Now(CLOCK_BOOTTIME) - std::chrono::nanoseconds(station.associatedAt);
-    return std::chrono::duration_cast<std::chrono::seconds>(Now(CLOCK_REALTIME) - ago).count();
+    return std::chrono::system_clock::to_time_t(std::chrono::system_clock::time_point(
+        std::chrono::duration_cast<std::chrono::seconds>(Now(CLOCK_REALTIME) - ago)));
   }
   return seconds ? std::time(nullptr) - static_cast<std::time_t>(*seconds) : 0;
 }
@@ -40,6 +41,12 @@ bool IsLetIn(std::optional<nl80211_sta_flag_update> flags) {
   return !flags || (flags->mask & kLetIn) == 0 || (flags->set & kLetIn) != 0;
 }
 
+// A driver may count in 32 bits, or not at all.
+std::optional<std::int64_t> BytesIn(const Nest<NL80211_STA_INFO_MAX>& facts, int all, int low) {
+  if (const auto bytes = facts.As<std::int64_t>(all)) return bytes;
+  return facts.As<std::uint32_t>(low);
+}
+
 std::optional<Station> StationIn(std::string& message) {
   const nlattr* address = AttributeOf(message, NL80211_ATTR_MAC);
   if (address == nullptr || nla_len(address) != sizeof(Address)) return std::nullopt;
@@ -48,16 +55,18 @@ std::optional<Station> StationIn(std::string& message) {
   std::memcpy(station.address.data(), nla_data(address), sizeof(Address));
   station.isLetIn = IsLetIn(facts.As<nl80211_sta_flag_update>(NL80211_STA_INFO_STA_FLAGS));
   station.signal = facts.As<std::int8_t>(NL80211_STA_INFO_SIGNAL);
-  station.received = facts.As<std::int64_t>(NL80211_STA_INFO_RX_BYTES64).value_or(0);
-  station.sent = facts.As<std::int64_t>(NL80211_STA_INFO_TX_BYTES64).value_or(0);
+  station.received = BytesIn(facts, NL80211_STA_INFO_RX_BYTES64, NL80211_STA_INFO_RX_BYTES);
+  station.sent = BytesIn(facts, NL80211_STA_INFO_TX_BYTES64, NL80211_STA_INFO_TX_BYTES);
   station.associatedAt = facts.As<std::uint64_t>(NL80211_STA_INFO_ASSOC_AT_BOOTTIME).value_or(0);
   station.since = SinceOf(station, facts.As<std::uint32_t>(NL80211_STA_INFO_CONNECTED_TIME));
   return station;
 }
 
-std::vector<Station> StationsOn(const std::string& interface) {
+std::optional<std::vector<Station>> StationsOn(const std::string& interface) {
+  auto messages = AskForStations(interface);
+  if (!messages) return std::nullopt;
   std::vector<Station> stations;
-  for (std::string& message : AskWirelessStack(NL80211_CMD_GET_STATION, interface, true)) {
+  for (std::string& message : *messages) {
     auto station = StationIn(message);
     if (!station) continue;
     station->interface = interface;
@@ -94,7 +103,7 @@ std::string TextOf(const Address& address) {
 }
 
 // A size in four characters at most, such as "340k".
-std::string ShortSize(std::int64_t bytes) {
+std::string ShortText(std::int64_t bytes) {
   constexpr std::string_view kUnits = "kMGTPE";
   constexpr std::int64_t kThousand = 1000;
   if (bytes < kThousand) return std::to_string(bytes);
@@ -106,6 +115,14 @@ std::string ShortSize(std::int64_t bytes) {
   std::string text = std::to_string(bytes / kThousand);
   if (bytes < 10 * kThousand) text += "." + std::to_string(bytes % kThousand / 100);
   return text + kUnits[unit];
+}
+
+Shown ShowSize(std::optional<std::int64_t> bytes) {
+  return bytes ? Shown{ShortText(*bytes)} : Shown{"-", Tone::kFaint};
+}
+
+Value ValueOf(std::optional<std::int64_t> number) {
+  return number ? Value(*number) : nullptr;
 }
 
 // A duration in its greatest unit, such as "5 min".
@@ -128,10 +145,10 @@ constexpr Field<Station> kFields[] = {
     {"ip", "IP", [](const Station& of) { return Value(of.ip); }},
     {"signal", "SIGNAL", [](const Station& of) { return of.signal ? Value(std::int64_t{*of.signal}) : nullptr; },
      Layout::kRight},
-    {"rx_bytes", "FROM", [](const Station& of) { return Value(of.received); }, Layout::kRight,
-     [](const Station& of, bool) { return Shown{ShortSize(of.received)}; }},
-    {"tx_bytes", "TO", [](const Station& of) { return Value(of.sent); }, Layout::kRight,
-     [](const Station& of, bool) { return Shown{ShortSize(of.sent)}; }},
+    {"rx_bytes", "FROM", [](const Station& of) { return ValueOf(of.received); }, Layout::kRight,
+     [](const Station& of, bool) { return ShowSize(of.received); }},
+    {"tx_bytes", "TO", [](const Station& of) { return ValueOf(of.sent); }, Layout::kRight,
+     [](const Station& of, bool) { return ShowSize(of.sent); }},
     {"since", "FOR", [](const Station& of) { return of.since != 0 ? Value(UtcText(of.since)) : nullptr; },
      Layout::kLeft, ShowSince},
     {"guest", "GUEST", [](const Station& of) { return Value(of.isGuest()); }, Layout::kLeft,
@@ -147,19 +164,21 @@ bool Station::isGuest() const {
   return interface == kGuestInterface;
 }
 
-std::vector<Station> Stations() {
+std::optional<std::vector<Station>> Stations() {
   std::vector<Station> all;
   for (const std::string& interface : {std::string(MEROWirelessAPInterfaceGet()), std::string(kGuestInterface)}) {
-    std::vector<Station> stations = StationsOn(interface);
-    AddLeases(stations, interface);
-    all.insert(all.end(), stations.begin(), stations.end());
+    auto stations = StationsOn(interface);
+    if (!stations) return std::nullopt;
+    AddLeases(*stations, interface);
+    all.insert(all.end(), stations->begin(), stations->end());
   }
   return all;
 }
 
-int CountStations() {
+std::optional<int> CountStations() {
   const auto stations = Stations();
-  return static_cast<int>(std::ranges::count_if(stations, &Station::isLetIn));
+  if (!stations) return std::nullopt;
+  return static_cast<int>(std::ranges::count_if(*stations, &Station::isLetIn));
 }
 
 std::span<const Field<Station>> StationFields() {

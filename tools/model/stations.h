@@ -15,10 +15,10 @@
 struct Station {
   Address address{};
   std::string interface;
-  bool isLetIn = true;        // else it has still to pass the network's protection
-  std::optional<int> signal;  // in dBm
-  std::int64_t received = 0;  // bytes that have come from it
-  std::int64_t sent = 0;
+  bool isLetIn = true;                   // else it has still to pass the network's protection
+  std::optional<int> signal;             // in dBm
+  std::optional<std::int64_t> received;  // bytes that have come from it
+  std::optional<std::int64_t> sent;
   std::time_t since = 0;           // it is there; 0 where the driver does not tell
   std::uint64_t associatedAt = 0;  // the same, exactly: tells one stay from the next
   std::string ip;                  // of its lease, like its name
@@ -27,11 +27,11 @@ struct Station {
   bool isGuest() const;
 };
 
-// Those of the main network, then the guests.
-std::vector<Station> Stations();
+// Those of the main network, then the guests; nothing when the driver cannot list them.
+std::optional<std::vector<Station>> Stations();
 
-// How many are let in.
-int CountStations();
+// How many are let in; nothing when the driver cannot list them.
+std::optional<int> CountStations();
 
 std::span<const Field<Station>> StationFields();
 

@@ -8,14 +8,30 @@
 #include "common/nl80211.h"
 #include "model/failed.h"
 
-std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool all) {
+namespace {
+
+nl80211::Answer Ask(nl80211_commands command, const std::string& interface, bool all) {
   const unsigned index = ::if_nametoindex(interface.c_str());
-  if (index == 0) return {};
+  if (index == 0) return {.error = ENODEV};
   nl80211::Answer answer = nl80211::Ask({command, all, index});
-  if (answer.saysNotWireless()) return {};
-  if (answer.error != 0 || answer.failure < 0) {
+  if (!answer.saysNotWireless() && (answer.error != 0 || answer.failure < 0)) {
     throw Failed("the kernel does not say what " + interface + " does: " + answer.reason());
   }
+  return answer;
+}
+
+}  // namespace
+
+std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool all) {
+  nl80211::Answer answer = Ask(command, interface, all);
+  if (answer.saysNotWireless()) return {};
+  return std::move(answer.messages);
+}
+
+std::optional<std::vector<std::string>> AskForStations(const std::string& interface) {
+  nl80211::Answer answer = Ask(NL80211_CMD_GET_STATION, interface, true);
+  if (answer.error == EOPNOTSUPP) return std::nullopt;
+  if (answer.error == ENODEV) answer.messages.clear();
   return std::move(answer.messages);
 }
 

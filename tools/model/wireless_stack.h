@@ -4,6 +4,7 @@
 
 #include <linux/nl80211.h>
 
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -11,6 +12,9 @@
 // The netlink messages of its answer, each whole; none when there is no such interface, or no wireless one. `all` asks
 // for everything of a kind, such as all stations. Fails when the kernel does not answer.
 std::vector<std::string> AskWirelessStack(nl80211_commands command, const std::string& interface, bool all);
+
+// The stations of an access point's interface, as above; nothing when its driver cannot list them.
+std::optional<std::vector<std::string>> AskForStations(const std::string& interface);
 
 // The rules that radios keep to, as netlink messages: the kernel's own, then those of each radio that has others. None
 // where no radio has ever been. Fails when the kernel does not answer.
