@@ -161,6 +161,7 @@ TEST_P(Completion, GoesOnWithFilesAndDirectories) {
       {"save --key-file \"/tmp/files/a\tx", "<save><--key-file></tmp/files/a key><x>"},
       {"ap set --wifi-sched /tmp/files/s\tx", "<ap><set><--wifi-sched></tmp/files/sub dir/x>"},
       {"ap set --wifi-sched=/tmp/files/s\tx", "<ap><set><--wifi-sched=/tmp/files/sub dir/x>"},
+      {"export /tmp/files/a\tx", "<export></tmp/files/a key><x>"},
   });
 }
 

@@ -131,6 +131,7 @@ const Command kCommands[] = {
     {InACountry, {"country", "DE"}},
     {WithAGateway, {"gateway", "10.0.0.1"}},  // the last one: its interface stays
     {WithAStore, {"edit", "Home", "--priority", "5"}},
+    {WithAStore, {"export", "--networks"}},
 };
 
 std::vector<std::string> With(std::vector<std::string> words, const char* szOption) {

@@ -22,6 +22,7 @@
 #include "commands/connection.h"
 #include "commands/country.h"
 #include "commands/edit.h"
+#include "commands/export.h"
 #include "commands/keep.h"
 #include "commands/networks.h"
 #include "commands/share.h"
@@ -184,6 +185,14 @@ void DescribeEditing(CLI::App& command, NetworkToEdit& values) {
   ask->excludes("--key-file", "--key-stdin");
 }
 
+void DescribeExporting(CLI::App& command, SettingsToExport& values) {
+  command.add_option("file", values.file, "where to write it; without it, or with -, the standard output")
+      ->option_text("[FILE|-]")
+      ->check(HasName);
+  command.add_flag("--secrets", values.secrets, "write the secrets too");
+  command.add_flag("--networks", values.networksAlone, "leave the access point's settings out");
+}
+
 void AddNetworkCommands(Commands& commands) {
   commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
                          [](const Program& program, const Scanning& values) { Scan(program, values.results()); });
@@ -197,6 +206,7 @@ void AddNetworkCommands(Commands& commands) {
   commands.Add<NetworkToEdit>("edit", "Change what was saved of a network; the rest stays", DescribeEditing, Edit);
   commands.Add<std::string>("forget", "Forget a network that has been saved", DescribeNetwork, Forget);
   commands.Add<NetworkToShare>("share", "Draw the code by which a phone joins a network", DescribeSharing, Share);
+  commands.Add<SettingsToExport>("export", "Write the settings into a document", DescribeExporting, Export);
 }
 
 // ---- The connection ----

@@ -8,7 +8,9 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 
+#include "base/failure.h"
 #include "common/descriptor.h"
 
 namespace {
@@ -56,4 +58,14 @@ bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode) {
   ::unlink(beside.c_str());
   errno = error;
   return false;
+}
+
+// Links are not followed: in a directory that others may write, they could lead anywhere.
+void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes) {
+  struct stat there {};
+  if (::lstat(path.c_str(), &there) == 0 && !S_ISREG(there.st_mode)) {
+    throw Failure(Exit::kFailed, shown + " is no plain file, and was not replaced", "give a name of its own");
+  }
+  if (ReplaceFile(path, bytes, S_IRUSR | S_IWUSR)) return;
+  throw Failure(Exit::kFailed, shown + " cannot be written: " + std::strerror(errno), "give another place");
 }

@@ -16,4 +16,8 @@ std::optional<std::string> TextOfFile(const std::string& path);
 // still.
 bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode);
 
+// Puts a file at a path that its owner alone may read. Fails with advice when it cannot be written, or when something
+// other than a plain file is there; `shown` is the path for a sentence.
+void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes);
+
 #endif  // MERO_TOOLS_WHOLE_FILE_H

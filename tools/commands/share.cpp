@@ -1,10 +1,6 @@
 // The command that shares a network by a code.
 #include "commands/share.h"
 
-#include <sys/stat.h>
-
-#include <cerrno>
-#include <cstring>
 #include <iterator>
 #include <span>
 #include <string_view>
@@ -80,19 +76,6 @@ JoinCode CodeToShare(const Program& program, const NetworkToShare& wanted) {
   return CodeOf(KnownAs(wanted.name, shown), wanted.isHidden, shown);
 }
 
-// ---- Where it goes ----
-
-// Links are not followed: in a directory that others may write, they could lead anywhere.
-void WriteTo(const Program& program, const std::string& path, const std::string& bytes) {
-  const std::string shown = program.output.Name(path);
-  struct stat there {};
-  if (::lstat(path.c_str(), &there) == 0 && !S_ISREG(there.st_mode)) {
-    throw Failure(Exit::kFailed, shown + " is no plain file, and was not replaced", "give a name of its own");
-  }
-  if (ReplaceFile(path, bytes, S_IRUSR | S_IWUSR)) return;
-  throw Failure(Exit::kFailed, shown + " cannot be written: " + std::strerror(errno), "give another place");
-}
-
 void Draw(const Program& program, const CodePicture& picture) {
   const Terminal& terminal = program.output.terminal();
   const std::size_t width = picture.WidthOn(terminal);
@@ -136,8 +119,8 @@ std::string SentenceOf(const Program& program, const Shared& shared) {
 void Share(const Program& program, const NetworkToShare& wanted) {
   const Shared shared{.code = CodeToShare(program, wanted), .png = wanted.png, .svg = wanted.svg};
   const CodePicture picture(shared.code.text);
-  if (!wanted.png.empty()) WriteTo(program, wanted.png, picture.Png());
-  if (!wanted.svg.empty()) WriteTo(program, wanted.svg, picture.Svg());
+  if (!wanted.png.empty()) WriteForOwner(wanted.png, program.output.Name(wanted.png), picture.Png());
+  if (!wanted.svg.empty()) WriteForOwner(wanted.svg, program.output.Name(wanted.svg), picture.Svg());
   if (program.output.form() == Form::kHuman && wanted.png.empty() && wanted.svg.empty()) Draw(program, picture);
   if (wanted.showSecrets) program.output.Picture(program.output.Name(shared.code.text) + "\n");
   program.output.Done<Shared>(SentenceOf(program, shared), "code", wanted.showSecrets ? kWithText : kWithoutText,

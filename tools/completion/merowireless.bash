@@ -114,6 +114,10 @@ _merowireless() { # PROGRAM REPLACED, which is the end of the current word: bash
     fi
     offered=$(_merowireless_choices "$takes")
     current=$value
+  elif [[ $current != -* ]] && _merowireless_listed Positionals <<<"$help" | grep -q ' \[\{0,1\}FILE'; then
+    COMPREPLY=()
+    compopt -o default # the names of files
+    return
   else
     offered=$(_merowireless_words "$command" "$help" "$current")
   fi

@@ -45,10 +45,11 @@ std::string WrittenOut(char32_t code) {
   return szCode;
 }
 
-// A character of a document. Those that are escaped can only stand within its strings, so \u is right for them.
+// A character of a document. Those that are escaped can only stand within its strings, so \u is right for them; a line
+// feed can only stand between them.
 std::string InDocument(const Character& character) {
   constexpr char32_t kPairs = 0x10000;
-  if (character.shown) return std::string(character.bytes);
+  if (character.shown || character.bytes == "\n") return std::string(character.bytes);
   if (character.code < kPairs) return WrittenOut(character.code);
   const char32_t code = character.code - kPairs;
   return WrittenOut(0xD800 + (code >> 10)) + WrittenOut(0xDC00 + (code & 0x3FF));
@@ -56,7 +57,7 @@ std::string InDocument(const Character& character) {
 
 // Names are bytes. Those that are no UTF-8 are replaced here; the field name_hex has such a name in full.
 void PutDocument(const Json& document, bool utf8) {
-  Put(Rewritten(document.dump(-1, ' ', false, Json::error_handler_t::replace), utf8, InDocument) + "\n");
+  Put(HarmlessDocument(document.dump(-1, ' ', false, Json::error_handler_t::replace), utf8) + "\n");
 }
 
 // ---- Porcelain: one record a line, its fields between tabs ----
@@ -176,6 +177,10 @@ std::string Beside(const std::string& value, std::size_t titles, std::size_t wid
 
 }  // namespace
 
+std::string HarmlessDocument(std::string_view document, bool utf8) {
+  return Rewritten(document, utf8, InDocument);
+}
+
 Shown Output::Show(const Value& value) const {
   return std::visit(Overloaded{[](std::nullptr_t) {
                                  return Shown{"-", Tone::kFaint};
@@ -256,6 +261,11 @@ void Output::WriteOne(std::string_view name, Table table) const {
 
 void Output::Picture(const std::string& lines) const {
   if (form_ == Form::kHuman) ::Put(lines);
+}
+
+void Output::Document(const std::string& document) const {
+  if (form_ == Form::kJson) return PutDocument(Json::parse(document), MachinesSeeUtf8());
+  ::Put(HarmlessDocument(document, MachinesSeeUtf8()));
 }
 
 void Output::Done(const std::string& sentence) const {

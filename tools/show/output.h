@@ -58,6 +58,9 @@ struct Table {
   std::vector<std::vector<Cell>> rows;
 };
 
+// A JSON document with everything written out that neither terminals nor people should be given.
+std::string HarmlessDocument(std::string_view document, bool utf8);
+
 class Output {
  public:
   Output(Form form, const Terminal& terminal) : form_(form), terminal_(terminal) {}
@@ -96,6 +99,9 @@ class Output {
 
   // A picture, for people alone: lines that are shown as they are.
   void Picture(const std::string& lines) const;
+
+  // A document that is the result itself, the same in all forms; for JSON it is one line.
+  void Document(const std::string& document) const;
 
   // A command was done that has no records to show.
   void Done(const std::string& sentence) const;
