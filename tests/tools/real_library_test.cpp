@@ -79,7 +79,7 @@ TEST(InstalledProgram, SavesANetworkThatItThenKnows) {
   EXPECT_THAT(ReadText("/usr/mero/etc/wireless.conf"),
               AllOf(HasSubstr("[00:11:22:33:44:55]"), HasSubstr("\tKEY=open sesame\n"), HasSubstr("\tIPADDR=DHCP\n")));
   EXPECT_THAT(Tool("known").out, AllOf(HasSubstr("\nMy Café  WPA2 TKIP+AES  DHCP"), Not(HasSubstr("sesame"))));
-  EXPECT_THAT(Tool("known --porcelain --show-secrets").out, HasSubstr("\topen sesame\n"));
+  EXPECT_THAT(Tool("known --porcelain --show-secrets").out, HasSubstr("\topen sesame\t"));
 }
 
 TEST(InstalledProgram, DoesNotShowASecretThatIsTypedAfterItWasStopped) {
@@ -158,7 +158,7 @@ TEST(InstalledProgram, SaysThatThereIsNoAdapterAndWhatTheLibraryReported) {
   EXPECT_EQ(ran.out, "merowireless: no adapter is plugged in: plug in a wireless USB adapter and try again\n");
   AnnounceAdapter();
   EXPECT_THAT(Tool("ap disable -v").out, HasSubstr("library: wireless_ap_disable:"));
-  EXPECT_THAT(Tool("status").out, StartsWith("status     no adapter is plugged in\n"));
+  EXPECT_THAT(Tool("status").out, StartsWith("status        no adapter is plugged in\n"));
   EXPECT_EQ(Tool("autoconnect").status, 3);
 }
 
