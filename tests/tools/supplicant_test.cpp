@@ -247,4 +247,27 @@ TEST_F(RefusedJoin, ByAStrangerOfTheNameIsTriedThroughTheAccessPointsThatTheNetw
   }
 }
 
+// One that took the appliance for its station, or its question, and said no more could keep it out.
+TEST_F(RefusedJoin, ByTheSilenceOfAStrangerIsTriedThroughTheAccessPointsThatTheNetworkWasSavedWith) {
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG* config) {
+    library::Record(AddressText(config->network.bssid) + (config->noneBssid != 0 ? " or any" : " alone"));
+    return config->noneBssid != 0 ? -1 : 0;
+  };
+  WIRELESS_NETWORK stranger = Network("Home");
+  stranger.bssid[5] = 0x0B;
+  stranger.signal = Network("Home").signal + 10;
+  const auto waysOf = [](const std::vector<WIRELESS_NETWORK>& inRange, int status) {
+    library::InRange(inRange);
+    const std::size_t before = library::Calls().size();
+    EXPECT_EQ(Tool({"autoconnect"}).status, status);
+    auto calls = library::Calls();
+    calls.erase(calls.begin(), calls.begin() + static_cast<std::ptrdiff_t>(before));
+    std::erase_if(calls, [](const std::string& call) { return call.find(':') == call.npos; });
+    return calls;
+  };
+  EXPECT_THAT(waysOf({Network("Home"), stranger}, 0),
+              testing::ElementsAre("0A:0A:0A:0A:0A:0B or any", "0A:0A:0A:0A:0A:0A alone"));
+  EXPECT_THAT(waysOf({Network("Home")}, 4), testing::ElementsAre("0A:0A:0A:0A:0A:0A or any")) << "it was its own";
+}
+
 }  // namespace

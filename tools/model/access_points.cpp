@@ -191,12 +191,12 @@ std::vector<Network> Trusted(const SavedNetwork& saved, const std::vector<Networ
 
 void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& trusted,
                   const std::function<void(const KnownNetwork&)>& join) {
-  std::optional<SecretRefused> refusal;
+  std::optional<NotLetIn> refusal;
   const auto isJoined = [&](const KnownNetwork& way) {
     try {
       join(way);
       return true;
-    } catch (const SecretRefused& failure) {
+    } catch (const NotLetIn& failure) {
       if (!failure.IsByStranger(trusted)) throw;
       refusal = failure;
       return false;
@@ -210,7 +210,7 @@ void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& truste
     alone.noneBssid = 0;
     if (isJoined(alone)) return;
   }
-  throw SecretRefused(*refusal);
+  throw NotLetIn(*refusal);
 }
 
 KnownNetwork AsSaved(const SavedNetwork& saved) {

@@ -19,8 +19,8 @@ std::optional<KnownNetwork> Through(const SavedNetwork& saved, const std::vector
 // Those in range that it was saved with, the strongest first.
 std::vector<Network> Trusted(const SavedNetwork& saved, const std::vector<Network>& inRange);
 
-// Joins a network, and where none of these access points refuses its secret, but another one, through each of them
-// alone: the other may only pretend to be one of the network.
+// Joins a network, and where none of these access points refuses its secret or does not answer, but another one,
+// through each of them alone: the other may only pretend to be one of the network.
 void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& trusted,
                   const std::function<void(const KnownNetwork&)>& join);
 

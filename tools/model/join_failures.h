@@ -3,7 +3,6 @@
 #define MERO_TOOLS_JOIN_FAILURES_H
 
 #include <algorithm>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -25,19 +24,21 @@ void RequireJoinable(const Program& program, const Network& network);
 // Why an attempt of the library failed, by its reports and by what the supplicant said.
 Failure JoinFailed(const std::string& name, Verdict verdict);
 
-// A join that has failed since an access point refused the secret.
-class SecretRefused : public Failure {
+// A join that has failed since an access point refused the secret, or did not answer in time.
+class NotLetIn : public Failure {
  public:
-  SecretRefused(const Failure& failure, const std::optional<Address>& by) : Failure(failure), by_(by) {}
+  NotLetIn(const Failure& failure, const std::vector<Address>& by) : Failure(failure), by_(by) {}
 
-  // Whether it was another one than these. The supplicant may not have told.
+  // Whether it was another one than these, or one of those that did not answer. The supplicant may not have told.
   bool IsByStranger(const std::vector<Network>& known) const {
-    return by_ && std::ranges::none_of(
-                      known, [&](const Network& accessPoint) { return std::ranges::equal(*by_, accessPoint.bssid); });
+    return std::ranges::any_of(by_, [&](const Address& by) {
+      return std::ranges::none_of(
+          known, [&](const Network& accessPoint) { return std::ranges::equal(by, accessPoint.bssid); });
+    });
   }
 
  private:
-  std::optional<Address> by_;
+  std::vector<Address> by_;
 };
 
 // Something of a connection has stayed.

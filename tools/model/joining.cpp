@@ -1,9 +1,11 @@
 // A join by the library, while the supplicant is listened to.
 #include "model/joining.h"
 
+#include <array>
 #include <chrono>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include "common/paths.h"
 #include "model/access_points.h"
@@ -14,6 +16,15 @@ namespace {
 
 std::string SupplicantSocket() {
   return std::string(kSupplicantControlDirectory) + "/" + MEROWirelessInterfaceGet();
+}
+
+// Who did not let the appliance in: who refused the secret, or all that did not answer in time. Without a word from the
+// supplicant that is the strongest, which it asks first.
+NotLetIn WhoRefused(const Failure& failure, const KnownNetwork& config, const SupplicantListener& listener) {
+  std::vector<Address> by = listener.accessPoints();
+  if (failure.exit() == Exit::kSecretRefused && by.size() > 1) by = {by.back()};
+  if (failure.exit() == Exit::kTimedOut && by.empty()) by = {std::to_array(config.network.bssid)};
+  return {failure, by};
 }
 
 }  // namespace
@@ -44,8 +55,9 @@ void Join(const Program& program, const KnownNetwork& config) {
     if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&config); }) >= 0) return;
   } catch (const Pointless&) {
   }
-  if (listener.verdict() != Verdict::kSecretRefused) throw JoinFailed(name, listener.verdict());
-  throw SecretRefused(JoinFailed(name, listener.verdict()), listener.accessPoint());
+  const Failure failure = JoinFailed(name, listener.verdict());
+  if (failure.exit() != Exit::kSecretRefused && failure.exit() != Exit::kTimedOut) throw Failure(failure);
+  throw WhoRefused(failure, config, listener);
 }
 
 void Join(const Program& program, const Target& target) {

@@ -96,7 +96,7 @@ void SupplicantListener::Receive() {
     const std::string_view text(event, static_cast<std::size_t>(size));
     verdict_ = std::max(verdict_, VerdictOf(text));
     final_ = final_ || IsFinal(text);
-    if (const auto asked = AccessPointIn(text)) accessPoint_ = asked;
+    if (const auto asked = AccessPointIn(text)) accessPoints_.push_back(*asked);
     if (WithoutLevel(text).starts_with(kLeaving)) socket_.Close();
   }
 }

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "base/text.h"
 #include "common/descriptor.h"
@@ -48,8 +49,8 @@ class SupplicantListener final : public Listener {
   // Whether it is final.
   bool isFinal() const { return final_; }
 
-  // The one that the supplicant was the station of last.
-  const std::optional<Address>& accessPoint() const { return accessPoint_; }
+  // Those that the supplicant was the station of, the last one at the end.
+  const std::vector<Address>& accessPoints() const { return accessPoints_; }
 
  private:
   bool Attach();
@@ -59,7 +60,7 @@ class SupplicantListener final : public Listener {
   std::chrono::steady_clock::time_point lastAsked_;
   Verdict verdict_ = Verdict::kNone;
   bool final_ = false;
-  std::optional<Address> accessPoint_;
+  std::vector<Address> accessPoints_;
 };
 
 #endif  // MERO_TOOLS_SUPPLICANT_H

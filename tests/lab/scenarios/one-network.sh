@@ -68,6 +68,14 @@ on nas merowireless connect home
 expect_joined near
 on nas merowireless disconnect
 switch_off other
+# Its beacons go on, and it answers nothing.
+access_point mute "${home[@]}" channel=6 beacon_int=20 signal=-20
+kill -STOP "$(</run/lab/mute.pid)"
+on nas merowireless connect home
+expect_joined near
+on nas merowireless disconnect
+kill -CONT "$(</run/lab/mute.pid)"
+switch_off mute
 access_point open ssid=home channel=6 signal=-20
 access_point old ssid=home channel=6 wpa=1 wpa_passphrase='the old printer' wpa_pairwise=TKIP signal=-20
 on nas merowireless connect home
