@@ -85,6 +85,14 @@ TEST_F(Joining, SavesANetworkThatGivesNoAddressYet) {
   EXPECT_THAT(library::Calls(), Contains("cafe|open sesame|DHCP"));
 }
 
+// Anybody could have had the appliance on a network of his own later, and nobody had been told.
+TEST_F(Joining, SaysWhatItMeansToSaveAnOpenNetwork) {
+  library::InRange({Network("cafe", WIRELESS_AUTH_OPEN, WIRELESS_ENCRYPT_NONE)});
+  const std::string said = "and saved: from now on any open network of this name may be joined by itself\n";
+  EXPECT_THAT(Tool({"connect", "cafe"}).out, testing::EndsWith(said));
+  EXPECT_THAT(Tool({"connect", "cafe", "--no-save"}).out, Not(HasSubstr("saved")));
+}
+
 TEST_F(Joining, SavesNothingWhereThatIsNotWanted) {
   const Ran ran = Tool({"connect", "cafe", "--key-file", kSecret, "--no-save"});
   EXPECT_EQ(ran.status, 0) << ran.err;

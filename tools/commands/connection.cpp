@@ -76,6 +76,13 @@ void SayConnected(const Program& program, const char* szMore = "") {
   program.output.Done(ConnectionText(program.output, status) + szMore, "status", StatusFields(), status);
 }
 
+// Nothing tells one open network from another of its name, so whoever saves one is told what that means.
+const char* WhatBecame(Saving saving, const KnownNetwork& config) {
+  if (saving != Saving::kDone) return "";
+  if (config.network.auth != WIRELESS_AUTH_OPEN) return ", and saved";
+  return ", and saved: from now on any open network of this name may be joined by itself";
+}
+
 void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target& target) {
   const JoinLock lock;
   RequireFreeAdapter();
@@ -89,7 +96,7 @@ void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target
     if (!wanted.noAddress) ApplyAddressing(program, target.config);
   });
   if (saving == Saving::kFailed) throw JoinedAndNotSaved(program.output.Name(target.config.network.szEssid));
-  SayConnected(program, saving == Saving::kDone ? ", and saved" : "");
+  SayConnected(program, WhatBecame(saving, target.config));
 }
 
 // The library does not notice when the driver refuses the cell.
