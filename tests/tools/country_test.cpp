@@ -1,4 +1,6 @@
 // The country whose rules the radio keeps to.
+#include <filesystem>
+
 #include "common/text.h"
 #include "running.h"
 
@@ -104,6 +106,18 @@ TEST_F(Country, IsTheKernelsToJudgeWhereItsDatabaseCannotBeRead) {
     EXPECT_EQ(Tool({"country", "US"}).status, 0) << szDatabase;
     EXPECT_EQ(Kernel(), "US") << szDatabase;
   }
+}
+
+// It was said to be none, and two letters as in ISO 3166 were advised.
+TEST_F(Country, IsNotCalledWrongWhereTheDatabaseIsMissing) {
+  std::filesystem::remove("/lib/firmware/regulatory.db");
+  const Ran ran = Tool({"country", "JP"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.err,
+            "merowireless: the kernel has no rules for JP, and its database of rules cannot be read: install the "
+            "package wireless-regdb, and start the appliance anew\n");
+  EXPECT_EQ(Kernel(), "00");
+  EXPECT_EQ(Saved(), "");
 }
 
 TEST_F(Country, ThatWasThereIsBroughtBackWhenAnotherOneCannotBe) {

@@ -82,6 +82,14 @@ Failure NoRules(const std::string& country) {
                "give a country's two letters as in ISO 3166, such as DE, GB or US");
 }
 
+// Of a country that the kernel was asked for.
+Failure NotFollowed(const std::string& country) {
+  if (country.empty()) return NoRules("the world");
+  if (HasRules(country)) return NoRules(country);
+  return {Exit::kFailed, "the kernel has no rules for " + country + ", and its database of rules cannot be read",
+          "install the package wireless-regdb, and start the appliance anew"};
+}
+
 bool MayGoOn(const Air& air, const std::vector<Channel>& channels) {
   return std::ranges::any_of(channels, [&](const Channel& channel) {
     return channel.megahertz == air.megahertz &&
@@ -143,7 +151,7 @@ void SetCountry(const Program& program, const std::string& text) {
   Task task = program.Doing("setting the country");
   task.undo = [&] { GoBackTo(former); };
   try {
-    if (former.rules.areThere() && !Follow(task, country)) throw NoRules(country.empty() ? "the world" : country);
+    if (former.rules.areThere() && !Follow(task, country)) throw NotFollowed(country);
     RequireChannelInUse();
     SaveCountry(country);
   } catch (const Failure&) {
