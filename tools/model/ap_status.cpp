@@ -98,7 +98,7 @@ ApStatus ReadApStatus(const ApConf& conf) {
   status.interface = MEROWirelessAPInterfaceGet();
   const auto air = AirOf(status.interface);
   status.state = StateOf(conf);
-  if (!status.isRunning()) return status;
+  if (!status.isRunning() || !air) return status;
   status.nameOnAir = air->name;
   status.channel = air->channel;
   status.megahertz = air->megahertz;
@@ -124,7 +124,7 @@ std::string WhatBecameOf(const ApStatus& status) {
     case ApState::kWaitingForRadar:
       return "waits until channel " + std::to_string(status.channel) + " is known to be free of radar";
     case ApState::kOnAir:
-      return "is on the air on channel " + std::to_string(status.channel);
+      return "is on the air" + (status.channel != 0 ? " on channel " + std::to_string(status.channel) : "");
   }
   return "";
 }

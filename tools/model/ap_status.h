@@ -16,7 +16,7 @@ struct ApStatus {
   bool enabled = false;
   std::string interface;
   std::string nameOnAir;  // empty while it is off the air
-  int channel = 0;        // the radio's; 0 for none
+  int channel = 0;        // the radio's; 0 for none, and where the driver does not tell
   int megahertz = 0;
   std::optional<int> stations;    // guests included; on the air only
   std::optional<bool> isPending;  // whether the settings differ from those that it runs with
