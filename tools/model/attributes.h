@@ -16,6 +16,15 @@ inline nlattr* AttributeOf(std::string& message, int kind) {
   return nla_find(genlmsg_attrdata(general, 0), genlmsg_attrlen(general, 0), kind);
 }
 
+// What an attribute holds, as a number of so many bits or a record; nothing when it is missing or shorter.
+template <class Value>
+std::optional<Value> ValueIn(const nlattr* attribute) {
+  Value value;
+  if (attribute == nullptr || nla_len(attribute) < static_cast<int>(sizeof value)) return std::nullopt;
+  std::memcpy(&value, nla_data(attribute), sizeof value);
+  return value;
+}
+
 // The attributes within another, by their kind; none where there is no such.
 template <int kLast>
 struct Nest {
@@ -23,13 +32,9 @@ struct Nest {
     if (outer != nullptr) (void)nla_parse_nested(parts, kLast, const_cast<nlattr*>(outer), nullptr);
   }
 
-  // As a number of so many bits, or a record; nothing when it is missing or shorter.
-  template <class Number>
-  std::optional<Number> As(int kind) const {
-    Number number;
-    if (parts[kind] == nullptr || nla_len(parts[kind]) < static_cast<int>(sizeof number)) return std::nullopt;
-    std::memcpy(&number, nla_data(parts[kind]), sizeof number);
-    return number;
+  template <class Value>
+  std::optional<Value> As(int kind) const {
+    return ValueIn<Value>(parts[kind]);
   }
 
   nlattr* parts[kLast + 1] = {};

@@ -2,7 +2,6 @@
 #include "model/link.h"
 
 #include <cstdint>
-#include <cstring>
 
 #include "base/failure.h"
 #include "base/text.h"
@@ -24,15 +23,10 @@ std::optional<int> RateOf(const nlattr* description) {
   return std::nullopt;
 }
 
-void SetAccessPoint(Link& link, const void* octets) {
-  unsigned char address[6];
-  std::memcpy(address, octets, sizeof address);
-  link.accessPoint = AddressText(address);
-}
-
 void AddStation(Link& link, std::string& message) {
-  const nlattr* address = AttributeOf(message, NL80211_ATTR_MAC);
-  if (address != nullptr && nla_len(address) == sizeof(Address)) SetAccessPoint(link, nla_data(address));
+  if (const auto address = ValueIn<Address>(AttributeOf(message, NL80211_ATTR_MAC))) {
+    link.accessPoint = AddressText(*address);
+  }
   const Nest<NL80211_STA_INFO_MAX> station(AttributeOf(message, NL80211_ATTR_STA_INFO));
   link.signal = station.As<std::int8_t>(NL80211_STA_INFO_SIGNAL);
   link.rate = RateOf(station.parts[NL80211_STA_INFO_TX_BITRATE]);
@@ -66,7 +60,7 @@ Link LinkOf(const std::string& interface, LinkTo to) {
     // An adapter may be pulled while it is asked: that stays unknown, and the rest is told all the same.
   }
   if (link.accessPoint.empty()) {
-    if (const auto address = AccessPointOf(interface)) SetAccessPoint(link, address->data());
+    if (const auto address = AccessPointOf(interface)) link.accessPoint = AddressText(*address);
   }
   link.gateway = GatewayOf(interface);
   AddNameServers(link, interface);

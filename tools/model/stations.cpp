@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <chrono>
-#include <cstring>
 #include <filesystem>
 #include <system_error>
 
@@ -48,11 +47,11 @@ std::optional<std::int64_t> BytesIn(const Nest<NL80211_STA_INFO_MAX>& facts, int
 }
 
 std::optional<Station> StationIn(std::string& message) {
-  const nlattr* address = AttributeOf(message, NL80211_ATTR_MAC);
-  if (address == nullptr || nla_len(address) != sizeof(Address)) return std::nullopt;
+  const auto address = ValueIn<Address>(AttributeOf(message, NL80211_ATTR_MAC));
+  if (!address) return std::nullopt;
   const Nest<NL80211_STA_INFO_MAX> facts(AttributeOf(message, NL80211_ATTR_STA_INFO));
   Station station;
-  std::memcpy(station.address.data(), nla_data(address), sizeof(Address));
+  station.address = *address;
   station.isLetIn = IsLetIn(facts.As<nl80211_sta_flag_update>(NL80211_STA_INFO_STA_FLAGS));
   station.signal = facts.As<std::int8_t>(NL80211_STA_INFO_SIGNAL);
   station.received = BytesIn(facts, NL80211_STA_INFO_RX_BYTES64, NL80211_STA_INFO_RX_BYTES);
@@ -96,12 +95,6 @@ void AddLeases(std::vector<Station>& stations, const std::string& interface) {
 
 // ---- As they are shown ----
 
-std::string TextOf(const Address& address) {
-  unsigned char octets[std::tuple_size_v<Address>];
-  std::ranges::copy(address, octets);
-  return AddressText(octets);
-}
-
 // A size in four characters at most, such as "340k".
 std::string ShortText(std::int64_t bytes) {
   constexpr std::string_view kUnits = "kMGTPE";
@@ -141,7 +134,7 @@ Shown ShowSince(const Station& station, bool) {
 
 constexpr Field<Station> kFields[] = {
     {"name", "NAME", [](const Station& of) { return Value(of.name); }, Layout::kElastic},
-    {"address", "ADDRESS", [](const Station& of) { return Value(TextOf(of.address)); }},
+    {"address", "ADDRESS", [](const Station& of) { return Value(AddressText(of.address)); }},
     {"ip", "IP", [](const Station& of) { return Value(of.ip); }},
     {"signal", "SIGNAL", [](const Station& of) { return of.signal ? Value(std::int64_t{*of.signal}) : nullptr; },
      Layout::kRight},
