@@ -4,9 +4,9 @@
 #include <algorithm>
 #include <chrono>
 #include <optional>
-#include <thread>
 #include <vector>
 
+#include "base/await.h"
 #include "common/paths.h"
 #include "model/ap_state.h"
 #include "model/library.h"
@@ -50,12 +50,8 @@ bool IsGone(const Station& station) {
 
 bool IsGoneSoon(const Station& station) {
   constexpr std::chrono::milliseconds kPause{50};
-  constexpr int kPatience = 100;  // pauses
-  for (int i = 0; i < kPatience; ++i) {
-    if (IsGone(station)) return true;
-    std::this_thread::sleep_for(kPause);
-  }
-  return false;
+  constexpr std::chrono::seconds kPatience{5};
+  return Await(kPatience, kPause, [&] { return IsGone(station); });
 }
 
 }  // namespace

@@ -1,16 +1,15 @@
 // The country whose rules the radio is to keep to, and whose it keeps to.
 #include "model/country.h"
 
-#include <netlink/genl/genl.h>
-
 #include <algorithm>
 #include <chrono>
-#include <cstring>
+#include <cstdint>
 #include <fstream>
 #include <iterator>
-#include <thread>
 
+#include "base/await.h"
 #include "common/paths.h"
+#include "model/attributes.h"
 #include "model/library.h"
 #include "model/wireless_stack.h"
 
@@ -29,18 +28,14 @@ std::optional<int> RadioOf(const std::string& interface) {
 }
 
 void Take(std::string& message, std::optional<int> radio, Rules& rules) {
-  auto* header = reinterpret_cast<nlmsghdr*>(message.data());
-  nla_policy policy[NL80211_ATTR_MAX + 1] = {};
-  policy[NL80211_ATTR_REG_ALPHA2].minlen = kWorld.size();
-  policy[NL80211_ATTR_WIPHY].type = NLA_U32;
-  nlattr* attributes[NL80211_ATTR_MAX + 1];
-  if (genlmsg_parse(header, 0, attributes, NL80211_ATTR_MAX, policy) < 0) return;
-  if (attributes[NL80211_ATTR_REG_ALPHA2] == nullptr) return;
-  const std::string country(static_cast<const char*>(nla_data(attributes[NL80211_ATTR_REG_ALPHA2])), kWorld.size());
-  if (attributes[NL80211_ATTR_WIPHY] == nullptr) {
+  const nlattr* letters = AttributeOf(message, NL80211_ATTR_REG_ALPHA2);
+  if (letters == nullptr || nla_len(letters) < static_cast<int>(kWorld.size())) return;
+  const std::string country(static_cast<const char*>(nla_data(letters)), kWorld.size());
+  const auto owner = ValueIn<std::uint32_t>(AttributeOf(message, NL80211_ATTR_WIPHY));
+  const bool isOwn = AttributeOf(message, NL80211_ATTR_WIPHY_SELF_MANAGED_REG) != nullptr;
+  if (!owner) {
     rules.kernel = country;
-  } else if (attributes[NL80211_ATTR_WIPHY_SELF_MANAGED_REG] != nullptr &&
-             static_cast<int>(nla_get_u32(attributes[NL80211_ATTR_WIPHY])) == radio) {
+  } else if (isOwn && static_cast<int>(*owner) == radio) {
     rules.radio = country;
   }
 }
@@ -92,16 +87,13 @@ std::optional<bool> HasRules(std::string_view country) {
 
 // A kernel that asks a program for rules waits for it for three seconds, and goes back to those of the world then.
 bool FollowRules(std::string_view country) {
-  using std::chrono::steady_clock;
   constexpr std::chrono::seconds kLongest{4};
   constexpr std::chrono::milliseconds kPause{20};
   if (RequestRules(country) != 0) return false;
-  const auto end = steady_clock::now() + kLongest;
-  for (std::string kernel = ReadRules().kernel; kernel != country && kernel != kSeveral; kernel = ReadRules().kernel) {
-    if (steady_clock::now() >= end) return false;
-    std::this_thread::sleep_for(kPause);
-  }
-  return true;
+  return Await(kLongest, kPause, [&] {
+    const std::string kernel = ReadRules().kernel;
+    return kernel == country || kernel == kSeveral;
+  });
 }
 
 std::string WhereRulesHold() {

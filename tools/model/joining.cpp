@@ -4,9 +4,9 @@
 #include <array>
 #include <chrono>
 #include <string>
-#include <thread>
 #include <vector>
 
+#include "base/await.h"
 #include "common/paths.h"
 #include "model/access_points.h"
 #include "model/join_failures.h"
@@ -34,10 +34,9 @@ void EndFormerSupplicant(const Program& program) {
   const bool gone = Run<bool>(program.Doing("leaving the former network"), [] {
     if (PLIBCExec("/usr/sbin/wpa_cli", "terminate", nullptr, nullptr, nullptr) != 0)
       return true;  // no supplicant runs, and only the file of one is left
-    for (int tries = 50; tries > 0 && PLIBCFileExist(kSupplicantPidPath) != 0; --tries) {
-      std::this_thread::sleep_for(std::chrono::milliseconds(100));
-    }
-    return PLIBCFileExist(kSupplicantPidPath) == 0;
+    constexpr std::chrono::milliseconds kPause{100};
+    constexpr std::chrono::seconds kPatience{5};
+    return Await(kPatience, kPause, [] { return PLIBCFileExist(kSupplicantPidPath) == 0; });
   });
   if (!gone) throw Failed("the former connection does not end", "`merowireless disconnect` ends it by force");
 }

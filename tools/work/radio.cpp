@@ -9,8 +9,8 @@
 #include <cerrno>
 #include <chrono>
 #include <cstring>
-#include <thread>
 
+#include "base/await.h"
 #include "base/require.h"
 #include "common/descriptor.h"
 
@@ -52,7 +52,7 @@ std::string WepKeyOf(const std::string& interface) {
 
 bool CallNetwork(const std::string& interface, const std::string& name) {
   constexpr std::chrono::milliseconds kPause{100};
-  constexpr int kPatience = 100;  // pauses
+  constexpr std::chrono::seconds kPatience{10};
   iw_scan_req call{};
   call.essid_len = static_cast<__u8>(std::min(name.size(), sizeof call.essid));
   std::memcpy(call.essid, name.data(), call.essid_len);
@@ -61,6 +61,7 @@ bool CallNetwork(const std::string& interface, const std::string& name) {
   request.u.data.length = sizeof call;
   request.u.data.flags = IW_SCAN_THIS_ESSID;
   if (!Ask(interface, SIOCSIWSCAN, request)) return false;
-  for (int i = 0; i < kPatience && IsScanning(interface); ++i) std::this_thread::sleep_for(kPause);
+  (void)Await(kPatience, kPause,
+              [&] { return !IsScanning(interface); });  // one that lasts longer is looked at as it is
   return true;
 }
