@@ -1,6 +1,9 @@
 // The command about channels: channels; and the choice of one.
 #include "commands/channels.h"
 
+#include <algorithm>
+#include <iterator>
+
 #include "model/country.h"
 #include "model/heard_channels.h"
 #include "model/library.h"
@@ -8,34 +11,29 @@
 
 namespace {
 
+// What an access point may do on a channel.
+struct UseText {
+  ChannelUse use;
+  const char* szKey;
+  const char* szText;
+  Tone tone;
+};
+
+constexpr UseText kUseTexts[] = {
+    {ChannelUse::kAll, "all", "yes", Tone::kGood},
+    {ChannelUse::kAllAfterRadar, "after-radar", "yes, after radar", Tone::kGood},
+    {ChannelUse::kListening, "listening", "listening only", Tone::kFair},
+    {ChannelUse::kNone, "none", "no", Tone::kBad},
+};
+
 Value UseOf(const HeardChannel& of) {
-  if (!of.use) return nullptr;
-  switch (*of.use) {
-    case ChannelUse::kAll:
-      return "all";
-    case ChannelUse::kAllAfterRadar:
-      return "after-radar";
-    case ChannelUse::kListening:
-      return "listening";
-    case ChannelUse::kNone:
-      return "none";
-  }
-  return nullptr;
+  const auto* text = std::ranges::find(kUseTexts, of.use, &UseText::use);
+  return text != std::end(kUseTexts) ? Value(text->szKey) : nullptr;
 }
 
 Shown ShowUse(const HeardChannel& of, bool) {
-  if (!of.use) return {"-", Tone::kFaint};
-  switch (*of.use) {
-    case ChannelUse::kAll:
-      return {"yes", Tone::kGood};
-    case ChannelUse::kAllAfterRadar:
-      return {"yes, after radar", Tone::kGood};
-    case ChannelUse::kListening:
-      return {"listening only", Tone::kFair};
-    case ChannelUse::kNone:
-      return {"no", Tone::kBad};
-  }
-  return {""};
+  const auto* text = std::ranges::find(kUseTexts, of.use, &UseText::use);
+  return text != std::end(kUseTexts) ? Shown{text->szText, text->tone} : Shown{"-", Tone::kFaint};
 }
 
 constexpr Field<HeardChannel> kFields[] = {

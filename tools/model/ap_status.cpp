@@ -1,6 +1,7 @@
 // What is so of the access point at this moment, by the kernel.
 #include "model/ap_status.h"
 
+#include <algorithm>
 #include <ctime>
 #include <string_view>
 
@@ -28,40 +29,34 @@ ApState StateOf(const ApConf& conf) {
   return state == ApState::kDown && IsOffNow(conf.wifiSchedConf) ? ApState::kOffBySchedule : state;
 }
 
-const char* KeyOf(ApState state) {
-  switch (state) {
-    case ApState::kOff:
-      return "off";
-    case ApState::kDown:
-      return "interface-down";
-    case ApState::kOffBySchedule:
-      return "off-by-schedule";
-    case ApState::kSettingUp:
-      return "setting-up";
-    case ApState::kWaitingForRadar:
-      return "waiting-for-radar";
-    case ApState::kOnAir:
-      return "on-air";
-  }
-  return "";
+struct StateText {
+  ApState state;
+  const char* szKey;
+  const char* szText;
+  Tone tone;
+};
+
+constexpr StateText kStateTexts[] = {
+    {ApState::kOff, "off", "off", Tone::kFair},
+    {ApState::kDown, "interface-down", "off the air, since its interface is down", Tone::kBad},
+    {ApState::kOffBySchedule, "off-by-schedule", "off the air at this hour, by its schedule", Tone::kFair},
+    {ApState::kSettingUp, "setting-up", "being set up", Tone::kFair},
+    {ApState::kWaitingForRadar, "waiting-for-radar", "waiting until its channel is known to be free of radar",
+     Tone::kFair},
+    {ApState::kOnAir, "on-air", "on the air", Tone::kGood},
+};
+
+const StateText& TextOf(ApState state) {
+  return *std::ranges::find(kStateTexts, state, &StateText::state);
+}
+
+Value KeyOf(const ApStatus& status) {
+  return TextOf(status.state).szKey;
 }
 
 Shown ShowState(const ApStatus& status, bool) {
-  switch (status.state) {
-    case ApState::kOff:
-      return {"off", Tone::kFair};
-    case ApState::kDown:
-      return {"off the air, since its interface is down", Tone::kBad};
-    case ApState::kOffBySchedule:
-      return {"off the air at this hour, by its schedule", Tone::kFair};
-    case ApState::kSettingUp:
-      return {"being set up", Tone::kFair};
-    case ApState::kWaitingForRadar:
-      return {"waiting until its channel is known to be free of radar", Tone::kFair};
-    case ApState::kOnAir:
-      return {"on the air", Tone::kGood};
-  }
-  return {""};
+  const StateText& text = TextOf(status.state);
+  return {text.szText, text.tone};
 }
 
 Shown ShowPending(const ApStatus& status, bool) {
@@ -74,7 +69,7 @@ Value NumberOrNothing(int number) {
 }
 
 constexpr Field<ApStatus> kFields[] = {
-    {"state", "access point", [](const ApStatus& of) { return Value(KeyOf(of.state)); }, Layout::kLeft, ShowState},
+    {"state", "access point", KeyOf, Layout::kLeft, ShowState},
     {"name", "name", [](const ApStatus& of) { return Value(of.name); }},
     {"enabled", "enabled", [](const ApStatus& of) { return Value(of.enabled); }},
     {"interface", "interface", [](const ApStatus& of) { return Value(of.interface); }},
