@@ -32,6 +32,7 @@ constexpr char kJoinMarker[] = "/var/tmp/.wireless_connecting";
 constexpr int kMany = 20;
 
 bool g_canCall = false;
+int g_busyCalls = 0;  // so many are refused, since another program has the adapter scan
 
 class Joining : public ToolTest {
  protected:
@@ -272,6 +273,15 @@ TEST_F(Joining, ByItselfCallsThoseThatMayHideOnceAndLast) {
   EXPECT_THAT(library::Calls(), Contains("MEROWirelessNetworkConnect"));
 }
 
+// The call was given up at once, and the network called out of range. The supplicant scans whenever it has just lost
+// one.
+TEST_F(Joining, FindsANetworkThatHidesWhileAnotherProgramScans) {
+  g_canCall = true;
+  g_busyCalls = 3;
+  ComeIntoRangeWith(kCalled);
+  EXPECT_EQ(Tool({"connect", "cafe", "--key-file", kSecret}).status, 0);
+}
+
 TEST_F(Joining, CallsNoAddress) {
   g_canCall = true;
   ComeIntoRangeWith(kInRange);
@@ -290,6 +300,7 @@ extern "C" int ioctl(int fd, unsigned long request, ...) noexcept {
   va_end(arguments);
   if (g_canCall && request == SIOCGIWSCAN) return 0;
   if (!g_canCall || request != SIOCSIWSCAN) return static_cast<int>(::syscall(SYS_ioctl, fd, request, argument));
+  if (g_busyCalls-- > 0) return errno = EBUSY, -1;
   const auto* call = static_cast<const iw_scan_req*>(static_cast<const iwreq*>(argument)->u.data.pointer);
   const std::string name(reinterpret_cast<const char*>(call->essid), call->essid_len);
   WriteText(kCalled, name);

@@ -50,6 +50,7 @@ std::string WepKeyOf(const std::string& interface) {
   return Hex({key, request.u.encoding.length});
 }
 
+// One scan at a time: the supplicant's own, after it has lost a network, comes to its end first.
 bool CallNetwork(const std::string& interface, const std::string& name) {
   constexpr std::chrono::milliseconds kPause{100};
   constexpr std::chrono::seconds kPatience{10};
@@ -60,7 +61,12 @@ bool CallNetwork(const std::string& interface, const std::string& name) {
   request.u.data.pointer = &call;
   request.u.data.length = sizeof call;
   request.u.data.flags = IW_SCAN_THIS_ESSID;
-  if (!Ask(interface, SIOCSIWSCAN, request)) return false;
+  bool called = false;
+  const auto isAnswered = [&] {
+    called = Ask(interface, SIOCSIWSCAN, request);
+    return called || errno != EBUSY;
+  };
+  if (!Await(kPatience, kPause, isAnswered) || !called) return false;
   (void)Await(kPatience, kPause,
               [&] { return !IsScanning(interface); });  // one that lasts longer is looked at as it is
   return true;
