@@ -33,6 +33,7 @@ constexpr char kDaemonPid[] = "/tmp/world/daemon";
 constexpr char kJoinMarker[] = "/var/tmp/.wireless_connecting";
 constexpr char kApMarker[] = "/var/tmp/.wireless_ap_connecting";
 constexpr char kApInfo[] = "/etc/hostapd/hostapd-wlan0.info";  // by which the hot-plug script goes
+constexpr char kClientPid[] = "/var/run/udhcpc-wlan0.pid";
 constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
 
 bool g_hasOwnClock = false;
@@ -85,7 +86,7 @@ class Keep : public ToolTest {
     std::filesystem::remove_all("/tmp/world");
     std::filesystem::create_directory("/tmp/world");
     std::filesystem::remove_all("/var/run/merowireless");
-    for (const char* szPath : {kJoinMarker, kApMarker, kApInfo, kSupplicantPid}) IsNot(szPath);
+    for (const char* szPath : {kJoinMarker, kApMarker, kApInfo, kSupplicantPid, kClientPid}) IsNot(szPath);
     library::Known({library::Home()});
     library::Connected("Home");
     library::MEROWirelessConnStatusGet = [] {
@@ -178,6 +179,27 @@ TEST_F(Keep, LeavesAConnectionAloneThatIsThereAlready) {
   StartedTool tool = Started();
   EXPECT_TRUE(Says(tool, kConnected));
   ExpectNoAttemptAfter(0);
+}
+
+// The address stayed until the server gave it to somebody else.
+TEST_F(Keep, AsksForAnAddressAnewWhenTheDhcpClientWasKilled) {
+  StartedTool tool = Started();
+  ASSERT_TRUE(Says(tool, kConnected));
+  const auto addressed = [] { return std::ranges::count(library::Calls(), "MEROWirelessIfconfigSet"); };
+  ASSERT_EQ(addressed(), 1);
+  {
+    const StartedDaemon client("busybox", kClientPid);
+    LetLook();
+    EXPECT_EQ(addressed(), 1) << "it lives";
+  }
+  WriteText(kClientPid, "999999");
+  Pass(5);
+  EXPECT_TRUE(Soon([&] { return addressed() == 2; }));
+  EXPECT_TRUE(Says(tool, "the DHCP client was killed, and an address is asked for anew\n"));
+  EXPECT_EQ(Attempts(), 1) << "the network is not joined anew";
+  Pass(4);
+  EXPECT_EQ(addressed(), 2);
+  IsNot(kClientPid);
 }
 
 // The unit tried once, and an appliance that was switched on before its access point stayed without a connection.

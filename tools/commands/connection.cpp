@@ -147,6 +147,14 @@ void AutoConnect(const Program& program, JoinLockFor who) {
   SayConnected(program);
 }
 
+void LeaseAgain(const Program& program) {
+  const JoinLock lock(JoinLockFor::kKeeper);
+  if (!ReadStatus().isLetIn || !IsLeaseAbandoned()) return;
+  KnownNetwork config{};
+  SetAddressing(config, Addressing{});
+  ApplyAddress(SettingAddress(program, config), config);
+}
+
 void Disconnect(const Program& program) {
   const JoinLock lock;
   if (Run<int>(program.Doing("disconnecting"), [] { return MEROWirelessNetworkDisconnect(); }) < 0) {

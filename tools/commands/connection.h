@@ -32,6 +32,10 @@ void Connect(const Program& program, const NetworkToJoin& wanted);
 void JoinAgain(const Program& program, const std::string& name);
 
 void AutoConnect(const Program& program, JoinLockFor who = JoinLockFor::kCommand);
+
+// Asks for an address anew where the DHCP client of the connection was killed, for `autoconnect --keep`.
+void LeaseAgain(const Program& program);
+
 void Disconnect(const Program& program);
 void ShowStatus(const Program& program);
 void MakeCell(const Program& program, const CellToMake& wanted);

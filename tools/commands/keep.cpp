@@ -14,6 +14,7 @@
 #include "base/signals.h"
 #include "commands/connection.h"
 #include "common/paths.h"
+#include "model/addressing.h"
 #include "model/library.h"
 #include "model/situation.h"
 #include "model/status.h"
@@ -81,6 +82,8 @@ class Keeper {
       Look();
       if (isDue())
         Try();
+      else if (isLeaseDue())
+        LeaseAnew();
       else
         Wait();
     }
@@ -88,6 +91,8 @@ class Keeper {
 
  private:
   bool isDue() const { return situation_ == Situation::kFree && Clock::now() >= due_; }
+
+  bool isLeaseDue() const { return situation_ == Situation::kConnected && Clock::now() >= due_ && IsLeaseAbandoned(); }
 
   // ---- What is so ----
 
@@ -157,6 +162,16 @@ class Keeper {
     if (failure && failure->exit() == Exit::kBusy) return;  // somebody else joins a network: that was no attempt
     if (failure) TellFailure(*failure);
     pause_ = std::min(2 * pause_, keeping_.longestPause);
+  }
+
+  // The kernel ends a client when memory runs out, say. This does not take long and goes before everything else: taken
+  // back, it would leave the connection without an address.
+  void LeaseAnew() {
+    Tell("the DHCP client was killed, and an address is asked for anew", ReadStatus());
+    const auto failure = Attempt([this] { LeaseAgain(program_); }).Result();
+    due_ = Clock::now() + pause_;
+    pause_ = std::min(2 * pause_, keeping_.longestPause);
+    if (failure && failure->exit() != Exit::kBusy) TellFailure(*failure);
   }
 
   // Until the attempt has ended. An access point goes before it, the end of the program, and what somebody wants to do

@@ -10,7 +10,9 @@
 #include <string_view>
 #include <tuple>
 
+#include "base/pid_file.h"
 #include "base/text.h"
+#include "common/paths.h"
 #include "model/library_lines.h"
 
 namespace {
@@ -115,6 +117,11 @@ void RequireAddressing(const KnownNetwork& config) {
 
 Task SettingAddress(const Program& program, const KnownNetwork& config) {
   return program.Doing(IsDhcp(config) ? "asking for an address" : "setting the address");
+}
+
+bool IsLeaseAbandoned() {
+  const InterfacePath pid(kDhcpClientPidFormat, MEROWirelessInterfaceGet());
+  return PLIBCFileExist(pid.c_str()) != 0 && !IsDaemonThere(pid.c_str(), "busybox");
 }
 
 void RequireLease() {

@@ -37,6 +37,10 @@ void ApplyGateway(const std::string& gateway);
 // Adds the gateway of a network with a static address; a DHCP server names it along with the address.
 void ApplySavedGateway(const KnownNetwork& config);
 
+// Whether the interface's DHCP client was killed, and its lease will not be renewed: one that is ended takes its pid
+// file with it.
+bool IsLeaseAbandoned();
+
 // Fails when no DHCP server has answered, which the library takes for a success.
 void RequireLease();
 
