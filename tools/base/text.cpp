@@ -186,6 +186,12 @@ std::optional<Address> ParseAddress(std::string_view text) {
   return address;
 }
 
+std::string WithBlanks(std::span<const std::string> words) {
+  std::string text;
+  for (const std::string& word : words) text.append(text.empty() ? "" : " ").append(word);
+  return text;
+}
+
 bool IsIpAddress(const std::string& text) {
   in_addr address;
   return ::inet_pton(AF_INET, text.c_str(), &address) == 1;

@@ -5,6 +5,7 @@
 #include <array>
 #include <cstddef>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 
@@ -45,6 +46,9 @@ std::string AddressText(const Address& address);
 
 // Six hexadecimal octets between colons, and nothing else.
 std::optional<Address> ParseAddress(std::string_view text);
+
+// With a blank between each and the next.
+std::string WithBlanks(std::span<const std::string> words);
 
 bool IsIpAddress(const std::string& text);
 

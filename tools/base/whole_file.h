@@ -20,4 +20,7 @@ bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode);
 // other than a plain file is there; `shown` is the path for a sentence.
 void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes);
 
+// Writes all of a text to an open file. False when it cannot; then errno tells why.
+bool WriteAll(int fd, std::string_view text);
+
 #endif  // MERO_TOOLS_WHOLE_FILE_H

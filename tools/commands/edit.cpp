@@ -91,12 +91,9 @@ void Write(const SettingsChange& change, const Edited& edited, const NetworkToEd
   if (wanted.concernsSecret() && NeedsSecret(network.network.auth)) change.Set(section, kKeySecret, network.szKey);
 }
 
-// All access points that were saved under a name, or else the one of this address.
 std::vector<KnownNetwork> ToEdit(const Program& program, const std::string& name) {
-  std::vector<KnownNetwork> known = AllKnown(name);
+  const std::vector<KnownNetwork> known = AllKnown(name);
   if (known.empty()) throw NotKnown(program, name);
-  const auto isOthers = [&](const KnownNetwork& network) { return name != network.network.szEssid; };
-  if (!std::ranges::all_of(known, isOthers)) std::erase_if(known, isOthers);
   if (std::ranges::all_of(known, HasSection)) return known;
   throw Failed("the section of " + program.output.Name(name) + " is not named by its BSSID",
                "look at it in " + std::string(kKnownNetworksPath));

@@ -149,7 +149,10 @@ Network FindInRange(const Program& program, const std::string& name) {
 
 std::vector<KnownNetwork> AllKnown(const std::string& name) {
   std::vector<KnownNetwork> known = Known(Order::kByTime);
-  std::erase_if(known, [&](const KnownNetwork& other) { return !IsNamed(other.network, name); });
+  const auto hasName = [&](const KnownNetwork& other) { return name == other.network.szEssid; };
+  const bool isName = std::ranges::any_of(known, hasName);
+  std::erase_if(known,
+                [&](const KnownNetwork& other) { return isName ? !hasName(other) : !IsNamed(other.network, name); });
   return known;
 }
 

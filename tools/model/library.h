@@ -44,10 +44,10 @@ bool IsNamed(const Network& network, const std::string& name);
 // The strongest access point in range of this name, or the one of this address; fails when there is none.
 Network FindInRange(const Program& program, const std::string& name);
 
-// The network that was saved last under a name or an address.
+// The first of AllKnown().
 std::optional<KnownNetwork> FindKnown(const std::string& name);
 
-// All known networks of a name or an address, the one saved last first.
+// All sections that were saved under a name, or else the one of this address, the one saved last first.
 std::vector<KnownNetwork> AllKnown(const std::string& name);
 
 // Fails when there is no adapter.

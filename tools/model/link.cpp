@@ -44,12 +44,6 @@ void AddAir(Link& link, const std::string& interface, LinkTo to) {
   if (!stations.empty()) AddStation(link, stations.front());
 }
 
-void AddNameServers(Link& link, const std::string& interface) {
-  for (const std::string& server : NameServersOf(interface)) {
-    link.nameServers.append(link.nameServers.empty() ? "" : " ").append(server);
-  }
-}
-
 }  // namespace
 
 Link LinkOf(const std::string& interface, LinkTo to) {
@@ -63,6 +57,6 @@ Link LinkOf(const std::string& interface, LinkTo to) {
     if (const auto address = AccessPointOf(interface)) link.accessPoint = AddressText(*address);
   }
   link.gateway = GatewayOf(interface);
-  AddNameServers(link, interface);
+  link.nameServers = WithBlanks(NameServersOf(interface));
   return link;
 }

@@ -32,12 +32,6 @@ std::vector<std::string> Saved(const std::string& interface) {
                         InterfacePath(kSavedServersEnd, interface.c_str()).c_str());
 }
 
-std::string Joined(const std::vector<std::string>& words) {
-  std::string joined;
-  for (const std::string& word : words) joined.append(joined.empty() ? "" : " ").append(word);
-  return joined;
-}
-
 // Whether it can be the address of one other machine, as the kit's script sees it.
 bool IsHost(const std::string& server) {
   const int first = std::atoi(server.c_str());
@@ -54,7 +48,7 @@ std::vector<std::string> NameServersOf(const std::string& interface) {
 }
 
 std::string SavedNameServersOf(const std::string& interface) {
-  return Joined(Saved(interface));
+  return WithBlanks(Saved(interface));
 }
 
 void SetNameServers(const std::string& interface, const std::string& servers) {
@@ -75,5 +69,5 @@ std::string CheckedNameServers(const std::string& text) {
     throw Wrong("these can be no name servers",
                 "give one to three addresses, such as 192.168.1.1,192.168.1.2, or none");
   }
-  return Joined(servers);
+  return WithBlanks(servers);
 }

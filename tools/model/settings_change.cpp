@@ -13,6 +13,7 @@
 #include <filesystem>
 #include <thread>
 
+#include "base/whole_file.h"
 #include "common/paths.h"
 #include "model/library.h"
 
@@ -56,15 +57,6 @@ Descriptor Locked(const std::string& lockPath, const std::string& path) {
   throw Failure(Exit::kBusy, path + " is being changed by another program", "try again in a moment");
 }
 
-void WriteAll(int fd, std::string_view text, const std::string& path) {
-  while (!text.empty()) {
-    const ssize_t put = ::write(fd, text.data(), text.size());
-    if (put < 0 && errno == EINTR) continue;
-    if (put < 0) throw NotChanged(path);
-    text.remove_prefix(static_cast<std::size_t>(put));
-  }
-}
-
 }  // namespace
 
 SettingsChange::SettingsChange(const std::string& path)
@@ -102,8 +94,7 @@ void SettingsChange::Copy() const {
   }
   char bytes[16384];
   for (ssize_t size; (size = ::read(file.get(), bytes, sizeof bytes)) != 0;) {
-    if (size < 0) throw NotChanged(path_);
-    WriteAll(copy.get(), {bytes, static_cast<std::size_t>(size)}, path_);
+    if (size < 0 || !WriteAll(copy.get(), {bytes, static_cast<std::size_t>(size)})) throw NotChanged(path_);
   }
 }
 
