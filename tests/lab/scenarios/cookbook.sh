@@ -55,6 +55,24 @@ expect_address nas 10.1.0.5/24
 expect_default_route nas 10.1.0.1
 expect_reachable nas 10.1.0.1
 
+# expect_access_point NAME: what the last status says of it.
+expect_access_point() {
+  grep -q "^access point  *$(address_of "$1" | tr a-f A-F)$" <<<"$OUTPUT" || fail "it is not at $1: $OUTPUT"
+}
+
+access_point hall ssid=Home channel=11 wpa=2 wpa_passphrase='deux croissants' rsn_pairwise=CCMP signal=-60
+recipe nas 'Roam between access points of one name'
+expect_same 'the access points of Home in range' 2 "$(grep -c '^Home .*WPA2 AES' <<<"$OUTPUT")"
+expect_station home nas
+expect_access_point home
+switch_off home
+within 30 station hall nas || fail 'the supplicant stays where nobody is'
+on nas merowireless status
+expect_access_point hall
+expect_address nas 10.1.0.5/24
+switch_on home
+switch_off hall
+
 recipe nas 'Join a hidden network'
 expect_station attic nas
 expect_address nas '10.2.0.1??/24'
