@@ -130,8 +130,9 @@ class Walk {
   bool Call(const SavedNetwork& saved) {
     try {
       auto answers = InRangeOnCall(program_, saved.newest.network.szEssid);
-      if (answers) inRange_ = *std::move(answers);
-      return answers.has_value();
+      if (!answers) return false;
+      inRange_ = *std::move(answers);
+      return true;
     } catch (const Failure& failure) {
       if (!IsOfOneNetwork(failure)) throw;
       return false;
