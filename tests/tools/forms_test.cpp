@@ -132,6 +132,7 @@ const Command kCommands[] = {
     {WithAGateway, {"gateway", "10.0.0.1"}},  // the last one: its interface stays
     {WithAStore, {"edit", "Home", "--priority", "5"}},
     {WithAStore, {"export", "--networks"}},
+    {WithAStore, {"import", "/tmp/settings.json"}},
 };
 
 std::vector<std::string> With(std::vector<std::string> words, const char* szOption) {
@@ -159,6 +160,9 @@ class Forms : public ToolTest {
     WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
     WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "ssid=Old Office\n");
     WriteText("/usr/mero/etc/wireless_country.conf", "country=\"DE\"\n");
+    WriteText("/tmp/settings.json",
+              R"({"version":1,"networks":[{"name":"Home","address":"0A:0A:0A:0A:0A:0A","auth":"WPA2PSK",)"
+              R"("encryption":"AES","priority":3}]})");
     kernel::PutInBridge();
     WriteText("/var/run/rc.network/dnsmasq-lbr0.leases", "0 02:00:00:00:00:00 10.1.14.23 tablet *\n");
   }

@@ -1,4 +1,7 @@
 // What one appliance knows goes to another one, as a document.
+#include <sys/resource.h>
+
+#include <csignal>
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
@@ -146,6 +149,262 @@ TEST_F(Export, WithoutAnAdapterLeavesTheAccessPointOutAndSaysSo) {
   EXPECT_TRUE(json::parse(ran.out)["access_point"].is_null());
   EXPECT_EQ(json::parse(ran.out)["networks"].size(), 2U);
   EXPECT_EQ(Tool({"export", "--networks"}).err, "");
+}
+
+class Import : public Export {
+ protected:
+  Import() {
+    library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF conf) {
+      library::Record(std::string("saves ") + conf->hostapConf.szSSID + (conf->blEnable != FALSE ? " on" : " off"));
+      return TRUE;
+    };
+  }
+
+  static Ran Imported(const std::string& document, std::vector<std::string> options = {}) {
+    options.insert(options.begin(), {"import", "-"});
+    return Tool(options, {.input = document});
+  }
+
+  static std::string Networks(const std::string& networks) { return R"({"version":1,"networks":[)" + networks + "]}"; }
+
+  static std::string Network(const std::string& more, const std::string& address = "0A:0A:0A:0A:0A:0E") {
+    return R"({"name":"Attic","auth":"WPA2PSK","encryption":"AES","address":")" + address + "\"" + more + "}";
+  }
+
+  // Says where the document is wrong, and that nothing was changed.
+  static void ExpectRefused(const std::string& document, const std::string& why, int status = 2) {
+    const Ran ran = Imported(document);
+    EXPECT_EQ(ran.status, status) << document.substr(0, 200) << ran.err;
+    EXPECT_THAT(ran.err, HasSubstr("merowireless: " + why)) << document.substr(0, 200);
+    EXPECT_EQ(ran.out, "");
+    EXPECT_EQ(ReadText(kPath), kStore);
+    EXPECT_EQ(Shell("ls -A /usr/mero/etc | grep edit || :"), "");
+  }
+};
+
+TEST_F(Import, MakesAnotherApplianceKnowTheSame) {
+  const std::string document = Tool({"export", "--secrets"}).out;
+  std::filesystem::remove(kPath);
+  const Ran ran = Imported(document);
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(ran.out,
+            "SETTINGS  NAME     ACCESS POINT       CHANGE  SECRET\n"
+            "network   Home     0A:0A:0A:0A:0A:0A  added   imported\n"
+            "network   caf\\xe9  0A:0A:0A:0A:0A:0C  added   -\n");
+  EXPECT_EQ(Tool({"export", "--secrets"}).out, document);
+  EXPECT_EQ(Shell("stat -c %a /usr/mero/etc/wireless.conf; ls -A /usr/mero/etc"), "600\nwireless.conf\n");
+}
+
+TEST_F(Import, ChangesOnlyWhatDiffersAndKeepsSecretsAndOtherLines) {
+  json document = Exported();
+  document["networks"][0]["priority"] = 9;
+  const Ran ran = Imported(document.dump(), {"--porcelain"});
+  EXPECT_EQ(ran.out,
+            "network\tHome\t\t0A:0A:0A:0A:0A:0A\tchanged\tkept\n"
+            "network\tcaf\\0351\t636166e9\t0A:0A:0A:0A:0A:0C\tsame\t\n");
+  std::string changed = kStore;
+  changed.replace(changed.find("PRIORITY=7"), 10, "PRIORITY=9");
+  EXPECT_EQ(ReadText(kPath), changed);
+}
+
+TEST_F(Import, WithDryRunSaysTheSameAndChangesNothing) {
+  const std::string document = Networks(Network(""));
+  const Ran dry = Imported(document, {"--dry-run"});
+  EXPECT_THAT(dry.err, HasSubstr("merowireless: nothing was changed: this is what would be imported\n"));
+  EXPECT_EQ(ReadText(kPath), kStore);
+  const Ran ran = Imported(document);
+  EXPECT_EQ(ran.out, dry.out);
+  EXPECT_THAT(ReadText(kPath), HasSubstr("[0A:0A:0A:0A:0A:0E]\n\tKEY=\n\tIPADDR=DHCP\n"));
+  EXPECT_EQ(ran.err, "merowireless: a network whose secret is missing needs it from `merowireless edit NAME --key`\n");
+  EXPECT_THAT(Imported(document, {"--json"}).out, HasSubstr(R"("change":"same","secret":"missing"}]})"));
+}
+
+TEST_F(Import, RefusesWhatCannotBeSavedAndNamesThePlace) {
+  const std::pair<std::string, std::string> rows[] = {
+      {R"(,"ip":"10.0.0.0","mask":"255.255.255.0")", "networks[1].ip: no host can have this address: "},
+      {R"(,"ip":"10.0.0.4","mask":"255.255.255.0","gateway":"10.0.1.1")", "networks[1].ip: the gateway is not in "},
+      {R"(,"ip":true)", "networks[1].ip: this is no text: "},
+      {R"(,"priority":1001)", "networks[1].priority: no network has this priority: "},
+      {R"(,"priority":"5")", "networks[1].priority: this is no whole number: "},
+      {R"(,"priority":99999999999999999999)", "networks[1].priority: this is no whole number: "},
+      {R"(,"autojoin":"no")", "networks[1].autojoin: this is no truth value: "},
+      {R"(,"name_servers":"home")", "networks[1].name_servers: these can be no name servers: "},
+      {R"(,"saved":"yesterday")", "networks[1].saved: this is no time: "},
+      {R"(,"mode":"MONITOR")", "networks[1].mode: networks have no such mode: "},
+      {R"(,"colour":"blue")", "networks[1].colour: networks have no such key: "},
+      {R"(,"secret":{"hex":"6g"})", "networks[1].secret: these are no bytes: "},
+      {R"(,"secret":{"bytes":"66"})", "networks[1].secret: this object is no text: "},
+      {R"(,"secret":"open\nsesame")", "networks[1].secret: the secret cannot be used: "},
+      {R"(,"secret":"open\u0000sesame")", "networks[1].secret: the secret cannot be used: "},
+      {",\"secret\":\"" + std::string(2000, 'x') + "\"", "networks[1].secret: the text is too long: "},
+  };
+  for (const auto& [more, why] : rows) {
+    ExpectRefused(Networks(Network("", "0A:0A:0A:0A:0A:0D") + "," + Network(more)), "the document is wrong at " + why);
+  }
+  ExpectRefused(Networks(Network(R"(,"secret":"short")")),
+                "the document is wrong at networks[0]: this can be no passphrase", 5);
+  const std::pair<const char*, const char*> records[] = {
+      {R"({"name":"a","auth":"OPEN","encryption":"NONE"})", "networks[0]: a network lacks a key: address"},
+      {R"({"name":"","auth":"OPEN","encryption":"NONE","address":"0A:0A:0A:0A:0A:0E"})", "networks[0].name: "},
+      {R"({"name":"a\u0000b","auth":"OPEN","encryption":"NONE","address":"0A:0A:0A:0A:0A:0E"})", "networks[0].name: "},
+      {R"({"name":"a\nb","auth":"OPEN","encryption":"NONE","address":"0A:0A:0A:0A:0A:0E"})", "networks[0].name: "},
+      {R"({"name":"a","auth":"WPA9","encryption":"NONE","address":"0A:0A:0A:0A:0A:0E"})",
+       "networks[0].auth: networks are not protected like this: "},
+      {R"({"name":"a","auth":"OPEN","encryption":"ROT13","address":"0A:0A:0A:0A:0A:0E"})",
+       "networks[0].encryption: networks are not enciphered like this: "},
+      {R"({"name":"a","auth":"WPANONE","encryption":"AES","address":"0A:0A:0A:0A:0A:0E"})",
+       "networks[0]: networks that are protected so cannot be joined: "},
+      {R"({"name":"a","auth":"OPEN","encryption":"NONE","address":"01:0A:0A:0A:0A:0E"})",
+       "networks[0].address: this is no address of an access point: "},
+      {"7", "networks[0]: this is no network: "},
+  };
+  for (const auto& [record, why] : records)
+    ExpectRefused(Networks(record), std::string("the document is wrong at ") + why);
+  ExpectRefused(Networks(Network("") + "," + Network("")),
+                "the document is wrong at networks[1].address: another network of the document has this address: ");
+}
+
+TEST_F(Import, RefusesWhatIsNoDocument) {
+  const std::pair<std::string, std::string> rows[] = {
+      {"", "the document is no JSON at line 1: "},
+      {"{\n\"version\": 1,\n oops}", "the document is no JSON at line 3: "},
+      {"{\"version\":1,\"networks\":\"\xff\"}", "the document is no JSON at line 1: "},
+      {R"({"version":1e999})", "the document holds a number that is too great: "},
+      {"[]", "this is no document of settings: "},
+      {R"({"networks":[]})", "this is no document of settings: "},
+      {R"({"version":2})", "the document is of another version: "},
+      {R"({"version":"1"})", "the document is of another version: "},
+      {R"({"version":1})", "the document has nothing to import: "},
+      {R"({"version":1,"colour":"blue"})", "the document is wrong at colour: documents have no such key: "},
+      {R"({"version":1,"version":1})", "the document has a key twice in one object: version: "},
+      {Networks(R"({"name":"a","name":"b"})"), "the document has a key twice in one object: name: "},
+      {R"({"version":1,"networks":{}})", "the document is wrong at networks: this is no list: "},
+      {std::string(100000, '['), "the document is nested too deeply: "},
+      {R"({"version":1)" + std::string(1 << 20, ' ') + "}", "the document is too long: "},
+  };
+  for (const auto& [document, why] : rows) ExpectRefused(document, why);
+  std::string many = "7";
+  for (int i = 0; i < 1000; ++i) many += ",7";
+  ExpectRefused(Networks(many), "the document is wrong at networks: there are too many networks: ");
+  EXPECT_THAT(Tool({"import", "/tmp/nowhere"}).err, HasSubstr("the document cannot be read from /tmp/nowhere: "));
+}
+
+TEST_F(Import, OfANetworkWhoseSectionHasAnotherNameIsRefused) {
+  std::string store = kStore;
+  store.replace(store.find("[0A:0A:0A:0A:0A:0A]"), 19, "[elsewhere]");
+  WriteText(kPath, store);
+  EXPECT_THAT(Imported(Networks(Network("", "0A:0A:0A:0A:0A:0A"))).err,
+              HasSubstr("networks[0]: the network is saved in a section that is not named by its address: "));
+  EXPECT_EQ(ReadText(kPath), store);
+}
+
+TEST_F(Import, ThatFindsNoRoomChangesNothing) {
+  library::PLIBCFileSetSectionValue = [](auto&&...) { return -1; };
+  json document = Exported();
+  document["networks"][0]["priority"] = 9;
+  const Ran ran = Imported(document.dump());
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ReadText(kPath), kStore);
+  EXPECT_EQ(Shell("ls -A /usr/mero/etc"), "wireless.conf\n");
+}
+
+TEST_F(Import, ThatFindsNoRoomForANewNetworkChangesNothing) {
+  const auto limit = [] {
+    const rlimit most{sizeof kStore + 20, sizeof kStore + 20};
+    ::setrlimit(RLIMIT_FSIZE, &most);
+    ::signal(SIGXFSZ, SIG_IGN);
+  };
+  const Ran ran = Tool({"import", "-"}, {.input = Networks(Network("")), .before = limit});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("a network could not be added, and nothing was imported: "));
+  EXPECT_EQ(ReadText(kPath), kStore);
+  EXPECT_EQ(Shell("ls -A /usr/mero/etc"), "wireless.conf\n");
+}
+
+// ---- The access point's settings ----
+
+constexpr char kOfficeNow[] =
+    R"({"version":1,"access_point":{"ssid":"Shop","channel":11,"wifi_sched":null,"max_num_sta":9,"wmm_enabled":false}})";
+
+TEST_F(Import, OfTheAccessPointKeepsTheRestAndItsSwitch) {
+  library::SavedAp(library::Office());
+  const Ran ran = Imported(kOfficeNow, {"--porcelain"});
+  EXPECT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(ran.out, "access-point\tShop\t\t\tchanged\tkept\n");
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: `merowireless ap enable` puts the imported settings on the air\n"));
+  EXPECT_THAT(ran.err,
+              HasSubstr("merowireless: the imported channel could not be checked: no radio is there to tell\n"));
+  EXPECT_THAT(library::Calls(), testing::IsSupersetOf({"saves Shop on", "saves Shop off"}));
+  EXPECT_THAT(library::Calls(), Not(testing::Contains("MEROWirelessAPEnable")));
+}
+
+TEST_F(Import, OfTheAccessPointAsItIsSavesNothing) {
+  library::SavedAp(library::Office());
+  const std::string document = Tool({"export", "--secrets"}).out;
+  EXPECT_THAT(Imported(document, {"--porcelain"}).out, HasSubstr("access-point\tOffice\t\t\tsame\timported\n"));
+  EXPECT_THAT(library::Calls(), Not(testing::Contains("MEROWirelessSetAPConfig")));
+}
+
+TEST_F(Import, OfTheAccessPointRefusesWhatItsOptionsRefuse) {
+  library::SavedAp(library::Office());
+  const std::pair<const char*, const char*> rows[] = {
+      {R"({"channel":15})", "access_point: there is no such channel in the 2.4 GHz band"},
+      {R"({"channel":true})", "access_point.channel: this setting is of another type: "},
+      {R"({"hw_mode":"an"})", "access_point.hw_mode: this is no mode of the 2.4 GHz band"},
+      {R"({"wifi_sched":"/etc/passwd"})", "access_point.wifi_sched: the schedule is not 168 hours"},
+      {R"({"enable":true})", "access_point.enable: access points have no such setting: "},
+      {R"({"encryption":"wep"})", "access_point: this security needs a secret"},
+      {R"(7)", "access_point: these are no settings: "},
+  };
+  for (const auto& [ap, why] : rows) {
+    ExpectRefused(R"({"version":1,"networks":[)" + Network("") + R"(],"access_point":)" + ap + "}",
+                  std::string("the document is wrong at ") + why);
+  }
+  EXPECT_THAT(library::Calls(), Not(testing::Contains("MEROWirelessSetAPConfig")));
+}
+
+TEST_F(Import, ThatCannotSaveTheAccessPointLeavesAllAsItWas) {
+  library::SavedAp(library::Office());
+  WriteText("/usr/mero/etc/wireless_ap.conf", "former\n", 0640);
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF conf) {
+    WriteText("/usr/mero/etc/wireless_ap.conf", "half\n");
+    return conf->blEnable;
+  };
+  json document = json::parse(kOfficeNow);
+  document["networks"] = json::array({json::parse(Network(""))});
+  EXPECT_THAT(Imported(document.dump()).err, HasSubstr("the settings could not be saved: "));
+  EXPECT_EQ(ReadText("/usr/mero/etc/wireless_ap.conf"), "former\n");
+  EXPECT_EQ(Shell("stat -c %a /usr/mero/etc/wireless_ap.conf"), "640\n");
+  EXPECT_EQ(ReadText(kPath), kStore);
+  std::filesystem::remove("/usr/mero/etc/wireless_ap.conf");
+}
+
+TEST_F(Import, OfTheAccessPointNeedsItsFormerSettingsAndSaysWhenTheyAreLost) {
+  static constexpr char kApPath[] = "/usr/mero/etc/wireless_ap.conf";
+  library::SavedAp(library::Office());
+  std::filesystem::create_directory(kApPath);
+  EXPECT_THAT(Imported(kOfficeNow).err,
+              HasSubstr("the access point's settings cannot be read, and nothing was imported: "));
+  EXPECT_THAT(library::Calls(), Not(testing::Contains("MEROWirelessSetAPConfig")));
+  std::filesystem::remove(kApPath);
+  WriteText(kApPath, "former\n");
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF) {
+    std::filesystem::remove(kApPath);
+    std::filesystem::create_directory(kApPath);
+    return FALSE;
+  };
+  EXPECT_THAT(Imported(kOfficeNow).err,
+              HasSubstr("the networks could not be imported, and the access point's settings not be put back: "));
+  std::filesystem::remove(kApPath);
+}
+
+TEST_F(Import, WithoutAnAdapterTakesTheNetworksAloneWhenToldTo) {
+  library::MEROWirelessApConfigSecNameGet = [](char*, size_t) { return FALSE; };
+  json document = json::parse(kOfficeNow);
+  document["networks"] = json::array({json::parse(Network(""))});
+  ExpectRefused(document.dump(), "the access point's settings are an adapter's, and none has been announced: ", 1);
+  EXPECT_EQ(Imported(document.dump(), {"--networks"}).status, 0);
+  EXPECT_THAT(ReadText(kPath), HasSubstr("\tESSID=Attic\n"));
 }
 
 }  // namespace

@@ -23,6 +23,7 @@
 #include "commands/country.h"
 #include "commands/edit.h"
 #include "commands/export.h"
+#include "commands/import.h"
 #include "commands/keep.h"
 #include "commands/networks.h"
 #include "commands/share.h"
@@ -193,6 +194,15 @@ void DescribeExporting(CLI::App& command, SettingsToExport& values) {
   command.add_flag("--networks", values.networksAlone, "leave the access point's settings out");
 }
 
+void DescribeImporting(CLI::App& command, SettingsToImport& values) {
+  command.add_option("file", values.file, "a document of export, or - for the standard input")
+      ->required()
+      ->option_text("FILE|-")
+      ->check(HasName);
+  command.add_flag("--networks", values.networksAlone, "leave the access point's settings as they are");
+  command.add_flag("--dry-run", values.dryRun, "show what would change, and change nothing");
+}
+
 void AddNetworkCommands(Commands& commands) {
   commands.Add<Scanning>("scan", "List the networks in range", DescribeScanning,
                          [](const Program& program, const Scanning& values) { Scan(program, values.results()); });
@@ -207,6 +217,7 @@ void AddNetworkCommands(Commands& commands) {
   commands.Add<std::string>("forget", "Forget a network that has been saved", DescribeNetwork, Forget);
   commands.Add<NetworkToShare>("share", "Draw the code by which a phone joins a network", DescribeSharing, Share);
   commands.Add<SettingsToExport>("export", "Write the settings into a document", DescribeExporting, Export);
+  commands.Add<SettingsToImport>("import", "Take settings from such a document", DescribeImporting, Import);
 }
 
 // ---- The connection ----

@@ -16,6 +16,12 @@ std::string UtcText(std::time_t time) {
   return TextOf(::gmtime_r(&time, &parts), "%FT%TZ");
 }
 
+std::time_t TimeOf(const std::string& text) {
+  std::tm parts{};
+  const char* szEnd = ::strptime(text.c_str(), "%FT%TZ", &parts);
+  return szEnd == text.c_str() + text.size() ? ::timegm(&parts) : -1;
+}
+
 std::string LocalText(std::time_t time, const char* szFormat) {
   std::tm parts{};
   return TextOf(::localtime_r(&time, &parts), szFormat);

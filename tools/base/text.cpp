@@ -192,6 +192,10 @@ std::string WithBlanks(std::span<const std::string> words) {
   return text;
 }
 
+bool IsStation(const Address& address) {
+  return address != Address{} && (address[0] & 1) == 0;
+}
+
 bool IsIpAddress(const std::string& text) {
   in_addr address;
   return ::inet_pton(AF_INET, text.c_str(), &address) == 1;

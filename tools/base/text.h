@@ -50,6 +50,9 @@ std::optional<Address> ParseAddress(std::string_view text);
 // With a blank between each and the next.
 std::string WithBlanks(std::span<const std::string> words);
 
+// Whether it can be an access point's: it is not all zeros, and not a group's.
+bool IsStation(const Address& address);
+
 bool IsIpAddress(const std::string& text);
 
 // A dotted netmask: ones, then zeros.

@@ -34,18 +34,23 @@ bool WriteAll(int fd, std::string_view text) {
   return true;
 }
 
+std::optional<std::string> TextOf(int fd, std::size_t most) {
+  std::string text;
+  char bytes[4096];
+  while (text.size() <= most) {
+    const ssize_t size = ::read(fd, bytes, sizeof bytes);
+    if (size < 0 && errno == EINTR) continue;
+    if (size < 0) return std::nullopt;
+    if (size == 0) break;
+    text.append(bytes, static_cast<std::size_t>(size));
+  }
+  return text;
+}
+
 std::optional<std::string> TextOfFile(const std::string& path) {
   const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
   if (!file.valid()) return std::nullopt;
-  std::string text;
-  char bytes[4096];
-  while (true) {
-    const ssize_t size = ::read(file.get(), bytes, sizeof bytes);
-    if (size < 0 && errno == EINTR) continue;
-    if (size < 0) return std::nullopt;
-    if (size == 0) return text;
-    text.append(bytes, static_cast<std::size_t>(size));
-  }
+  return TextOf(file.get(), std::string::npos - 1);
 }
 
 bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode) {

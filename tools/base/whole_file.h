@@ -4,12 +4,17 @@
 
 #include <sys/types.h>
 
+#include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
 
 // The bytes of a file; nothing when it cannot be read, and errno tells why.
 std::optional<std::string> TextOfFile(const std::string& path);
+
+// The bytes that an open file has left, or the first of them: `most` and a few more. Nothing when they cannot be read,
+// and errno tells why.
+std::optional<std::string> TextOf(int fd, std::size_t most);
 
 // Puts a file of these bytes and this mode at a path, in one step: whoever reads it, and whoever switches the machine
 // off, finds what there was or all of this. False when that fails; then errno tells why, and what there was is there

@@ -4,13 +4,13 @@
 #include <algorithm>
 #include <optional>
 
-#include "base/signals.h"
 #include "base/text.h"
 #include "commands/channels.h"
 #include "common/ap_settings.h"
 #include "common/paths.h"
 #include "model/ap_channels.h"
 #include "model/ap_former.h"
+#include "model/ap_saving.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
 #include "model/join_lock.h"
@@ -18,11 +18,6 @@
 #include "model/library_lines.h"
 
 namespace {
-
-// `radio off` may have saved settings that hold the switch alone, and so no bridge.
-void SetBridgeDefault(ApConf& conf) {
-  if (conf.hostapConf.szBridge[0] == '\0') SetText(conf.hostapConf.szBridge, kNatBridge, "the bridge");
-}
 
 // The saved settings. The defaults are never enabled: they are an open network, which nobody has asked for.
 ApConf SettingsToEnable() {
@@ -33,23 +28,6 @@ ApConf SettingsToEnable() {
   }
   RequireComplete(conf);
   return conf;
-}
-
-Failure NotSaved() {
-  return Failed("the settings could not be saved", "is there room on the disk? -v shows more");
-}
-
-void SaveSwitch(ApConf conf, bool on) {
-  conf.blEnable = on ? TRUE : FALSE;
-  if (MEROWirelessSetAPConfig(&conf) == FALSE) throw NotSaved();
-}
-
-// The library saves settings only when the access point is switched on in them. Where it was off, this saves twice: on,
-// then off again, and a signal must not come between.
-void SaveKeepingSwitch(const ApConf& conf) {
-  const Signals signals;
-  SaveSwitch(conf, true);
-  if (conf.blEnable == FALSE) SaveSwitch(conf, false);
 }
 
 void ApplySecrets(const Program& program, ApConf& conf, const ApChanges& changes) {
@@ -97,7 +75,7 @@ void TakeDown(const Program& program) {
 }
 
 void Disable(const Program& program, const ApConf& conf) {
-  SaveSwitch(conf, false);
+  SaveApSwitch(conf, false);
   TakeDown(program);
 }
 
@@ -182,7 +160,7 @@ void SetAp(const Program& program, const ApChanges& changes) {
   RequireComplete(conf);
   const std::string chosen = AsksForQuietest(changes) ? ChooseChannel(program, conf) : "";
   const bool checked = !ConcernsChannel(changes) || CheckChannel(conf) == ChannelCheck::kPassed;
-  SaveKeepingSwitch(conf);
+  SaveApKeepingSwitch(conf);
   if (!checked) Remark("merowireless: the channel could not be checked, since no radio is there to tell");
   const auto fields = ApFields(false);
   program.output.Done<ApConf>("saved" + chosen + "; `merowireless ap enable` puts the settings on the air",
@@ -204,7 +182,7 @@ void EnableAp(const Program& program) {
   task.szMarker = kApMarkerPath;
   task.undo = [&] { TakeBack(program, conf, former); };
   const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
-  if (start == Start::kNotSaved) throw NotSaved();
+  if (start == Start::kNotSaved) throw ApNotSaved();
   if (start == Start::kFailed) {
     if (!IsAnothers()) Undo(task);
     throw EnableFailed(former && ReadApStatus(conf).isRunning());

@@ -48,9 +48,7 @@ void SetAddress(KnownNetwork& network, const NetworkToEdit& wanted) {
   if (wanted.mask) addressing.mask = *wanted.mask;
   if (wanted.gateway) addressing.gateway = NoneAsEmpty(*wanted.gateway);
   SetAddressing(network, addressing);
-  const Soundness soundness = SoundnessOf(network);
-  if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at --ip and --mask");
-  if (soundness == Soundness::kGatewayOutside) throw Wrong("the gateway is not in this subnet", "look at --gateway");
+  RequireSound(network);
 }
 
 void SetExtras(Extras& extras, const NetworkToEdit& wanted) {

@@ -127,11 +127,6 @@ constexpr auto kWithoutSecret = [] {
 
 // ---- Saving ----
 
-// Whether an address can be an access point's: it is not all zeros, and not a group's.
-bool IsStation(const Address& address) {
-  return address != Address{} && (address[0] & 1) == 0;
-}
-
 // A network that no scan shows, since it hides its name or is out of range, as the user describes it.
 Network Described(const NetworkToSave& wanted) {
   const auto address = ParseAddress(wanted.address);

@@ -103,6 +103,12 @@ Soundness SoundnessOf(const KnownNetwork& config) {
   return Soundness::kGatewayOutside;
 }
 
+void RequireSound(const KnownNetwork& config) {
+  const Soundness soundness = SoundnessOf(config);
+  if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at --ip and --mask");
+  if (soundness == Soundness::kGatewayOutside) throw Wrong("the gateway is not in this subnet", "look at --gateway");
+}
+
 void RequireAddressing(const KnownNetwork& config) {
   const std::string advice = "`merowireless save` saves it with another one, or with DHCP";
   switch (SoundnessOf(config)) {

@@ -115,7 +115,16 @@ void SetBridge(ApConf& conf, const std::string& text) {
   SetText(conf.hostapConf.szBridge, text, "the bridge");
 }
 
-// The hours of a week as 168 zeros and ones, white space between them aside.
+// The hours of a week as 168 zeros and ones.
+void SetHours(MERO_WIFI_SCHED_CONF& schedule, const std::string& hours) {
+  if (hours.size() != sizeof schedule.szWifiSched - 1 || hours.find_first_not_of("01") != hours.npos) {
+    throw Wrong("the schedule is not 168 hours", "give seven lines of 24 zeros and ones");
+  }
+  SetText(schedule.szWifiSched, hours, "the schedule");
+  schedule.wifiSchedEnabled = 1;
+}
+
+// The same from a file, white space between them aside.
 void SetSchedule(MERO_WIFI_SCHED_CONF& schedule, const std::string& path) {
   if (IsWord(path, "off")) {
     schedule.wifiSchedEnabled = 0;
@@ -127,11 +136,7 @@ void SetSchedule(MERO_WIFI_SCHED_CONF& schedule, const std::string& path) {
   for (char c; file.get(c) && hours.size() < sizeof schedule.szWifiSched;) {
     if (std::isspace(static_cast<unsigned char>(c)) == 0) hours += c;
   }
-  if (hours.size() != sizeof schedule.szWifiSched - 1 || hours.find_first_not_of("01") != hours.npos) {
-    throw Wrong("the schedule is not 168 hours", "give seven lines of 24 zeros and ones");
-  }
-  SetText(schedule.szWifiSched, hours, "the schedule");
-  schedule.wifiSchedEnabled = 1;
+  SetHours(schedule, hours);
 }
 
 Value ScheduleValue(const MERO_WIFI_SCHED_CONF& schedule) {
@@ -271,7 +276,8 @@ constexpr ApSetting kSettings[] = {
          "wifi_sched", [](const ApConf& of) { return ScheduleValue(of.wifiSchedConf); },
          [](const ApConf& of, bool) { return ShowSchedule(of.wifiSchedConf); }),
      "FILE|off", "a file of 7 lines of 24 zeros and ones",
-     [](ApConf& of, const std::string& text) { SetSchedule(of.wifiSchedConf, text); }},
+     [](ApConf& of, const std::string& text) { SetSchedule(of.wifiSchedConf, text); }, Show::kAlways,
+     [](ApConf& of, const std::string& hours) { SetHours(of.wifiSchedConf, hours); }},
     {Told(
          "guest_net_enable", [](const ApConf& of) { return Value(Guest(of).blEnable != FALSE); },
          [](const ApConf& of, bool) { return ShowSwitch(Guest(of).blEnable != FALSE); }),
@@ -303,7 +309,8 @@ constexpr ApSetting kSettings[] = {
          "guest_net_sched", [](const ApConf& of) { return ScheduleValue(of.guestNetSchedConf); },
          [](const ApConf& of, bool) { return ShowSchedule(of.guestNetSchedConf); }),
      "FILE|off", "as --wifi-sched",
-     [](ApConf& of, const std::string& text) { SetSchedule(of.guestNetSchedConf, text); }},
+     [](ApConf& of, const std::string& text) { SetSchedule(of.guestNetSchedConf, text); }, Show::kAlways,
+     [](ApConf& of, const std::string& hours) { SetHours(of.guestNetSchedConf, hours); }},
     {{"has_secret", "",
       [](const ApConf& of) { return Value(*SecretOf(of.hostapConf.encryption, of.hostapConf.encryptInfo) != '\0'); }}},
     {{"guest_net_has_secret", "",

@@ -21,6 +21,7 @@ struct ApSetting {
   const char* szHelp = nullptr;
   void (*set)(ApConf&, const std::string& text) = nullptr;  // fails with advice
   Show show = Show::kAlways;
+  void (*setHours)(ApConf&, const std::string& hours) = nullptr;  // of a schedule, whose option takes a file or off
 
   bool hasOption() const { return set != nullptr; }
 };
