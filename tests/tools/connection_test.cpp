@@ -352,7 +352,8 @@ TEST_F(Connection, ThatEndsUnnotedSaysSo) {
   EXPECT_THAT(ran.err, HasSubstr("disconnected, but `autoconnect --keep` does not know that it is to stay so"));
 }
 
-TEST_F(Connection, OfEqualsIsACell) {
+// A cell once kept the address, the routes, the name servers and the DHCP client of the network before it.
+TEST_F(Connection, OfEqualsIsACellWithNothingOfTheFormerNetwork) {
   library::InCell("cell");
   library::MEROWirelessAdhocCreate = [](const WIRELESS_NETWORK_CONFIG* config) {
     library::Record(std::string(config->network.szEssid) + "|" + config->szKey + "|" +
@@ -362,8 +363,18 @@ TEST_F(Connection, OfEqualsIsACell) {
   EXPECT_EQ(Tool({"adhoc", "cell"}).status, 0);
   EXPECT_EQ(Tool({"adhoc", "cell", "--wep", "--key-stdin"}, {.input = "12345"}).status, 0);
   EXPECT_EQ(Tool({"adhoc", "cell", "--wep", "--key-stdin"}, {.input = "123456"}).status, 5);
-  EXPECT_THAT(library::Calls(),
-              ElementsAre("MEROWirelessAdhocCreate", "cell||1|1", "MEROWirelessAdhocCreate", "cell|12345|1|2"));
+  const char* const szLeave = "MEROWirelessNetworkDisconnect";
+  EXPECT_THAT(library::Calls(), ElementsAre(szLeave, "MEROWirelessAdhocCreate", "cell||1|1", szLeave,
+                                            "MEROWirelessAdhocCreate", "cell|12345|1|2"));
+}
+
+TEST_F(Connection, OfEqualsIsNotBegunInAConnectionThatDoesNotEnd) {
+  library::Connected("Home");
+  library::MEROWirelessNetworkDisconnect = [] { return -1; };
+  const Ran ran = Tool({"adhoc", "cell"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("the connection could not be ended whole"));
+  EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessAdhocCreate")));
 }
 
 // The library reports no command that the driver refuses.

@@ -99,6 +99,14 @@ void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target
   SayConnected(program, WhatBecame(saving, target.config));
 }
 
+// The library leaves all that the former network has brought to the cell: address, routes, name servers, and the DHCP
+// client that renews them.
+void LeaveFormerNetwork(const Program& program) {
+  EndFormerSupplicant(program);
+  const auto disconnect = [] { return MEROWirelessNetworkDisconnect(); };
+  if (Run<int>(program.Doing("leaving the former network"), disconnect) < 0) throw NotEnded();
+}
+
 // The library does not notice when the driver refuses the cell.
 bool IsInCell(const std::string& name) {
   WIRELESS_INFO info{};
@@ -180,7 +188,7 @@ void MakeCell(const Program& program, const CellToMake& wanted) {
   RequireFreeAdapter();
   const std::string name = program.output.Name(wanted.name);
   FormerConnection(program).Try([&] {
-    EndFormerSupplicant(program);
+    LeaveFormerNetwork(program);
     const int result = Run<int>(program.Doing("starting " + name), [&] { return MEROWirelessAdhocCreate(&config); });
     if (result >= 0 && IsInCell(wanted.name)) return LeaveAloneNoMore();
     throw Failed("the cell " + name + " could not be started",

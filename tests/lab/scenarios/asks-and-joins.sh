@@ -100,5 +100,8 @@ switch_on home
 wait "$waiting"
 expect_file nas /var/lib/status <<<0
 expect_station home nas
-on nas merowireless disconnect
+expect_address nas '10.1.0.1??/24'
+
+say '-- a cell has nothing of the network that was left for it'
+on nas merowireless adhoc bench
 expect_nothing_left nas
