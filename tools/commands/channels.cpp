@@ -14,16 +14,16 @@ namespace {
 // What an access point may do on a channel.
 struct UseText {
   ChannelUse use;
+  Tone tone;
   const char* szKey;
   const char* szText;
-  Tone tone;
 };
 
 constexpr UseText kUseTexts[] = {
-    {ChannelUse::kAll, "all", "yes", Tone::kGood},
-    {ChannelUse::kAllAfterRadar, "after-radar", "yes, after radar", Tone::kGood},
-    {ChannelUse::kListening, "listening", "listening only", Tone::kFair},
-    {ChannelUse::kNone, "none", "no", Tone::kBad},
+    {ChannelUse::kAll, Tone::kGood, "all", "yes"},
+    {ChannelUse::kAllAfterRadar, Tone::kGood, "after-radar", "yes, after radar"},
+    {ChannelUse::kListening, Tone::kFair, "listening", "listening only"},
+    {ChannelUse::kNone, Tone::kBad, "none", "no"},
 };
 
 Value UseOf(const HeardChannel& of) {

@@ -90,7 +90,7 @@ void Write(const SettingsChange& change, const Edited& edited, const NetworkToEd
 }
 
 std::vector<KnownNetwork> ToEdit(const Program& program, const std::string& name) {
-  const std::vector<KnownNetwork> known = AllKnown(name);
+  std::vector<KnownNetwork> known = AllKnown(name);
   if (known.empty()) throw NotKnown(program, name);
   if (std::ranges::all_of(known, HasSection)) return known;
   throw Failed("the section of " + program.output.Name(name) + " is not named by its BSSID",

@@ -31,19 +31,19 @@ ApState StateOf(const ApConf& conf) {
 
 struct StateText {
   ApState state;
+  Tone tone;
   const char* szKey;
   const char* szText;
-  Tone tone;
 };
 
 constexpr StateText kStateTexts[] = {
-    {ApState::kOff, "off", "off", Tone::kFair},
-    {ApState::kDown, "interface-down", "off the air, since its interface is down", Tone::kBad},
-    {ApState::kOffBySchedule, "off-by-schedule", "off the air at this hour, by its schedule", Tone::kFair},
-    {ApState::kSettingUp, "setting-up", "being set up", Tone::kFair},
-    {ApState::kWaitingForRadar, "waiting-for-radar", "waiting until its channel is known to be free of radar",
-     Tone::kFair},
-    {ApState::kOnAir, "on-air", "on the air", Tone::kGood},
+    {ApState::kOff, Tone::kFair, "off", "off"},
+    {ApState::kDown, Tone::kBad, "interface-down", "off the air, since its interface is down"},
+    {ApState::kOffBySchedule, Tone::kFair, "off-by-schedule", "off the air at this hour, by its schedule"},
+    {ApState::kSettingUp, Tone::kFair, "setting-up", "being set up"},
+    {ApState::kWaitingForRadar, Tone::kFair, "waiting-for-radar",
+     "waiting until its channel is known to be free of radar"},
+    {ApState::kOnAir, Tone::kGood, "on-air", "on the air"},
 };
 
 const StateText& TextOf(ApState state) {

@@ -13,7 +13,7 @@ using Result = Nest<NL80211_BSS_MAX>;
 
 bool IsJoined(const Result& result) {
   const auto status = result.As<std::uint32_t>(NL80211_BSS_STATUS);
-  return status == NL80211_BSS_STATUS_ASSOCIATED || status == NL80211_BSS_STATUS_IBSS_JOINED;
+  return status && (*status == NL80211_BSS_STATUS_ASSOCIATED || *status == NL80211_BSS_STATUS_IBSS_JOINED);
 }
 
 void Take(const Result& result, LastScan& last) {
