@@ -1,5 +1,6 @@
 # connect asks, waits, calls what hides, tells a wrong secret at once, and saves what worked.
 # Plain only
+# Limit: 600 s
 # shellcheck shell=bash
 
 access_point home ssid=home channel=1 wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP

@@ -1,6 +1,6 @@
 # The recipes of docs/cookbook.md, each as it stands there, and what comes of them.
 # Plain only
-# Limit: 600 s
+# Limit: 900 s
 # shellcheck shell=bash
 
 recipes_of "$LAB/../../docs/cookbook.md"

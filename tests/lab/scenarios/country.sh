@@ -1,6 +1,7 @@
 # The country is what the kernel keeps to, what the access point tells and what the program shows; and so are channels.
 # Plain only
 # Rules of countries
+# Limit: 600 s
 # shellcheck shell=bash
 
 appliance nas

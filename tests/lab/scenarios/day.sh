@@ -1,6 +1,6 @@
 # A day of an administrator: after every command, the program says what the kernel, the daemons and the settings say.
 # Plain only
-# Limit: 600 s
+# Limit: 900 s
 # shellcheck shell=bash
 
 access_point home ssid=home channel=1 wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP

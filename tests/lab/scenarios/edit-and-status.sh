@@ -1,5 +1,6 @@
 # The status agrees with the kernel and the resolver; what is edited of a network comes with the next join, and name servers go with it.
 # Plain only
+# Limit: 600 s
 # shellcheck shell=bash
 
 access_point home ssid=home channel=6 wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP

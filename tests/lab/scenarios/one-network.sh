@@ -1,7 +1,7 @@
 # A network is all of its access points: it is joined through any that is there, the supplicant changes between them, and
 # nothing that only bears its name is given its secret.
 # Plain only
-# Limit: 500 s
+# Limit: 800 s
 # shellcheck shell=bash
 
 home=(ssid=home wpa=2 wpa_passphrase='the old printer' rsn_pairwise=CCMP)

@@ -1,5 +1,6 @@
 # Who is on the access point is who the kernel and the DHCP server say, and whoever is sent away leaves.
 # Plain only
+# Limit: 600 s
 # shellcheck shell=bash
 
 appliance nas
