@@ -56,7 +56,7 @@ on nas merowireless save cafe
 on nas merowireless scan --porcelain
 expect_shown cafe home late
 joined=$(ip netns exec nas iw dev wlan0 link | awk '/^Connected to/ { print toupper($3) }')
-expect_same 'which are joined, and known' "$(printf '%s\n' 'no yes' 'yes no' 'no no')" \
+expect_same 'which are joined, and known' "$(printf '%s\n' 'no yes' 'yes yes' 'no no')" \
   "$(cut -f 9,10 <<<"$OUTPUT" | tr '\t' ' ')"
 expect_same 'the address of the one that is joined' "$joined" "$(awk -F '\t' '$9 == "yes" { print $7 }' <<<"$OUTPUT")"
 on nas merowireless disconnect
