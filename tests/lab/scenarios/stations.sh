@@ -67,11 +67,11 @@ is_joining() {
 
 say '-- one that does not know the secret'
 inside stranger mero-call connect bssid="$(address_of nas)" essid=office auth=WPA2PSK encrypt=AES key='trois croissants' \
-  >/dev/null 2>&1 || true &
+  >/dev/null 2>&1 &
 attempt=$!
 within 15 is_joining || fail 'the stranger was never seen'
 expect_same 'the stations' 2 "$(count)"
-wait "$attempt"
+! wait "$attempt" || fail 'the stranger was let in'
 
 # sent_away: how often the kernel of a station was told to leave.
 sent_away() {
