@@ -25,6 +25,7 @@ constexpr char kClosed[] = "/tmp/world/closed";               // no network can 
 constexpr char kSlow[] = "/tmp/world/slow";                   // joining one has no end
 constexpr char kAbsent[] = "/tmp/world/absent";               // the adapter
 constexpr char kSilent[] = "/tmp/world/silent";               // the adapter's driver does not tell its state
+constexpr char kCell[] = "/tmp/world/cell";                   // the adapter looks for the others of its cell
 constexpr char kUnannounced[] = "/tmp/world/unannounced";     // the adapter has been plugged in just now
 constexpr char kRadioOff[] = "/tmp/world/radio-off";
 constexpr char kLater[] = "/tmp/world/later";  // so many seconds is the program's clock ahead
@@ -92,7 +93,14 @@ class Keep : public ToolTest {
     library::MEROWirelessConnStatusGet = [] {
       if (::getpid() == g_program) NoteLook();
       if (Exists(kSilent)) return WIRELESS_STATUS_NOT_SUPPORTED;
+      if (Exists(kCell)) return WIRELESS_STATUS_DISCONNECTED;
       return Exists(kJoined) ? WIRELESS_STATUS_CONNECTED_MANAGED : WIRELESS_STATUS_DOWN;
+    };
+    library::MEROWirelessCurInfoGet = [inHome = library::MEROWirelessCurInfoGet](WIRELESS_REQUEST request,
+                                                                                 PWIRELESS_INFO info) {
+      if (!Exists(kCell) || request != REQUEST_MODE) return inHome(request, info);
+      info->opmode = WIRELESS_OPMODE_ADHOC;
+      return 0;
     };
     library::MEROWirelessAdapterNum = [] { return Exists(kAbsent) ? 0 : 1; };
     library::MEROWirelessCheckBlock = [] { return Exists(kRadioOff) ? 0 : Exists(kUnannounced) ? -1 : 1; };
@@ -411,6 +419,8 @@ TEST_F(Keep, TellsWhyItWaits) {
       {kRadioOff, "waiting until the radio is switched on", "down\t\t\t\t\twlan0\t\t\toff\t\t\t\t\t\t\t\t\n"},
       {kUnannounced, "waiting until the adapter is announced, so that its radio may be used",
        "down\t\t\t\t\twlan0\t\t\tunknown\t\t\t\t\t\t\t\t\n"},
+      {kCell, "waiting while the adapter looks for the others of its ad-hoc cell",
+       "disconnected\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\n"},
       {kSilent, "waiting while nobody knows whether the adapter is connected",
        "not-supported\t\t\t\t\twlan0\t\t\ton\t\t\t\t\t\t\t\t\n"},
   };

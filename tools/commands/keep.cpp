@@ -49,6 +49,8 @@ const char* WaitingText(Situation situation) {
       return "waiting while the adapter is an access point's";
     case Situation::kLeftAlone:
       return "waiting since somebody has disconnected; `merowireless connect` or `autoconnect` joins again";
+    case Situation::kCell:
+      return "waiting while the adapter looks for the others of its ad-hoc cell";
     case Situation::kUntold:
       return "waiting while nobody knows whether the adapter is connected";
     case Situation::kUnannounced:

@@ -13,6 +13,13 @@ bool IsSwitchedOn() {
   return ApSwitchOf(MEROWirelessAPInterfaceGet()) == ApSwitch::kOn;
 }
 
+// The driver looks for others of its cell for some seconds before it begins one, and is in no network meanwhile.
+bool IsInSearchOfItsCell() {
+  WIRELESS_INFO info{};
+  if (MEROWirelessCurInfoGet(REQUEST_MODE, &info) != 0 || info.opmode != WIRELESS_OPMODE_ADHOC) return false;
+  return MEROWirelessCurInfoGet(REQUEST_ESSID, &info) == 0 && info.szEssid[0] != '\0';
+}
+
 }  // namespace
 
 bool IsForAccessPoint() {
@@ -28,5 +35,6 @@ Situation SituationOf(const Status& status) {
   const bool isFree =
       status.isConnected() || status.state == WIRELESS_STATUS_DOWN || status.state == WIRELESS_STATUS_DISCONNECTED;
   if (!isFree) return Situation::kUntold;
+  if (status.state == WIRELESS_STATUS_DISCONNECTED && IsInSearchOfItsCell()) return Situation::kCell;
   return IsLeftAlone() ? Situation::kLeftAlone : Situation::kFree;
 }

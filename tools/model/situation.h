@@ -8,6 +8,7 @@ enum class Situation {
   kConnected,
   kFree,
   kLeftAlone,    // the same, and somebody has disconnected it
+  kCell,         // somebody has made an ad-hoc cell, which the driver has not found or begun yet
   kAccessPoint,  // also one that is being set up, or off the air for hours of its schedule
   kNoAdapter,
   kRadioOff,
