@@ -174,7 +174,7 @@ class RefusedJoin : public ToolTest {
 TEST_F(RefusedJoin, TellsAWrongSecretFromANetworkOutOfRange) {
   const Ran wrong = Join("<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect");
   EXPECT_EQ(wrong.status, 5);
-  EXPECT_THAT(wrong.err, HasSubstr("Home does not accept the secret: `merowireless save`"));
+  EXPECT_THAT(wrong.err, HasSubstr("Home does not accept the secret: `merowireless connect --key-stdin`"));
 
   const Ran absent = Join("<3>CTRL-EVENT-NETWORK-NOT-FOUND ");
   EXPECT_EQ(absent.status, 4);
@@ -213,7 +213,7 @@ TEST_F(RefusedJoin, EndsAsSoonAsTheSupplicantKnowsThatTheSecretIsWrong) {
 TEST_F(RefusedJoin, ByAutoconnectTellsThemApartToo) {
   const Ran wrong = Join("<3>WPA: 4-Way Handshake failed - pre-shared key may be incorrect", {"autoconnect"});
   EXPECT_EQ(wrong.status, 5);
-  EXPECT_THAT(wrong.err, HasSubstr("Home does not accept the secret: `merowireless save`"));
+  EXPECT_THAT(wrong.err, HasSubstr("Home does not accept the secret: `merowireless connect --key-stdin`"));
 
   const Ran absent = Join("<3>CTRL-EVENT-NETWORK-NOT-FOUND ", {"autoconnect"});
   EXPECT_EQ(absent.status, 4);

@@ -29,7 +29,7 @@ std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
   switch (verdict) {
     case Verdict::kSecretRefused:
       return Failure(Exit::kSecretRefused, name + " does not accept the secret",
-                     "`merowireless save` saves the right one");
+                     "`merowireless connect --key-stdin` tries another, and saves it once it works");
     case Verdict::kRefused:
       return Failed(name + " refuses this appliance",
                     "look for address filters and station limits at the access point");

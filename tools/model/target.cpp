@@ -66,7 +66,7 @@ void RequireSavedSecret(const Program& program, const KnownNetwork& config) {
   if (CanBeSecret(config.network.auth, config.szKey)) return;
   throw Failure(Exit::kSecretRefused,
                 "the secret that was saved for " + program.output.Name(config.network.szEssid) + " can be none",
-                "`merowireless save` saves the right one");
+                "`merowireless connect --key-stdin` tries another, and saves it once it works");
 }
 
 Failure NotInRange(const Program& program, const Target& target) {
