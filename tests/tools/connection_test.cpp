@@ -474,7 +474,8 @@ TEST_F(Connection, IsWatchedWithoutTheAddressesThatItHasOnTheWayToAnother) {
 
 // The news of a busy machine never ends.
 TEST_F(Connection, IsWatchedThoughTheKernelIsNeverQuiet) {
-  Shell("ip link add wlan0 type veth && ip link add noise type veth");
+  Shell("ip link add wlan0 type veth peer name air && ip link set air up && ip link set wlan0 up");
+  Shell("ip link add noise type veth");
   const StartedChild noise([] {
     while (true) Shell("ip link set noise up; ip link set noise down");
     return 0;

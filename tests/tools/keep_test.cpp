@@ -300,6 +300,18 @@ TEST_F(Keep, TakesAStationThatIsNotLetInForNoConnection) {
   Shell("ip link delete wlan0");
 }
 
+// The kernel follows a station's state a moment later. Until then it was taken for let in, and one that never was had
+// the patience of a lost connection.
+TEST_F(Keep, TakesAStationThatTheKernelHasNotFollowedYetForNoConnection) {
+  Is(kJoined);
+  Shell("ip link add wlan0 type veth peer name air");
+  StartedTool tool = Started();
+  EXPECT_TRUE(Attempted(1));
+  EXPECT_EQ(tool.OutputSoFar(), "");
+  Shell("ip link delete wlan0");
+  EXPECT_TRUE(Says(tool, kConnected));
+}
+
 // It joined again once its patience was over.
 TEST_F(Keep, LeavesAnApplianceAloneThatSomebodyHasDisconnected) {
   constexpr char kWaiting[] =

@@ -153,11 +153,12 @@ void ReadAddress(Status& status) {
   }
 }
 
-// A station that the access point has not let in yet is "dormant".
-bool IsDormant(const std::string& interface) {
+// A station that the access point has not let in yet is "dormant", and for a moment before the kernel has followed it
+// is still "down".
+bool IsLetIn(const std::string& interface) {
   std::ifstream file("/sys/class/net/" + interface + "/operstate");
   std::string state;
-  return file >> state && state == "dormant";
+  return !(file >> state) || (state != "dormant" && state != "down");
 }
 
 // Asks the library one thing about the connection; without an answer `answer` stays as it is.
@@ -195,7 +196,7 @@ Status ReadStatus() {
   status.isAccessPoint = !status.isConnected() && IsAccessPoints();
   if (!status.isConnected()) return status;
 
-  status.isLetIn = !IsDormant(status.interface);
+  status.isLetIn = IsLetIn(status.interface);
   const bool isCell = status.state == WIRELESS_STATUS_CONNECTED_ADHOC;
   status.link = LinkOf(status.interface, isCell ? LinkTo::kCell : LinkTo::kAccessPoint);
   WIRELESS_INFO info{};
