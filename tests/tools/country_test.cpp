@@ -53,6 +53,16 @@ TEST_F(Country, IsShownWithWhatTheKernelKeepsTo) {
   EXPECT_EQ(Tool({"country", "--porcelain"}).out, "DE\tUS\t\tno\n");
 }
 
+// The program said that none was set, and the access point did not start for it.
+TEST_F(Country, InTheSettingsThatIsNoneIsToldAndCanBeReplaced) {
+  Set(kSettings, "de; reboot");
+  const Ran shown = Tool({"country"});
+  EXPECT_EQ(shown.status, 1);
+  EXPECT_THAT(shown.err, HasSubstr(" has a country that is none, and no access point starts with it: `merowireless "));
+  EXPECT_EQ(Tool({"country", "DE"}).status, 0);
+  EXPECT_THAT(Tool({"country"}).out, HasSubstr("country         DE\n"));
+}
+
 // What only looks asks for nothing.
 TEST_F(Country, IsNotChangedByBeingShown) {
   Set(kSettings, "DE");

@@ -140,6 +140,7 @@ std::string WhatBecame(const Country& now) {
 }  // namespace
 
 void ShowCountry(const Program& program) {
+  RequireSavedCountry();
   program.output.One<Country>("country", kFields, ReadCountry());
 }
 

@@ -57,12 +57,24 @@ bool IsLetters(std::string_view country) {
   return country.size() == kWorld.size() && std::ranges::all_of(country, [](char c) { return c >= 'A' && c <= 'Z'; });
 }
 
+// As it stands there, whatever that is.
+std::string TextInSettings() {
+  char szText[8];
+  return PLIBCFileGetKeyValue(kCountryPath, kKey, szText, sizeof szText, 0) > 0 ? szText : "";
+}
+
 }  // namespace
 
 std::string SavedCountry() {
-  char szCountry[8];
-  if (PLIBCFileGetKeyValue(kCountryPath, kKey, szCountry, sizeof szCountry, 0) <= 0) return "";
-  return IsLetters(szCountry) ? szCountry : "";
+  const std::string country = TextInSettings();
+  return IsLetters(country) ? country : "";
+}
+
+void RequireSavedCountry() {
+  const std::string country = TextInSettings();
+  if (country.empty() || IsLetters(country)) return;
+  throw Failed(std::string(kCountryPath) + " has a country that is none, and no access point starts with it",
+               "`merowireless country CC` sets one");
 }
 
 void SaveCountry(const std::string& country) {

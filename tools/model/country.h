@@ -15,6 +15,9 @@ inline constexpr std::string_view kDrivers = "99";
 // The one of the settings; empty where none is set.
 std::string SavedCountry();
 
+// Fails when somebody else has put something there that is no country.
+void RequireSavedCountry();
+
 // Notes a country, or with an empty one that there is none. Fails when that cannot be written.
 void SaveCountry(const std::string& country);
 
