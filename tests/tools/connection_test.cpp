@@ -102,6 +102,13 @@ TEST_F(Connection, IsNotMadeBesideASupplicantThatDoesNotEnd) {
       << "it is ended by force, and made again";
 }
 
+// Any failure of the client was taken for a supplicant that was gone.
+TEST_F(Connection, IsNotMadeBesideASupplicantThatDoesNotListen) {
+  const StartedDaemon supplicant("wpa_supplicant", kSupplicantPid);
+  InstallSupplicantClient("exit 255\n");
+  EXPECT_THAT(Tool({"connect", "Home"}).err, HasSubstr("the former connection does not end"));
+}
+
 TEST_F(Connection, CanLeaveTheAddressesAlone) {
   EXPECT_EQ(Tool({"connect", "Home", "--no-address"}).status, 0);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessNetworkConnect", "Home|open sesame||1"));

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "base/await.h"
+#include "base/pid_file.h"
 #include "common/paths.h"
 #include "model/access_points.h"
 #include "model/join_failures.h"
@@ -33,7 +34,7 @@ void EndFormerSupplicant(const Program& program) {
   if (PLIBCFileExist(kSupplicantPidPath) == 0) return;
   const bool gone = Run<bool>(program.Doing("leaving the former network"), [] {
     if (PLIBCExec("/usr/sbin/wpa_cli", "terminate", nullptr, nullptr, nullptr) != 0)
-      return true;  // no supplicant runs, and only the file of one is left
+      return !IsDaemonThere(kSupplicantPidPath, "wpa_supplicant");  // mostly only the file of one is left
     constexpr std::chrono::milliseconds kPause{100};
     constexpr std::chrono::seconds kPatience{5};
     return Await(kPatience, kPause, [] { return PLIBCFileExist(kSupplicantPidPath) == 0; });
