@@ -1,7 +1,7 @@
-# A router that goes off and comes back, an adapter that is pulled, an access point meanwhile: the program that keeps the
-# connection has the appliance back within the time that the manual states, and disturbs nothing.
+# A router that goes off and comes back, an adapter that is pulled, an access point and a cell meanwhile: the program
+# that keeps the connection has the appliance back within the time that the manual states, and disturbs nothing.
 # Plain only
-# Limit: 400 s
+# Limit: 600 s
 # shellcheck shell=bash
 
 access_point cafe ssid=cafe channel=6 wpa=2 wpa_passphrase='deux croissants' rsn_pairwise=CCMP
@@ -89,6 +89,14 @@ expect_same 'what it says' 'waiting until an adapter is plugged in' "$(tail -n 1
 plug nas
 plug_in nas
 comes_back 8 $((pause + attempt))
+
+say '-- somebody makes a cell, which the driver takes seconds to begin: it is left alone'
+on nas merowireless adhoc bench
+within 20 told 10 || fail "it disturbs the cell: $(cat "$lines")"
+expect_same 'what it says' 'waiting while the adapter looks for the others of its ad-hoc cell
+connected to bench without an address' "$(tail -n 2 "$lines")"
+expect_same "the kind of nas's interface" IBSS "$(radio_type nas)"
+on nas merowireless connect cafe
 
 say '-- it is ended, and the connection stays'
 inside nas pkill -TERM -x merowireless

@@ -1,4 +1,4 @@
-# The status agrees with the kernel and the resolver; what is edited of a network comes with the next join, and name servers go with it.
+# The status agrees with the kernel and the resolver; what is edited of a network comes with the next join, and what was exported can be taken back.
 # Plain only
 # Limit: 600 s
 # shellcheck shell=bash
@@ -79,5 +79,17 @@ say '-- it is not joined by itself, and then it is'
 on nas merowireless edit home --auto no
 ends_with nas 4 autoconnect
 on nas merowireless edit home --auto yes --ip dhcp --dns none
+on nas merowireless autoconnect
+expect_truth 10.1.0.1 10.1.0.1
+
+say '-- what was exported is known again once it is imported, and joins'
+on nas merowireless export --secrets /var/lib/settings.json
+expect_mode nas /var/lib/settings.json 600
+known=$(inside nas merowireless known --show-secrets --json)
+on nas merowireless disconnect
+on nas merowireless forget home
+ends_with nas 4 autoconnect
+on nas merowireless import /var/lib/settings.json
+expect_same 'what is known' "$known" "$(inside nas merowireless known --show-secrets --json)"
 on nas merowireless autoconnect
 expect_truth 10.1.0.1 10.1.0.1
