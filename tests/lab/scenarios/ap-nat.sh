@@ -33,14 +33,17 @@ auto_time="30"
 enable="yes"
 END
 
-say '-- while another one is under way'
-inside nas touch /var/tmp/.wireless_ap_connecting
-fails_on nas mero-call ap-enable
-expect_line result=0
-expect_message nas 'Another ap construction is going'
-gone "/proc/${INIT_OF[nas]}/root/var/tmp/.wireless_ap_connecting" || fail 'the marker is still there'
-expect_station nas guest
-expect_reachable guest 203.0.113.1
+# The program asks whether anybody who could have made the marker still lives.
+if through_functions; then
+  say '-- while another one is under way'
+  inside nas touch /var/tmp/.wireless_ap_connecting
+  fails_on nas mero-call ap-enable
+  expect_line result=0
+  expect_message nas 'Another ap construction is going'
+  gone "/proc/${INIT_OF[nas]}/root/var/tmp/.wireless_ap_connecting" || fail 'the marker is still there'
+  expect_station nas guest
+  expect_reachable guest 203.0.113.1
+fi
 
 say '-- the end of it'
 on nas mero-call ap-disable

@@ -40,7 +40,12 @@ leaves nas
 say '-- while another attempt is under way'
 inside nas touch /var/tmp/.wireless_connecting
 refused nas "${square[@]}"
-expect_message nas 'Another connection construction is going'
+if through_functions; then
+  expect_message nas 'Another connection construction is going'
+else
+  # The program leaves the attempt to whoever makes it, and so the marker, too.
+  inside nas rm /var/tmp/.wireless_connecting
+fi
 expect_no_station square nas
 expect_nothing_left nas
 
