@@ -369,7 +369,6 @@ TEST_F(ALease, SaysWhichStepCannotBeTaken) {
       {"ip", "route delete", "bound", "cannot remove the default route of net0: broken\n"},
       {"ip", "address flush", "deconfig", "cannot remove the addresses of net0: broken\n"},
       {"ip", "net0 up", "deconfig", "cannot bring net0 up: broken\n"},
-      {"cat", "ifindex", "bound", "there is no interface net0\n"},
       {"cat", "resolv.conf", "bound", "cannot read /etc/resolv.conf\n"},
       {"mkdir", "udhcpc.lease", "bound", "cannot make /var/run/udhcpc.lease\n"},
       {"flock", "", "bound", "another run takes too long to change /etc/resolv.conf\n"},
@@ -384,12 +383,36 @@ TEST_F(ALease, SaysWhichStepCannotBeTaken) {
                   "'*) echo broken >&2; exit 1 ;; esac\nexec /usr/bin/env PATH=/usr/sbin:/usr/bin " + program +
                   " \"$@\"\n",
               0755);
+    if (row.szCalls == std::string("net0 up")) Shell("ip link set net0 down");
     EXPECT_EQ(Run({row.szEvent}, Usual({"router=10.1.0.2", "dns=10.1.0.2"})), 1) << row.szMessage;
     ExpectLogged(row.szMessage);
     fs::remove("/tmp/platform/" + program);
   }
   EXPECT_EQ(Run({"left", "a b"}), 1);
   ExpectLogged("'a b' is no name of an interface\n");
+}
+
+TEST_F(ALease, SaysThatItsInterfaceHasGone) {
+  WriteScript("/tmp/platform/busybox", "ip link set net0 down && exec ip link set net0 name gone0\n");
+  EXPECT_EQ(Bound({"router=10.1.0.1"}), 1);
+  ExpectLogged("there is no interface net0\n");
+  Shell("ip link set gone0 name net0");
+}
+
+// A score of programs ran, twice over, before the client sent its first word, although there was nothing to take back.
+TEST_F(ALease, ThatWasNeverMadeIsGivenBackWithoutAnyProgram) {
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
+  Shell("ip address add 192.0.2.9/24 dev eth5 && ip route add default via 192.0.2.1 dev eth5");
+  for (const char* szProgram : {"awk", "busybox", "cat", "flock", "grep", "head", "ip", "mkdir", "readlink"}) {
+    WriteScript(std::string("/tmp/platform/") + szProgram,
+                "echo \"${0##*/} $*\" >>/tmp/platform/ran\n"
+                "exec env PATH=/usr/sbin:/usr/bin \"${0##*/}\" \"$@\"\n");
+  }
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(TextOrNothing("/tmp/platform/ran"), "");
+  EXPECT_EQ(Run({"deconfig"}, {"interface=net0"}), 0);
+  EXPECT_EQ(TextOrNothing("/tmp/platform/ran"), "ip -4 address flush dev net0\n");
+  ExpectNothingLogged();
 }
 
 // The block of the servers that were saved for a network.
