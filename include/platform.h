@@ -346,7 +346,14 @@ WIRELESS_PROTOCOL MEROWirelessProtocolParse(const char* szProtocol);
 
 /* ---- Interface ------------------------------------------------------------------------------------------------ */
 
-/** Brings an interface up. @return 1; 0 on failure. */
+/**
+ * Brings an interface up.
+ *
+ * @return 1; 0 on failure.
+ *
+ * A client's wireless adapter that was down begins to scan, so that results are there when somebody asks for them; the
+ * call does not wait for that, and whether the adapter scans makes no difference to its result.
+ */
 int PLIBNetIfUp(const char* szIfName);
 
 /** Takes an interface down. @return 1; 0 on failure. */

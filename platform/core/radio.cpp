@@ -91,3 +91,8 @@ Status Radio::Leave() const {
   request->u.data.length = sizeof leave;
   return Status::Of(::ioctl(control_.get(), SIOCSIWMLME, &*request));
 }
+
+Status Radio::Scan() const {
+  Result<iwreq> request = RequestFor<iwreq>(szIfName_);
+  return Status::Of(::ioctl(control_.get(), SIOCSIWSCAN, &*request));
+}

@@ -29,6 +29,9 @@ class Radio {
   // Leaves the current network or cell.
   Status Leave() const;
 
+  // Has the radio scan for all networks in range; does not wait for it.
+  Status Scan() const;
+
  private:
   Descriptor control_;
   char szIfName_[IFNAMSIZ] = {};

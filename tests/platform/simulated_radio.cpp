@@ -101,6 +101,12 @@ int SimulatedDriver::Answer(unsigned long request, void* argument) {
       told.push_back(order.cmd == IW_MLME_DISASSOC || order.cmd == IW_MLME_DEAUTH ? "leave" : "something else");
       return 0;
     }
+    case SIOCSIWSCAN:
+      if (scanRefusal != 0) return Fail(scanRefusal);
+      told.push_back(wireless.u.data.pointer == nullptr && wireless.u.data.length == 0 && wireless.u.data.flags == 0
+                         ? "scan"
+                         : "scan for something");
+      return 0;
     default:
       return Fail(EOPNOTSUPP);
   }

@@ -28,12 +28,13 @@ class SimulatedDriver {
   SimulatedDriver& operator=(const SimulatedDriver&) = delete;
   ~SimulatedDriver();
 
-  int refusal = 0;  // the errno that every request meets; 0 for none
+  int refusal = 0;      // the errno that every request meets; 0 for none
+  int scanRefusal = 0;  // the errno that a request to scan meets
   unsigned mode = 2;
   std::array<unsigned char, 6> accessPoint = {};
   std::string name;
   bool hasName = true;
-  std::vector<std::string> told;  // "mode N", "leave", "up", "down", in order
+  std::vector<std::string> told;  // "mode N", "leave", "scan", "up", "down", in order
 
   // A request of the kernel's wireless extensions; as ioctl(), less the descriptor.
   int Answer(unsigned long request, void* argument);
