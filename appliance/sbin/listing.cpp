@@ -8,6 +8,8 @@
 #include <system_error>
 #include <tuple>
 
+#include "common/protocol_texts.h"
+#include "common/value_texts.h"
 #include "platform.h"
 
 namespace iwlist {
@@ -90,7 +92,7 @@ std::string Row(const Network& network, Reader reader) {
   std::snprintf(row, sizeof(row), "%-4d %-32s %s %6d %-9s %s\n", network.channel,
                 Printable(description.name, reader).c_str(),
                 MEROWirelessBssidStringGet(network.bssid.data(), address, sizeof(address)), network.signal,
-                MEROWirelessProtocolStringGet(description.protocol), Token(description.security).c_str());
+                TextOf(kProtocolTexts, description.protocol), Token(description.security).c_str());
   return row;
 }
 

@@ -1,5 +1,6 @@
 // The listing tool as a program, on a machine without a radio and with an ordinary tool of the test's making.
 #include <fcntl.h>
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <unistd.h>
 
@@ -10,6 +11,7 @@
 
 #include "tests/support/files.h"
 #include "tests/support/processes.h"
+#include "tests/support/shell.h"
 
 namespace {
 
@@ -97,6 +99,16 @@ TEST_F(ListingTool, AnswersTheMeroFormItselfAndSaysThatThereIsNoSuchInterface) {
     }
   }
 }
+
+#ifndef __SANITIZE_ADDRESS__  // whose run time is the shared one
+// Loading them took longer than the listing, and a scan has it made up to five times.
+TEST_F(ListingTool, LoadsNeitherTheLibraryOfItsLanguageNorTheOneThatRunsIt) {
+  const std::string loaded = Shell("LD_TRACE_LOADED_OBJECTS=1 " IWLIST_PROGRAM);
+  EXPECT_THAT(loaded, testing::HasSubstr("libc.so.6"));
+  EXPECT_THAT(loaded, testing::Not(testing::HasSubstr("libstdc++")));
+  EXPECT_THAT(loaded, testing::Not(testing::HasSubstr("libmerowireless-core")));
+}
+#endif
 
 TEST_F(ListingTool, SaysThatAnInterfaceIsNotWireless) {
   Run({"lo", "scanning", "mero"});
