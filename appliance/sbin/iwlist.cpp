@@ -2,11 +2,16 @@
 // driver holds, in the fixed columns of listing.h, and does not scan for them; with `unsupported` behind it, it tells
 // which of them cannot be joined. Every other form is the ordinary tool's, which the package system has moved aside.
 //
+// While the radio scans, for whomever, these forms wait for the end of that, since a part of the results would look
+// like all of them. `iwlist INTERFACE scanning` does so too, and then has the ordinary tool show what was heard: the
+// kernel would refuse it a scan of its own.
+//
 // Exit status: 0 listed, also when nothing is in range; 1 not listed, with the reason in one line on standard error
 // and nothing on standard output; 127 the ordinary tool is not there, 126 it cannot be run; else the ordinary tool's.
 #include <unistd.h>
 
 #include <cerrno>
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -15,20 +20,29 @@
 
 #include "appliance/sbin/listing.h"
 #include "appliance/sbin/radio.h"
+#include "common/scan_end.h"
 
 namespace {
 
 constexpr char kOrdinaryTool[] = "/sbin/iwlist.distrib";
 
-bool AsksForListing(int argc, char* argv[]) {
-  if (argc != 4 && argc != 5) return false;
+// Longer than a radio takes that goes over all channels while it is connected.
+constexpr std::chrono::seconds kPatience{10};
+
+bool AsksForScan(int argc, char* argv[]) {
+  if (argc < 3) return false;
   const std::string_view verb = argv[2];
-  if ((verb != "scanning" && verb != "scan") || std::string_view(argv[3]) != "mero") return false;
+  return verb == "scanning" || verb == "scan";
+}
+
+bool AsksForListing(int argc, char* argv[]) {
+  if (!AsksForScan(argc, argv) || (argc != 4 && argc != 5) || std::string_view(argv[3]) != "mero") return false;
   return argc == 4 || std::string_view(argv[4]) == "unsupported";
 }
 
 int List(const char* interface, bool unsupported) {
   try {
+    (void)nl80211::AwaitScanEnd(interface, kPatience);  // one that lasts longer is listed as far as it has come
     const auto reader = isatty(STDOUT_FILENO) != 0 ? iwlist::Reader::kTerminal : iwlist::Reader::kProgram;
     const auto networks = iwlist::ReadScanResults(interface);
     iwlist::Write(STDOUT_FILENO,
@@ -40,8 +54,17 @@ int List(const char* interface, bool unsupported) {
   }
 }
 
+// Whether somebody else's scan was under way and has ended, so that no other one is needed.
+bool HasJustScanned(const char* interface) {
+  try {
+    return nl80211::AwaitScanEnd(interface, kPatience);
+  } catch (const std::exception&) {
+    return false;  // the ordinary tool finds out what is wrong
+  }
+}
+
 // Runs the ordinary tool in place of this program; returns only when that cannot be done.
-int HandOver(char* argv[]) {
+int HandOver(char* const argv[]) {
   execv(kOrdinaryTool, argv);
   const int status = errno == ENOENT ? 127 : 126;
   std::fprintf(stderr, "iwlist: cannot run the ordinary tool %s: %s\n", kOrdinaryTool, std::strerror(errno));
@@ -51,5 +74,9 @@ int HandOver(char* argv[]) {
 }  // namespace
 
 int main(int argc, char* argv[]) {
-  return AsksForListing(argc, argv) ? List(argv[1], argc == 5) : HandOver(argv);
+  if (AsksForListing(argc, argv)) return List(argv[1], argc == 5);
+  char last[] = "last";
+  char* const asToldLast[] = {argv[0], argv[1], argv[2], last, nullptr};
+  const bool isHeard = argc == 3 && AsksForScan(argc, argv) && HasJustScanned(argv[1]);
+  return HandOver(isHeard ? asToldLast : argv);
 }

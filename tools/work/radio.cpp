@@ -1,6 +1,8 @@
 // What the kernel is asked of a wireless interface where the library has no function for it.
 #include "work/radio.h"
 
+#include <net/if.h>  // first: the kernel's own headers make room for it
+
 #include <linux/wireless.h>
 #include <sys/ioctl.h>
 #include <sys/socket.h>
@@ -13,6 +15,7 @@
 #include "base/await.h"
 #include "base/require.h"
 #include "common/descriptor.h"
+#include "common/scan_end.h"
 
 namespace {
 
@@ -21,14 +24,6 @@ bool Ask(const std::string& interface, unsigned long what, iwreq& request) {
   if (interface.size() >= sizeof request.ifr_name) return errno = ENODEV, false;
   std::ranges::copy(interface, request.ifr_name);
   return ::ioctl(control.get(), what, &request) == 0;
-}
-
-// The kernel has no results to show as long as it scans.
-bool IsScanning(const std::string& interface) {
-  char results[1];
-  iwreq request{};
-  request.u.data.pointer = results;
-  return !Ask(interface, SIOCGIWSCAN, request) && errno == EAGAIN;
 }
 
 }  // namespace
@@ -63,11 +58,11 @@ bool CallNetwork(const std::string& interface, const std::string& name) {
   request.u.data.flags = IW_SCAN_THIS_ESSID;
   bool called = false;
   const auto isAnswered = [&] {
+    (void)nl80211::AwaitScanEnd(interface, kPatience);
     called = Ask(interface, SIOCSIWSCAN, request);
     return called || errno != EBUSY;
   };
   if (!Await(kPatience, kPause, isAnswered) || !called) return false;
-  (void)Await(kPatience, kPause,
-              [&] { return !IsScanning(interface); });  // one that lasts longer is looked at as it is
+  (void)nl80211::AwaitScanEnd(interface, kPatience);  // one that lasts longer is looked at as it is
   return true;
 }
