@@ -140,6 +140,28 @@ TEST(SupplicantListener, FindsTheNextSupplicantWhenOneVanishes) {
   EXPECT_EQ(second.Request(), "ATTACH");
 }
 
+// A tenth of a second later the supplicant had begun to scan.
+TEST(SupplicantListener, GreetsTheFirstSupplicantAtOnce) {
+  int greetings = 0;
+  SupplicantListener listener(kSocket, [&] { ++greetings; });
+  listener.Tick();
+  EXPECT_EQ(greetings, 0);
+  EXPECT_LE(listener.interval(), std::chrono::milliseconds(10));
+  {
+    Supplicant first;
+    listener.Tick();
+    EXPECT_EQ(greetings, 1);
+    EXPECT_GE(listener.interval(), std::chrono::milliseconds(100)) << "there is time now";
+    ASSERT_EQ(first.Request(), "ATTACH");
+    first.Say("<3>CTRL-EVENT-TERMINATING ");
+    listener.Receive();
+  }
+  Supplicant second;
+  listener.Tick();
+  EXPECT_EQ(second.Request(), "ATTACH");
+  EXPECT_EQ(greetings, 1);
+}
+
 TEST(SupplicantListener, BearsAPathThatNoSocketCanHave) {
   SupplicantListener listener(std::string(500, 'x'));
   listener.Tick();

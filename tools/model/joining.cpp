@@ -11,9 +11,17 @@
 #include "common/paths.h"
 #include "model/access_points.h"
 #include "model/join_failures.h"
+#include "work/radio.h"
 #include "work/supplicant.h"
 
 namespace {
+
+// A supplicant that has just been started goes over all channels, also where that has just been done. It takes the end
+// of any scan for the end of its own, and what the kernel knows then for its results: so the radio listens to the
+// channel on which the network was heard. Where that comes to nothing, the supplicant scans by itself.
+void SpareScan(const KnownNetwork& config) {
+  if (config.network.channel > 0) (void)ListenTo(MEROWirelessInterfaceGet(), config.network.channel);
+}
 
 std::string SupplicantSocket() {
   return std::string(kSupplicantControlDirectory) + "/" + MEROWirelessInterfaceGet();
@@ -46,7 +54,7 @@ void EndFormerSupplicant(const Program& program) {
 void Join(const Program& program, const KnownNetwork& config) {
   const std::string name = program.output.Name(config.network.szEssid);
   EndFormerSupplicant(program);
-  SupplicantListener listener(SupplicantSocket());
+  SupplicantListener listener(SupplicantSocket(), [&] { SpareScan(config); });
   Task task = program.Doing("joining " + name);
   task.szMarker = kJoinMarkerPath;
   task.listener = &listener;

@@ -45,6 +45,17 @@ std::string WepKeyOf(const std::string& interface) {
   return Hex({key, request.u.encoding.length});
 }
 
+bool ListenTo(const std::string& interface, int channel) {
+  iw_scan_req listening{};
+  listening.scan_type = IW_SCAN_TYPE_PASSIVE;
+  listening.num_channels = 1;
+  listening.channel_list[0].m = channel;
+  iwreq request{};
+  request.u.data.pointer = &listening;
+  request.u.data.length = sizeof listening;
+  return Ask(interface, SIOCSIWSCAN, request);
+}
+
 // One scan at a time: the supplicant's own, after it has lost a network, comes to its end first.
 bool CallNetwork(const std::string& interface, const std::string& name) {
   constexpr std::chrono::milliseconds kPause{100};

@@ -18,4 +18,8 @@ std::string WepKeyOf(const std::string& interface);
 // results of the adapter's last scan then. False when the driver cannot do that.
 bool CallNetwork(const std::string& interface, const std::string& name);
 
+// Has the radio listen to one channel for as long as a beacon takes, and does not wait for that. False when it cannot,
+// as while it scans.
+bool ListenTo(const std::string& interface, int channel);
+
 #endif  // MERO_TOOLS_RADIO_H

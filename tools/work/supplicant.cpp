@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstring>
 #include <iterator>
+#include <utility>
 
 #include "work/control_socket.h"
 
@@ -65,7 +66,8 @@ std::optional<Address> AccessPointIn(std::string_view event) {
   return event.starts_with(kStart) ? ParseAddress(event.substr(kStart.size(), kAddressSize)) : std::nullopt;
 }
 
-SupplicantListener::SupplicantListener(std::string path) : path_(std::move(path)) {}
+SupplicantListener::SupplicantListener(std::string path, std::function<void()> greet)
+    : path_(std::move(path)), greet_(std::move(greet)) {}
 
 bool SupplicantListener::Attach() {
   socket_ = ConnectToDaemon(path_);
@@ -77,12 +79,21 @@ void SupplicantListener::Tick() {
   const auto now = std::chrono::steady_clock::now();
   if (!socket_.valid()) {
     lastAsked_ = now;
-    if (!Attach()) socket_.Close();
+    if (!Attach()) {
+      socket_.Close();
+    } else if (const auto greet = std::exchange(greet_, nullptr)) {
+      greet();
+    }
     return;
   }
   if (now - lastAsked_ < kPatience) return;
   lastAsked_ = now;
   if (!SendToDaemon(socket_, "PING") && errno != EAGAIN) socket_.Close();
+}
+
+// A supplicant that comes up is greeted before it does anything by itself.
+std::chrono::milliseconds SupplicantListener::interval() const {
+  return std::chrono::milliseconds(socket_.valid() ? 100 : 10);
 }
 
 void SupplicantListener::Receive() {

@@ -3,6 +3,7 @@
 #define MERO_TOOLS_SUPPLICANT_H
 
 #include <chrono>
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -33,13 +34,16 @@ std::optional<Address> AccessPointIn(std::string_view event);
 // Listens to the control socket of the supplicant. Supplicants may come and go meanwhile.
 class SupplicantListener final : public Listener {
  public:
-  explicit SupplicantListener(std::string path);
+  // Calls `greet` as soon as the first supplicant is there.
+  explicit SupplicantListener(std::string path, std::function<void()> greet = {});
 
   // -1 as long as there is no supplicant.
   int fd() const override { return socket_.get(); }
 
   // Finds the supplicant, and finds out that it is gone.
   void Tick() override;
+
+  std::chrono::milliseconds interval() const override;
 
   void Receive() override;
 
@@ -56,6 +60,7 @@ class SupplicantListener final : public Listener {
   bool Attach();
 
   std::string path_;
+  std::function<void()> greet_;
   Descriptor socket_;
   std::chrono::steady_clock::time_point lastAsked_;
   Verdict verdict_ = Verdict::kNone;

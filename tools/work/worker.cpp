@@ -127,11 +127,13 @@ class Worker {
     pollfd waited[] = {
         {pipe_.reader.get(), POLLIN, 0}, {signals_.fd(), POLLIN, 0}, {end_.get(), POLLIN, 0}, {-1, POLLIN, 0}};
     const auto& [frames, signals, end, events] = waited;
+    std::chrono::milliseconds patience = kTick;
     if (task_.listener != nullptr) {
       task_.listener->Tick();
       waited[3].fd = task_.listener->fd();
+      patience = std::min(patience, task_.listener->interval());
     }
-    const int ready = ::poll(waited, std::size(waited), static_cast<int>(kTick.count()));
+    const int ready = ::poll(waited, std::size(waited), static_cast<int>(patience.count()));
     processes_.Reap();
     progress_.Update();
     if (ready <= 0) return true;

@@ -96,9 +96,22 @@ expect_scans nas 0
 expect_station office nas
 leaves nas
 
-say '-- an access point comes up beside a scan that has just begun'
+# What the supplicant needs to know it has from the look at one channel, which it takes for a scan of its own.
+say '-- from nothing to a connection, the program has the radio go over all channels once'
 appliance shelf
 plug_in shelf
+follow_scans shelf
+on shelf mero-call save essid=office bssid="$(address_of office)" auth=OPEN encrypt=NONE ip=10.2.0.7 mask=255.255.255.0
+on shelf merowireless autoconnect
+expect_station office shelf
+on shelf sed -n 's/.*scan finished: \([0-9 ]*\),.*/\1/p' <"/run/lab/shelf.events"
+expect_same 'how often it went over all channels' 1 "$(grep -c '[0-9] [0-9]' <<<"$OUTPUT")"
+expect_same 'the channels that it looked at again' 2462 "$(grep -v '[0-9] [0-9]' <<<"$OUTPUT")"
+on shelf mero-call disconnect
+expect_line result=0
+
+say '-- an access point comes up beside a scan that has just begun'
+inside shelf ip link set wlan0 down
 inside shelf mero-call scan last >/dev/null {STEPS}>&- &
 serves shelf ssid=shelf channel=6
 guest_of shelf nas essid=shelf auth=OPEN encrypt=NONE
