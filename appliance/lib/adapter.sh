@@ -18,10 +18,8 @@ adapter() {
 # PRODUCT names the adapter's section in the access point's settings.
 note_adapter() { # INTERFACE
 	section=$(section_of "$1") || exit 1
-	put "$adapter_info" 644 <<-END
-		INTERFACE="$1"
-		PRODUCT="$section"
-	END
+	put "$adapter_info" "INTERFACE=\"$1\"
+PRODUCT=\"$section\"" 644
 }
 
 # Most USB adapters have a name. Other adapters are known by the numbers of vendor and model, or by their driver.
@@ -57,15 +55,15 @@ numbers_of() { # DEVICE
 
 # The kernel knows nothing of it after a boot, or of a radio that is new.
 block_if_switched_off() { # INTERFACE
-	unblock=$(setting unblock) || exit 1
-	[ "$unblock" = no ] || return 0
+	read_setting unblock
+	[ "$answer" = no ] || return 0
 	for switch in "/sys/class/net/$1/phy80211"/rfkill*/soft; do
 		[ ! -e "$switch" ] || said=$( (echo 1 >"$switch") 2>&1) || fail "cannot block the radio of $1: $said"
 	done
 }
 
 can_be_access_point() { # INTERFACE
-	iw phy "$(cat "/sys/class/net/$1/phy80211/name")" info | awk '
+	read -r phy <"/sys/class/net/$1/phy80211/name" && iw phy "$phy" info | awk '
 		/Supported interface modes:/ { inside = 1; next }
 		inside && $1 != "*" { exit }
 		inside && $2 == "AP" { found = 1 }
@@ -78,5 +76,5 @@ access_point_is() {
 }
 
 set_access_point() { # INTERFACE yes|no
-	printf 'enable="%s"\n' "$2" | put "$hostapd_files-$1.info"
+	put "$hostapd_files-$1.info" "enable=\"$2\""
 }

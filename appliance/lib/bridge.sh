@@ -1,21 +1,35 @@
 # Bridges, as their network-script files describe them.
 # shellcheck shell=sh
-# shellcheck disable=SC2154  # what the other parts set
+# shellcheck disable=SC2034,SC2154  # what the other parts use, and set
 
 script_value() { # KEY INTERFACE
 	value_of "$1" "$scripts/ifcfg-$2"
 }
 
+values_of_bridge='nat at-boot static address mask member hardware-address'
+known_bridge='' # the bridge whose values are in the variables that know_bridge fills
+
+# know_bridge BRIDGE: reads what its file says, unless that is known; $described is empty where it describes no bridge.
+know_bridge() {
+	[ "$known_bridge" != "$1" ] || return 0
+	described=''
+	# shellcheck disable=SC2086  # words
+	if ask bridge "$1" $values_of_bridge; then described=yes; fi
+	into nat at_boot static address mask primary hardware
+	known_bridge=$1
+}
+
 is_bridge() { # NAME
-	ask bridge "$1" nat
+	know_bridge "$1"
+	[ -n "$described" ]
 }
 
 is_nat() { # BRIDGE
-	says_yes bridge "$1" nat
+	is_bridge "$1" && is_yes "$nat" "bridge $1 nat"
 }
 
 comes_up_at_boot() { # BRIDGE
-	says_yes bridge "$1" at-boot
+	is_bridge "$1" && is_yes "$at_boot" "bridge $1 at-boot"
 }
 
 is_there() { # INTERFACE
@@ -26,25 +40,16 @@ is_there() { # INTERFACE
 # wireless member comes in when its access point starts. Without its first member the bridge is made all the same, and
 # that is a failure. A new bridge that is undoable has noted what give_wire_back needs.
 make_bridge() {
-	ask bridge "$1" hardware-address member static address mask || fail "$scripts/ifcfg-$1 describes no bridge"
-	{
-		IFS= read -r hardware
-		IFS= read -r primary
-		IFS= read -r static
-		IFS= read -r address
-		IFS= read -r mask
-	} <<-END
-		$answer
-	END
+	is_bridge "$1" || fail "$scripts/ifcfg-$1 describes no bridge"
 	undoable=${2-}
 	if is_there "$1"; then undoable=''; fi
-	create_bridge "$1" "$hardware"
+	plan_bridge "$1" "$hardware"
 	missing='' routes=''
 	if [ -n "$primary" ] && ! is_wireless "$primary"; then
 		if is_there "$primary"; then
 			routes=$(ip -4 route show default dev "$primary") || fail "cannot tell the routes of $primary"
 			[ -z "$undoable" ] || note_wire "$primary" "$1"
-			join_bridge "$primary" "$1"
+			plan_member "$primary" "$1"
 		else
 			missing=yes
 		fi
@@ -61,43 +66,44 @@ make_bridge() {
 # make_bridge_of_boot NAME DEADLINE: makes the bridge of that network-script file, if it is one that comes up at boot.
 # A first member that is not there yet is waited for until the deadline, which is in seconds since the machine's start.
 make_bridge_of_boot() {
+	is_name "$1" || return 0
+	read_bridge_of_boot "$1"
 	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1" && ! waits_for_access_point "$1"; then
-		await_first_member "$1" "$2"
+		[ -z "$primary" ] || await $(($2 - $(uptime_seconds))) is_there "$primary"
 		make_bridge "$1"
 	fi
 }
 
-# waits_for_access_point BRIDGE: whether the bridge exists for an access point alone, and that one is switched off.
-waits_for_access_point() {
-	member=$(script_value PRIMARY "$1") || exit 1
-	[ -n "$member" ] && [ -e "$hostapd_files-$member.info" ] && ! is_enabled "$hostapd_files-$member.info"
+read_bridge_of_boot() { # NAME
+	# shellcheck disable=SC2086  # words
+	ask file "$scripts/ifcfg-$1" DEVICE -- bridge "$1" $values_of_bridge || : # something is missing
+	into device nat at_boot static address mask primary hardware
+	described=$nat known_bridge=$1
 }
 
-# is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and not a backup copy of a file. The DEVICE in
-# the file decides. In a file without DEVICE, a name with a dot has to be a VLAN's, with a number behind the dot.
+# waits_for_access_point BRIDGE: whether the bridge exists for an access point alone, and that one is switched off.
+waits_for_access_point() {
+	know_bridge "$1"
+	[ -n "$primary" ] && [ -e "$hostapd_files-$primary.info" ] && ! is_enabled "$hostapd_files-$primary.info"
+}
+
+# is_file_of_interface NAME: whether ifcfg-NAME is that interface's file, and not a backup copy of a file. The $device in
+# the file decides. In a file without one, a name with a dot has to be a VLAN's, with a number behind the dot.
 is_file_of_interface() {
-	is_name "$1" || return 1
-	device=$(script_value DEVICE "$1") || exit 1
 	case $device,$1 in
 	"$1,$1") return 0 ;;
 	,*. | ,*.*[!0-9.]* | ?*,*) return 1 ;;
 	esac
 }
 
-await_first_member() { # BRIDGE DEADLINE
-	primary=$(script_value PRIMARY "$1") || exit 1
-	[ -n "$primary" ] || return 0
-	while ! is_there "$primary" && [ "$(uptime_seconds)" -lt "$2" ]; do sleep 0.1; done
-}
-
 uptime_seconds() {
 	read -r seconds _ </proc/uptime && printf '%s' "${seconds%.*}"
 }
 
-create_bridge() { # BRIDGE HARDWARE-ADDRESS, which may be empty
-	is_there "$1" || attempt "cannot make the bridge $1" ip link add name "$1" type bridge
-	[ -z "$2" ] || attempt "cannot give $1 the address $2" ip link set dev "$1" address "$2"
-	attempt "cannot bring $1 up" ip link set dev "$1" up
+plan_bridge() { # BRIDGE HARDWARE-ADDRESS, which may be empty
+	is_there "$1" || plan "cannot make the bridge $1" "link add name $1 type bridge"
+	[ -z "$2" ] || plan "cannot give $1 the address $2" "link set dev $1 address $2"
+	plan "cannot bring $1 up" "link set dev $1 up"
 }
 
 is_wireless() { # INTERFACE
@@ -105,11 +111,11 @@ is_wireless() { # INTERFACE
 }
 
 # A member of a bridge has no addresses: the bridge has them.
-join_bridge() { # INTERFACE BRIDGE
+plan_member() { # INTERFACE BRIDGE
 	end_lease "$1"
-	attempt "cannot bring $1 into $2" ip link set dev "$1" master "$2"
-	remove_addresses "$1"
-	attempt "cannot bring $1 up" ip link set dev "$1" up
+	plan "cannot bring $1 into $2" "link set dev $1 master $2"
+	plan_no_addresses "$1"
+	plan "cannot bring $1 up" "link set dev $1 up"
 }
 
 # move_routes BRIDGE TEXT: gives the bridge the default routes that its first member had, a line each.
@@ -127,10 +133,10 @@ move_routes() {
 # member of a new bridge. give_wire_back restores them if the start fails.
 note_wire() {
 	leased=''
-	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || leased=yes
+	if daemon_of busybox "$lease_run-$1.pid"; then leased=yes; fi
 	ip -4 address save dev "$1" >"$state/wire-$2.addresses" || fail "cannot note the addresses of $1"
 	ip -4 route save dev "$1" >"$state/wire-$2.routes" || fail "cannot note the routes of $1"
-	printf '%s %s\n' "$1" "$leased" | put "$state/wire-$2"
+	note "$state/wire-$2" "$1 $leased"
 }
 
 forget_wire() { # BRIDGE [FILE]
@@ -151,72 +157,80 @@ give_wire_back() {
 # set_address INTERFACE ADDRESS/MASK: sets the interface's only address. An interface that has it already keeps it, and
 # so the routes that depend on it.
 set_address() {
+	case $2 in *[!0-9./]*) fail "cannot give $1 the address $2: it is none" ;; esac
 	end_lease "$1"
-	attempt "cannot give $1 the address $2" ip address replace "$2" broadcast + dev "$1"
-	addresses=$(ip -4 -oneline address show dev "$1") || fail "cannot tell the addresses of $1"
-	case $addresses in *"$newline"*) ;; *) return 0 ;; esac
-	remove_addresses "$1"
-	attempt "cannot give $1 the address $2" ip address add "$2" broadcast + dev "$1"
+	plan "cannot give $1 the address $2" "address replace $2 broadcast + dev $1"
+	plan "cannot tell the addresses of $1" "address show dev $1"
+	plan_networks
+	run_plan
+	take_networks
+	case $said in *" inet "*" inet "*) ;; *) return 0 ;; esac
+	networks=''
+	plan_no_addresses "$1"
+	plan "cannot give $1 the address $2" "address add $2 broadcast + dev $1"
+	run_plan
 }
 
-remove_addresses() { # INTERFACE
-	is_there "$1" || return 0
-	attempt "cannot remove the addresses of $1" ip -4 address flush dev "$1"
+plan_no_addresses() { # INTERFACE
+	! is_there "$1" || plan "cannot remove the addresses of $1" "address flush dev $1"
 }
 
 lease_script=/usr/mero/sbin/udhcpc.lease
 
 # The client goes on in the background when no server has answered yet. A client that a server keeps busy is ended.
 lease_address() { # INTERFACE
-	[ -z "$(daemon_of busybox "$(lease_pid "$1")")" ] || return 0
-	attempt "cannot lease an address for $1" timeout -k 2 20 busybox udhcpc -b -S -i "$1" -p "$(lease_pid "$1")" -t 2 \
-		-T 2 -s "$lease_script"
+	run_plan
+	networks=''
+	daemon_of busybox "$lease_run-$1.pid" ||
+		attempt "cannot lease an address for $1" timeout -k 2 20 busybox udhcpc -b -S -i "$1" -p "$lease_run-$1.pid" \
+			-t 2 -T 2 -s "$lease_script"
 }
 
 # end_lease INTERFACE: ends the DHCP client, and gives its lease back, also that of a client that had ended by itself.
 end_lease() {
-	end_daemon busybox "$(lease_pid "$1")"
-	[ ! -x "$lease_script" ] || "$lease_script" left "$1" ||
+	end_daemon busybox "$lease_run-$1.pid"
+	[ ! -x "$lease_script" ] || has_no_lease "$1" || "$lease_script" left "$1" ||
 		warn "what $1 had leased is not all given back"
 }
 
-lease_pid() { # INTERFACE
-	printf '/var/run/udhcpc-%s.pid' "$1"
-}
+# Mostly there is none. The script finds that out without another program, and so without a process when it is read here.
+has_no_lease() ( # INTERFACE
+	set -- none "$1"
+	# shellcheck source=/dev/null
+	. "$lease_script"
+)
 
 # ---- The bridge of an access point --------------------------------------------------------------------------------
 
 # A note says which bridge an access point was put into: when the access point ends, its interface's file may already
 # name another bridge, or none.
-bridge_note() { # INTERFACE
-	printf '%s/bridge-%s' "$state" "$1"
-}
+bridge_note=$state/bridge # with -INTERFACE behind it
 
 note_bridge() { # INTERFACE BRIDGE
-	put "$(bridge_note "$1")" <<-END
-		$2
-	END
+	note "$bridge_note-$1" "$2"
 }
 
 # was_started INTERFACE: whether an access point was started there, and not ended.
 was_started() {
-	[ -s "$(bridge_note "$1")" ]
+	[ -s "$bridge_note-$1" ]
 }
 
 forget_bridge() { # INTERFACE
-	remove_files "$(bridge_note "$1")"
+	remove_files "$bridge_note-$1"
 }
 
-# bridge_of INTERFACE: prints the bridge that its access point was put into. Without a note, that is the bridge that the
-# interface is a member of.
+# bridge_of INTERFACE: puts the bridge that its access point was put into into $noted; nothing where there is none. Without
+# a note, that is the bridge that the interface is a member of.
 bridge_of() {
-	note=$(bridge_note "$1")
-	if [ -s "$note" ]; then
-		read -r noted <"$note" && printf '%s' "$noted"
-	elif [ -e "/sys/class/net/$1/master" ]; then
-		master=$(readlink "/sys/class/net/$1/master") || fail "cannot tell the bridge of $1"
-		if is_bridge "${master##*/}"; then printf '%s' "${master##*/}"; fi
+	noted=''
+	if was_started "$1"; then
+		read -r noted <"$bridge_note-$1" || cannot_read "$bridge_note-$1"
+		return
 	fi
+	for master in /sys/class/net/*/brif/"$1"; do
+		master=${master#/sys/class/net/} master=${master%%/*}
+		if is_there "$master" && is_bridge "$master"; then noted=$master; fi
+	done
 }
 
 leave_bridge() { # INTERFACE BRIDGE

@@ -3,9 +3,14 @@
 
 # end_client INTERFACE: ends the supplicant and the DHCP client, and removes the addresses.
 end_client() {
+	plan_end_of_client "$1"
+	run_plan
+}
+
+plan_end_of_client() { # INTERFACE
 	end_daemon wpa_supplicant /var/run/wpa_supplicant.pid
 	end_lease "$1"
-	remove_addresses "$1"
+	plan_no_addresses "$1"
 }
 
 # An interface for client use is in the state of a freshly plugged one: without addresses, down, and of the type

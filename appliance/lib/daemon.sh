@@ -1,12 +1,12 @@
 # Daemons, by their pid files.
 # shellcheck shell=sh
 
-# daemon_of NAME PIDFILE: prints the process of a pid file, if that process still runs and has that name.
+# daemon_of NAME PIDFILE: puts the process of a pid file into $daemon, if that process still runs and has that name.
 daemon_of() {
-	pid=''
-	[ -s "$2" ] && read -r pid <"$2"
-	case $pid in '' | *[!0-9]*) return 1 ;; esac
-	is_daemon "$1" "$pid" && printf '%s' "$pid"
+	daemon=''
+	[ -s "$2" ] && read -r daemon <"$2"
+	case $daemon in '' | *[!0-9]*) return 1 ;; esac
+	is_daemon "$1" "$daemon"
 }
 
 is_daemon() { # NAME PID
@@ -24,31 +24,41 @@ is_daemon() { # NAME PID
 	esac
 }
 
-# announce_daemon PIDFILE: makes an empty pid file, which stands for a daemon that starts and has not written it yet.
-announce_daemon() {
-	put "$1" </dev/null
+# await SECONDS CONDITION WORD...: waits until the condition is true, and is false when it does not become so in time.
+# Most of what is waited for takes a few hundredths of a second: the first pauses are short.
+await() {
+	left=$(($1 * 100)) pause=1
+	shift
+	until "$@"; do
+		[ "$left" -gt 0 ] || return 1
+		sleep 0.0$pause
+		left=$((left - pause))
+		[ $pause -eq 8 ] || pause=$((2 * pause))
+	done
 }
 
-await_pid() { # PIDFILE
-	tries=20
-	while [ $tries -gt 0 ] && [ -e "$1" ] && [ ! -s "$1" ]; do
-		sleep 0.1
-		tries=$((tries - 1))
-	done
+# announce_daemon PIDFILE: makes an empty pid file, which stands for a daemon that starts and has not written it yet.
+announce_daemon() {
+	note "$1" ''
+}
+
+# is_written PIDFILE: whether no daemon is announced there that still has to write it.
+is_written() {
+	[ ! -e "$1" ] || [ -s "$1" ]
 }
 
 # end_daemon NAME PIDFILE: ends it, and waits until it has.
 end_daemon() {
-	await_pid "$2"
+	await 2 is_written "$2"
 	for signal in TERM KILL; do
-		ended=$(daemon_of "$1" "$2") || break
-		kill -s "$signal" "$ended" 2>/dev/null # in vain where it has just ended by itself
-		tries=50
-		while [ $tries -gt 0 ] && [ -d "/proc/$ended" ]; do
-			sleep 0.1
-			tries=$((tries - 1))
-		done
+		daemon_of "$1" "$2" || break
+		kill -s "$signal" "$daemon" 2>/dev/null # in vain where it has just ended by itself
+		await 5 has_ended "$1" "$daemon"
 	done
-	! daemon_of "$1" "$2" >/dev/null || fail "cannot end $1 (process $ended)"
+	! daemon_of "$1" "$2" || fail "cannot end $1 (process $daemon)"
 	remove_files "$2"
+}
+
+has_ended() { # NAME PID
+	! is_daemon "$1" "$2"
 }

@@ -8,6 +8,9 @@ hostapd_files=/etc/hostapd/hostapd # with -INTERFACE-host.conf, -INTERFACE-guest
 dhcp_files=/etc/dhcpd/dhcpd # with -BRIDGE-BRIDGE.conf and -BRIDGE-BRIDGE.info behind it
 adapter_info=/tmp/wireless.info
 state=/var/run/rc.network
+hostapd_run=$state/hostapd # with -INTERFACE.conf, -INTERFACE.log and -INTERFACE.pid behind it
+dnsmasq_run=$state/dnsmasq # with -BRIDGE.conf, -BRIDGE.leases and -BRIDGE.pid behind it
+lease_run=/var/run/udhcpc # with -INTERFACE.pid behind it
 newline='
 '
 
@@ -23,13 +26,21 @@ ask() {
 	esac
 }
 
-# says_yes REQUEST...: whether the one answer to a request is "yes"; a missing value is a no.
-says_yes() {
-	ask "$@" || return 1
-	case $answer in
+# into NAME...: puts the lines of $answer into variables.
+into() {
+	rest=$answer$newline
+	for variable; do
+		line=${rest%%"$newline"*} rest=${rest#*"$newline"}
+		eval "$variable=\$line"
+	done
+}
+
+# is_yes TEXT REQUEST: whether the answer to a request is "yes".
+is_yes() {
+	case $1 in
 	yes) ;;
 	no) return 1 ;;
-	*) fail "neither yes nor no, but '$answer': $*" ;;
+	*) fail "neither yes nor no, but '$1': $2" ;;
 	esac
 }
 
@@ -43,15 +54,19 @@ is_enabled() {
 	ask check "$1" enable yes
 }
 
-# setting KEY: prints a setting of the access point, for the adapter that is plugged in.
-setting() {
-	ask access-point "$1" || fail "cannot read the setting $1"
-	printf '%s' "$answer"
+known_settings='' # the keys of those that are in variables, setting_KEY
+
+# read_setting KEY: puts a setting of the access point, for the adapter that is plugged in, into $answer.
+read_setting() {
+	case " $known_settings " in
+	*" $1 "*) eval "answer=\$setting_$1" ;;
+	*) ask access-point "$1" || fail "cannot read the setting $1" ;;
+	esac
 }
 
 # is_on KEY: whether such a setting is a number other than 0.
 is_on() {
-	ask access-point "$1" || fail "cannot read the setting $1"
+	read_setting "$1"
 	case $answer in
 	0) return 1 ;;
 	'' | *[!0-9-]*) fail "the setting $1 is '$answer', which is no number" ;;
@@ -63,17 +78,22 @@ cannot_read() {
 	fail "cannot read $1"
 }
 
-# remove_files FILE...: removes files, which need not be there. A failure is told of the first one.
+# remove_files FILE...: removes those that are there. A failure is told of the first one.
 remove_files() {
-	attempt "cannot remove $1" rm -f "$@"
+	for file; do
+		shift
+		if [ -e "$file" ] || [ -L "$file" ]; then set -- "$@" "$file"; fi
+	done
+	[ $# -eq 0 ] || attempt "cannot remove $1" rm -f "$@"
 }
 
-# put FILE [MODE]: replaces a file by the standard input, in one step. The mode is 600 by default. In a directory like
-# /tmp anybody may have put a link or a file in the way: that is neither followed nor written to, and the new file is
-# made under a name that nobody can foresee.
+# put FILE TEXT [MODE]: replaces a file by the text and a line feed, or by nothing, in one step. The mode is 600 by
+# default. In a directory like /tmp anybody may have put a link or a file in the way: that is neither followed nor
+# written to, and the new file is made under a name that nobody can foresee.
 put() {
 	new=$(mktemp "$1.XXXXXXXXXX" 2>&1) || fail "cannot write $1: $new"
-	{ cat >"$new" && chmod "${2:-600}" "$new"; } || give_up "$new" "cannot write $1"
+	printf '%s' "${2:+$2$newline}" >"$new" || give_up "$new" "cannot write $1"
+	[ -z "${3-}" ] || chmod "$3" "$new" || give_up "$new" "cannot write $1"
 	if [ -d "$1" ] && [ ! -L "$1" ]; then set_aside "$1"; fi
 	said=$(mv -fT "$new" "$1" 2>&1) || give_up "$new" "cannot replace $1: $said"
 }
@@ -81,6 +101,18 @@ put() {
 give_up() { # NEW-FILE TEXT
 	rm -f "$1"
 	fail "$2"
+}
+
+# note FILE TEXT: writes the text and a line feed, or nothing, into a file of the state directory, with the mode 600. The
+# directory is root's alone, so that the file needs no other name first.
+note() {
+	umask 077
+	write_note "$@" 2>/dev/null || said=$(write_note "$@" 2>&1) || fail "cannot write $1: ${said##*: }"
+	umask 022
+}
+
+write_note() {
+	printf '%s' "${2:+$2$newline}" >"$1"
 }
 
 # set_aside PATH: renames a file or directory that is in the way, so that nothing of it is lost.

@@ -17,7 +17,10 @@ set_firewall() { # BRIDGE
 	first=''
 	if [ ! -e "$forwarding_before" ]; then
 		first=yes
-		put "$forwarding_before" <"$forwarding"
+		before=''
+		read -r before <"$forwarding" # a switch tells its one digit, and nothing behind it
+		[ -n "$before" ] || cannot_read "$forwarding"
+		note "$forwarding_before" "$before"
 	fi
 	said=$(set_rules "$text") || {
 		[ -z "$first" ] || rm -f "$forwarding_before" # none stand
@@ -34,7 +37,7 @@ clear_firewall() {
 	read -r before <"$forwarding_before" || cannot_read "$forwarding_before"
 	echo "$before" >"$forwarding" || fail 'cannot stop passing traffic on between networks'
 	said=$(set_rules '') || fail "cannot remove the rules between networks: $said"
-	remove_files "$guest_rights" "$guest_rights".* "$forwarding_before"
+	remove_files "$guest_rights" "$forwarding_before"
 }
 
 # rights_of_guests: prints what the settings let guests reach, or keep them from; nothing for a start without guests.
@@ -52,9 +55,7 @@ note_guest_rights() {
 		remove_files "$guest_rights"
 		return
 	fi
-	put "$guest_rights" <<-END
-		$1
-	END
+	note "$guest_rights" "$1"
 }
 
 # set_rules TEXT: replaces all rules by the text's in one step, and prints what nft says. The table is added first,
@@ -70,7 +71,7 @@ set_rules() {
 rules() { # BRIDGE
 	echo 'table inet mero_ap {'
 	if is_nat "$1"; then
-		subnet=$(subnet_of "$1") || exit 1
+		subnet_of "$1"
 		translation "$1" "$subnet"
 	fi
 	if [ -n "$guests" ]; then
@@ -87,11 +88,37 @@ translation() { # BRIDGE SUBNET
 	}"
 }
 
-# subnet_of BRIDGE: prints its network as ADDRESS/BITS. The bridge has its address by now, so the kernel has the route.
+networks='' # those that the appliance has an address in, each as ADDRESS/BITS@INTERFACE, where they are known
+
+# plan_networks: they are told among what the planned commands say. take_networks takes them from there.
+plan_networks() {
+	plan 'cannot tell the networks around the appliance' 'route show proto kernel scope link'
+}
+
+take_networks() {
+	networks=''
+	while read -r network dev interface _; do
+		[ "$dev" != dev ] || networks="$networks $network@$interface"
+	done <<-END
+		$said
+	END
+}
+
+know_networks() {
+	[ -z "$networks" ] || return 0
+	plan_networks
+	run_plan
+	take_networks
+}
+
+# subnet_of BRIDGE: puts its network into $subnet. The bridge has its address by now, so the kernel has the route.
 subnet_of() {
-	networks=$(ip -4 route show dev "$1" proto kernel scope link) || fail "cannot tell the network of $1"
-	[ -n "$networks" ] || fail "$1 has no address, and so no network to translate"
-	printf '%s' "${networks%% *}"
+	know_networks
+	subnet=''
+	for network in $networks; do
+		case $subnet,$network in ,*"@$1") subnet=${network%@*} ;; esac
+	done
+	[ -n "$subnet" ] || fail "$1 has no address, and so no network to translate"
 }
 
 # Guests always get addresses, names, and an answer to a ping. Settings decide whether they reach the rest of the
@@ -128,13 +155,9 @@ guest_rules() {
 
 # local_networks: prints the private networks, and those that the appliance has an address in.
 local_networks() {
-	networks=$(ip -4 route show proto kernel scope link) || fail 'cannot tell the networks around the appliance'
+	know_networks
 	printf 10.0.0.0/8,100.64.0.0/10,172.16.0.0/12,192.168.0.0/16,169.254.0.0/16
-	while read -r network _; do
-		[ -z "$network" ] || printf ',%s' "$network"
-	done <<-END
-		$networks
-	END
+	for network in $networks; do printf ',%s' "${network%@*}"; done
 }
 
 verdict() { # KEY

@@ -19,14 +19,19 @@ decide_on_guests() { # INTERFACE
 
 # guest_is_on INTERFACE: whether there is a guest network, and it is on the air at this hour.
 guest_is_on() {
-	is_enabled "$hostapd_files-$1-guest.info" &&
+	know_guests "$1"
+	[ "$has_guests" = yes ] &&
 		[ -f "$hostapd_files-$1-guest.conf" ] &&
 		! is_off_now guest_net_sched_enable guest_net_sched
 }
 
-# An empty "bssid=" is left out: the daemon then gives the guest network the address that follows the radio's own.
-guest_configuration() { # INTERFACE
-	sed '/^bssid=$/d' "$hostapd_files-$1-guest.conf" || cannot_read "$hostapd_files-$1-guest.conf"
+known_guests='' # the interface whose guests $has_guests is about
+
+know_guests() { # INTERFACE
+	[ "$known_guests" != "$1" ] || return 0
+	ask check "$hostapd_files-$1-guest.info" enable yes || :
+	into has_guests
+	known_guests=$1
 }
 
 # set_guest_bridge: makes the bridge for a start with guests, and removes it for one without.
@@ -35,12 +40,12 @@ set_guest_bridge() {
 }
 
 make_guest_bridge() {
-	create_bridge "$guest_bridge" ''
+	plan_bridge "$guest_bridge" ''
 	set_address "$guest_bridge" "$guest_address/24"
 }
 
 remove_guest_bridge() {
 	end_dnsmasq "$guest_bridge"
 	remove_bridge "$guest_bridge"
-	remove_files "$state/dnsmasq-$guest_bridge.conf" "$state/dnsmasq-$guest_bridge.conf".*
+	remove_files "$dnsmasq_run-$guest_bridge.conf"
 }

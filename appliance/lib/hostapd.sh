@@ -5,41 +5,42 @@
 control=/var/run/hostapd
 
 start_hostapd() { # INTERFACE
-	configuration=$state/hostapd-$1.conf log=$state/hostapd-$1.log
+	configuration=$hostapd_run-$1.conf log=$hostapd_run-$1.log pid=$hostapd_run-$1.pid
 	write_configuration "$1" "$configuration"
-	make_named_files "$configuration"
-
-	put "$log" </dev/null
-	announce_daemon "$(hostapd_pid "$1")"
-	said=$(run_hostapd "$1" "$configuration" "$log" 2>&1) || {
-		rm -f "$(hostapd_pid "$1")"
+	make_named_files
+	note "$log" ''
+	announce_daemon "$pid"
+	said=$(run_hostapd "$pid" "$configuration" "$log" 2>&1) || {
+		rm -f "$pid"
 		reason=$(reason_in "$log" "$said")
 		fail "cannot start the access point on $1: $reason"
 	}
-	await_pid "$(hostapd_pid "$1")"
+	await 2 is_written "$pid"
 	await_access_point "$1" "$log"
-	daemon_of hostapd "$(hostapd_pid "$1")" >/dev/null || fail "the access point on $1 has not noted its process"
+	daemon_of hostapd "$pid" || fail "the access point on $1 has not noted its process"
 }
 
 # Anyone in range can make the daemon log a line with each frame, so the log is limited to 1 MiB.
-run_hostapd() ( # INTERFACE CONFIGURATION LOG
+run_hostapd() ( # PIDFILE CONFIGURATION LOG
 	trap '' XFSZ
 	ulimit -f 2048
-	hostapd -B -t -f "$3" -P "$(hostapd_pid "$1")" "$2"
+	hostapd -B -t -f "$3" -P "$1" "$2"
 )
 
 end_hostapd() { # INTERFACE
-	end_daemon hostapd "$(hostapd_pid "$1")"
+	end_daemon hostapd "$hostapd_run-$1.pid"
 	end_stray_hostapd "$1"
 }
 
 # end_stray_hostapd INTERFACE: ends a daemon that its pid file does not name, as after a start with a full disk.
 end_stray_hostapd() {
 	for process in /proc/[0-9]*; do
-		if is_daemon hostapd "${process#/proc/}" && is_ours "$process" &&
-			grep -qF "$state/hostapd-$1.conf" "$process/cmdline" 2>/dev/null; then
-			printf '%s\n' "${process#/proc/}" | put "$(hostapd_pid "$1")"
-			end_daemon hostapd "$(hostapd_pid "$1")"
+		name=''
+		read -r name 2>/dev/null <"$process/comm" # in vain where it has just ended
+		if [ "$name" = hostapd ] && is_daemon hostapd "${process#/proc/}" && is_ours "$process" &&
+			grep -qF "$hostapd_run-$1.conf" "$process/cmdline" 2>/dev/null; then
+			note "$hostapd_run-$1.pid" "${process#/proc/}"
+			end_daemon hostapd "$hostapd_run-$1.pid"
 		fi
 	done
 }
@@ -54,108 +55,149 @@ belongings_of() { # PROCESS
 	stat -Lc %d:%i "$1/root" "$1/ns/net" 2>/dev/null
 }
 
-# forget_configuration INTERFACE: removes the daemon's files, which hold secrets, and half-written ones.
+# forget_configuration INTERFACE: removes the daemon's files, which hold secrets.
 forget_configuration() {
-	remove_files "$state/hostapd-$1.conf" "$state/hostapd-$1.conf".* "$state/hostapd-$1.log" "$state/hostapd-$1.log".*
-}
-
-hostapd_pid() { # INTERFACE
-	printf '%s/hostapd-%s.pid' "$state" "$1"
+	remove_files "$hostapd_run-$1.conf" "$hostapd_run-$1.log"
 }
 
 # Writes the daemon's configuration: the main network's file, the country and, for a start with guests, the guest
-# network's file. Features that the card lacks are left out, since the daemon does not start with them.
+# network's file, whose empty "bssid=" is left out: the daemon then gives it the address that follows the radio's own.
 write_configuration() { # INTERFACE FILE
-	host=$hostapd_files-$1-host.conf
+	host=$hostapd_files-$1-host.conf guest=''
 	[ -s "$host" ] || fail "$host is missing or empty"
-	band=$(band_of "$host") || exit 1
-	unable=$(what_is_unable "$1" "$band") || exit 1
-	networks=$(sed "$unable" "$host") || cannot_read "$host"
-	there=$(country_lines "$band") || exit 1
-	networks=$networks${there:+$newline$there}
-	if [ -n "$guests" ]; then
-		second=$(guest_configuration "$1") || exit 1
-		networks=$networks$newline$second
-	fi
-	expect_protection "$networks"
-	put "$2" <<-END
-		$networks
-	END
+	[ -z "$guests" ] || guest=$hostapd_files-$1-guest.conf
+	learn_capabilities "$1"
+	lines=$(sed '/^bssid=$/d' "$host" ${guest:+"$guest"}) || cannot_read "$host${guest:+ or $guest}"
+	make_configuration
+	note "$2" "$content"
 }
 
-# expect_protection TEXT: ends the script when the configuration of a network asks for protection, but has no key or no
+# make_configuration: makes the daemon's $content out of the files' $lines. Features that the card lacks are left out,
+# since the daemon does not start with them.
+make_configuration() {
+	bits=$ht_of_2ghz content='' told=''
+	case $newline$lines$newline in *"${newline}hw_mode=a$newline"*) bits=$ht_of_5ghz ;; esac
+	begin_network
+	set -f
+	IFS=$newline
+	for line in $lines; do
+		case $line in
+		bss=*)
+			expect_protection
+			begin_network
+			tell_country
+			;;
+		ieee80211n=* | require_ht=*) [ -n "$bits" ] || continue ;;
+		ht_capab=*) leave_out_what_is_lacking || continue ;;
+		esac
+		note_protection
+		content=$content$line$newline
+	done
+	unset IFS
+	set +f
+	expect_protection
+	tell_country
+	content=${content%"$newline"}
+}
+
+# tell_country: adds, once, what the daemon is told of the country, and, with it, of the radars of 5 GHz.
+tell_country() {
+	[ -z "$told" ] && [ -n "$country" ] || return 0
+	told=yes
+	content=${content}country_code=$country${newline}ieee80211d=1$newline
+	case $newline$lines$newline in
+	*"${newline}hw_mode=a$newline"*) content=${content}ieee80211h=1$newline ;;
+	esac
+}
+
+leave_out_what_is_lacking() {
+	[ -n "$bits" ] || return 1
+	lacks 0x0020 '[SHORT-GI-20]'
+	lacks 0x0040 '[SHORT-GI-40]'
+	lacks 0x0400 '[DELAYED-BA]'
+	lacks 0x0800 '[MAX-AMSDU-7935]'
+	lacks 0x0002 '[HT40+]'
+	lacks 0x0002 '[HT40-]'
+}
+
+lacks() { # BIT FEATURE
+	case $((bits & $1)),$line in 0,*"$2"*) line=${line%%"$2"*}${line#*"$2"} ;; esac
+}
+
+begin_network() {
+	secret='' wpa='' wep='' wep_key=''
+}
+
+note_protection() {
+	case $line in
+	wep_default_key=*) wep=yes ;;
+	wep_key0=*) wep_key=yes ;;
+	wpa_passphrase=* | wpa_key_mgmt=*) secret=yes ;;
+	wpa=[1-3]) wpa=yes ;;
+	esac
+}
+
+# expect_protection: ends the script when the configuration of a network asks for protection, but has no key or no
 # version of WPA: the daemon would run such a network as an open one.
 expect_protection() {
-	printf '%s\n' "$1" | awk '
-		function judge() { if ((wep && !key) || (secret && !wpa)) open = 1; wep = key = secret = wpa = 0 }
-		/^bss=/ { judge() }
-		/^wep_default_key=/ { wep = 1 }
-		/^wep_key0=/ { key = 1 }
-		/^wpa_passphrase=|^wpa_key_mgmt=/ { secret = 1 }
-		/^wpa=[1-3]$/ { wpa = 1 }
-		END { judge(); exit open }' || fail 'a network would be open that is to be protected: its key or its version of WPA is none'
+	case $wep,$wep_key,$secret,$wpa in
+	yes,,* | *,yes,) fail 'a network would be open that is to be protected: its key or its version of WPA is none' ;;
+	esac
 }
 
-band_of() { # CONFIGURATION
-	mode=$(sed -n 's/^hw_mode=//p' "$1") || cannot_read "$1"
-	if [ "$mode" = a ]; then echo 2; else echo 1; fi
-}
-
-# what_is_unable INTERFACE BAND: prints a program for sed that takes the features that the card lacks out of a
-# configuration.
-what_is_unable() {
-	bits=$(ht_capabilities "$1" "$2") || exit 1
-	if [ -z "$bits" ]; then
-		echo '/^ieee80211n=/d; /^ht_capab=/d; /^require_ht=/d'
-		return
-	fi
-	lacks "$bits" 0x0020 '\[SHORT-GI-20\]'
-	lacks "$bits" 0x0040 '\[SHORT-GI-40\]'
-	lacks "$bits" 0x0400 '\[DELAYED-BA\]'
-	lacks "$bits" 0x0800 '\[MAX-AMSDU-7935\]'
-	lacks "$bits" 0x0002 '\[HT40[+-]\]'
-}
-
-lacks() { # BITS BIT PATTERN
-	[ $(($1 & $2)) -ne 0 ] || echo "/^ht_capab=/s/$3//"
-}
-
-# Prints the card's 802.11n capabilities in a band, as the number that the driver gives; nothing for a card without.
-ht_capabilities() { # INTERFACE BAND
-	phy=$(cat "/sys/class/net/$1/phy80211/name") || fail "$1 is no wireless interface"
+# learn_capabilities INTERFACE: puts the card's 802.11n capabilities in both bands into variables, as the numbers that the
+# driver gives; nothing for a card without.
+learn_capabilities() {
+	ht_of_2ghz='' ht_of_5ghz='' band=''
+	read -r phy 2>/dev/null <"/sys/class/net/$1/phy80211/name" || fail "$1 is no wireless interface"
 	said=$(iw phy "$phy" info) || fail "cannot tell the capabilities of $1"
-	awk -v band="Band $2:" '
-		$1 == "Band" { inside = ($0 ~ band) }
-		inside && $1 == "Capabilities:" { print $2; exit }' <<-END || fail "cannot tell the capabilities of $1"
-		$said
-	END
+	set -f
+	IFS=$newline
+	for line in $said; do
+		case $band$line in
+		*"	Band "*:) band=${line#*Band } ;;
+		"1:		Capabilities: "*) ht_of_2ghz=${line#*: } band='' ;;
+		"2:		Capabilities: "*) ht_of_5ghz=${line#*: } band='' ;;
+		esac
+	done
+	unset IFS
+	set +f
 }
 
 # The daemon does not start when a file that it is told to read is missing.
-make_named_files() { # CONFIGURATION
-	files=$(sed -n 's/^wpa_psk_file=//p' "$1") || cannot_read "$1"
-	while IFS= read -r file; do
-		[ -z "$file" ] || [ -e "$file" ] || put "$file" </dev/null
-	done <<-END
-		$files
-	END
+make_named_files() {
+	set -f
+	IFS=$newline
+	for line in $content; do
+		case $line in
+		wpa_psk_file=?*) [ -e "${line#*=}" ] || put "${line#*=}" '' ;;
+		esac
+	done
+	unset IFS
+	set +f
 }
 
 # The daemon goes into the background before it has chosen a channel, so its start alone does not say that it works.
 await_access_point() { # INTERFACE LOG
-	tries=300
-	while [ $tries -gt 0 ]; do
-		case $(hostapd_cli -p "$control" -i "$1" status 2>/dev/null | sed -n 's/^state=//p') in
-		ENABLED) return ;;
-		DFS) return ;; # listens for radar, for a minute or more, and comes up by itself
-		DISABLED) break ;;
-		esac
-		daemon_of hostapd "$(hostapd_pid "$1")" >/dev/null || break
-		sleep 0.1
-		tries=$((tries - 1))
-	done
+	await 30 is_decided "$1" "$2"
+	case $outcome in ENABLED | DFS) return ;; esac
 	reason=$(reason_in "$2")
 	fail "the access point on $1 does not come up: $reason"
+}
+
+# is_decided INTERFACE LOG: whether the daemon is on the air, or will not be. It may listen for radar first, for a minute
+# or more, and comes up by itself then. Its log says it at no cost, where nothing has to be scanned for.
+is_decided() {
+	outcome=ENABLED
+	while read -r line; do
+		case $line in *" $1: AP-ENABLED"*) return ;; esac
+	done <"$2"
+	case $(hostapd_cli -p "$control" -i "$1" status 2>/dev/null) in
+	*state=ENABLED*) ;;
+	*state=DFS*) outcome=DFS ;;
+	*state=DISABLED*) outcome=DISABLED ;;
+	*) outcome=ENDED && ! daemon_of hostapd "$hostapd_run-$1.pid" ;;
+	esac
 }
 
 # reason_in LOG [TEXT]: prints the line in which a daemon gives the reason of its failure, without the time.

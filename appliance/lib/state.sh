@@ -9,6 +9,11 @@ lock=$state/lock
 # it. Whatever else stood in its place is moved aside.
 own_state() {
 	[ -e "$state" ] || [ -L "$state" ] || make_state
+	foreign=$(foreign_entries 0) || fail "cannot tell what of $state is root's"
+	[ -z "$foreign" ] || make_own
+}
+
+make_own() {
 	owner=$(stat -c '%u %F' "$state") || fail "cannot tell whose $state is"
 	if [ "$owner" != '0 directory' ]; then
 		set_aside "$state"
@@ -25,26 +30,28 @@ make_state() {
 # Everything but plain files of root's with one name each is removed, and so is a lock that others may open: they may
 # already hold it, for ever.
 remove_foreign_entries() {
-	foreign=$(foreign_entries) || fail "cannot tell what of $state is root's"
-	[ -n "$foreign" ] || return 0
 	adopt_pid_files
-	foreign=$(foreign_entries -exec rm -rf --one-file-system -- '{}' +) ||
+	foreign=$(foreign_entries 1 -exec rm -rf --one-file-system -- '{}' +) ||
 		fail "cannot remove what is not root's from $state"
 	foreign=$(printf '%s' "${foreign% }" | tr -c '[:print:]' '?')
 	[ -z "$foreign" ] || warn "removed from $state what was not root's alone: $foreign"
 }
 
-foreign_entries() { # WHAT-ELSE-TO-DO-WITH-THEM...
-	find "$state" -mindepth 1 -maxdepth 1 '(' ! -type f -o ! -user 0 -o -links +1 -o -name lock -perm /077 ')' \
-		-printf '%f ' "$@"
+# foreign_entries DEPTH [WHAT-ELSE-TO-DO-WITH-THEM...]: prints the names of what is not root's alone. With the depth 0 that
+# may be the directory itself, which is looked at first: if it is root's, nobody else changes what is found in it.
+foreign_entries() {
+	depth=$1
+	shift
+	find "$state" -mindepth "$depth" -maxdepth 1 '(' -path "$state" '(' ! -type d -o ! -user 0 -o ! -perm 700 ')' -o \
+		! -path "$state" '(' ! -type f -o ! -user 0 -o -links +1 -o -name lock -perm /077 ')' ')' -printf '%f ' "$@"
 }
 
 # A DHCP server gives its pid file to the user that it runs as, and a start gives the file back to root. Starts of
 # former versions did not: this does it for servers that still run, so that their pid files are not removed.
 adopt_pid_files() {
 	for file in "$state"/dnsmasq-*.pid; do
-		server=$(daemon_of dnsmasq "$file") || continue
-		if tr '\0' '\n' <"/proc/$server/cmdline" | grep -qxF -e "--pid-file=$file"; then
+		daemon_of dnsmasq "$file" || continue
+		if tr '\0' '\n' <"/proc/$daemon/cmdline" | grep -qxF -e "--pid-file=$file"; then
 			attempt "cannot keep $file to root" chown -h 0:0 "$file"
 		fi
 	done

@@ -15,8 +15,8 @@ namespace fs = std::filesystem;
 // Has the parts do something, as the scripts would.
 inline Ran RunInParts(const std::string& command) {
   std::string script = "set -u; PATH=/tmp/bin:$PATH; ";
-  for (const char* part : {"report", "files", "daemon", "bridge", "country", "hostapd", "guest", "dhcp", "firewall",
-                           "schedule", "client", "adapter"}) {
+  for (const char* part : {"report", "files", "daemon", "ip", "bridge", "country", "hostapd", "guest", "dhcp",
+                           "firewall", "schedule", "client", "adapter"}) {
     script += ". /usr/mero/lib/network/" + std::string(part) + ".sh; ";
   }
   return RunInShell(script + command);

@@ -39,7 +39,7 @@ TEST_F(KitBoot, MakesTheOtherBridgesWhenOneCannotBeMade) {
   Bridge("dbr", "");
   const Ran ran = RunInShell("/etc/rc.network boot");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.out, HasSubstr("rc.network: cannot give abr the address nonsense/255.255.255.0: "));
+  EXPECT_THAT(ran.out, HasSubstr("rc.network: cannot give abr the address nonsense/255.255.255.0: it is none\n"));
   EXPECT_THAT(ran.out, HasSubstr("rc.network: cannot give cbr the address 01:00:00:00:00:00: "));
   EXPECT_EQ(RunInShell("ip -brief -4 address show up | awk '$3 { print $1 }' | grep br | xargs").out, "bbr dbr\n");
 }

@@ -28,7 +28,8 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
   const std::string asks = "ask() { printf '%s' \"$2\"; exit; }; ";
   const std::string ends = "end_daemon() { printf '%s' \"$2\"; exit; }; ";
   const std::string serves =
-      "end_dnsmasq() { :; }; is_enabled() { :; }; is_there() { :; }; start_dnsmasq() { printf '%s' \"$2\"; }; ";
+      "end_dnsmasq() { :; }; serves=yes leases='' known_server=if0; is_there() { :; }; "
+      "start_dnsmasq() { printf '%s' \"$2\"; }; ";
   const struct {
     std::string command;
     std::string path;
@@ -41,17 +42,18 @@ TEST_F(KitPaths, OfTheScriptsAreTheLibrarys) {
       {"printf '%s' \"$guest_rights\"", kGuestRightsPath},
       {"printf '%s' \"$control\"", kHostapdControlDirectory},
       {"printf '%s' \"$scripts\"", kInterfaceScriptDirectory},
-      {"hostapd_pid if0", PathOf(kHostapdPidFormat)},
+      {"printf '%s' \"$hostapd_run-if0.pid\"", PathOf(kHostapdPidFormat)},
       {asks + "script_value KEY if0", PathOf(kInterfaceScriptFormat)},
       {asks + "access_point_is if0 yes", PathOf(kHostapdInfoFormat)},
       {"put() { printf '%s' \"$1\"; }; set_access_point if0 yes", PathOf(kHostapdInfoFormat)},
       {asks + "guest_is_on if0", PathOf(kHostapdGuestInfoFormat)},
-      {"sed() { printf '%s' \"$2\"; }; guest_configuration if0", PathOf(kHostapdGuestFormat)},
       {"fail() { printf '%s' \"$host\"; exit; }; write_configuration if0 /tmp/file", PathOf(kHostapdHostFormat)},
+      {"guests=yes; fail() { :; }; learn_capabilities() { printf '%s' \"$guest\"; exit; }; "
+       "write_configuration if0 /tmp/file",
+       PathOf(kHostapdGuestFormat)},
       {"end_dnsmasq() { :; }; " + asks + "serve_addresses if0", PathOf(kDhcpInfoFormat)},
       {serves + "serve_addresses if0", PathOf(kDhcpConfFormat)},
-      {"ask() { return 1; }; dnsmasq() { printf '%s' \"${6#*=}\"; exit; }; run_dnsmasq if0 file",
-       PathOf(kLeasesFormat)},
+      {"dnsmasq() { printf '%s' \"${6#*=}\"; exit; }; run_dnsmasq if0 file ''", PathOf(kLeasesFormat)},
       {ends + "end_client if0", kSupplicantPidPath},
       {ends + "end_lease if0", PathOf(kDhcpClientPidFormat)},
       {"attempt() { eval \"printf '%s' \\\"\\${$#}\\\"\"; }; lease_address if0", kLeaseScript},
@@ -124,7 +126,7 @@ TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
                    kAdapterInfoPath}));
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.prerm"),
             (Paths{state + "/hostapd-*.pid", state + "/hostapd-", kNetworkScriptPath}));
-  EXPECT_EQ(Tells("hostapd_pid if0"), state + "/hostapd-if0.pid");
+  EXPECT_EQ(Tells("printf '%s' \"$hostapd_run-if0.pid\""), state + "/hostapd-if0.pid");
 }
 
 }  // namespace

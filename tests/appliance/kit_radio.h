@@ -7,6 +7,12 @@
 
 #include "kit.h"
 
+// The programs that the scripts may run. `logger` runs where something has failed already; the shell has the rest.
+inline constexpr const char* kTools[] = {"awk",      "basename", "busybox", "cat",   "chmod",   "chown",       "cut",
+                                         "date",     "dnsmasq",  "find",    "flock", "hostapd", "hostapd_cli", "id",
+                                         "ip",       "iw",       "ls",      "mkdir", "mktemp",  "mv",          "nft",
+                                         "readlink", "rm",       "sed",     "sleep", "stat",    "tr",          "wc"};
+
 class KitRadio : public Kit {
  protected:
   KitRadio() {
@@ -17,8 +23,8 @@ class KitRadio : public Kit {
     StandIn("dnsmasq", "for word; do case $word in --pid-file=*) file=${word#*=} ;; esac; done\n" + Launch("dnsmasq"));
     StandIn("nft", "cat >/tmp/rules\n");
     StandIn("iw", "");
-    StandIn("ip", "exec /usr/sbin/ip \"$@\"\n");
-    Install("cat", "case ${1-} in */phy80211/name) echo phy0 ;; *) exec /bin/cat \"$@\" ;; esac\n");
+    StandInForIp();
+    RunInShell("echo phy0 >/tmp/phy; sed -i 's,/sys/class/net/$1/phy80211/name,/tmp/phy,' /usr/mero/lib/network/*.sh");
     RunInShell("ip link add wlan0 type veth peer name air; ip link add eth0 type veth peer name wire");
     WriteText("/etc/hostapd/hostapd-wlan0-host.conf",
               "interface=wlan0\nssid=home\nwpa=2\nwpa_passphrase=deux croissants\n");
@@ -43,6 +49,33 @@ if [ -e $broken ] && read -r often calls <$broken; then
 	esac
 fi
 )" + script);
+  }
+
+  // The commands of a batch are noted, and fail, each by itself.
+  static void StandInForIp() {
+    StandIn("ip", R"(case " $* " in
+*' -batch '*) ;;
+*) exec /usr/sbin/ip "$@" ;;
+esac
+done='' n=0
+while IFS= read -r line; do
+	n=$((n + 1))
+	echo "ip $line" >>/tmp/calls
+	if [ -e $broken ] && read -r often calls <$broken; then
+		case $line in
+		*"$calls"*)
+			[ "$often" = always ] || rm $broken
+			printf '%s' "$done" | /usr/sbin/ip "$@"
+			printf 'ip is broken\nCommand failed -:%s\n' $n >&2
+			exit 1
+			;;
+		esac
+	fi
+	done="$done$line
+"
+done
+printf '%s' "$done" | /usr/sbin/ip "$@"
+)");
   }
 
   static std::string Launch(const std::string& name) {

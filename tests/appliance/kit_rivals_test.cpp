@@ -49,7 +49,7 @@ TEST_F(KitRivals, GetNoHoldOfTheNoteOfTheAdapter) {
           "echo PRODUCT=theirs >" + name + "; chmod 666 " + name, "mkdir " + name + "; echo x >" + name + "/file",
           "mkdir /tmp/theirs; ln -s /tmp/theirs " + name}) {
       ASSERT_EQ(AsNobody(attack).out, "") << attack;
-      const Ran ran = RunInParts("timeout 10 sh -c 'true'; echo PRODUCT=ours | put $adapter_info 644");
+      const Ran ran = RunInParts("put $adapter_info PRODUCT=ours 644");
       EXPECT_EQ(ran.status, 0) << attack << ran.out;
       EXPECT_EQ(Note(), "regular file 644 0 1\nPRODUCT=ours\n") << attack;
       EXPECT_EQ(RunInShell("timeout 10 /usr/mero/hotplug/usb.wireless.function remove").out, "") << attack;

@@ -15,7 +15,7 @@ using testing::Not;
 
 // Everything that is read for something else than to be shown.
 constexpr const char* kQuestions[] = {
-    "setting wifi_sched",
+    "read_setting wifi_sched",
     "is_on guest_net_lan_block",
     "! is_on guest_net_access_ds",
     "value_of BRIDGE /etc/sysconfig/network-scripts/ifcfg-wlan0",
@@ -41,7 +41,8 @@ constexpr const char* kQuestions[] = {
 
 void ExpectEveryQuestionToEndTheScript(const std::string& why) {
   Install("nft", "touch /tmp/rules-are-set\n");
-  Install("ip", "case $* in *show*) ;; *) touch /tmp/addresses-are-set ;; esac\n");
+  Install("ip",
+          "case $* in\n*-batch*) grep -v show ;;\n*show*) false ;;\nesac && touch /tmp/addresses-are-set\nexit 0\n");
   for (const std::string question : kQuestions) {
     const Ran ran = RunInParts(question + "\necho went on");
     EXPECT_EQ(ran.status, 1) << question << " with " << why << "\n" << ran.out;
@@ -66,8 +67,9 @@ TEST_F(Settings, EndTheScriptWhereTheirReaderFails) {
 }
 
 TEST_F(Settings, EndTheScriptWhereTheyAreNeitherOnNorOff) {
-  for (const char* szAnswer : {"", "on", "\nyes"}) {
-    WriteScript("/usr/mero/sbin/mero-settings", "echo '"s + szAnswer + "'\n");
+  for (const char* szAnswer : {"", "on", "yes "}) {
+    WriteScript("/usr/mero/sbin/mero-settings",
+                "[ $1 = access-point ] || shift; shift; for value; do echo '"s + szAnswer + "'; done\n");
     for (const std::string question : {"! is_nat br0", "! comes_up_at_boot br0", "! is_on guest_net_lan_block"}) {
       const Ran ran = RunInParts(question + "\necho went on");
       EXPECT_EQ(ran.status, 1) << question;
@@ -84,7 +86,7 @@ TEST_F(Settings, EndTheScriptWhereTheyCannotBeRead) {
       {kApSettings, "guest_rules"},
       {kApSettings, "is_on guest_net_lan_block"},
       {"/tmp/wireless.info", "guest_rules"},
-      {"/tmp/wireless.info", "setting wifi_sched"},
+      {"/tmp/wireless.info", "read_setting wifi_sched"},
       {kBridgeScript, "is_nat br0"},
       {kBridgeScript, "make_bridge br0"},
       {"/etc/hostapd/hostapd-wlan0.info", "access_point_is wlan0 yes"},

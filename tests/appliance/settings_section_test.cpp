@@ -77,7 +77,7 @@ TEST_F(Settings, OfEveryAdapterAreReadAsTheyWereSaved) {
     ASSERT_EQ(MEROWirelessGetAPConfig(szName, &read), 1) << row.name;
     EXPECT_STREQ(read.szSecName, szName);
     EXPECT_EQ(read.txpower, power) << row.name;
-    EXPECT_EQ(Tells("setting txpower"), std::to_string(power)) << row.name;
+    EXPECT_EQ(Tells("read_setting txpower; printf '%s' \"$answer\""), std::to_string(power)) << row.name;
 
     WriteText(kFile, row.name);
     EXPECT_EQ(RunReader("section-name </tmp/file").out, row.name + "\n") << "it has one name only";

@@ -84,11 +84,13 @@ TEST_F(Settings, OfTheAccessPointAreReadByTheLibrary) {
 TEST_F(Settings, OfTheAccessPointAreReadByTheKitAsByTheLibrary) {
   for (const Reading& row : SectionReadings()) {
     WriteText(kApSettings, row.text);
-    EXPECT_EQ(Tells("setting " + row.key), row.value.value_or("")) << Shortened(row.text);
+    EXPECT_EQ(Tells("read_setting " + row.key + "; printf '%s' \"$answer\""), row.value.value_or(""))
+        << Shortened(row.text);
   }
   for (const Reading& row : AccessPointReadings()) {
     WriteText(kApSettings, row.text);
-    EXPECT_EQ(Tells("setting " + row.key), row.value) << row.key << " in " << Shortened(row.text);
+    EXPECT_EQ(Tells("read_setting " + row.key + "; printf '%s' \"$answer\""), row.value)
+        << row.key << " in " << Shortened(row.text);
     const bool number = !row.value->empty() && row.value->find_first_not_of("-0123456789") == std::string::npos;
     const int status = number && row.value != "0" ? 0 : 1;
     EXPECT_EQ(RunInParts("is_on " + row.key).status, status) << row.key << " in " << Shortened(row.text);

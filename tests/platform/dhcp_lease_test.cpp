@@ -109,6 +109,25 @@ TEST_F(ALease, IsAppliedAndGivenBack) {
   ExpectNothingLogged();
 }
 
+TEST_F(ALease, IsToldFromNone) {
+  const auto is_none = [] { return Run({"none", "net0"}) == 0; };
+  EXPECT_TRUE(is_none()) << "nor is there a file of name servers";
+  WriteText(kResolver, "nameserver 192.0.2.1\n# net0, By the DHCP client of net01, until it leaves the network:\n",
+            0644);
+  EXPECT_TRUE(is_none());
+  EXPECT_EQ(Bound({"router=10.1.0.1"}), 0);
+  EXPECT_FALSE(is_none()) << "a route";
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_TRUE(is_none());
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+  EXPECT_FALSE(is_none()) << "a name server";
+  EXPECT_EQ(Run({"left", "net0"}), 0);
+  EXPECT_EQ(Run({"servers", "net0", "10.1.0.3"}), 0);
+  EXPECT_FALSE(is_none()) << "a name server that was saved";
+  EXPECT_EQ(Run({"none", "eth5"}), 0);
+  EXPECT_NE(Run({"none", "../net0"}), 0);
+}
+
 TEST_F(ALease, IsGivenBackWithTheAddressesWhenTheClientBeginsAnew) {
   EXPECT_EQ(Bound({"router=10.1.0.1", "dns=10.1.0.2"}), 0);
   EXPECT_EQ(Run({"deconfig"}, {"interface=net0"}), 0);

@@ -1,5 +1,5 @@
-# Sweeps over the kit: each call of a program of the network fails once, one at a time. Everything happens within the appliance,
-# by guest/sweep: a call from outside takes longer than a start.
+# Sweeps over the kit: each call of a program of the network fails once, one at a time, and so does each command of a batch
+# of ip. Everything happens within the appliance, by guest/sweep: a call from outside takes longer than a start.
 # shellcheck shell=bash
 
 SWEPT=0

@@ -1,0 +1,90 @@
+// How many processes the network start script takes for what it does. Each takes longer than all that the shell does by
+// itself, and until the last of them has ended nobody can join.
+#include "kit_radio.h"
+
+namespace {
+
+// The scripts find no program but through a stand-in that notes it, so that none is left uncounted.
+class KitCost : public KitRadio {
+ protected:
+  KitCost() {
+    fs::create_directories("/tmp/noted");
+    WriteScript("/tmp/noted/tool", R"(echo "${0##*/}" >>/tmp/ran
+PATH=/tmp/bin:/usr/sbin:/usr/bin:/sbin:/bin
+exec "${0##*/}" "$@"
+)");
+    for (const char* szTool : kTools) fs::create_symlink("tool", std::string("/tmp/noted/") + szTool);
+    // The scripts name it by its path.
+    fs::remove("/usr/mero/sbin/mero-settings");
+    WriteScript("/usr/mero/sbin/mero-settings",
+                "echo mero-settings >>/tmp/ran\necho \"$*\" >>/tmp/asked\nexec " SETTINGS_PROGRAM " \"$@\"\n");
+    StandIn("hostapd", "log=$4\n" + Daemon("hostapd", "-P") +
+                           "ip link set dev wlan0 up; echo '17.5: wlan0: AP-ENABLED ' >>$log\n");
+    fs::copy(APPLIANCE_KIT "/sbin/udhcpc.lease", "/usr/mero/sbin/udhcpc.lease");
+    WriteText("/etc/resolv.conf", "nameserver 192.0.2.53\n");
+    RunInShell("mkdir -m 700 /run/rc.network");
+    WriteText("/usr/mero/etc/wireless_ap.conf", "[RT [5370]\n\tssid=home\n");
+    WriteText("/usr/mero/etc/wireless_country.conf", "country=\"DE\"\n");
+  }
+
+  // The programs that the script runs, in order.
+  static std::string ProgramsOf(const std::string& words) {
+    RunInShell("rm -f /tmp/ran /tmp/asked");
+    const Ran ran = RunInShell("PATH=/tmp/noted /etc/rc.network " + words);
+    EXPECT_EQ(ran.out, "");
+    EXPECT_EQ(ran.status, 0);
+    return RunInShell("xargs </tmp/ran").out;
+  }
+
+  static void SetGuests() {
+    WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+    WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  }
+};
+
+// There were 92 before the daemon, seven of them to read settings.
+TEST_F(KitCost, OfAStartIsNineProcessesBeforeTheDaemon) {
+  EXPECT_EQ(ProgramsOf("start wlan0 lbr0"), "find flock mero-settings ip nft dnsmasq chown iw sed hostapd\n");
+}
+
+TEST_F(KitCost, OfGuestsIsABridgeWithItsServerMore) {
+  SetGuests();
+  EXPECT_EQ(ProgramsOf("start wlan0 lbr0"),
+            "find flock mero-settings ip ip nft dnsmasq chown dnsmasq chown iw sed hostapd\n");
+}
+
+// Each was read anew for each thing that was to be known, so that an answer could be of another time than the next.
+TEST_F(KitCost, OfAStartIsOneReadingOfEachFile) {
+  SetGuests();
+  ProgramsOf("start wlan0 lbr0");
+  const std::string asked = " -- " + ReadText("/tmp/asked");
+  for (const char* szRequest :
+       {" access-point ", " bridge lbr0 ", " check /etc/dhcpd/dhcpd-lbr0-lbr0.info ",
+        " file /etc/dhcpd/dhcpd-lbr0-lbr0.conf ", " check /etc/hostapd/hostapd-wlan0-guest.info ",
+        " file /usr/mero/etc/wireless_country.conf "}) {
+    const size_t at = asked.find(szRequest);
+    EXPECT_NE(at, std::string::npos) << szRequest;
+    EXPECT_EQ(asked.find(szRequest, at + 1), std::string::npos) << szRequest;
+  }
+}
+
+TEST_F(KitCost, OfAnEndIsThirteenProcessesAndTheWaitForItsDaemons) {
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  const std::string programs = ProgramsOf("restart wlan0 lbr0");
+  EXPECT_EQ(Shell("echo '" + programs + "' | tr ' ' '\\n' | grep -v sleep | xargs"),
+            "find flock rm rm nft rm mero-settings rm ip ip ip iw rm\n");
+}
+
+TEST_F(KitCost, OfAnHourWithoutAChangeIsThreeProcesses) {
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(ProgramsOf("schedule wlan0"), "find flock mero-settings\n");
+}
+
+TEST_F(KitCost, OfABootIsTwoProcessesForEachBridge) {
+  WriteText("/etc/sysconfig/network-scripts/ifcfg-abr0",
+            "DEVICE=abr0\nTYPE=Bridge\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT=yes\n");
+  // The third file is that of the wireless interface.
+  EXPECT_EQ(ProgramsOf("boot"), "find flock mero-settings ip mero-settings ip mero-settings\n");
+}
+
+}  // namespace
