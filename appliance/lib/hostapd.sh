@@ -35,10 +35,12 @@ end_hostapd() { # INTERFACE
 # end_stray_hostapd INTERFACE: ends a daemon that its pid file does not name, as after a start with a full disk.
 end_stray_hostapd() {
 	for process in /proc/[0-9]*; do
-		name=''
+		name='' words=''
 		read -r name 2>/dev/null <"$process/comm" # in vain where it has just ended
-		if [ "$name" = hostapd ] && is_daemon hostapd "${process#/proc/}" && is_ours "$process" &&
-			grep -qF "$hostapd_run-$1.conf" "$process/cmdline" 2>/dev/null; then
+		[ "$name" = hostapd ] || continue
+		read -r words 2>/dev/null <"$process/cmdline" # which has no line feed, and whose null bytes are left out
+		case $words in *"$hostapd_run-$1.conf"*) ;; *) continue ;; esac
+		if is_daemon hostapd "${process#/proc/}" && is_ours "$process"; then
 			note "$hostapd_run-$1.pid" "${process#/proc/}"
 			end_daemon hostapd "$hostapd_run-$1.pid"
 		fi
@@ -48,11 +50,12 @@ end_stray_hostapd() {
 # is_ours PROCESS: whether root runs it, and it has this machine's files and network, and not those of a container. Any
 # user can run a process with the daemon's name, also one with root's rights; to end it may take seconds.
 is_ours() {
-	grep -qs '^Uid:[^0-9]*0[^0-9]' "$1/status" && [ "$(belongings_of "$1")" = "$(belongings_of /proc/self)" ]
-}
-
-belongings_of() { # PROCESS
-	stat -Lc %d:%i "$1/root" "$1/ns/net" 2>/dev/null
+	user=''
+	while read -r key value _; do
+		[ "$key" != Uid: ] || user=$value
+	done 2>/dev/null <"$1/status"
+	# shellcheck disable=SC3013  # the shell knows it
+	[ "$user" = 0 ] && [ "$1/root" -ef /proc/self/root ] && [ "$1/ns/net" -ef /proc/self/ns/net ]
 }
 
 # forget_configuration INTERFACE: removes the daemon's files, which hold secrets.
