@@ -392,6 +392,7 @@ TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
 // Gives the wire an address and a way out, and the file of a bridge that it is the first member of.
 void SetWire(const std::string& atBoot) {
   ASSERT_EQ(RunInShell("ip address add 192.0.2.9/24 dev eth0; ip link set eth0 up; ip link set wire up; "
+                       "until grep -qx up /sys/class/net/eth0/operstate; do sleep 0.05; done; "
                        "ip route add default via 192.0.2.1 metric 7; ip route add 198.51.100.0/24 via 192.0.2.2")
                 .out,
             "");
