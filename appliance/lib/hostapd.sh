@@ -188,18 +188,22 @@ await_access_point() { # INTERFACE LOG
 	fail "the access point on $1 does not come up: $reason"
 }
 
-# is_decided INTERFACE LOG: whether the daemon is on the air, or will not be. It may listen for radar first, for a minute
-# or more, and comes up by itself then. Its log says it at no cost, where nothing has to be scanned for.
+# is_decided INTERFACE LOG: whether the daemon is on the air, or will not be; it may have to scan first. It may also have to
+# listen for radar, for a minute or more, and comes up by itself then. It is asked only if its log does not tell its state.
 is_decided() {
-	outcome=ENABLED
-	while read -r line; do
-		case $line in *" $1: AP-ENABLED"*) return ;; esac
+	outcome=''
+	while read -r _ whose what is change _; do
+		[ "$whose $what $is" != "$1: interface state" ] || outcome=${change#*->}
 	done <"$2"
-	case $(hostapd_cli -p "$control" -i "$1" status 2>/dev/null) in
-	*state=ENABLED*) ;;
+	[ -n "$outcome" ] || outcome=$(hostapd_cli -p "$control" -i "$1" status 2>/dev/null)
+	case $outcome in
+	*state=ENABLED*) outcome=ENABLED ;;
 	*state=DFS*) outcome=DFS ;;
 	*state=DISABLED*) outcome=DISABLED ;;
-	*) outcome=ENDED && ! daemon_of hostapd "$hostapd_run-$1.pid" ;;
+	esac
+	case $outcome in
+	ENABLED | DFS | DISABLED) ;;
+	*) ! daemon_of hostapd "$hostapd_run-$1.pid" ;;
 	esac
 }
 
