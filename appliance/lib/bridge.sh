@@ -241,7 +241,7 @@ leave_bridge() { # INTERFACE BRIDGE
 # give_up_bridge BRIDGE [undo]: removes the bridge, unless it comes up at boot and has other members, whom it may serve.
 # With "undo", a bridge that was made for the start that failed goes in any case.
 give_up_bridge() {
-	if [ -n "${2-}" ] && [ -e "$state/wire-$1" ]; then
+	if [ -n "${2-}" ] && [ -s "$state/wire-$1" ]; then
 		give_wire_back "$1"
 	elif comes_up_at_boot "$1" && has_members "$1"; then
 		serve_addresses "$1"

@@ -104,10 +104,14 @@ give_up() { # NEW-FILE TEXT
 }
 
 # note FILE TEXT: writes the text and a line feed, or nothing, into a file of the state directory, with the mode 600. The
-# directory is root's alone, so that the file needs no other name first.
+# directory is root's alone, so that the file needs no other name first. What is told by a text is not told by a file that
+# is empty, as a run leaves it that is killed here.
 note() {
 	umask 077
-	write_note "$@" 2>/dev/null || said=$(write_note "$@" 2>&1) || fail "cannot write $1: ${said##*: }"
+	write_note "$@" 2>/dev/null || said=$(write_note "$@" 2>&1) || {
+		[ ! -f "$1" ] || rm -f "$1"
+		fail "cannot write $1: ${said##*: }"
+	}
 	umask 022
 }
 

@@ -15,7 +15,7 @@ set_firewall() { # BRIDGE
 	text=$(rules "$1") || exit 1
 	rights=$(rights_of_guests) || exit 1
 	first=''
-	if [ ! -e "$forwarding_before" ]; then
+	if [ ! -s "$forwarding_before" ]; then
 		first=yes
 		before=''
 		read -r before <"$forwarding" # a switch tells its one digit, and nothing behind it
@@ -33,7 +33,7 @@ set_firewall() { # BRIDGE
 # Without the note there are no rules, and nft is not run: it may not be installed. The forwarding switch gets its
 # former value back, since others may need it on.
 clear_firewall() {
-	[ -e "$forwarding_before" ] || return 0
+	[ -s "$forwarding_before" ] || return 0
 	read -r before <"$forwarding_before" || cannot_read "$forwarding_before"
 	echo "$before" >"$forwarding" || fail 'cannot stop passing traffic on between networks'
 	said=$(set_rules '') || fail "cannot remove the rules between networks: $said"

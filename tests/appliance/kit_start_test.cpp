@@ -134,6 +134,33 @@ TEST_F(KitAccessPoint, IsTakenDownWhateverStepFails) {
   }
 }
 
+TEST_F(KitAccessPoint, IsStartedAndTakenDownBesideNotesThatSomebodyWasKilledOver) {
+  for (const char* szNote : {"ip_forward", "wire-lbr0", "bridge-wlan0"}) {
+    const std::string leave = "mkdir -p -m 700 /run/rc.network; >/run/rc.network/" + std::string(szNote);
+    RunInShell(leave);
+    EXPECT_EQ(Script("restart wlan0 lbr0").out, "") << szNote;
+    RunInShell(leave);
+    BreakOnce("hostapd");
+    EXPECT_EQ(Script("start wlan0 lbr0").out,
+              "rc.network: cannot start the access point on wlan0: hostapd is broken\n");
+    RunInShell(leave);
+    EXPECT_EQ(Script("start wlan0 lbr0").out, "") << szNote;
+    EXPECT_EQ(Script("restart wlan0 lbr0").out, "") << szNote;
+    RunInShell("rm -f /run/rc.network/" + std::string(szNote));
+    EXPECT_EQ(Left(), "") << szNote;
+  }
+}
+
+// A full disk left a note without what it tells, which no later run could read.
+TEST_F(KitAccessPoint, LeavesNoNoteThatCouldNotBeWritten) {
+  EXPECT_EQ(RunInShell("mount -t tmpfs -o size=8k none /run && mkdir -m 700 /run/rc.network && "
+                       "head -c 8192 /dev/zero >/run/full; ls /run/rc.network")
+                .out,
+            "");
+  EXPECT_THAT(RunInParts("note $forwarding_before 1").out, HasSubstr("cannot write /var/run/rc.network/ip_forward: "));
+  EXPECT_FALSE(fs::exists("/run/rc.network/ip_forward"));
+}
+
 // A second call to disable the access point, after one that failed, cannot name its bridge any more.
 TEST_F(KitAccessPoint, IsTakenDownWithItsBridgeWhenNobodyNamesThat) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
