@@ -197,6 +197,9 @@ int PLIBCFileRemoveKey(const char* szPath, const char* szKey);
  *
  * @param ppslList  the address of the caller's list pointer; names are appended.
  * @return how many were appended, 0 also for a missing file; -1 on failure.
+ *
+ * An empty list that gets the names of /usr/mero/etc/wireless.conf keeps the file's text for MEROWirelessConfGet(),
+ * until it is freed; the secrets in it are wiped then.
  */
 int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList);
 
@@ -285,12 +288,15 @@ int MEROWirelessCurInfoGet(WIRELESS_REQUEST request, PWIRELESS_INFO pInfo);
 /**
  * Reads a known network from /usr/mero/etc/wireless.conf.
  *
- * @param szSection  the section's name: the access point's address as text.
+ * @param szSection  the section's name: the access point's address as text. The very pointer that PLIBCSzListGet()
+ *                   gives for a list of PLIBCFileEnumSection() stands for the section as it was when the list was made;
+ *                   any other is looked for in the file as it is.
  * @param pNetCfg    receives the network; untouched unless it was read. A missing or malformed value leaves its field
  *                   empty or unknown; a time beyond 32 bits becomes the greatest.
  * @return 0; -1 when there is no such section or the file cannot be read.
  *
- * Reading sections in the order of the file takes time linear in the file, however many there are.
+ * Reads the file, in linear time, but not for the pointers of a list: one after another, all sections of a list take
+ * time linear in the file, too.
  */
 int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg);
 

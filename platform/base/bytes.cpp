@@ -6,6 +6,7 @@
 #include <cstring>
 
 Bytes::~Bytes() {
+  if (data_ != nullptr) ::explicit_bzero(data_, size_);
   std::free(data_);
 }
 

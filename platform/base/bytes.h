@@ -1,4 +1,5 @@
-// A growing run of bytes: a file that was read, or the content that it is to get.
+// A growing run of bytes: a file that was read, or the content that it is to get. What was read may hold secrets, so
+// that the memory is wiped before it is freed.
 #ifndef MERO_PLATFORM_BYTES_H
 #define MERO_PLATFORM_BYTES_H
 

@@ -1,13 +1,16 @@
 // Reading one known network.
-#include "platform/core/known_network.h"
-
 #include <algorithm>
 #include <cstring>
 
 #include "common/clock.h"
 #include "common/known_networks_file.h"
+#include "common/paths.h"
 #include "common/text.h"
+#include "platform/base/failure.h"
+#include "platform/base/file_read.h"
 #include "platform/core/radio_texts.h"
+#include "platform/core/section_text.h"
+#include "platform/core/text_list.h"
 
 namespace {
 
@@ -54,16 +57,30 @@ void Take(const Pair& pair, WIRELESS_NETWORK_CONFIG& config) {
   if (key == kKeyEncrypt) network.encrypt = ParseWord(MEROWirelessEncryptParse, value);
 }
 
-}  // namespace
-
-Status ReadKnownNetwork(std::string_view text, const std::optional<SectionPlace>& place,
-                        WIRELESS_NETWORK_CONFIG& config) {
-  if (!place) return Status::Failed(kNoSection);
+// Fills the record with the network that a section describes.
+void Read(std::string_view text, const SectionPlace& place, WIRELESS_NETWORK_CONFIG& config) {
   config = {};
   config.network.opmode = WIRELESS_OPMODE_UNKNOWN;
-  for (Lines lines = LinesOf(text, *place); lines.Next();) {
+  for (Lines lines = LinesOf(text, place); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
     if (pair) Take(*pair, config);
   }
-  return Status::Ok();
+}
+
+}  // namespace
+
+int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg) {
+  if (szSection == nullptr || pNetCfg == nullptr) return REFUSE_NULL(), -1;
+  if (const std::optional<std::string_view> section = SectionOfItem(szSection)) {
+    Read(*section, {0, LineEnd(*section, 0), section->size()}, *pNetCfg);
+    return 0;
+  }
+
+  Result<Bytes> file = ReadFile(kKnownNetworksPath);
+  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), -1;
+  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", kKnownNetworksPath), -1;
+  const std::optional<SectionPlace> place = FindSection(file->view(), szSection);
+  if (!place) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
+  Read(file->view(), *place, *pNetCfg);
+  return 0;
 }

@@ -1,4 +1,7 @@
 // Section files.
+#include <cstring>
+
+#include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/failure.h"
 #include "platform/base/file_edit.h"
@@ -134,12 +137,15 @@ int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList) {
 
   PLIBSZLIST& list = **ppslList;
   const int before = list.nItem;
+  const bool keep = CanKeepFile(list) && std::strcmp(szPath, kKnownNetworksPath) == 0;
   for (Sections sections(file->view()); sections.Next();) {
-    if (!AppendToList(list, sections.name())) {
+    const bool known = keep && sections.name().find('\0') == std::string_view::npos;  // else no name leads to it
+    if (!AppendToList(list, sections.name(), known ? sections.whole() : std::string_view())) {
       TruncateList(list, before);
       return FAIL(ENOMEM, "Failed to read %s", szPath), -1;
     }
   }
+  if (keep) KeepFile(list, std::move(*file));
   return list.nItem - before;
 }
 

@@ -91,12 +91,6 @@ std::optional<SectionPlace> FindSection(std::string_view text, std::string_view 
   return std::nullopt;
 }
 
-size_t CountSections(std::string_view text) {
-  size_t count = 0;
-  for (Sections sections(text); sections.Next();) ++count;
-  return count;
-}
-
 std::optional<LinePlace> FindKey(std::string_view text, std::string_view key, ValueForm form) {
   std::optional<LinePlace> place;
   for (Lines lines(text); lines.Next();) {

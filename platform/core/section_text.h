@@ -91,6 +91,7 @@ class Sections {
   bool Next();
 
   std::string_view name() const { return name_; }
+  std::string_view whole() const { return Slice(text_, place_.header, place_.end); }  // with its header
   const SectionPlace& place() const { return place_; }
 
  private:
@@ -111,9 +112,6 @@ class Sections {
 
 // The first section of that name; none when absent. Names compare without regard to ASCII case.
 std::optional<SectionPlace> FindSection(std::string_view text, std::string_view name);
-
-// How many sections there are, those included that stand twice.
-size_t CountSections(std::string_view text);
 
 // Where a key's line stands in a text, as offsets. When the key stands there several times, its last line counts. None
 // when the key is absent.

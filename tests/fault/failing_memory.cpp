@@ -3,6 +3,8 @@
 // The real allocators are called by their other names: looking them up by dlsym() would take memory.
 #include "tests/fault/failing_memory.h"
 
+#include <malloc.h>
+
 #include <cerrno>
 #include <cstddef>
 #include <cstring>
@@ -33,6 +35,11 @@ namespace {
 int g_untilFailure = 0;  // allocations until the one that fails; 0 when none is to
 bool g_failed = false;
 int g_blocks = 0;
+// The text that freed blocks are searched for; none when it is null. No class: free() is called before the sanitizer
+// has made ready, and the functions of a class may be the checked ones of another source.
+const char* g_watched = nullptr;
+size_t g_watchedSize = 0;
+int g_freedWithIt = 0;
 
 bool Fails() {
   if (g_untilFailure == 0 || --g_untilFailure > 0) return false;
@@ -67,6 +74,9 @@ void* realloc(void* block, size_t size) {
 
 void free(void* block) {
   if (block != nullptr) --g_blocks;
+  const bool holdsIt = block != nullptr && g_watched != nullptr &&
+                       ::memmem(block, ::malloc_usable_size(block), g_watched, g_watchedSize) != nullptr;
+  if (holdsIt) ++g_freedWithIt;
   REAL(free)(block);
 }
 
@@ -89,4 +99,13 @@ MemoryOutcome RunWithoutMemory(int n, const std::function<int()>& operation) {
   const int result = operation();
   g_untilFailure = 0;
   return {g_failed, result, g_blocks - before};
+}
+
+int CountFreedWith(std::string_view text, const std::function<void()>& operation) {
+  g_freedWithIt = 0;
+  g_watchedSize = text.size();
+  g_watched = text.data();
+  operation();
+  g_watched = nullptr;
+  return g_freedWithIt;
 }

@@ -3,6 +3,7 @@
 #define MERO_TESTS_FAULT_FAILING_MEMORY_H
 
 #include <functional>
+#include <string_view>
 
 struct MemoryOutcome {
   bool failed = false;  // an allocation has failed
@@ -12,5 +13,8 @@ struct MemoryOutcome {
 
 // Runs an operation whose nth allocation fails, from 1 on, and no other.
 MemoryOutcome RunWithoutMemory(int n, const std::function<int()>& operation);
+
+// How many of the blocks that an operation frees hold a text still.
+int CountFreedWith(std::string_view text, const std::function<void()>& operation);
 
 #endif  // MERO_TESTS_FAULT_FAILING_MEMORY_H

@@ -1,15 +1,10 @@
-// Reading the known networks one after another, from the first to the last, while others may write to the file.
+// Reading the known networks one after another, by the names of a list of them, while others may write to the file.
 #include <fcntl.h>
 #include <sys/inotify.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
-#include <chrono>
-#include <ctime>
 #include <filesystem>
-#include <thread>
-#include <utility>
+#include <memory>
 
 #include "common/known_networks_file.h"
 #include "common/paths.h"
@@ -53,6 +48,26 @@ class OpenCounter {
   int watch_ = ::inotify_init1(IN_NONBLOCK | IN_CLOEXEC);
 };
 
+// The known networks, as a list of their names has them.
+class ListedNetworks {
+ public:
+  ListedNetworks() : count_(PLIBCFileEnumSection(kKnownNetworksPath, names_.address())) {}
+
+  int count() const { return count_; }
+  PPLIBSZLIST names() const { return names_.get(); }
+  const char* NameOf(int i) const { return PLIBCSzListGet(names_.get(), i); }
+  std::string EssidOf(int i) const { return EssidOfName(NameOf(i)); }
+
+  static std::string EssidOfName(const char* szName) {
+    WIRELESS_NETWORK_CONFIG config = {};
+    return MEROWirelessConfGet(szName, &config) == 0 ? config.network.szEssid : "(none)";
+  }
+
+ private:
+  TextList names_;
+  int count_;
+};
+
 class Walk : public PlatformTest {
  protected:
   void SetUp() override {
@@ -60,13 +75,12 @@ class Walk : public PlatformTest {
     std::filesystem::remove_all(kKnownNetworksPath);
   }
 
-  static std::string EssidOf(int i) {
-    WIRELESS_NETWORK_CONFIG config = {};
-    return MEROWirelessConfGet(NameOf(i).c_str(), &config) == 0 ? config.network.szEssid : "(none)";
-  }
+  static std::string EssidOf(int i) { return ListedNetworks::EssidOfName(NameOf(i).c_str()); }
 
   static void WalkOver(int count) {
-    for (int i = 0; i < count; ++i) ASSERT_EQ(EssidOf(i), "old") << i;
+    const ListedNetworks networks;
+    ASSERT_EQ(networks.count(), count);
+    for (int i = 0; i < count; ++i) ASSERT_EQ(networks.EssidOf(i), "old") << i;
   }
 
   // As another process.
@@ -80,18 +94,19 @@ class Walk : public PlatformTest {
     const ssize_t put = ::pwrite(fd, text.data(), text.size(), offset);
     return ::close(fd) == 0 && put == static_cast<ssize_t>(text.size());
   }
+
+  // Where the name of a network stands in a file of old ones.
+  static off_t PlaceOfEssid(int i) { return static_cast<off_t>(Networks(i).size() + TextOf(i, "").find("ESSID=") + 6); }
 };
 
 TEST_F(Walk, SeesEveryNetworkOnce) {
   WriteText(kKnownNetworksPath, Networks(100));
-  LetSettle(kKnownNetworksPath);
   for (int round = 0; round < 3; ++round) WalkOver(100);
 }
 
-TEST_F(Walk, ReadsTheFileOnceAndKeepsNothingOfItBehindTheLastNetwork) {
-  for (const int count : {1, 2, 100}) {
+TEST_F(Walk, ReadsTheFileOnceHoweverManyNetworksThereAre) {
+  for (const int count : {1, 2, 100, 10'000}) {
     WriteText(kKnownNetworksPath, Networks(count));
-    LetSettle(kKnownNetworksPath);
     for (int round = 0; round < 3; ++round) {
       OpenCounter opens(kKnownNetworksPath);
       WalkOver(count);
@@ -100,125 +115,103 @@ TEST_F(Walk, ReadsTheFileOnceAndKeepsNothingOfItBehindTheLastNetwork) {
   }
 }
 
-TEST_F(Walk, KeepsNothingBehindTheLastNetworkOfAnyFile) {
-  const std::string_view contents[] = {
-      "[a]\n[b]\n[a]\n",          "[a]\n[a]\n[a]\n", "[a]\n[b]\n[B]\n", "junk\nKEY=value\n[a]\n[]\n[ b ]\n",
-      {"[a]\n[b\0c]\n[d]\n", 14},
-  };
-  for (const std::string_view content : contents) {
-    WriteText(kKnownNetworksPath, content);
-    LetSettle(kKnownNetworksPath);
-    for (int round = 0; round < 3; ++round) {
-      TextList names;
-      ASSERT_EQ(PLIBCFileEnumSection(kKnownNetworksPath, names.address()), names.get()->nItem);
-      OpenCounter opens(kKnownNetworksPath);
-      for (int i = 0; i < names.get()->nItem; ++i) {
-        WIRELESS_NETWORK_CONFIG config;
-        (void)MEROWirelessConfGet(PLIBCSzListGet(names.get(), i), &config);
-        if (i > 0) continue;
-        EXPECT_EQ(opens.Take(), 1) << "nothing was there to take the first from: " << content << ", round " << round;
-      }
-    }
-  }
+TEST_F(Walk, ReadsTheFileForANameThatIsNotTheListsOwn) {
+  WriteText(kKnownNetworksPath, Networks(4));
+  const ListedNetworks networks;
+  OpenCounter opens(kKnownNetworksPath);
+  EXPECT_EQ(EssidOf(2), "old");
+  EXPECT_EQ(opens.Take(), 1);
+  EXPECT_EQ(ListedNetworks::EssidOfName(networks.NameOf(2) + 1), "(none)");
+  EXPECT_EQ(opens.Take(), 1);
 }
 
-TEST_F(Walk, SeesAFileThatAnotherProcessPutInPlace) {
+// It was kept until as many networks were asked for as there are, whatever became of the list.
+TEST_F(Walk, KeepsNothingOfTheFileBehindTheList) {
   WriteText(kKnownNetworksPath, Networks(4));
-  LetSettle(kKnownNetworksPath);
-  WalkOver(2);
+  OpenCounter opens(kKnownNetworksPath);
+  std::string name;
+  {
+    const ListedNetworks networks;
+    name = networks.NameOf(1);
+    EXPECT_EQ(networks.EssidOf(0), "old");
+  }
+  EXPECT_EQ(opens.Take(), 1);
+  EXPECT_EQ(ListedNetworks::EssidOfName(name.c_str()), "old");
+  EXPECT_EQ(opens.Take(), 1);
+}
+
+TEST_F(Walk, SeesOneAndTheSameFileThroughoutWhateverAnotherProcessWrites) {
+  WriteText(kKnownNetworksPath, Networks(4));
+  Elsewhere([] { return Overwrite(PlaceOfEssid(0), "new"); });
+  const ListedNetworks networks;
+  EXPECT_EQ(networks.EssidOf(0), "new") << "written before the list was made";
+  Elsewhere([] { return Overwrite(PlaceOfEssid(1), "new"); });
+  EXPECT_EQ(networks.EssidOf(1), "old") << "written over since";
   Elsewhere(
       [] { return PLIBCFileSetSectionValue(kKnownNetworksPath, NameOf(2).c_str(), "ESSID", "new", "\t%s=%s\n") == 0; });
-  EXPECT_EQ(EssidOf(2), "new");
-  EXPECT_EQ(EssidOf(3), "old");
-}
-
-TEST_F(Walk, SeesAnEditOfTheFileByAnotherProcess) {
-  WriteText(kKnownNetworksPath, Networks(4));
-  LetSettle(kKnownNetworksPath);
-  WalkOver(2);
-  const auto essid = static_cast<off_t>(Networks(2).size() + TextOf(2, "").find("ESSID=") + 6);
-  Elsewhere([&] { return Overwrite(essid, "new"); });
-  EXPECT_EQ(EssidOf(2), "new");
-  EXPECT_EQ(EssidOf(3), "old");
-}
-
-// Two files may well have been written in one tick, and be equal in everything but what they hold.
-TEST_F(Walk, SeesThatALinkWasTurnedToAnotherFile) {
-  const auto changed = [](const char* szPath) {
-    struct stat info = {};
-    EXPECT_EQ(::stat(szPath, &info), 0);
-    return std::pair(info.st_ctim.tv_sec, info.st_ctim.tv_nsec);
-  };
-  constexpr char kOld[] = "/tmp/platform/old";
-  constexpr char kNew[] = "/tmp/platform/new";
-  do {
-    std::filesystem::remove(kOld);
-    std::filesystem::remove(kNew);
-    WriteText(kOld, Networks(4, "old"));
-    WriteText(kNew, Networks(4, "new"));
-  } while (changed(kOld) != changed(kNew));
-  std::filesystem::create_symlink(kOld, kKnownNetworksPath);
-  LetSettle(kKnownNetworksPath);
-  WalkOver(2);
+  EXPECT_EQ(networks.EssidOf(2), "old") << "replaced since";
   std::filesystem::remove(kKnownNetworksPath);
-  std::filesystem::create_symlink(kNew, kKnownNetworksPath);
-  EXPECT_EQ(EssidOf(2), "new");
+  EXPECT_EQ(networks.EssidOf(3), "old") << "removed since";
+  EXPECT_EQ(EssidOf(3), "(none)");
 }
 
-// File times advance in ticks, so that of two edits within one the second may not show in them.
-TEST_F(Walk, SeesAnEditThatComesRightBehindAnother) {
-  const auto essid = static_cast<off_t>(Networks(1).size() + TextOf(1, "").find("ESSID=") + 6);
-  for (int round = 0; round < 200; ++round) {
-    WriteText(kKnownNetworksPath, Networks(4));
-    ASSERT_EQ(EssidOf(0), "old");
-    ASSERT_TRUE(Overwrite(essid, "new"));
-    ASSERT_EQ(EssidOf(1), "new") << round;
-  }
+TEST_F(Walk, IsOfTheFileAsItWasWhenItsOwnListWasMade) {
+  WriteText(kKnownNetworksPath, Networks(2, "old"));
+  auto before = std::make_unique<ListedNetworks>();
+  WriteText(kKnownNetworksPath, Networks(2, "new"));
+  const ListedNetworks behind;
+  EXPECT_EQ(before->EssidOf(0), "old");
+  EXPECT_EQ(behind.EssidOf(0), "new");
+  EXPECT_EQ(before->EssidOf(1), "old");
+  before.reset();
+  EXPECT_EQ(behind.EssidOf(1), "new");
 }
 
-TEST_F(Walk, SeesThatTheFileWasRemovedOrEmptied) {
+TEST_F(Walk, GoesOnBehindANameThatIsTakenOutOfTheList) {
   WriteText(kKnownNetworksPath, Networks(4));
-  LetSettle(kKnownNetworksPath);
-  WalkOver(2);
-  std::filesystem::rename(kKnownNetworksPath, "/usr/mero/etc/aside");
-  EXPECT_EQ(EssidOf(2), "(none)");
-  std::filesystem::rename("/usr/mero/etc/aside", kKnownNetworksPath);
-  WalkOver(2);
+  const ListedNetworks networks;
+  EXPECT_EQ(networks.EssidOf(0), "old");
+  ASSERT_EQ(PLIBCSzListRemove(networks.names(), 1), 0);
   WriteText(kKnownNetworksPath, "");
-  EXPECT_EQ(EssidOf(2), "(none)");
+  for (const int i : {1, 2, 0}) EXPECT_EQ(networks.EssidOf(i), "old") << i;
 }
 
-TEST_F(Walk, FindsASectionWhateverItsCaseAndTheFirstOfItsName) {
-  WriteText(kKnownNetworksPath,
-            TextOf(0, "old") + "[NETWORK 1]\n\tESSID=old\n" + TextOf(1, "second") + TextOf(2, "old"));
-  LetSettle(kKnownNetworksPath);
+TEST_F(Walk, ReadsTheFileForNamesThatWereAddedToAList) {
+  WriteText(kKnownNetworksPath, Networks(2, "old"));
+  const ListedNetworks networks;
+  WriteText(kKnownNetworksPath, Networks(2, "new"));
+  PPLIBSZLIST list = networks.names();
+  ASSERT_EQ(PLIBCFileEnumSection(kKnownNetworksPath, &list), 2);
+  const char* const essids[] = {"old", "old", "new", "new"};
+  for (int i = 0; i < 4; ++i) EXPECT_EQ(networks.EssidOf(i), essids[i]) << i;
+}
+
+TEST_F(Walk, IsNotLedAstrayByTheNamesOfAnotherFile) {
+  constexpr char kOther[] = "/tmp/platform/other";
+  WriteText(kOther, Networks(2, "other"));
+  WriteText(kKnownNetworksPath, Networks(2));
+  TextList names;
+  ASSERT_EQ(PLIBCFileEnumSection(kOther, names.address()), 2);
+  EXPECT_EQ(ListedNetworks::EssidOfName(PLIBCSzListGet(names.get(), 1)), "old");
+}
+
+TEST_F(Walk, FindsTheFirstSectionOfANameWhateverItsCase) {
+  WriteText(kKnownNetworksPath, TextOf(0, "old") + "[NETWORK 1]\n\tESSID=old\n" + TextOf(1, "second"));
   WalkOver(3);
+}
+
+TEST_F(Walk, FindsNothingForANameThatNoneCanAskFor) {
+  WriteText(kKnownNetworksPath, std::string("[a\0b]\n\tESSID=old\n[c]\n\tESSID=old\n", 33));
+  const ListedNetworks networks;
+  EXPECT_EQ(networks.EssidOf(0), "(none)");
+  EXPECT_EQ(networks.EssidOf(1), "old");
 }
 
 TEST_F(Walk, FindsNetworksInAnyOrderAndNoneThatIsNotThere) {
   WriteText(kKnownNetworksPath, Networks(10));
-  LetSettle(kKnownNetworksPath);
-  for (const int i : {0, 5, 3, 3, 0, 11, 9, 2, 10, 1, 9, 9, 0, 4})
-    EXPECT_EQ(EssidOf(i), i < 10 ? "old" : "(none)") << i;
-}
-
-TEST_F(Walk, TakesTimeInProportionToTheNumberOfNetworks) {
-  const auto seconds = [](int count) {
-    WriteText(kKnownNetworksPath, Networks(count));
-    LetSettle(kKnownNetworksPath);
-    double least = 1e9;
-    for (int round = 0; round < 3; ++round) {
-      timespec begin;
-      timespec end;
-      ::clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &begin);
-      WalkOver(count);
-      ::clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &end);
-      least = std::min(least, static_cast<double>(end.tv_sec - begin.tv_sec) +
-                                  static_cast<double>(end.tv_nsec - begin.tv_nsec) / 1e9);
-    }
-    return least;
-  };
-  EXPECT_LT(seconds(10'000), 40 * seconds(1'000));  // a hundred times as long, were each a reading of its own
+  const ListedNetworks networks;
+  for (const int i : {0, 5, 3, 3, 0, 9, 2, 1, 9, 9, 0, 4}) EXPECT_EQ(networks.EssidOf(i), "old") << i;
+  for (const int i : {0, 5, 3, 3, 0, 11, 9, 2, 10}) EXPECT_EQ(EssidOf(i), i < 10 ? "old" : "(none)") << i;
 }
 
 }  // namespace
