@@ -324,7 +324,7 @@ race_to_serve() {  # ROUND
 put_up_neighbours() {
   local index
   for index in "${!NEIGHBOUR_CHANNELS[@]}"; do
-    neighbour "neighbour$index" "${NEIGHBOUR_CHANNELS[index]}" $((-50 - 4 * index))
+    neighbour "neighbour$index" "${NEIGHBOUR_CHANNELS[index]}" $((-48 - 2 * index))
   done
 }
 

@@ -78,9 +78,10 @@ function median(row, column, unit, digits) {
 
 function heading(table,    part) {
 	split(table, part, FS)
-	return sprintf("%s, %s, %s GHz, %s: medians of %d (the least and the most)",
+	return sprintf("%s, %s, %s GHz, %s: medians of %d%s",
 		part[1] == "join" ? "Joining" : "Access point",
-		part[2] == "alone" ? "alone" : "among eight access points", part[3], part[4], most[table])
+		part[2] == "alone" ? "alone" : "among eight access points", part[3], part[4], most[table],
+		most[table] > 1 ? " (the least and the most)" : "")
 }
 
 END {
