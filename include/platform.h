@@ -357,8 +357,9 @@ WIRELESS_PROTOCOL MEROWirelessProtocolParse(const char* szProtocol);
  *
  * @return 1; 0 on failure.
  *
- * A client's wireless adapter that was down begins to scan, so that results are there when somebody asks for them; the
- * call does not wait for that, and whether the adapter scans makes no difference to its result.
+ * A client's wireless adapter that was down, and has heard of no network lately, begins to scan, so that results are
+ * there when somebody asks for them; the call does not wait for that, and whether the adapter scans makes no difference
+ * to its result.
  */
 int PLIBNetIfUp(const char* szIfName);
 

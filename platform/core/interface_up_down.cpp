@@ -6,7 +6,7 @@
 
 namespace {
 
-// A client's adapter that is down: neither in a network nor an access point, and whatever it heard is long gone.
+// A client's adapter that is down: neither in a network nor an access point.
 bool IsIdleClient(const Radio& radio) {
   Result<bool> up = radio.IsUp();
   Result<WIRELESS_OPMODE> mode = radio.Mode();
@@ -15,8 +15,8 @@ bool IsIdleClient(const Radio& radio) {
 
 }  // namespace
 
-// Whoever brings a client's adapter up asks next for the networks in range, so it scans meanwhile. Without that scan
-// it is up all the same.
+// Whoever brings a client's adapter up asks next for the networks in range, so it scans meanwhile if it knows of none.
+// Without that scan it is up all the same.
 int PLIBNetIfUp(const char* szIfName) {
   if (szIfName == nullptr) return REFUSE_NULL(), 0;
   Result<Radio> radio = Radio::OfAdapter(szIfName);
@@ -24,7 +24,7 @@ int PLIBNetIfUp(const char* szIfName) {
   if (Status status = SetInterfaceUp(szIfName, true); !status.ok()) {
     return FAIL(status.error(), "Failed to bring up %s", szIfName), 0;
   }
-  if (scans) (void)radio->Scan();
+  if (scans && !radio->KnowsNetworks()) (void)radio->Scan();
   return 1;
 }
 

@@ -92,6 +92,13 @@ Status Radio::Leave() const {
   return Status::Of(::ioctl(control_.get(), SIOCSIWMLME, &*request));
 }
 
+bool Radio::KnowsNetworks() const {
+  char none[1];
+  Result<iwreq> request = RequestFor<iwreq>(szIfName_);
+  request->u.data.pointer = none;  // with no room for any
+  return ::ioctl(control_.get(), SIOCGIWSCAN, &*request) < 0 && errno == E2BIG;
+}
+
 Status Radio::Scan() const {
   Result<iwreq> request = RequestFor<iwreq>(szIfName_);
   return Status::Of(::ioctl(control_.get(), SIOCSIWSCAN, &*request));

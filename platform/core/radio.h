@@ -29,6 +29,9 @@ class Radio {
   // Leaves the current network or cell.
   Status Leave() const;
 
+  // Whether the kernel knows of a network that the radio has heard, while the interface is up and does not scan.
+  bool KnowsNetworks() const;
+
   // Has the radio scan for all networks in range; does not wait for it.
   Status Scan() const;
 

@@ -80,6 +80,13 @@ TEST_F(AnAdapter, DoesNotScanForBeingBroughtUpAgain) {
   EXPECT_THAT(driver_.told, ElementsAre("up"));
 }
 
+// Whoever asked for what was known waited for the end of a scan.
+TEST_F(AnAdapter, DoesNotScanWhileItKnowsOfNetworks) {
+  driver_.hasResults = true;
+  EXPECT_EQ(PLIBNetIfUp("wlan3"), 1);
+  EXPECT_THAT(driver_.told, ElementsAre("up"));
+}
+
 TEST_F(AnAdapter, ThatIsNoClientsDoesNotScan) {
   for (const WIRELESS_OPMODE mode :
        {WIRELESS_OPMODE_AUTO, WIRELESS_OPMODE_ADHOC, WIRELESS_OPMODE_MASTER, WIRELESS_OPMODE_MONITOR}) {

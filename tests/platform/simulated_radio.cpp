@@ -101,6 +101,9 @@ int SimulatedDriver::Answer(unsigned long request, void* argument) {
       told.push_back(order.cmd == IW_MLME_DISASSOC || order.cmd == IW_MLME_DEAUTH ? "leave" : "something else");
       return 0;
     }
+    case SIOCGIWSCAN:
+      if (wireless.u.data.pointer == nullptr) return Fail(EFAULT);
+      return hasResults ? Fail(E2BIG) : 0;  // for whoever brings no room
     case SIOCSIWSCAN:
       if (scanRefusal != 0) return Fail(scanRefusal);
       told.push_back(wireless.u.data.pointer == nullptr && wireless.u.data.length == 0 && wireless.u.data.flags == 0

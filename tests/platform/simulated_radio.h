@@ -30,6 +30,7 @@ class SimulatedDriver {
 
   int refusal = 0;      // the errno that every request meets; 0 for none
   int scanRefusal = 0;  // the errno that a request to scan meets
+  bool hasResults = false;
   unsigned mode = 2;
   std::array<unsigned char, 6> accessPoint = {};
   std::string name;

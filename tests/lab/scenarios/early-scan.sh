@@ -70,6 +70,12 @@ on nas mero-call scan last
 expect_line "$square"
 expect_scans nas 0
 
+say '-- nor one that was down for a moment, and has heard of networks'
+inside nas ip link set wlan0 down
+on nas mero-call scan last
+expect_line "$square"
+expect_scans nas 0
+
 say '-- while somebody else scans, a reading waits for what that finds'
 access_point newcomer ssid=newcomer channel=11 signal=-60
 begin_scan nas
@@ -111,7 +117,8 @@ on shelf mero-call disconnect
 expect_line result=0
 
 say '-- an access point comes up beside a scan that has just begun'
-inside shelf ip link set wlan0 down
-inside shelf mero-call scan last >/dev/null {STEPS}>&- &
+inside shelf ip link set wlan0 up
+SCANS[shelf]=$(started_scans shelf)
+begin_scan shelf
 serves shelf ssid=shelf channel=6
 guest_of shelf nas essid=shelf auth=OPEN encrypt=NONE
