@@ -4,7 +4,8 @@
 
 control=/var/run/hostapd
 
-start_hostapd() { # INTERFACE
+# start_hostapd INTERFACE: starts it. await_access_point waits until it is on the air.
+start_hostapd() {
 	configuration=$hostapd_run-$1.conf log=$hostapd_run-$1.log pid=$hostapd_run-$1.pid
 	write_configuration "$1" "$configuration"
 	make_named_files
@@ -15,9 +16,6 @@ start_hostapd() { # INTERFACE
 		reason=$(reason_in "$log" "$said")
 		fail "cannot start the access point on $1: $reason"
 	}
-	await 2 is_written "$pid"
-	await_access_point "$1" "$log"
-	daemon_of hostapd "$pid" || fail "the access point on $1 has not noted its process"
 }
 
 # Anyone in range can make the daemon log a line with each frame, so the log is limited to 1 MiB.
@@ -181,20 +179,26 @@ make_named_files() {
 }
 
 # The daemon goes into the background before it has chosen a channel, so its start alone does not say that it works.
-await_access_point() { # INTERFACE LOG
-	await 30 is_decided "$1" "$2"
-	case $outcome in ENABLED | DFS) return ;; esac
-	reason=$(reason_in "$2")
-	fail "the access point on $1 does not come up: $reason"
+await_access_point() { # INTERFACE
+	await 2 is_written "$hostapd_run-$1.pid"
+	await 30 is_decided "$1"
+	case $outcome in
+	ENABLED | DFS) ;;
+	*)
+		reason=$(reason_in "$hostapd_run-$1.log")
+		fail "the access point on $1 does not come up: $reason"
+		;;
+	esac
+	daemon_of hostapd "$hostapd_run-$1.pid" || fail "the access point on $1 has not noted its process"
 }
 
-# is_decided INTERFACE LOG: whether the daemon is on the air, or will not be; it may have to scan first. It may also have to
+# is_decided INTERFACE: whether the daemon is on the air, or will not be; it may have to scan first. It may also have to
 # listen for radar, for a minute or more, and comes up by itself then. It is asked only if its log does not tell its state.
 is_decided() {
 	outcome=''
 	while read -r _ whose what is change _; do
 		[ "$whose $what $is" != "$1: interface state" ] || outcome=${change#*->}
-	done <"$2"
+	done <"$hostapd_run-$1.log"
 	[ -n "$outcome" ] || outcome=$(hostapd_cli -p "$control" -i "$1" status 2>/dev/null)
 	case $outcome in
 	*state=ENABLED*) outcome=ENABLED ;;

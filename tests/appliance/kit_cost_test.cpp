@@ -48,8 +48,8 @@ exec "${0##*/}" "$@"
 };
 
 // There were 92 before the daemon, seven of them to read settings.
-TEST_F(KitCost, OfAStartIsNineProcessesBeforeTheDaemon) {
-  EXPECT_EQ(ProgramsOf("start wlan0 lbr0"), "find flock mero-settings ip nft dnsmasq chown iw sed hostapd\n");
+TEST_F(KitCost, OfAStartIsSevenProcessesBeforeTheDaemon) {
+  EXPECT_EQ(ProgramsOf("start wlan0 lbr0"), "find flock mero-settings ip nft iw sed hostapd dnsmasq chown\n");
 }
 
 // hostapd was asked for its state ten times a second while it looked for neighbours, by two processes each time.
@@ -57,14 +57,14 @@ TEST_F(KitCost, OfAScanForNeighboursIsPausesAlone) {
   StandIn("hostapd", "log=$4\n" + Daemon("hostapd", "-P") + "ip link set dev wlan0 up\n" +
                          Log("UNINITIALIZED->HT_SCAN") + "{ sleep 0.4; " + Log("HT_SCAN->ENABLED") +
                          "} >/dev/null 2>&1 &\n");
-  EXPECT_EQ(ProgramsOf("start wlan0 lbr0"), "find flock mero-settings ip nft dnsmasq chown iw sed hostapd\n");
+  EXPECT_EQ(ProgramsOf("start wlan0 lbr0"), "find flock mero-settings ip nft iw sed hostapd dnsmasq chown\n");
   EXPECT_THAT(ReadText("/run/rc.network/hostapd-wlan0.log"), testing::HasSubstr("->ENABLED"));
 }
 
 TEST_F(KitCost, OfGuestsIsABridgeWithItsServerMore) {
   SetGuests();
   EXPECT_EQ(ProgramsOf("start wlan0 lbr0"),
-            "find flock mero-settings ip ip nft dnsmasq chown dnsmasq chown iw sed hostapd\n");
+            "find flock mero-settings ip ip nft iw sed hostapd dnsmasq chown dnsmasq chown\n");
 }
 
 // Each was read anew for each thing that was to be known, so that an answer could be of another time than the next.

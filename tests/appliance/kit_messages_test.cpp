@@ -117,11 +117,10 @@ TEST_F(KitMessage, OfADaemonSaysWhatItDoesNotDo) {
   WriteText("/tmp/log", "1795.2: Driver does not support configured HT\n");
   StandIn("hostapd_cli", "echo state=DISABLED\n");
   ExpectMessages({
-      {"await_access_point wlan0 /tmp/log", "", "",
+      {"cp /tmp/log $hostapd_run-wlan0.log; await_access_point wlan0", "", "",
        "the access point on wlan0 does not come up: Driver does not support configured HT"},
-      {"write_configuration() { :; }; make_named_files() { :; }; await_access_point() { :; }; await() { :; }; "
-       "run_hostapd() { :; }; start_hostapd wlan0",
-       "", "", "the access point on wlan0 has not noted its process"},
+      {"await() { outcome=ENABLED; }; await_access_point wlan0", "", "",
+       "the access point on wlan0 has not noted its process"},
       {"rm /tmp/phy; learn_capabilities nowhere; echo phy0 >/tmp/phy", "", "", "nowhere is no wireless interface"},
       {"ht_of_2ghz=''; lines=wpa_passphrase=x; make_configuration", "", "",
        "a network would be open that is to be protected: its key or its version of WPA is none"},

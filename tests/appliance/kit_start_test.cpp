@@ -25,7 +25,7 @@ TEST_F(KitAccessPoint, IsOnTheAirWithItsRulesAndOffWithoutALeftover) {
 TEST_F(KitAccessPoint, HasItsRulesBeforeItIsOnTheAir) {
   ASSERT_EQ(Script("start wlan0 lbr0").status, 0);
   const std::string calls = RunInShell("grep -oE '^(nft|dnsmasq|hostapd) ' /tmp/calls | xargs").out;
-  EXPECT_EQ(calls, "nft dnsmasq hostapd\n");
+  EXPECT_EQ(calls, "nft hostapd dnsmasq\n");
 }
 
 TEST_F(KitAccessPoint, LeavesNothingWhenAStepFails) {
