@@ -25,7 +25,7 @@ enum class SettingKind : uint8_t {
 struct Setting {
   const char* szKey;
   SettingKind kind;
-  int missing;                      // the value of the field when a section lacks the key
+  int16_t missing;                  // the value of the field when a section lacks the key
   uint16_t offset;                  // of the field in the record
   uint16_t size;                    // of the field, for texts
   const char* szMissing = nullptr;  // the text when a section lacks the key

@@ -66,18 +66,11 @@ RecordHolder<Record> NewRecord() {
   return RecordHolder<Record>(static_cast<Record*>(std::calloc(1, sizeof(Record))));
 }
 
-// Makes a stream one that no command inherits which is run while it is open. A stream in memory has no descriptor.
-inline void CloseOnExec(FILE* pfStream) {
-  if (pfStream != nullptr && ::fileno(pfStream) >= 0) (void)::fcntl(::fileno(pfStream), F_SETFD, FD_CLOEXEC);
-}
-
 // The output of a command, to be read.
 class Pipe {
  public:
   template <size_t kSize>
-  explicit Pipe(const Command<kSize>& command) : pfPipe_(command.OpenPipe()) {
-    CloseOnExec(pfPipe_);
-  }
+  explicit Pipe(const Command<kSize>& command) : pfPipe_(command.OpenPipe()) {}
   Pipe(const Pipe&) = delete;
   Pipe& operator=(const Pipe&) = delete;
   ~Pipe() {

@@ -1,9 +1,14 @@
 // Commands for the shell.
 #include "shell_words.h"
 
+#include <fcntl.h>
+
 #include <algorithm>
+#include <cerrno>
+#include <cstdlib>
 
 #include "common/text.h"
+#include "common/umask.h"
 
 namespace {
 
@@ -35,4 +40,22 @@ ShellQuoted::ShellQuoted(std::string_view value) {
     *to++ = c;
   }
   *to = '\0';
+}
+
+int RunShell(const char* szCommand) {
+  const Umask umask(kOrdinaryUmask);
+  return std::system(szCommand);
+}
+
+FILE* OpenShell(const char* szCommand) {
+  const Umask umask(kOrdinaryUmask);
+  FILE* pfOutput = ::popen(szCommand, "r");
+  // A stream in memory has no descriptor.
+  if (pfOutput != nullptr && ::fileno(pfOutput) >= 0) (void)::fcntl(::fileno(pfOutput), F_SETFD, FD_CLOEXEC);
+  return pfOutput;
+}
+
+int RefuseShell() {
+  errno = E2BIG;
+  return -1;
 }

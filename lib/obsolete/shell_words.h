@@ -2,13 +2,9 @@
 #ifndef MERO_LIB_SHELL_WORDS_H
 #define MERO_LIB_SHELL_WORDS_H
 
-#include <cerrno>
 #include <cstddef>
 #include <cstdio>
-#include <cstdlib>
 #include <string_view>
-
-#include "common/umask.h"
 
 // A value as one word of a command, which the shell passes on unchanged: quoted, unless all its characters are
 // ordinary.
@@ -35,6 +31,11 @@ class ShellQuoted {
   char szText_[2 * 1024 + 1];  // longer than any command when the value was
 };
 
+// Commands of any size, for the next class.
+int RunShell(const char* szCommand);
+FILE* OpenShell(const char* szCommand);
+int RefuseShell();  // -1, with E2BIG
+
 // A command of at most kSize - 1 bytes. A longer one is never run; its text is cut, and serves for messages.
 template <size_t kSize>
 class Command {
@@ -53,24 +54,12 @@ class Command {
   const char* c_str() const { return szText_; }
 
   // Runs it and waits; negative when it could not be started. The exit status is for callers that look at it.
-  [[nodiscard]] int Run() const {
-    const Umask umask(kOrdinaryUmask);
-    return fits_ ? std::system(szText_) : Refuse(-1);
-  }
+  [[nodiscard]] int Run() const { return fits_ ? RunShell(szText_) : RefuseShell(); }
 
-  // Starts it, to read its output; null when it could not be started.
-  [[nodiscard]] FILE* OpenPipe() const {
-    const Umask umask(kOrdinaryUmask);
-    return fits_ ? ::popen(szText_, "r") : Refuse<FILE*>(nullptr);
-  }
+  // Starts it, to read its output, which no other command inherits; null when it could not be started.
+  [[nodiscard]] FILE* OpenPipe() const { return fits_ ? OpenShell(szText_) : (RefuseShell(), nullptr); }
 
  private:
-  template <class Failure>
-  static Failure Refuse(Failure failure) {
-    errno = E2BIG;
-    return failure;
-  }
-
   char szText_[kSize] = {};
   bool fits_ = false;
 };

@@ -7,9 +7,9 @@
 #include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/failure.h"
-#include "platform/base/file_read.h"
 #include "platform/core/radio_texts.h"
 #include "platform/core/section_text.h"
+#include "platform/core/settings_file.h"
 #include "platform/core/text_list.h"
 
 namespace {
@@ -76,11 +76,10 @@ int MEROWirelessConfGet(const char* szSection, WIRELESS_NETWORK_CONFIG* pNetCfg)
     return 0;
   }
 
-  Result<Bytes> file = ReadFile(kKnownNetworksPath);
-  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), -1;
-  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", kKnownNetworksPath), -1;
-  const std::optional<SectionPlace> place = FindSection(file->view(), szSection);
+  Bytes text;
+  if (ReadSettings(kKnownNetworksPath, text) <= 0) return -1;
+  const std::optional<SectionPlace> place = FindSection(text.view(), szSection);
   if (!place) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), -1;
-  Read(file->view(), *place, *pNetCfg);
+  Read(text.view(), *place, *pNetCfg);
   return 0;
 }

@@ -4,9 +4,8 @@
 #include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/failure.h"
-#include "platform/base/file_edit.h"
-#include "platform/base/file_read.h"
 #include "platform/core/section_text.h"
+#include "platform/core/settings_file.h"
 #include "platform/core/text_hash.h"
 #include "platform/core/text_list.h"
 
@@ -119,11 +118,9 @@ int WriteSection(const char* szPath, const char* szSection, const char* szNewNam
     LOG("%s is not written: a pair of [%s] found no memory", szPath, szSection);
     return PLIBCErrSet(ERR_OUT_OF_MEMORY), -1;
   }
-  const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
+  return ChangeSettings(szPath, kMode, [&](std::string_view text, Bytes& content) {
     ComposeSection(text, szSection, szNewName, pairs, content);
   });
-  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
-  return 1;
 }
 
 }  // namespace
@@ -131,21 +128,20 @@ int WriteSection(const char* szPath, const char* szSection, const char* szNewNam
 int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList) {
   if (szPath == nullptr || ppslList == nullptr || *ppslList == nullptr) return REFUSE_NULL(), -1;
 
-  Result<Bytes> file = ReadFile(szPath);
-  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", szPath), -1;
+  Bytes text;
+  if (const int result = ReadSettings(szPath, text); result <= 0) return result;
 
   PLIBSZLIST& list = **ppslList;
   const int before = list.nItem;
   const bool keep = CanKeepFile(list) && std::strcmp(szPath, kKnownNetworksPath) == 0;
-  for (Sections sections(file->view()); sections.Next();) {
+  for (Sections sections(text.view()); sections.Next();) {
     const bool known = keep && sections.name().find('\0') == std::string_view::npos;  // else no name leads to it
     if (!AppendToList(list, sections.name(), known ? sections.whole() : std::string_view())) {
       TruncateList(list, before);
       return FAIL(ENOMEM, "Failed to read %s", szPath), -1;
     }
   }
-  if (keep) KeepFile(list, std::move(*file));
+  if (keep) KeepFile(list, std::move(text));
   return list.nItem - before;
 }
 
@@ -154,13 +150,12 @@ int PLIBCFileGetSection(const char* szPath, const char* szSection, PPLIBSZHASH* 
     return REFUSE_NULL(), -1;
   }
 
-  Result<Bytes> file = ReadFile(szPath);
-  if (file.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!file.ok()) return FAIL(file.error(), "Failed to read %s", szPath), -1;
+  Bytes text;
+  if (const int result = ReadSettings(szPath, text); result <= 0) return result;
 
-  const std::optional<SectionPlace> place = FindSection(file->view(), szSection);
+  const std::optional<SectionPlace> place = FindSection(text.view(), szSection);
   if (!place) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
-  for (Lines lines = LinesOf(file->view(), *place); lines.Next();) {
+  for (Lines lines = LinesOf(text.view(), *place); lines.Next();) {
     const std::optional<Pair> pair = PairOfLine(lines.text(), ValueForm::kPlain);
     if (pair && !SetInHash(**ppshHash, pair->key, pair->value)) return FAIL(ENOMEM, "Failed to read %s", szPath), -1;
   }
@@ -183,24 +178,14 @@ int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const ch
   if (szPath == nullptr || szSection == nullptr || szKey == nullptr || szValue == nullptr || szFormat == nullptr) {
     return REFUSE_NULL(), -1;
   }
-  const Status status = EditFile(szPath, kMode, [&](std::string_view text, Bytes& content) {
+  const int result = ChangeSettings(szPath, kMode, [&](std::string_view text, Bytes& content) {
     ComposeValue(text, szSection, {szKey, szValue}, szFormat, content);
   });
-  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
-  return 0;
+  return result > 0 ? 0 : result;
 }
 
 int PLIBCFileRemoveSection(const char* szPath, const char* szSection) {
   if (szPath == nullptr || szSection == nullptr) return REFUSE_NULL(), -1;
-
-  Result<FileEdit> edit = FileEdit::Open(szPath, 0);
-  if (edit.error() == ENOENT) return PLIBCErrSet(ERR_FILE_NOT_FOUND), 0;
-  if (!edit.ok()) return FAIL(edit.error(), "Failed to read %s", szPath), -1;
-
-  Bytes content;
-  AppendWithout(content, edit->text(), szSection);
-  if (content.view().size() == edit->text().size()) return PLIBCErrSet(ERR_SECTION_NOT_FOUND), 0;
-  const Status status = edit->Commit(content);
-  if (!status.ok()) return FAIL(status.error(), "Failed to write %s", szPath), -1;
-  return 1;
+  return ShortenSettings(szPath, ERR_SECTION_NOT_FOUND,
+                         [&](std::string_view text, Bytes& content) { AppendWithout(content, text, szSection); });
 }

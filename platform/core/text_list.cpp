@@ -28,7 +28,7 @@ std::string_view& SectionBefore(char* szItem) {
 }
 
 char* NewItem(std::string_view text, std::string_view section) {
-  void* room = std::malloc(sizeof section + text.size() + 1);
+  void* room = std::malloc(sizeof(std::string_view) + text.size() + 1);
   if (room == nullptr) return nullptr;
   char* szItem = reinterpret_cast<char*>(new (room) std::string_view(section) + 1);
   CopyText(szItem, text.size() + 1, text);

@@ -25,11 +25,10 @@ constexpr char kHardwareKey[] = "HWADDR";
 
 constexpr const char* kNoYes[] = {"no", "yes"};
 
-template <size_t kSize>
-bool Holds(const NetworkScript& script, const char* szKey, const char (&szExpected)[kSize]) {
+bool Holds(const NetworkScript& script, const char* szKey, std::string_view expected) {
   char szValue[16];
   script.Get(szKey, szValue);
-  return EqualIgnoringCase(szValue, szExpected);
+  return EqualIgnoringCase(szValue, expected);
 }
 
 BOOL IsYes(const NetworkScript& script, const char* szKey) {
@@ -66,14 +65,17 @@ BRIDGE_INFO ReadBridge(const NetworkScript& script, const char* szBridge) {
 
 // Whether the text of a field ends within it, and is one word to a shell without quotes. All fields are checked before
 // anything is written, so that no record is written half.
+bool IsWord(const char* szField, size_t cbField) {
+  const size_t size = ::strnlen(szField, cbField);
+  return size < cbField && std::all_of(szField, szField + size, [](char c) {
+           constexpr char kSpecial[] = "\"'\\`$&|;<>()#*?[]{}~!";
+           return static_cast<unsigned char>(c) > ' ' && c != '\x7f' && std::strchr(kSpecial, c) == nullptr;
+         });
+}
+
 template <size_t kSize>
 bool IsWord(const char (&szField)[kSize]) {
-  const char* const end = std::find(szField, std::end(szField), '\0');
-  if (end == std::end(szField)) return false;
-  return std::all_of(szField, end, [](char c) {
-    constexpr std::string_view kSpecial = "\"'\\`$&|;<>()#*?[]{}~!";
-    return static_cast<unsigned char>(c) > ' ' && c != '\x7f' && kSpecial.find(c) == std::string_view::npos;
-  });
+  return IsWord(szField, kSize);
 }
 
 // The name of the bridge that the records are about; null when they are about none, or about two.
