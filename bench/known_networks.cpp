@@ -3,12 +3,10 @@
 // The store lies on the file system of the directory that the program is run in.
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
-#include <search.h>
 #include <sys/mount.h>
 #include <unistd.h>
 
 #include <chrono>
-#include <cstddef>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -17,6 +15,7 @@
 #include <string>
 #include <thread>
 
+#include "bench/support.h"
 #include "common/known_networks_file.h"
 #include "common/paths.h"
 #include "common/text.h"
@@ -29,12 +28,6 @@
 namespace {
 
 namespace fs = std::filesystem;
-
-void Require(bool done, const char* szWhat) {
-  if (done) return;
-  std::perror(szWhat);
-  std::exit(EXIT_FAILURE);
-}
 
 WIRELESS_NETWORK_CONFIG NetworkOf(int number) {
   WIRELESS_NETWORK_CONFIG config = {};
@@ -75,16 +68,6 @@ void MakeStore(int64_t networks) {
   while (age() < std::chrono::milliseconds(100)) std::this_thread::sleep_for(std::chrono::milliseconds(5));
 }
 
-int64_t CountAndFree(WIRELESS_LIST& head) {
-  int64_t count = 0;
-  for (; head.q_forw != &head; ++count) {
-    WIRELESS_LIST* node = head.q_forw;
-    ::remque(node);
-    std::free(reinterpret_cast<char*>(node) - offsetof(WIRELESS_NETWORK_CONFIG, list));
-  }
-  return count;
-}
-
 void ReportPerNetwork(benchmark::State& state) {
   using Counter = benchmark::Counter;
   state.counters["per_network"] =
@@ -96,7 +79,8 @@ void EnumerateByLastSave(benchmark::State& state) {
   MakeStore(state.range(0));
   for (auto _ : state) {
     WIRELESS_LIST head;
-    Require(MEROWirelessConfEnumByAtime(&head) == 0 && CountAndFree(head) == state.range(0), "enumerate");
+    Require(MEROWirelessConfEnumByAtime(&head) == 0 && CountAndFree<WIRELESS_NETWORK_CONFIG>(head) == state.range(0),
+            "enumerate");
   }
   ReportPerNetwork(state);
 }

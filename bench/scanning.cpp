@@ -1,17 +1,16 @@
 // What a scan costs: the library's two readings of a listing, beside a program that reads as much and drops it. The
 // listing is canned, so that no radio is needed, and nothing sleeps.
 #include <benchmark/benchmark.h>
-#include <search.h>
 #include <sys/stat.h>
 #include <syslog.h>
 #include <unistd.h>
 
-#include <cstddef>
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
 #include <string>
 
+#include "bench/support.h"
 #include "platform.h"
 #include "private_machine.h"
 #include "wireless.h"
@@ -43,12 +42,6 @@ namespace {
 constexpr char kListing[] = "/tmp/listing";
 constexpr char kTool[] = "/sbin/iwlist";
 
-void Require(bool done, const char* szWhat) {
-  if (done) return;
-  std::perror(szWhat);
-  std::exit(EXIT_FAILURE);
-}
-
 void InstallTool() {
   std::ofstream tool(kTool);
   tool << "#!/bin/sh\nexec cat " << kListing << "\n";
@@ -71,21 +64,13 @@ void MakeListing(int64_t networks) {
   Require(listing.good(), "make a listing");
 }
 
-int64_t CountAndFree(WIRELESS_LIST& head) {
-  int64_t count = 0;
-  for (; head.q_forw != &head; ++count) {
-    WIRELESS_LIST* node = head.q_forw;
-    ::remque(node);
-    std::free(reinterpret_cast<char*>(node) - offsetof(WIRELESS_NETWORK, list));
-  }
-  return count;
-}
-
 void Scan(benchmark::State& state) {
   MakeListing(state.range(0));
   for (auto _ : state) {
     WIRELESS_LIST head{&head, &head};
-    Require(MEROWirelessNetworkScan(WIRELESS_SCAN_LAST, &head) == 0 && CountAndFree(head) == state.range(0), "scan");
+    Require(MEROWirelessNetworkScan(WIRELESS_SCAN_LAST, &head) == 0 &&
+                CountAndFree<WIRELESS_NETWORK>(head) == state.range(0),
+            "scan");
   }
 }
 BENCHMARK(Scan)->RangeMultiplier(10)->Range(10, 1'000)->UseRealTime();

@@ -11,6 +11,8 @@
 #include <cstdlib>
 #include <string>
 
+#include "bench/support.h"
+
 namespace {
 
 struct Started {
@@ -28,12 +30,6 @@ constexpr Started kPrograms[] = {
     {"iwctl", "/usr/bin/iwctl", "--version"},
     {"connmanctl", "/usr/bin/connmanctl", "--version"},
 };
-
-void Require(bool done, const char* szWhat) {
-  if (done) return;
-  std::perror(szWhat);
-  std::exit(EXIT_FAILURE);
-}
 
 double SecondsOf(const timeval& time) {
   return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_usec) / 1e6;
