@@ -235,13 +235,19 @@ join_once() {  # STATE ROUND
   write_figures join "$1" "$2"
 }
 
-race_to_join() {  # ROUND
+# has_its_starts TO-PREPARE ONCE ROUND: a contender's first start and its second, on an appliance that is new to it; a
+# practice round has no second.
+has_its_starts() {
   fresh
-  contender knows >/run/lab/knows.log 2>&1 || fail "$name cannot be told of the network: $(</run/lab/knows.log)"
+  contender "$1" >/run/lab/prepared.log 2>&1 || fail "$name cannot be prepared: $(</run/lab/prepared.log)"
   ! has "$name" Bus || start_bus
-  join_once cold "$1"
-  (($1 == 0)) || join_once warm "$1"
+  "$2" cold "$3"
+  (($3 == 0)) || "$2" warm "$3"
   ! has "$name" Bus || end_members bus
+}
+
+race_to_join() {  # ROUND
+  has_its_starts knows join_once "$1"
 }
 
 # ---- Serving ---------------------------------------------------------------------------------------------------------
@@ -312,12 +318,7 @@ serve_once() {  # STATE ROUND
 
 race_to_serve() {  # ROUND
   [[ $band == 2.4 ]] || ! has "$name" Channel || return 0
-  fresh
-  contender offers >/run/lab/offers.log 2>&1 || fail "$name cannot be told of its network: $(</run/lab/offers.log)"
-  ! has "$name" Bus || start_bus
-  serve_once cold "$1"
-  (($1 == 0)) || serve_once warm "$1"
-  ! has "$name" Bus || end_members bus
+  has_its_starts offers serve_once "$1"
 }
 
 # ---- The air ---------------------------------------------------------------------------------------------------------
