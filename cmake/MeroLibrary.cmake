@@ -15,7 +15,8 @@ set(MERO_LIBRARY_OPTIONS "" CACHE STRING "Options that the shared libraries are 
 # How the parts of the shared libraries are compiled: to be small, except in debug builds. Nothing unwinds through them
 # at run time, and what debuggers unwind by goes with the debugging information.
 function(mero_compile_part name)
-  target_include_directories(${name} PUBLIC $<BUILD_INTERFACE:${CMAKE_SOURCE_DIR}/include> PRIVATE ${CMAKE_SOURCE_DIR})
+  cmake_path(GET CMAKE_CURRENT_FUNCTION_LIST_DIR PARENT_PATH top)
+  target_include_directories(${name} PUBLIC $<BUILD_INTERFACE:${top}/include> PRIVATE ${top})
   target_compile_options(${name} PRIVATE -fno-exceptions -fno-rtti -fvisibility=hidden -fvisibility-inlines-hidden
                                          -ffunction-sections -fdata-sections
                                          $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};-fno-plt;-fno-ident>

@@ -4,14 +4,11 @@
 #include <poll.h>
 #include <unistd.h>
 
-extern "C" {
-#include <sys/pidfd.h>  // which does not declare its functions as C for C++
-}
-
 #include <csignal>
 #include <cstdio>
 
 #include "common/descriptor.h"
+#include "common/pidfd.h"
 #include "common/text.h"
 #include "platform/base/file_read.h"
 #include "platform/base/number.h"
@@ -51,12 +48,12 @@ bool EndsWithin(int process, int milliseconds) {
 
 Status End(pid_t pid, const char* szProgram) {
   // The process is held before its name is looked at, so that its pid cannot become another process's in between.
-  const Descriptor process(::pidfd_open(pid, 0));
+  const Descriptor process(PidfdOpen(pid));
   if (!process.valid()) return errno == ESRCH ? Status::Ok() : Status::Failed(errno);
   if (!Runs(pid, szProgram)) return Status::Ok();
 
   for (const int signal : {SIGTERM, SIGKILL}) {
-    if (::pidfd_send_signal(process.get(), signal, nullptr, 0) < 0) {
+    if (PidfdSendSignal(process.get(), signal) < 0) {
       return errno == ESRCH ? Status::Ok() : Status::Failed(errno);
     }
     if (EndsWithin(process.get(), kPatience)) return Status::Ok();

@@ -9,8 +9,17 @@
 #include <csignal>
 
 #include "common/umask.h"
+#include "platform/base/directory.h"
+#include "platform/base/number.h"
 
 extern char** environ;
+
+// In glibc since 2.34.
+#ifdef __GLIBC_PREREQ
+#if __GLIBC_PREREQ(2, 34)
+#define MERO_CLOSES_FROM
+#endif
+#endif
 
 namespace {
 
@@ -52,13 +61,31 @@ class FileActions {
       if (error_ != 0 || standard == Standard::kInherited) break;
       error_ = ::posix_spawn_file_actions_addopen(&actions_, fd, "/dev/null", O_RDWR, 0);
     }
-    if (error_ == 0) error_ = ::posix_spawn_file_actions_addclosefrom_np(&actions_, STDERR_FILENO + 1);
+    CloseOthers();
     return error_;
   }
 
   const posix_spawn_file_actions_t* get() const { return &actions_; }
 
  private:
+  // What is open here is not for the program: a lock, a socket or a marker that it held might be held for ever.
+#ifdef MERO_CLOSES_FROM
+  void CloseOthers() {
+    if (error_ == 0) error_ = ::posix_spawn_file_actions_addclosefrom_np(&actions_, STDERR_FILENO + 1);
+  }
+#else  // what another thread opens meanwhile is passed on, unless it is closed at exec
+  void CloseOthers() {
+    const Directory open(::opendir("/proc/self/fd"));
+    if (error_ == 0 && !open) error_ = errno;
+    while (const dirent* entry = open && error_ == 0 ? ::readdir(open.get()) : nullptr) {
+      std::string_view name(entry->d_name);
+      if (const int fd = TakeNumber(name).value_or(0); fd > STDERR_FILENO) {
+        error_ = ::posix_spawn_file_actions_addclose(&actions_, fd);
+      }
+    }
+  }
+#endif
+
   posix_spawn_file_actions_t actions_;
   int error_;
 };

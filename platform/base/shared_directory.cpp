@@ -2,8 +2,10 @@
 #include "platform/base/shared_directory.h"
 
 #include <fcntl.h>
+#include <linux/fs.h>
 #include <sys/random.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <climits>
@@ -19,6 +21,11 @@ bool IsOurs(const struct stat& info) {
   return (info.st_uid == 0 || info.st_uid == ::geteuid()) && S_ISREG(info.st_mode) && info.st_nlink == 1;
 }
 
+// renameat2() is a function of its own in some libcs only.
+bool RenameToNew(const char* szFrom, const char* szTo) {
+  return ::syscall(SYS_renameat2, AT_FDCWD, szFrom, AT_FDCWD, szTo, RENAME_NOREPLACE) == 0;
+}
+
 Status MoveAside(const char* szPath) {
   constexpr int kTries = 8;
   for (int i = 0; i < kTries; ++i) {
@@ -27,7 +34,7 @@ Status MoveAside(const char* szPath) {
     char szAside[PATH_MAX];
     const int size = std::snprintf(szAside, sizeof szAside, "%s.foreign-%08x", szPath, number);
     if (size >= PATH_MAX) return Status::Failed(ENAMETOOLONG);
-    if (::renameat2(AT_FDCWD, szPath, AT_FDCWD, szAside, RENAME_NOREPLACE) == 0) return Status::Ok();
+    if (RenameToNew(szPath, szAside)) return Status::Ok();
     if (errno != EEXIST) break;
   }
   return Status::Failed(errno);

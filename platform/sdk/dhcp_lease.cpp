@@ -48,7 +48,7 @@ Status Lease(const char* szIfName, int seconds) {
   return Status::Ok();
 }
 
-Result<ifreq> Ask(const Descriptor& control, const char* szIfName, unsigned long what) {
+Result<ifreq> Ask(const Descriptor& control, const char* szIfName, int what) {
   Result<ifreq> request = RequestFor<ifreq>(szIfName);
   if (request.ok() && ::ioctl(control.get(), what, &*request) < 0) return Status::Failed(errno);
   return request;

@@ -3,10 +3,23 @@
 
 #include <cstdlib>
 
+#include "tests/support/shell.h"
+
 namespace {
 
 TEST(Abi, ServesAProgramInC99) {
   EXPECT_EQ(std::system(C_PROGRAM), 0);
 }
+
+#ifdef MUSL_DIRECTORY
+TEST(Musl, ServesAProgramInC99) {
+  EXPECT_EQ(std::system(MUSL_DIRECTORY "/program"), 0);
+}
+
+// It cannot be told to close all descriptors from one on.
+TEST(Musl, HasAProgramInheritTheStandardDescriptorsAndNothingElse) {
+  EXPECT_EQ(Shell(MUSL_DIRECTORY "/inherits"), "0\n1\n2\n3\n");  // 3 is the listing itself
+}
+#endif
 
 }  // namespace

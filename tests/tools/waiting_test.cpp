@@ -1,10 +1,12 @@
 // The program while it waits for the library.
+#include <dlfcn.h>
 #include <fcntl.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <csignal>
+#include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -374,9 +376,15 @@ TEST(LibraryLog, KeepsTheNewestLines) {
 
 }  // namespace
 
-// The program comes upon this one before libc's.
-extern "C" int pidfd_open(pid_t pid, unsigned int flags) {
-  if (g_processDescriptors == 0) return errno = EPERM, -1;
-  if (g_processDescriptors > 0) --g_processDescriptors;
-  return static_cast<int>(::syscall(SYS_pidfd_open, pid, flags));
+// The program comes upon this one before libc's, which takes as many arguments whatever the call is.
+extern "C" long syscall(long number, ...) noexcept {
+  static const auto real = reinterpret_cast<decltype(&::syscall)>(::dlsym(RTLD_NEXT, "syscall"));
+  if (number == SYS_pidfd_open && g_processDescriptors == 0) return errno = EPERM, -1;
+  if (number == SYS_pidfd_open && g_processDescriptors > 0) --g_processDescriptors;
+  long of[6];
+  va_list arguments;
+  va_start(arguments, number);
+  for (long& argument : of) argument = va_arg(arguments, long);
+  va_end(arguments);
+  return real(number, of[0], of[1], of[2], of[3], of[4], of[5]);
 }

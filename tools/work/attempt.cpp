@@ -6,10 +6,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-extern "C" {
-#include <sys/pidfd.h>  // does not declare its functions extern "C"
-}
-
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
@@ -19,6 +15,7 @@ extern "C" {
 
 #include "base/require.h"
 #include "base/signals.h"
+#include "common/pidfd.h"
 
 namespace {
 
@@ -57,7 +54,7 @@ Attempt::Attempt(const std::function<void()>& act) : pid_(-1) {
   std::fflush(nullptr);
   pid_ = Require(::fork(), "fork");
   if (pid_ == 0) Act(writer.get(), act);
-  ended_ = Descriptor(Require(::pidfd_open(pid_, 0), "pidfd_open"));
+  ended_ = Descriptor(Require(PidfdOpen(pid_), "pidfd_open"));
 }
 
 Attempt::~Attempt() {

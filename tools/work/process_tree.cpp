@@ -6,10 +6,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-extern "C" {
-#include <sys/pidfd.h>  // does not declare its functions extern "C"
-}
-
 #include <algorithm>
 #include <chrono>
 #include <csignal>
@@ -19,6 +15,7 @@ extern "C" {
 #include <utility>
 
 #include "base/require.h"
+#include "common/pidfd.h"
 
 namespace {
 
@@ -54,7 +51,7 @@ pid_t Start(const std::function<void()>& act) {
 
 // Waits until a child has ended, for so long at most.
 bool EndsWithin(pid_t pid, milliseconds time) {
-  const Descriptor process(::pidfd_open(pid, 0));  // without it, poll() just waits, and the child counts as alive
+  const Descriptor process(PidfdOpen(pid));  // without it, poll() just waits, and the child counts as alive
   pollfd ended{process.get(), POLLIN, 0};
   if (::poll(&ended, 1, static_cast<int>(time.count())) == 0) return false;
   return ::waitpid(pid, nullptr, 0) == pid;
@@ -85,7 +82,7 @@ bool ProcessTree::End() {
 }
 
 Descriptor ProcessTree::Watch() const {
-  return Descriptor(Require(::pidfd_open(pid_, 0), "pidfd_open"));
+  return Descriptor(Require(PidfdOpen(pid_), "pidfd_open"));
 }
 
 void ProcessTree::Reap() const {
