@@ -103,7 +103,8 @@ bool CanKeepFile(const PLIBSZLIST& list) {
 
 void KeepFile(PLIBSZLIST& list, Bytes&& file) {
   auto& keeper = static_cast<TextList&>(list);
-  if (!ForgetRepeated(list)) return;
+  // Without sections there is nothing to keep, and the list stays one that can.
+  if (list.nItem == 0 || !ForgetRepeated(list)) return;
   keeper.file = std::move(file);
   keeper.older = std::exchange(g_newest, &keeper);
 }

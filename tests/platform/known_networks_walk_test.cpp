@@ -186,6 +186,21 @@ TEST_F(Walk, ReadsTheFileForNamesThatWereAddedToAList) {
   for (int i = 0; i < 4; ++i) EXPECT_EQ(networks.EssidOf(i), essids[i]) << i;
 }
 
+// A list that had kept an empty file kept the next one beside it, and looking into it never came to an end.
+TEST_F(Walk, IsOfTheFileThatHasNetworksWhereTheSameListWasOfAnEmptyOne) {
+  WriteText(kKnownNetworksPath, "");
+  const ListedNetworks networks;
+  ASSERT_EQ(networks.count(), 0);
+  WriteText(kKnownNetworksPath, Networks(2, "old"));
+  PPLIBSZLIST list = networks.names();
+  ASSERT_EQ(PLIBCFileEnumSection(kKnownNetworksPath, &list), 2);
+  WriteText(kKnownNetworksPath, Networks(2, "new"));
+  ::alarm(10);  // a walk without an end is to fail, and not to last
+  EXPECT_EQ(networks.EssidOf(1), "old");
+  EXPECT_EQ(EssidOf(1), "new");
+  ::alarm(0);
+}
+
 TEST_F(Walk, IsNotLedAstrayByTheNamesOfAnotherFile) {
   constexpr char kOther[] = "/tmp/platform/other";
   WriteText(kOther, Networks(2, "other"));
