@@ -69,6 +69,12 @@ TEST_F(KitCountry, IsToldToTheAccessPointsStations) {
   WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nhw_mode=a\n");
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   EXPECT_EQ(Configuration(), "interface=wlan0\nssid=home\nhw_mode=a\ncountry_code=DE\nieee80211d=1\nieee80211h=1\n");
+  // It is the radio's, and stands with the main network's lines.
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
+  WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
+  WriteText("/usr/mero/etc/wireless_ap.conf", "[RT [5370]\n\tssid=home\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_THAT(Configuration(), testing::EndsWith("ieee80211h=1\nbss=gwlan\nssid=visitors\n"));
 }
 
 TEST_F(KitCountry, ThatIsNoneKeepsTheAccessPointOffTheAir) {

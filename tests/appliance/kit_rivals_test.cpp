@@ -154,6 +154,11 @@ TEST_F(KitRivals, AreNotTakenForAServerThatRuns) {
   EXPECT_EQ(RunInShell("stat -c %u " + pid + "; read -r server <" + pid + "; kill $server").out, "0\n");
 }
 
+TEST_F(KitRivals, CannotLookIntoADirectoryThatRootHasMade) {
+  ASSERT_EQ(RunInShell("mkdir -m 755 /run/rc.network && /etc/rc.network boot").out, "");
+  EXPECT_EQ(RunInShell("stat -c %a " + kState).out, "700\n");
+}
+
 TEST_F(KitRivals, HaveADirectoryOfTheirOwnMovedAside) {
   for (const char* szMade : {"mkdir -m 777 /run/rc.network; chown 65534:65534 /run/rc.network",
                              "mkdir -m 777 /tmp/theirs; ln -s /tmp/theirs /run/rc.network", "mkfifo /run/rc.network",

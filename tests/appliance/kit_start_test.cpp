@@ -134,6 +134,37 @@ TEST_F(KitAccessPoint, IsTakenDownWhateverStepFails) {
   }
 }
 
+// Anyone in range could fill the memory that the log is in.
+TEST_F(KitAccessPoint, LogsOneMebibyteAtMost) {
+  StandIn("hostapd", "log=$4\n" + Daemon("hostapd", "-P") +
+                         "echo '17.5: wlan0: interface state UNINITIALIZED->ENABLED' >>$log\n"
+                         "head -c 2000000 /dev/zero >>$log 2>/dev/null\n"
+                         "grep -q '^SigIgn:.*[13579bdf]......$' /proc/$(cat $file)/status\n");
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(fs::file_size("/run/rc.network/hostapd-wlan0.log"), 1u << 20);
+  EXPECT_EQ(Daemons(), OnAir());
+}
+
+// What the former daemon has logged would count for the new one.
+TEST_F(KitAccessPoint, IsNotTakenToBeOnTheAirForWhatItsFormerDaemonHasLogged) {
+  const std::string logs = "echo '17.5: wlan0: interface state UNINITIALIZED->ENABLED' >>$4\n";
+  StandIn("hostapd", logs + Daemon("hostapd", "-P"));
+  StandIn("hostapd_cli", "echo state=DISABLED\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  StandIn("hostapd", Daemon("hostapd", "-P"));
+  EXPECT_THAT(Script("start wlan0 lbr0").out, StartsWith("rc.network: the access point on wlan0 does not come up"));
+  EXPECT_EQ(Left(), "");
+}
+
+// A daemon is on the air as soon as it has gone into the background, and its process may be noted a moment later.
+TEST_F(KitAccessPoint, IsStartedThoughItsDaemonNotesItsProcessLate) {
+  StandIn("hostapd",
+          "file=$6\necho '17.5: wlan0: interface state UNINITIALIZED->ENABLED' >>$4\n"
+          "(/tmp/daemons/hostapd 60 & pid=$!; sleep 1; echo $pid >$file; wait) >/dev/null 2>&1 &\n");
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(Daemons(), OnAir());
+}
+
 TEST_F(KitAccessPoint, IsStartedAndTakenDownBesideNotesThatSomebodyWasKilledOver) {
   for (const char* szNote : {"ip_forward", "wire-lbr0", "bridge-wlan0"}) {
     const std::string leave = "mkdir -p -m 700 /run/rc.network; >/run/rc.network/" + std::string(szNote);

@@ -36,19 +36,25 @@ TEST_F(Kit, LeavesOutWhatTheCardCannotDo) {
       {"0x0000", "ieee80211n=1\nht_capab=\nrequire_ht=1\n"},
       {"", ""},  // no 802.11n at all
   };
-  for (const auto& row : rows) {
-    WriteText("/tmp/conf", "ieee80211n=1\nht_capab=" + all + "\nrequire_ht=1\n");
-    const std::string card = "ht_of_2ghz='" + std::string(row.szBits) + "'; ht_of_5ghz=''; country=''; ";
-    EXPECT_EQ(Tells(card + "lines=$(cat /tmp/conf); make_configuration; printf '%s' \"${content:+$content$newline}\""),
-              row.left)
-        << row.szBits;
+  const std::string asked = "ieee80211n=1\nht_capab=" + all + "\nrequire_ht=1\n";
+  const auto left = [](const std::string& card, const std::string& configuration) {
+    WriteText("/tmp/conf", configuration);
+    return Tells(card +
+                 "; country=''; lines=$(cat /tmp/conf); make_configuration; "
+                 "printf '%s' \"${content:+$content$newline}\"");
+  };
+  for (const auto& [szBits, expected] : rows) {
+    const std::string bits = "='" + std::string(szBits) + "' ";
+    EXPECT_EQ(left("ht_of_2ghz" + bits + "ht_of_5ghz=0x0800", asked), expected) << szBits;
+    EXPECT_EQ(left("ht_of_5ghz" + bits + "ht_of_2ghz=0x0800", "hw_mode=a\n" + asked), "hw_mode=a\n" + expected)
+        << szBits;
   }
 }
 
 TEST_F(Kit, ReadsTheCapabilitiesOfTheBand) {
   Install("iw",
           "cat <<END\nWiphy phy0\n\tBand 1:\n\t\tCapabilities: 0x11\n\t\tCapabilities: 0x99\n"
-          "\tBand 2:\n\t\tCapabilities: 0x22\n\tBand 3:\n\t\tFrequencies:\nEND\n");
+          "\tBand 2:\n\t\tCapabilities: 0x22\n\t\tCapabilities: 0x98\n\tBand 3:\n\t\tFrequencies:\nEND\n");
   RunInShell("echo phy0 >/tmp/phy; sed -i 's,/sys/class/net/$1/phy80211/name,/tmp/phy,' /usr/mero/lib/network/*.sh");
   const std::string learn = "learn_capabilities wlan0; echo \"$ht_of_2ghz $ht_of_5ghz\"";
   EXPECT_EQ(Tells(learn), "0x11 0x22\n");
@@ -111,6 +117,34 @@ TEST_F(Kit, EndsADaemonOnlyWhenItIsStillTheOneOfItsPidFile) {
     EXPECT_EQ(Tells("end_daemon sleep /tmp/pid"), "") << szText;
   }
   EXPECT_EQ(Tells("end_daemon sleep /tmp/missing"), "");
+}
+
+// The kernel keeps a process that has ended until its parent asks for it, and not every parent does.
+TEST_F(Kit, EndsADaemonThatNobodyWaitsFor) {
+  EXPECT_EQ(Tells("(sleep 60 & echo $! >/tmp/pid; exec sleep 61) >/dev/null 2>&1 & until read -r running </tmp/pid && "
+                  "grep -qx sleep /proc/$running/comm; do sleep 0.01; done 2>/dev/null; "
+                  "end_daemon sleep /tmp/pid; grep -o 'Z (zombie)' /proc/$running/status; kill $!"),
+            "Z (zombie)\n");
+  EXPECT_FALSE(fs::exists("/tmp/pid"));
+}
+
+// It would go on, and nobody would know of it.
+TEST_F(Kit, EndsADaemonThatHasNotNotedItsProcessYet) {
+  EXPECT_EQ(Tells(">/tmp/pid; (sleep 60 & echo $! >/tmp/later; wait) >/dev/null 2>&1 & "
+                  "(sleep 0.5; mv /tmp/later /tmp/pid) & end_daemon sleep /tmp/pid; wait $!"),
+            "");
+  EXPECT_FALSE(fs::exists("/tmp/pid"));
+}
+
+// For a command that it does not understand, ip does not tell which of them that was.
+TEST_F(Kit, SaysWhichOfThePlannedCommandsIpDidNotTake) {
+  for (const char* szCommand : {"address replace 192.0.2.1/99 dev lo", "address replace none dev lo",
+                                "link set dev lo address zz", "link set dev gone up", "link set dev lo master gone"}) {
+    const Ran ran = RunInParts("plan 'cannot begin' 'link set dev lo up'; plan 'cannot go on' '" +
+                               std::string(szCommand) + "'; plan 'cannot end' 'link set dev lo up'; run_plan");
+    EXPECT_EQ(ran.status, 1) << szCommand;
+    EXPECT_THAT(ran.out, ContainsRegex("^sh: cannot go on: .*(192.0.2.1/99|none|zz|gone)")) << szCommand;
+  }
 }
 
 TEST_F(Kit, ReplacesAFileThatOnlyRootMayRead) {
