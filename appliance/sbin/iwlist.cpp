@@ -3,8 +3,8 @@
 // which of them cannot be joined. Every other form is the ordinary tool's, which the package system has moved aside.
 //
 // While the radio scans, for whomever, these forms wait for the end of that, since a part of the results would look
-// like all of them. `iwlist INTERFACE scanning` does so too, and then has the ordinary tool show what was heard: the
-// kernel would refuse it a scan of its own.
+// like all of them. `iwlist INTERFACE scanning` does so too, since the kernel would refuse it a scan of its own, and
+// then has the ordinary tool show what was heard, unless that scan was not for all networks in range.
 //
 // Exit status: 0 listed, also when nothing is in range; 1 not listed, with the reason in one line on standard error
 // and nothing on standard output; 127 the ordinary tool is not there, 126 it cannot be run; else the ordinary tool's.
@@ -54,7 +54,7 @@ int List(const char* interface, bool unsupported) {
   }
 }
 
-// Whether somebody else's scan was under way and has ended, so that no other one is needed.
+// Whether somebody else's scan was under way and has heard all that there is, so that no other one is needed.
 bool HasJustScanned(const char* interface) {
   try {
     return nl80211::AwaitScanEnd(interface, kPatience);

@@ -32,8 +32,8 @@ scan_has_begun() {  # NAME
 }
 
 # Has somebody else scan on an appliance; returns once that scan is under way.
-begin_scan() {  # NAME
-  inside "$1" iw dev wlan0 scan trigger >/dev/null
+begin_scan() {  # NAME [WORD OF IW...]
+  inside "$1" iw dev wlan0 scan trigger "${@:2}" >/dev/null
   within 2 scan_has_begun "$1" || fail "no scan begins on $1"
 }
 
@@ -88,6 +88,12 @@ begin_scan nas
 on nas /sbin/iwlist wlan0 scanning
 expect_line '                    ESSID:"newcomer"'
 expect_scans nas 1
+
+say '-- unless that one does not go over all channels'
+begin_scan nas freq 2412 passive
+on nas /sbin/iwlist wlan0 scanning
+expect_line '                    ESSID:"newcomer"'
+expect_scans nas 2
 
 say '-- with nobody scanning it is a scan of its own'
 on nas /sbin/iwlist wlan0 scanning
