@@ -398,8 +398,8 @@ int MEROWirelessConfEnumByAtime(WIRELESS_LIST* pHead);
  *         nothing in range.
  *
  * Waits up to 5 s for an adapter to be plugged in, brings its interface up and waits 1 s; a fresh scan takes a few
- * seconds more. An interface that was down, and has no results, scans by being brought up. The listing tool waits for
- * the end of a scan that is under way, 10 s at most. Runs /sbin/iwlist; reads and writes no file.
+ * seconds more. An interface that was down, and has no results, scans by being brought up. Runs /sbin/iwlist up to six
+ * times, which waits for the end of a scan that is under way, 10 s at most each time. Reads and writes no file.
  */
 int MEROWirelessNetworkScan(const WIRELESS_SCAN scan, WIRELESS_LIST* pHead);
 

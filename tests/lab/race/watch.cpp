@@ -3,8 +3,7 @@
 //   race-watch start GROUP COMMAND...          tells the number of the last process and the time, and becomes the
 //                                              command, in that control group
 //   race-watch join SECONDS                    tells when the kernel lets the wireless interface's traffic pass, when
-//   it
-//                                              has an address, and when the first machine of its network answers a ping
+//                                              it has an address, and when its network's first machine answers a ping
 //   race-watch beacon INTERFACE NAME SECONDS   tells when the first beacon of that network is on the air
 //
 // Each thing told is a line of its name and the time, in microseconds of the machine's monotonic clock. A watcher says
