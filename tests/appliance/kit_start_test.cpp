@@ -394,6 +394,15 @@ TEST_F(KitAccessPointBesideAnother, EndsNoneOfAnotherNetwork) {
   ExpectItToGoOn("unshare -n");
 }
 
+// A container may have the machine's network, and files of its own at the same paths.
+TEST_F(KitAccessPointBesideAnother, EndsNoneOfAnotherRoot) {
+  ASSERT_EQ(RunInShell("mkdir -p /tmp/container/usr /tmp/container/tmp/daemons && cp -P /bin /lib* /tmp/container && "
+                       "mount --bind /usr /tmp/container/usr && mount --bind /tmp/daemons /tmp/container/tmp/daemons")
+                .out,
+            "");
+  ExpectItToGoOn("chroot /tmp/container");
+}
+
 // A user of the machine held a start up, 5 s for each process that bore the daemon's name and did not want to end.
 TEST_F(KitAccessPointBesideAnother, EndsNoneOfAnotherUser) {
   const std::string asNobody = "setpriv --reuid=65534 --regid=65534 --clear-groups";
