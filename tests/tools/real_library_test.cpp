@@ -17,6 +17,7 @@
 
 using testing::AllOf;
 using testing::HasSubstr;
+using testing::MatchesRegex;
 using testing::Not;
 using testing::StartsWith;
 
@@ -94,6 +95,29 @@ TEST(InstalledProgram, DoesNotShowASecretThatIsTypedAfterItWasStopped) {
   shell.Type("open sesame\n");
   EXPECT_TRUE(shell.Shows("saved Home")) << shell.shown();
   EXPECT_THAT(shell.shown(), Not(HasSubstr("sesame")));
+}
+
+// Has a shared library be a file that is none.
+void SpoilLibrary(const std::string& soname) {
+  Shell("mount --bind /dev/null $(ldconfig -p | awk '$1 == \"" + soname + "\" { print $NF; exit }')");
+}
+
+// All of them were loaded at every start, and there was no start without them.
+TEST(InstalledProgram, NeedsTheLibrariesThatDrawCodesForNothingElse) {
+  WriteText("/tmp/secret", "open sesame\n");
+  Shell(MERO_TOOL " save Home --bssid 00:11:22:33:44:55 --security wpa2 --key-file /tmp/secret");
+  SpoilLibrary("libpng16.so.16");
+  EXPECT_THAT(
+      Tool("share Home --png /tmp/home.png").out,
+      MatchesRegex("merowireless: no picture can be written: /[^\n]*libpng16.so.16: file too short: install that "
+                   "library, or take --svg\n"));
+  EXPECT_EQ(Tool("share Home --svg /tmp/home.svg").status, 0);
+  SpoilLibrary("libqrencode.so.4");
+  EXPECT_THAT(Tool("share Home").out,
+              MatchesRegex("merowireless: no code can be drawn: /[^\n]*libqrencode.so.4: file too short: install that "
+                           "library\n"));
+  EXPECT_EQ(Tool("share Home --porcelain --show-secrets").out,
+            "Home\t\twpa\tno\t\t\tWIFI:T:WPA;S:Home;P:open sesame;;\n");
 }
 
 TEST(InstalledProgram, SwitchesTheRadio) {

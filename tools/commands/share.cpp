@@ -118,10 +118,14 @@ std::string SentenceOf(const Program& program, const Shared& shared) {
 
 void Share(const Program& program, const NetworkToShare& wanted) {
   const Shared shared{.code = CodeToShare(program, wanted), .png = wanted.png, .svg = wanted.svg};
-  const CodePicture picture(shared.code.text);
-  if (!wanted.png.empty()) WriteForOwner(wanted.png, program.output.Name(wanted.png), picture.Png());
-  if (!wanted.svg.empty()) WriteForOwner(wanted.svg, program.output.Name(wanted.svg), picture.Svg());
-  if (program.output.form() == Form::kHuman && wanted.png.empty() && wanted.svg.empty()) Draw(program, picture);
+  const bool isWritten = !wanted.png.empty() || !wanted.svg.empty();
+  const bool isShown = !isWritten && program.output.form() == Form::kHuman;
+  if (isWritten || isShown) {
+    const CodePicture picture(shared.code.text);
+    if (!wanted.png.empty()) WriteForOwner(wanted.png, program.output.Name(wanted.png), picture.Png());
+    if (!wanted.svg.empty()) WriteForOwner(wanted.svg, program.output.Name(wanted.svg), picture.Svg());
+    if (isShown) Draw(program, picture);
+  }
   if (wanted.showSecrets) program.output.Picture(program.output.Name(shared.code.text) + "\n");
   program.output.Done<Shared>(SentenceOf(program, shared), "code", wanted.showSecrets ? kWithText : kWithoutText,
                               shared);

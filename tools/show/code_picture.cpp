@@ -8,11 +8,58 @@
 #include <memory>
 #include <new>
 
+#include "base/failure.h"
+#include "base/loaded_library.h"
 #include "base/text.h"
 
 namespace {
 
 constexpr std::size_t kBorder = 4;  // fields on each side
+
+// ---- The libraries ----
+//
+// They are loaded with the first picture, and not with each start of the program.
+
+// What makes codes. Its header does not tell the SONAME.
+struct CodeLibrary : LoadedLibrary {
+  CodeLibrary() : LoadedLibrary("libqrencode.so.4") {}
+
+  decltype(QRinput_new2)* newInput = Find<decltype(QRinput_new2)>("QRinput_new2");
+  decltype(QRinput_appendECIheader)* addEncoding = Find<decltype(QRinput_appendECIheader)>("QRinput_appendECIheader");
+  decltype(QRinput_append)* addBytes = Find<decltype(QRinput_append)>("QRinput_append");
+  decltype(QRcode_encodeInput)* encode = Find<decltype(QRcode_encodeInput)>("QRcode_encodeInput");
+  decltype(QRinput_free)* freeInput = Find<decltype(QRinput_free)>("QRinput_free");
+  decltype(QRcode_free)* freeCode = Find<decltype(QRcode_free)>("QRcode_free");
+};
+
+const CodeLibrary& Codes() {
+  try {
+    static const CodeLibrary library;
+    return library;
+  } catch (const NotLoaded& missing) {
+    throw Failure(Exit::kFailed, std::string("no code can be drawn: ") + missing.what(), "install that library");
+  }
+}
+
+// What writes pictures.
+struct PictureLibrary : LoadedLibrary {
+  static_assert(PNG_LIBPNG_VER_SONUM == 16, "load the library of this header");
+  PictureLibrary() : LoadedLibrary("libpng16.so.16") {}
+
+  decltype(png_image_write_to_memory)* write = Find<decltype(png_image_write_to_memory)>("png_image_write_to_memory");
+};
+
+const PictureLibrary& Pictures() {
+  try {
+    static const PictureLibrary library;
+    return library;
+  } catch (const NotLoaded& missing) {
+    throw Failure(Exit::kFailed, std::string("no picture can be written: ") + missing.what(),
+                  "install that library, or take --svg");
+  }
+}
+
+// ---- The code ----
 
 using Code = std::unique_ptr<QRcode, void (*)(QRcode*)>;
 using Input = std::unique_ptr<QRinput, void (*)(QRinput*)>;
@@ -24,17 +71,20 @@ bool IsAscii(std::string_view bytes) {
 // A code says when its bytes are UTF-8, since readers guess wrong elsewhere.
 Code Encode(std::string_view bytes) {
   constexpr unsigned kUtf8 = 26;
+  const CodeLibrary& library = Codes();
   const auto* data = reinterpret_cast<const unsigned char*>(bytes.data());
-  const Input input(QRinput_new2(0, QR_ECLEVEL_M), QRinput_free);
+  const Input input(library.newInput(0, QR_ECLEVEL_M), library.freeInput);
   const bool says = !IsAscii(bytes) && IsUtf8(bytes);
-  Code code(nullptr, QRcode_free);
-  if (input && (!says || QRinput_appendECIheader(input.get(), kUtf8) == 0) &&
-      QRinput_append(input.get(), QR_MODE_8, static_cast<int>(bytes.size()), data) == 0) {
-    code.reset(QRcode_encodeInput(input.get()));
+  Code code(nullptr, library.freeCode);
+  if (input && (!says || library.addEncoding(input.get(), kUtf8) == 0) &&
+      library.addBytes(input.get(), QR_MODE_8, static_cast<int>(bytes.size()), data) == 0) {
+    code.reset(library.encode(input.get()));
   }
   if (!code) throw std::bad_alloc();  // a code has room for far more than a name and a secret
   return code;
 }
+
+// ---- The picture ----
 
 // Two fields, one above the other, by the light ones.
 std::string_view HalfBlocks(bool upperIsDark, bool lowerIsDark) {
@@ -111,7 +161,7 @@ std::string CodePicture::Png() const {
   image.width = image.height = static_cast<png_uint_32>(side);
   std::string png(PNG_IMAGE_PNG_SIZE_MAX(image), '\0');
   png_alloc_size_t size = png.size();
-  if (png_image_write_to_memory(&image, png.data(), &size, 0, dots.data(), 0, nullptr) == 0) throw std::bad_alloc();
+  if (Pictures().write(&image, png.data(), &size, 0, dots.data(), 0, nullptr) == 0) throw std::bad_alloc();
   png.resize(size);
   return png;
 }
