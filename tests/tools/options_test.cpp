@@ -1,13 +1,43 @@
 // The command line.
 #include <algorithm>
+#include <cstdlib>
+#include <new>
 #include <sstream>
 
+#include "app/options.h"
 #include "base/text.h"
 #include "running.h"
 
 using testing::Contains;
 using testing::HasSubstr;
 using testing::MatchesRegex;
+
+namespace {
+
+std::size_t allocations = 0;
+
+}  // namespace
+
+// ---- Memory, counted: each way to get some that these ways to give it back belong to ----
+
+void* operator new(std::size_t size) {
+  ++allocations;
+  if (void* memory = std::malloc(size)) return memory;
+  throw std::bad_alloc();
+}
+
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+  ++allocations;
+  return std::malloc(size);
+}
+
+void operator delete(void* memory) noexcept {
+  std::free(memory);
+}
+
+void operator delete(void* memory, std::size_t) noexcept {
+  std::free(memory);
+}
 
 namespace {
 
@@ -189,6 +219,20 @@ TEST_F(CommandLine, ExplainsItselfOnRequest) {
   const Ran ran = Tool({"--help"});
   EXPECT_EQ(ran.status, 0);
   EXPECT_THAT(Tool({"ap", "set", "--help"}).out, HasSubstr("--channel N|auto"));
+}
+
+std::size_t AllocationsFor(const std::vector<const char*>& arguments) {
+  const std::size_t before = allocations;
+  ParseOptions(static_cast<int>(arguments.size()), arguments.data());
+  return allocations - before;
+}
+
+// Each command took the time that it takes to describe the options of all.
+TEST_F(CommandLine, CostsNothingForTheOptionsOfCommandsThatItDoesNotName) {
+  const std::size_t few = AllocationsFor({"merowireless", "status"});
+  const std::size_t many = AllocationsFor({"merowireless", "ap", "set", "--channel", "6"});
+  EXPECT_GT(few, 0U);
+  EXPECT_GT(many, 3 * few / 2);
 }
 
 TEST_F(CommandLine, TellsTheVersion) {

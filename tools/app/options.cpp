@@ -4,11 +4,14 @@
 #include <CLI/App.hpp>
 #include <CLI/Config.hpp>
 #include <CLI/Formatter.hpp>
+#include <algorithm>
 #include <chrono>
 #include <limits>
 #include <memory>
 #include <optional>
+#include <span>
 #include <sstream>
+#include <string_view>
 #include <vector>
 
 #include "app/spelling.h"
@@ -45,10 +48,13 @@ std::string About() {
 }
 
 // Adds commands: a name, a sentence of help, the function that describes the options, and the one that acts on their
-// values. The values live as long as the action, which holds them.
+// values. The values live as long as the action, which holds them. To describe the options of all commands takes longer
+// than most of what a command does, so they are described of those alone whose name stands among the arguments: no
+// other can be the one that is given.
 class Commands {
  public:
-  Commands(CLI::App& app, Options& options) : app_(app), options_(options) {}
+  Commands(CLI::App& app, Options& options, std::span<const char* const> arguments)
+      : app_(app), options_(options), arguments_(arguments) {}
 
   template <class Values = std::nullptr_t>
   CLI::App* Add(CLI::App& parent, const char* szName, const char* szHelp,
@@ -56,7 +62,7 @@ class Commands {
                 std::function<void(const Program&, const Values&)> act) {
     CLI::App* command = parent.add_subcommand(szName, szHelp);
     const auto values = std::make_shared<Values>();
-    if (describe) describe(*command, *values);
+    if (describe && IsNamed(szName)) describe(*command, *values);
     command->callback(
         [this, values, act] { options_.command = [values, act](const Program& program) { act(program, *values); }; });
     return command;
@@ -79,8 +85,11 @@ class Commands {
   }
 
  private:
+  bool IsNamed(std::string_view name) const { return std::ranges::find(arguments_, name) != arguments_.end(); }
+
   CLI::App& app_;
   Options& options_;
+  std::span<const char* const> arguments_;
 };
 
 // What needs an adapter says at once that there is none: before it waits for one, and before it asks for a secret.
@@ -512,7 +521,7 @@ Options ParseOptions(int argc, const char* const* argv) {
   app.set_version_flag("--version", "merowireless " MERO_VERSION, "tell the version of this program");
   app.require_subcommand(1);
 
-  Commands commands(app, options);
+  Commands commands(app, options, std::span(argv, static_cast<std::size_t>(argc)));
   AddNetworkCommands(commands);
   AddConnectionCommands(commands);
   AddApCommands(commands, app);
