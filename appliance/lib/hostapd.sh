@@ -74,9 +74,11 @@ write_configuration() { # INTERFACE FILE
 }
 
 # make_configuration: makes the daemon's $content out of the files' $lines. Features that the card lacks are left out,
-# since the daemon does not start with them.
+# since the daemon does not start with them. A main network that is off at this hour starts without its beacon, and gets
+# it when its interface, which is taken down then, comes up.
 make_configuration() {
 	bits=$ht_of_2ghz content='' told=''
+	[ "$turn" = up ] || content=start_disabled=1$newline
 	case $newline$lines$newline in *"${newline}hw_mode=a$newline"*) bits=$ht_of_5ghz ;; esac
 	begin_network
 	set -f

@@ -26,10 +26,16 @@ is_off_now() {
 	case $hours in 0*) ;; *) return 1 ;; esac
 }
 
-# An interface that is down is off the air; the daemon puts its network back when it comes up.
-apply_main_schedule() { # INTERFACE
+# Whether the main network's interface is to be up or down at this hour: an interface that is down is off the air, and the
+# daemon puts its network back when it comes up. It is decided once for each run, since the hour may change meanwhile.
+turn=up
+
+decide_on_main() {
 	turn=up
 	if is_off_now wifi_sched_enabled wifi_sched; then turn=down; fi
+}
+
+turn_main() { # INTERFACE
 	is_switched "$1" "$turn" || attempt "cannot switch $1 $turn" ip link set dev "$1" "$turn"
 }
 

@@ -311,6 +311,45 @@ TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   EXPECT_EQ(Left(), "");
 }
 
+// Has the main network be off the air in the first hour of the week, and sets the hour.
+void SetHours(const std::string& now) {
+  WriteText("/usr/mero/etc/wireless_ap.conf",
+            "[RT [5370]\n\twifi_sched_enabled=1\n\twifi_sched=0" + std::string(167, '1') + "\n");
+  Install("date", "cat /tmp/hour\n");
+  WriteText("/tmp/hour", now + "\n");
+}
+
+std::string StateOfMain() {
+  return RunInShell("ip -brief link show up dev wlan0 | grep -q wlan0 && echo up || echo down").out;
+}
+
+// It was on the air for a moment, in which anybody could join.
+TEST_F(KitAccessPoint, IsNotOnTheAirForAMomentAtAnHourThatItsScheduleHasItOff) {
+  constexpr char kConfiguration[] = "/run/rc.network/hostapd-wlan0.conf";
+  SetHours("0 00");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_THAT(ReadText(kConfiguration), StartsWith("start_disabled=1\ninterface=wlan0\n"));
+  EXPECT_EQ(StateOfMain(), "down\n");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(StateOfMain(), "down\n");
+  SetHours("0 01");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(StateOfMain(), "up\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_THAT(ReadText(kConfiguration), StartsWith("interface=wlan0\n"));
+  EXPECT_EQ(StateOfMain(), "up\n");
+}
+
+// A network without its beacon would stay so if its interface did not go down and come up again.
+TEST_F(KitAccessPoint, IsOnTheAirInTheNextHourWhenThatComesDuringItsStart) {
+  SetHours("0 00");
+  StandIn("hostapd", "echo 0 01 >/tmp/hour\n" + Daemon("hostapd", "-P"));
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(StateOfMain(), "down\n");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(StateOfMain(), "up\n");
+}
+
 // Files had the mode that the caller's umask left them.
 TEST_F(KitAccessPoint, HasFilesOfTheSameModesWhateverTheUmask) {
   WriteText("/etc/hostapd/hostapd-wlan0-host.conf", "interface=wlan0\nssid=home\nwpa_psk_file=/etc/hostapd.psk\n");

@@ -30,7 +30,7 @@ constexpr const char* kQuestions[] = {
     "give_up_bridge br0",
     "decide_on_guests wlan0",
     "! is_off_now wifi_sched_enabled wifi_sched",
-    "apply_main_schedule lo",
+    "decide_on_main",
     "serve_addresses br0",
     "guest_rules",
     "verdict guest_net_lan_block",

@@ -109,12 +109,31 @@ on nas merowireless radio on
 expect_output <<<'the radio is on, and office is on the air on channel 11'
 expect_truth on-air
 
-say '-- off by its schedule'
-inside nas sh -c 'printf "%0168d" 0 >/var/lib/never'
-on nas merowireless ap set --bridge lbr0 --wifi-sched /var/lib/never
+say '-- off by its schedule, from the first moment on'
+inside nas sh -c 'printf "%0168d" 0 >/var/lib/never; printf "%0168d" 0 | tr 0 1 >/var/lib/always'
+on nas merowireless ap disable
+on nas merowireless ap set --bridge lbr0 --wifi-sched /var/lib/never --ieee80211n-wireless-width 20
+# What a start does besides takes as long as on a slow machine.
+inside nas tee /usr/local/sbin/dnsmasq >/dev/null <<<$'#!/bin/sh\nsleep 1; touch /run/slow; exec /usr/sbin/dnsmasq "$@"'
+inside nas chmod 755 /usr/local/sbin/dnsmasq
+ip link set hwsim0 up
+/run/lab/products/usr/bin/race-watch beacon hwsim0 bureau 10 >/run/lab/beacon 2>&1 &
+watcher=$!
+within 10 grep -qx watching /run/lab/beacon || fail 'nobody listens to the air'
 on nas merowireless ap enable
 expect_output <<<'the access point bureau is enabled, and is off the air at this hour, by its schedule'
 expect_truth off-by-schedule
+inside nas rm /run/slow /usr/local/sbin/dnsmasq
+! wait "$watcher" || fail 'the access point was on the air at an hour that its schedule has it off'
+
+say '-- and on at the hour that has it on'
+/run/lab/products/usr/bin/race-watch beacon hwsim0 bureau 10 >/run/lab/beacon 2>&1 &
+watcher=$!
+within 10 grep -qx watching /run/lab/beacon || fail 'nobody listens to the air'
+on nas merowireless ap set --wifi-sched /var/lib/always
+on nas /etc/rc.network schedule wlan0
+wait "$watcher" || fail 'the access point is not on the air at an hour that its schedule has it on'
+expect_truth on-air
 on nas merowireless ap set --wifi-sched off
 # shellcheck disable=SC2016  # for the appliance's shell
 on nas sh -c 'merowireless ap enable & for try in $(seq 99); do
