@@ -1,6 +1,6 @@
 # The wireless adapter: its interface, its name, and whether it is used as an access point.
 # shellcheck shell=sh
-# shellcheck disable=SC2154  # what the other parts set
+# shellcheck disable=SC2034,SC2154  # what the other parts use, and set
 
 # adapter: prints the first wireless interface by name; false when there is none. The guests' interface does not count,
 # since it is a second one on the same radio.
@@ -15,9 +15,40 @@ adapter() {
 	return 1
 }
 
+known_adapter='' # the interface of the adapter that know_adapter has read about
+
+# know_adapter INTERFACE: reads at once what decides on an adapter that is plugged in: its $section, the radio's switch,
+# the country, its access point, and the bridge of that. Where one cannot be read nothing is known, and each is read by
+# whoever needs it, so that what goes without it is done all the same.
+know_adapter() {
+	device=$(readlink -f "/sys/class/net/$1/device") || return 0
+	answer=$(
+		read_name "$device" || exit
+		exec "$settings_reader" section-name -- access-point unblock -- file "$country_settings" country -- \
+			check "$hostapd_files-$1.info" enable yes -- file "$scripts/ifcfg-$1" BRIDGE 2>/dev/null
+	)
+	[ $? -le 1 ] || return 0
+	into section setting_unblock country is_access_point bridge
+	[ -n "$section" ] || return 0
+	known_adapter=$1 known_settings=unblock
+}
+
+# read_name DEVICE: makes what the adapter is called the standard input.
+read_name() {
+	for file in "$1/../product" "$1/product"; do
+		[ -s "$file" ] || continue
+		exec <"$file"
+		return
+	done
+	numbers=$(numbers_of "$1") || return
+	exec <<-END
+		$numbers
+	END
+}
+
 # PRODUCT names the adapter's section in the access point's settings.
 note_adapter() { # INTERFACE
-	section=$(section_of "$1") || exit 1
+	[ "$known_adapter" = "$1" ] || section=$(section_of "$1") || exit 1
 	put "$adapter_info" "INTERFACE=\"$1\"
 PRODUCT=\"$section\"" 644
 }
@@ -72,7 +103,10 @@ can_be_access_point() { # INTERFACE
 
 # access_point_is INTERFACE yes|no: whether an access point has been set up there and is switched on (yes) or off (no).
 access_point_is() {
-	ask check "$hostapd_files-$1.info" enable "$2"
+	case $known_adapter,$2 in
+	"$1,yes") [ "$is_access_point" = yes ] ;;
+	*) ask check "$hostapd_files-$1.info" enable "$2" ;;
+	esac
 }
 
 set_access_point() { # INTERFACE yes|no

@@ -14,9 +14,10 @@ expect_country() {
 }
 
 # keep_to_country: has the kernel keep to the country's rules. Without them it allows what is allowed everywhere, so a
-# failure keeps nobody from using the adapter.
+# failure keeps nobody from using the adapter. $country is known with the adapter.
 keep_to_country() {
-	country=$(value_of country "$country_settings") && (expect_country) && [ -n "$country" ] || return 0
+	[ -n "$known_adapter" ] || country=$(value_of country "$country_settings") || return 0
+	(expect_country) && [ -n "$country" ] || return 0
 	said=$(iw reg set "$country" 2>&1) || {
 		warn "cannot set the country $country: $said"
 		return
@@ -27,5 +28,13 @@ keep_to_country() {
 # has_rules_of COUNTRY: whether the kernel keeps to them; it begins a moment after it was told, or not at all. Those of a
 # radio that has its own stand behind those that hold for all.
 has_rules_of() {
-	iw reg get 2>/dev/null | awk -v country="$1:" '$1 == "country" { found = $2 == country; exit } END { exit !found }'
+	regulations=$(iw reg get 2>/dev/null) || return 1
+	while read -r word which _; do
+		[ "$word" = country ] || continue
+		[ "$which" = "$1:" ]
+		return
+	done <<-END
+		$regulations
+	END
+	return 1
 }

@@ -25,7 +25,8 @@ constexpr char kUsage[] =
        mero-settings bridge BRIDGE VALUE...    nat, at-boot, static, address, mask, member, hardware-address
        mero-settings file FILE KEY...          values in a key/value file
        mero-settings check FILE KEY VALUE      whether a key/value file holds a key with exactly that value
-       mero-settings section-name              the settings' section for the adapter's name on standard input
+       mero-settings section-name              the settings' section for the adapter's name on standard input, which
+                                               access-point behind it tells the settings of
 
 Tells a line for each thing asked for; several requests can follow each other, with -- between them. What the settings
 of the access point lack has its default; secrets are not told. What else is missing is an empty line.
@@ -49,6 +50,9 @@ using Words = std::span<char* const>;
 // The lines that are printed, all at once, and the exit status.
 class Answers {
  public:
+  // The section that section-name has told of. What is asked of the access point behind it is that section's.
+  std::optional<std::string> section;
+
   void Add(std::string_view line) { (text_ += line) += '\n'; }
   void AddMissing() {
     Add("");
@@ -74,16 +78,20 @@ class Answers {
 
 // ---- The access point --------------------------------------------------------------------------------------------
 
-// The settings for the adapter; none where there is no adapter or no section for it.
-std::optional<MERO_AP_CONF> ReadAccessPoint() {
+// The section of the adapter that is plugged in; none where there is no adapter.
+std::optional<std::string> SectionOfAdapter() {
   if (PLIBCFileExist(kAdapterInfoPath) == 0) return std::nullopt;
   char szSection[1024];
-  if (MEROWirelessApConfigSecNameGet(szSection, sizeof szSection) == FALSE) {
-    if (PLIBCErrGet() == ERR_KEY_NOT_FOUND) return std::nullopt;
-    throw Unreadable(kAdapterInfoPath);
-  }
+  if (MEROWirelessApConfigSecNameGet(szSection, sizeof szSection) != FALSE) return szSection;
+  if (PLIBCErrGet() == ERR_KEY_NOT_FOUND) return std::nullopt;
+  throw Unreadable(kAdapterInfoPath);
+}
+
+// The settings in a section; none where there is no such section.
+std::optional<MERO_AP_CONF> ReadAccessPoint(const std::optional<std::string>& section) {
+  if (!section) return std::nullopt;
   MERO_AP_CONF conf;
-  const int found = MEROWirelessGetAPConfig(szSection, &conf);
+  const int found = MEROWirelessGetAPConfig(section->c_str(), &conf);
   if (found < 0) throw Unreadable(kApSettingsPath);
   return found > 0 ? std::optional(conf) : std::nullopt;
 }
@@ -110,7 +118,7 @@ void AddSetting(Answers& answers, const Setting& setting, const std::optional<ME
 
 void TellAccessPoint(Answers& answers, Words keys) {
   if (keys.empty()) throw WrongUsage("access-point needs a KEY");
-  const std::optional<MERO_AP_CONF> conf = ReadAccessPoint();
+  const std::optional<MERO_AP_CONF> conf = ReadAccessPoint(answers.section ? answers.section : SectionOfAdapter());
   for (const char* szKey : keys) AddSetting(answers, SettingOf(szKey), conf);
 }
 
@@ -222,7 +230,9 @@ void TellSectionName(Answers& answers, Words words) {
   char text[64 * 1024];
   const std::string name = SectionName({text, std::fread(text, 1, sizeof text, stdin)});
   if (std::ferror(stdin) != 0) throw std::runtime_error("cannot read the adapter's name");
-  name.empty() ? answers.AddMissing() : answers.Add(name);
+  if (name.empty()) return answers.AddMissing();
+  answers.Add(name);
+  answers.section = name;
 }
 
 // ---- Requests ----------------------------------------------------------------------------------------------------

@@ -1,4 +1,4 @@
-// How many processes the network start script takes for what it does. Each takes longer than all that the shell does by
+// How many processes the scripts take for what they do. Each takes longer than all that the shell does by
 // itself, and until the last of them has ended nobody can join.
 #include "kit_radio.h"
 
@@ -32,10 +32,10 @@ exec "${0##*/}" "$@"
     return "echo '17.5: wlan0: interface state " + change + "' >>$log\n";
   }
 
-  // The programs that the script runs, in order, but for pauses.
-  static std::string ProgramsOf(const std::string& words) {
+  // The programs that a script runs, in order, but for pauses.
+  static std::string ProgramsOf(const std::string& words, const std::string& script = "/etc/rc.network") {
     RunInShell("rm -f /tmp/ran /tmp/asked");
-    const Ran ran = RunInShell("PATH=/tmp/noted /etc/rc.network " + words);
+    const Ran ran = RunInShell("PATH=/tmp/noted " + script + " " + words);
     EXPECT_EQ(ran.out, "");
     EXPECT_EQ(ran.status, 0);
     return RunInShell("grep -v sleep /tmp/ran | xargs").out;
@@ -97,6 +97,82 @@ TEST_F(KitCost, OfABootIsTwoProcessesForEachBridge) {
             "DEVICE=abr0\nTYPE=Bridge\nBOOTPROTO=static\nIPADDR=192.0.2.1\nNETMASK=255.255.255.0\nONBOOT=yes\n");
   // The third file is that of the wireless interface.
   EXPECT_EQ(ProgramsOf("boot"), "find flock mero-settings ip mero-settings ip mero-settings\n");
+}
+
+// ---- The hot-plug script ----
+
+class HotPlugCost : public KitCost {
+ protected:
+  HotPlugCost() {
+    fs::create_directories("/tmp/adapters/wlan0/phy80211");
+    RunInShell("sed -i 's,/sys/class/net/\\*/phy80211,/tmp/adapters/*/phy80211,' /usr/mero/lib/network/adapter.sh");
+    fs::create_directories("/tmp/usb/device");
+    WriteText("/tmp/usb/product", "RT [5370\n");
+    Install("readlink", "echo /tmp/usb/device\n");
+    StandIn("iw", "[ \"$*\" != 'reg get' ] || echo 'country DE: DFS-ETSI'\n");
+    WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
+    fs::remove("/tmp/wireless.info");
+  }
+
+  static std::string ProgramsOf(const std::string& words) {
+    return KitCost::ProgramsOf(words, "/usr/mero/hotplug/usb.wireless.function");
+  }
+};
+
+constexpr char kOfAStart[] = "find flock mero-settings ip nft iw sed hostapd dnsmasq chown";
+
+// It read settings five times before the start of the access point.
+TEST_F(HotPlugCost, OfAnAdapterThatIsPluggedInIsOneReadingOfItsSettings) {
+  EXPECT_EQ(ProgramsOf("add"), "readlink mero-settings iw iw mktemp chmod mv " + std::string(kOfAStart) + "\n");
+  EXPECT_EQ(ReadText("/tmp/wireless.info"), "INTERFACE=\"wlan0\"\nPRODUCT=\"RT 5370\"\n");
+  EXPECT_EQ(Daemons(), OnAir());
+}
+
+TEST_F(HotPlugCost, OfAnAdapterWithoutAnAccessPointIsThatAlone) {
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  EXPECT_EQ(ProgramsOf("add"), "readlink mero-settings iw iw mktemp chmod mv\n");
+}
+
+TEST_F(HotPlugCost, OfAnAdapterWithoutANameIsNoMore) {
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  fs::remove("/tmp/usb/product");
+  WriteText("/tmp/usb/idVendor", "148f\n");
+  WriteText("/tmp/usb/idProduct", "5370\n");
+  EXPECT_EQ(ProgramsOf("add"), "readlink mero-settings iw iw mktemp chmod mv\n");
+  EXPECT_EQ(ReadText("/tmp/wireless.info"), "INTERFACE=\"wlan0\"\nPRODUCT=\"148f:5370\"\n");
+}
+
+// What is known of the adapter before it is noted is what its own section says, and not that of the adapter before it.
+TEST_F(HotPlugCost, KeepsTheRadioOffThatIsOffByTheSectionOfTheAdapter) {
+  fs::create_directories("/tmp/adapters/wlan0/phy80211/rfkill0");
+  RunInShell(
+      "sed -i 's,\"/sys/class/net/$1/phy80211\"/rfkill,/tmp/adapters/wlan0/phy80211/rfkill,' "
+      "/usr/mero/lib/network/adapter.sh");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  for (const bool isBlocked : {true, false}) {
+    WriteText("/tmp/adapters/wlan0/phy80211/rfkill0/soft", "0\n");
+    WriteText("/tmp/wireless.info", "PRODUCT=\"another\"\n", 0644);
+    WriteText("/usr/mero/etc/wireless_ap.conf", std::string("[another]\n\tunblock=") + (isBlocked ? "yes" : "no") +
+                                                    "\n[RT 5370]\n\tunblock=" + (isBlocked ? "no" : "yes") + "\n");
+    ProgramsOf("add");
+    EXPECT_EQ(ReadText("/tmp/adapters/wlan0/phy80211/rfkill0/soft"), isBlocked ? "1\n" : "0\n");
+  }
+}
+
+// Each setting that can be read counts, whichever cannot.
+TEST_F(HotPlugCost, OfSettingsThatCannotBeReadIsNotTheAdapter) {
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  fs::remove("/usr/mero/etc/wireless_country.conf");
+  fs::create_directories("/usr/mero/etc/wireless_country.conf");
+  RunInShell("PATH=/tmp/bin:$PATH /usr/mero/hotplug/usb.wireless.function add");
+  EXPECT_EQ(ReadText("/tmp/wireless.info"), "INTERFACE=\"wlan0\"\nPRODUCT=\"RT 5370\"\n");
+}
+
+TEST_F(HotPlugCost, OfAnAdapterThatIsPulledIsOneReadingOfItsNoteAndOneForItsAccessPoint) {
+  ASSERT_THAT(ProgramsOf("add"), testing::StartsWith("readlink "));
+  RunInShell("ip link delete wlan0");
+  EXPECT_EQ(ProgramsOf("remove"),
+            "mero-settings mktemp chmod mv mero-settings find flock rm rm nft rm mero-settings rm ip rm\n");
 }
 
 }  // namespace

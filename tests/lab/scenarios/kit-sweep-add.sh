@@ -6,4 +6,4 @@
 appliance nas
 swept_access_point nas
 sweep nas add
-expect_swept 8
+expect_swept 7
