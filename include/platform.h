@@ -497,7 +497,7 @@ int MERONetSetCard1(const NETINFO* pNetInfo, int flags);
  * addresses the interface. MEROWirelessNetworkDisconnect(), a static address and the next lease end that.
  *
  * @param pNetInfo  names the interface; receives its hardware address, the address leased and its mask.
- * @param seconds   how long to wait for a server, at most; less than 4 counts as 4.
+ * @param seconds   how long to wait for a server, which is asked each second, at most; less than 1 counts as 1.
  * @return 0; -1 when no server has answered yet, or the interface cannot be brought up.
  *
  * /usr/mero/sbin/udhcpc.lease applies what is leased, and gives it back when the client ends; mero_connection(3) tells

@@ -17,32 +17,29 @@
 
 namespace {
 
-constexpr int kTries = 4;       // the client waits as long after each
 constexpr int kGrace = 15;      // seconds more, for the script that applies the lease
 constexpr int kTimedOut = 124;  // timeout(1)'s exit status when the time is up
 
-// Runs the client until it has a lease, or was not answered in time. It stays behind to renew the lease, or to go on
-// asking for one.
+// Runs the client until it has a lease, or was not answered in time. It asks each second, since everybody waits for the
+// next question when one is lost. It stays behind to renew the lease, or to go on asking for one.
 Status Lease(const char* szIfName, int seconds) {
   const InterfacePath pidFile(kDhcpClientPidFormat, szIfName);
+  const int tries = std::max(seconds, 1);
   char szTries[16];
-  char szWait[16];
-  std::snprintf(szTries, sizeof szTries, "%d", kTries);
-  std::snprintf(szWait, sizeof szWait, "%d", std::max(seconds / kTries, 1));
-
+  std::snprintf(szTries, sizeof szTries, "%d", tries);
   char szLimit[16];
-  std::snprintf(szLimit, sizeof szLimit, "%d", std::max(seconds, kTries) + kGrace);
+  std::snprintf(szLimit, sizeof szLimit, "%d", tries + kGrace);
 
   // The time is limited: a server that offers and refuses again and again would keep the client in the foreground.
   const char* const argv[] = {
-      "/usr/bin/timeout", "-k", "2",          szLimit, kDhcpClientPath, "udhcpc", "-b",   "-S",   "-i", szIfName, "-p",
-      pidFile.c_str(),    "-s", kLeaseScript, "-t",    szTries,         "-T",     szWait, nullptr};
+      "/usr/bin/timeout", "-k", "2",          szLimit, kDhcpClientPath, "udhcpc", "-b", "-S",   "-i", szIfName, "-p",
+      pidFile.c_str(),    "-s", kLeaseScript, "-t",    szTries,         "-T",     "1",  nullptr};
   Result<int> exitStatus = RunProgram(argv, Standard::kNull);
   if (!exitStatus.ok()) return exitStatus.status();
   if (*exitStatus == kTimedOut) return Status::Failed(ETIMEDOUT);
   if (*exitStatus != 0) return Status::Failed(ENOEXEC);
   // The client that stays behind writes its pid file only now, and without its pid it could not be ended.
-  for (int tries = 100; tries > 0 && !IsDaemonThere(pidFile.c_str(), kDhcpClientProgram); --tries) {
+  for (int looks = 100; looks > 0 && !IsDaemonThere(pidFile.c_str(), kDhcpClientProgram); --looks) {
     (void)::poll(nullptr, 0, 10);
   }
   return Status::Ok();

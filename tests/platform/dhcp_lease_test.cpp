@@ -1,4 +1,9 @@
 // Leasing an address: the script that applies a lease and gives it back, and the client that runs it.
+#include <arpa/inet.h>
+#include <linux/if_packet.h>
+#include <net/ethernet.h>
+#include <net/if.h>
+#include <sys/socket.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -9,6 +14,7 @@
 #include <string>
 #include <vector>
 
+#include "common/descriptor.h"
 #include "common/text.h"
 #include "tests/platform/network_interfaces.h"
 #include "tests/platform/platform_test.h"
@@ -619,6 +625,40 @@ TEST_F(ALeasingClient, GoesOnAskingWhenNobodyAnswersInTime) {
   EXPECT_TRUE(HasEnded(client));
   EXPECT_EQ(MEROWirelessNetworkDisconnect(), 0);
   ExpectGivenBack();
+}
+
+// What is sent to a server while this lives.
+class Questions {
+ public:
+  Questions() : heard_(::socket(AF_PACKET, SOCK_DGRAM | SOCK_CLOEXEC, htons(ETH_P_IP))) {
+    sockaddr_ll end{};
+    end.sll_family = AF_PACKET;
+    end.sll_protocol = htons(ETH_P_IP);
+    end.sll_ifindex = static_cast<int>(::if_nametoindex("serve0"));
+    EXPECT_EQ(::bind(heard_.get(), reinterpret_cast<const sockaddr*>(&end), sizeof end), 0);
+  }
+
+  int Count() const {
+    constexpr std::size_t kPort = 22;  // behind a header of 20 bytes, the second of two
+    int count = 0;
+    unsigned char packet[2048];
+    while (::recv(heard_.get(), packet, sizeof packet, MSG_DONTWAIT) > static_cast<ssize_t>(kPort + 1)) {
+      if (packet[kPort] == 0 && packet[kPort + 1] == 67) ++count;
+    }
+    return count;
+  }
+
+ private:
+  Descriptor heard_;
+};
+
+// When one was lost, everybody waited 4 s for the next.
+TEST_F(ALeasingClient, AsksEachSecond) {
+  const Questions questions;
+  NETINFO netInfo = Asker();
+  EXPECT_EQ(MEROIGetDHCPTestNetInfo(&netInfo, 6), -1);
+  EXPECT_GE(questions.Count(), 6);
+  TakeLog();
 }
 
 TEST_F(ALeasingClient, ThatAsksInVainIsEndedByDisconnecting) {

@@ -14,7 +14,7 @@ office=(essid=office bssid="$(address_of office)" protocol=11b/g auth=WPAPSK enc
 lounge=(essid=lounge bssid="$(address_of lounge)" protocol=11a auth=WPA2PSK encrypt=TKIP+AES key='any old key')
 supplicant='/usr/sbin/wpa_supplicant -Dwext -iwlan0 -c/usr/mero/etc/wpa_supplicant.conf -B'
 supplicant+=' -P/var/run/wpa_supplicant.pid'
-dhcp_client='/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 4 -T 4'
+dhcp_client='/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 16 -T 1'
 
 # The media service has to be told of a new network.
 inside nas tee /etc/meroinfo.conf >/dev/null <<'END'

@@ -21,7 +21,7 @@ ended=$(uptime_seconds)
 ((${ended%.*} - ${began%.*} <= 18)) || fail "it was waited for too long: $began to $ended"
 expect_message nas 'Failed to get IP from DHCP'
 expect_processes nas <<END
-/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 4 -T 4
+/bin/busybox udhcpc -b -S -i wlan0 -p /var/run/udhcpc-wlan0.pid -s /usr/mero/sbin/udhcpc.lease -t 16 -T 1
 /usr/sbin/wpa_supplicant -Dwext -iwlan0 -c/usr/mero/etc/wpa_supplicant.conf -B -P/var/run/wpa_supplicant.pid
 END
 expect_address nas ''
