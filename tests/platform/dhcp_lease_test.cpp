@@ -424,15 +424,30 @@ TEST_F(ALease, SaysThatItsInterfaceHasGone) {
   Shell("ip link set gone0 name net0");
 }
 
-// A score of programs ran, twice over, before the client sent its first word, although there was nothing to take back.
-TEST_F(ALease, ThatWasNeverMadeIsGivenBackWithoutAnyProgram) {
-  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
-  Shell("ip address add 192.0.2.9/24 dev eth5 && ip route add default via 192.0.2.1 dev eth5");
-  for (const char* szProgram : {"awk", "busybox", "cat", "flock", "grep", "head", "ip", "mkdir", "readlink"}) {
+// Has the programs that the script may run note their calls.
+void NotePrograms() {
+  for (const char* szProgram : {"awk", "busybox", "cat", "chmod", "cp", "flock", "grep", "head", "ip", "mkdir",
+                                "mktemp", "mv", "readlink", "sed"}) {
     WriteScript(std::string("/tmp/platform/") + szProgram,
                 "echo \"${0##*/} $*\" >>/tmp/platform/ran\n"
                 "exec env PATH=/usr/sbin:/usr/bin \"${0##*/}\" \"$@\"\n");
   }
+}
+
+// Two more looked for its lines and for a domain.
+TEST_F(ALease, ChangesTheNameServersByFivePrograms) {
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
+  fs::create_directories("/var/run/udhcpc.lease");
+  NotePrograms();
+  EXPECT_EQ(Bound({"dns=10.1.0.2", "domain=home.example"}), 0);
+  EXPECT_EQ(Shell("sed 's/ .*//' /tmp/platform/ran | xargs"), "busybox flock cat mktemp cp mv\n");
+}
+
+// A score of programs ran, twice over, before the client sent its first word, although there was nothing to take back.
+TEST_F(ALease, ThatWasNeverMadeIsGivenBackWithoutAnyProgram) {
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
+  Shell("ip address add 192.0.2.9/24 dev eth5 && ip route add default via 192.0.2.1 dev eth5");
+  NotePrograms();
   EXPECT_EQ(Run({"left", "net0"}), 0);
   EXPECT_EQ(TextOrNothing("/tmp/platform/ran"), "");
   EXPECT_EQ(Run({"deconfig"}, {"interface=net0"}), 0);
