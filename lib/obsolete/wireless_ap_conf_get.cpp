@@ -14,7 +14,7 @@ namespace {
 
 int GetIntegerValue(const PPLIBSZHASH pHash, const char* key, int defValue) {
   const char* szValue = PLIBCSzHashGetValue(pHash, key);
-  return szValue != nullptr ? std::atoi(szValue) : defValue;
+  return szValue != nullptr ? static_cast<int>(std::strtol(szValue, nullptr, 10)) : defValue;
 }
 
 const char* GetStringValue(const PPLIBSZHASH pHash, const char* key, const char* defValue) {

@@ -159,6 +159,10 @@ TEST_F(ListingRow, HasTheAddressAndTheSignalBehindItsName) {
       {" ff:ff:ff:ff:ff:ff 0 11n WEP", "\xff\xff\xff\xff\xff\xff", 0},
       {" 1fe:2:3:4:5:abcdef99 +5 11n WEP", "\xfe\x02\x03\x04\x05\x99", 5},
       {" 1: 2: 3: 4: 5: 6 -2147483648 11n WEP", "\x01\x02\x03\x04\x05\x06", -2147483647 - 1},
+      {" +a:-1:0x1f:0Xe:-0x2: +0xd 1 11n WEP", "\x0a\xff\x1f\x0e\xfe\x0d", 1},
+      {" 0x:0X:+0x:-0x: 0x:0x 1 11n WEP", "\x00\x00\x00\x00\x00\x00", 1},
+      {" 1:2:3:4:-fffffffffffffffffffff:fffffffffffffffffffff 1 11n WEP", "\x01\x02\x03\x04\xff\xff", 1},
+      {" 1:2:3:4:5:6-40\v11n\fWEP", "\x01\x02\x03\x04\x05\x06", -40},
       {" 00:11:22:33:44:55 -40 11n WEP and what else there is", "\x00\x11\x22\x33\x44\x55", -40},
       {" 00:11:22:33:44:55 -40 11n WEP\r", "\x00\x11\x22\x33\x44\x55", -40},
   };
@@ -182,10 +186,27 @@ TEST_F(ListingRow, IsReportedAndLeftOutWithoutAChannel) {
 }
 
 TEST_F(ListingRow, IsReportedAndLeftOutWithoutAllInformation) {
-  for (const char* szInfo :
-       {"", " ", " 00", " 00:11:22:33:44", " 00:11:22:33:44:55", " 00:11:22:33:44:55 -40", " 00:11:22:33:44:55 -40 11n",
-        " 00:11:22:33:44:55 -40 11n  ", " 00-11-22-33-44-55 -40 11n WEP", " zz:11:22:33:44:55 -40 11n WEP",
-        " 00:11:22:33:44:55 weak 11n WEP", " 00 :11:22:33:44:55 -40 11n WEP"}) {
+  for (const char* szInfo : {"",
+                             " ",
+                             " 00",
+                             " 00:11:22:33:44",
+                             " 00:11:22:33:44:55",
+                             " 00:11:22:33:44:55 -40",
+                             " 00:11:22:33:44:55 -40 11n",
+                             " 00:11:22:33:44:55 -40 11n  ",
+                             " 00-11-22-33-44-55 -40 11n WEP",
+                             " zz:11:22:33:44:55 -40 11n WEP",
+                             " 00:11:22:33:44:55 weak 11n WEP",
+                             " 00 :11:22:33:44:55 -40 11n WEP",
+                             " :11:22:33:44:55 -40 11n WEP",
+                             " 00x:11:22:33:44:55 -40 11n WEP",
+                             " 10x:11:22:33:44:55 -40 11n WEP",
+                             " 0x0x:11:22:33:44:55 -40 11n WEP",
+                             " x:11:22:33:44:55 -40 11n WEP",
+                             " - 1:11:22:33:44:55 -40 11n WEP",
+                             " 00:11:22:33:44:55: -40 11n WEP",
+                             " 00:11:22:33:44:55 - 40 11n WEP",
+                             " 00:11:22:33:44:55 -40n-WEP"}) {
     const std::string row = RowOf("6", "net", szInfo) + "\n";
     Read(row + RowOf("after"));
     EXPECT_THAT(Complaints(), ElementsAre(InfoComplaint(row)));

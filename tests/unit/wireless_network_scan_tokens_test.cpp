@@ -56,6 +56,12 @@ TEST_F(ListingToken, OfTheProtocolIsPassedOnUpTo31Bytes) {
   }
 }
 
+TEST_F(ListingToken, OfTheProtocolLeavesWhatIsBehind31BytesToTheSecurity) {
+  const WIRELESS_NETWORK network = Read(std::string(31, 'p') + "wep", "NONE");
+  EXPECT_EQ(network.auth, WIRELESS_AUTH_SHARED);
+  EXPECT_EQ(network.encrypt, WIRELESS_ENCRYPT_WEP);
+}
+
 TEST_F(ListingToken, OfNoEncryptionMeansOpenInAnyCase) {
   for (const char* szToken : {"NONE", "none", "None", "nOnE"}) {
     const WIRELESS_NETWORK network = Read("11n", szToken);
@@ -140,6 +146,17 @@ TEST_F(ListingToken, OfSecurityIsTakenUpTo31Bytes) {
     EXPECT_EQ(network.auth, WIRELESS_AUTH_UNKNOWN) << size;
     EXPECT_EQ(First("syslog"), NotUnderstood(token.substr(0, 31)));
   }
+}
+
+TEST_F(ListingToken, HasAtMost15BytesBeforeItsSlashAndAsManyBehind) {
+  const std::string longest(15, 'a');
+  Read("11n", longest + "/" + std::string(15, 'e'));
+  EXPECT_EQ(First("MEROWirelessAuthParse"), "MEROWirelessAuthParse(" + longest + ")");
+  EXPECT_EQ(First("MEROWirelessEncryptParse"), "MEROWirelessEncryptParse(" + std::string(15, 'e') + ")");
+  Read("11n", "a/" + std::string(29, 'e'));
+  EXPECT_EQ(First("MEROWirelessEncryptParse"), "MEROWirelessEncryptParse(" + std::string(15, 'e') + ")");
+  Read("11n", longest + "a/e");
+  EXPECT_EQ(First("syslog"), NotUnderstood(longest + "a/e"));
 }
 
 TEST_F(ListingToken, WithALongerAuthenticationThanAnyIsUnknown) {
