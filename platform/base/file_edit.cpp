@@ -97,11 +97,13 @@ Status TakeOwnerAndMode(int fd, int model) {
   return Status::Of(::fchmod(fd, want.st_mode & 07777));
 }
 
-Status WriteBeside(const char* szBeside, std::string_view content, int model) {
+Status WriteBeside(const char* szBeside, const Revision& revision, int model) {
   Descriptor file(::open(szBeside, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));
   if (!file.valid()) return Status::Failed(errno);
   if (Status status = TakeOwnerAndMode(file.get(), model); !status.ok()) return status;
-  if (Status status = WriteAll(file.get(), content); !status.ok()) return status;
+  for (const std::string_view part : {revision.before, revision.content.view(), revision.behind}) {
+    if (Status status = WriteAll(file.get(), part); !status.ok()) return status;
+  }
   if (::fsync(file.get()) < 0) return Status::Failed(errno);
   return Status::Of(file.Close());
 }
@@ -198,13 +200,13 @@ void FileEdit::Abandon() {
   if (created_ && text_.view().empty()) (void)::unlink(szPath_);
 }
 
-Status FileEdit::Commit(const Bytes& content) {
-  if (!content.status().ok()) return content.status();
+Status FileEdit::Commit(const Revision& revision) {
+  if (Status status = revision.content.status(); !status.ok()) return status;
   const Beside beside(kNewFormat, szPath_);
   if (!beside.fits()) return Status::Failed(ENAMETOOLONG);
   if (Status status = RemoveOrMoveAside(beside.c_str()); !status.ok() && status.error() != ENOENT) return status;
 
-  Status status = WriteBeside(beside.c_str(), content.view(), file_.get());
+  Status status = WriteBeside(beside.c_str(), revision, file_.get());
   if (status.ok()) status = Status::Of(::rename(beside.c_str(), szPath_));
   if (!status.ok()) {
     (void)::unlink(beside.c_str());  // may never have come into being
@@ -216,9 +218,9 @@ Status FileEdit::Commit(const Bytes& content) {
 Status EditFile(const char* szPath, mode_t mode, Composer compose) {
   Result<FileEdit> edit = FileEdit::Open(szPath, mode);
   if (!edit.ok()) return edit.status();
-  Bytes content;
-  compose(edit->text(), content);
-  const Status status = edit->Commit(content);
+  Revision revision;
+  compose(edit->text(), revision);
+  const Status status = edit->Commit(revision);
   if (!status.ok()) edit->Abandon();
   return status;
 }

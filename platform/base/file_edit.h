@@ -14,6 +14,16 @@
 // Another process has kept a file's lock for as long as this one would wait. An error of our own: no errno says so.
 inline constexpr int kLockKept = -2;
 
+// What a file is to hold: a beginning and an end of its old text, and what is new between them. What stays is not
+// copied, since a file of many networks is long, and a change of it short.
+struct Revision {
+  std::string_view before;
+  Bytes content;
+  std::string_view behind;
+
+  size_t size() const { return before.size() + content.view().size() + behind.size(); }
+};
+
 class FileEdit {
  public:
   FileEdit() = default;
@@ -25,7 +35,7 @@ class FileEdit {
   // umask, or is ENOENT when `mode` is 0. Blocks for up to 20 s while another process edits the file; kLockKept then.
   static Result<FileEdit> Open(const char* szPath, mode_t mode);
 
-  // What the file holds.
+  // What the file holds; a revision's beginning and end are parts of it.
   std::string_view text() const { return text_.view(); }
 
   // Gives up, and removes the file again if it was made for this edit.
@@ -33,7 +43,7 @@ class FileEdit {
 
   // Replaces the content, unless it failed to be built. The file holds the old content or the new one, whole, whenever
   // this is interrupted.
-  Status Commit(const Bytes& content);
+  Status Commit(const Revision& revision);
 
  private:
   Status Lock(int& tries);
@@ -46,21 +56,21 @@ class FileEdit {
   char szPath_[PATH_MAX] = {};  // where the file really is
 };
 
-// Composes the new content of a file from its old text; a failure is remembered by the content. Refers to a function
-// object that outlives it.
+// Composes the new content of a file from its old text; a failure is remembered by the bytes that are new. Refers to a
+// function object that outlives it.
 class Composer {
  public:
   template <class Compose>
   Composer(const Compose& compose)  // NOLINT(google-explicit-constructor)
-      : object_(&compose), call_([](const void* object, std::string_view text, Bytes& content) {
-          (*static_cast<const Compose*>(object))(text, content);
+      : object_(&compose), call_([](const void* object, std::string_view text, Revision& revision) {
+          (*static_cast<const Compose*>(object))(text, revision);
         }) {}
 
-  void operator()(std::string_view text, Bytes& content) const { call_(object_, text, content); }
+  void operator()(std::string_view text, Revision& revision) const { call_(object_, text, revision); }
 
  private:
   const void* object_;
-  void (*call_)(const void* object, std::string_view text, Bytes& content);
+  void (*call_)(const void* object, std::string_view text, Revision& revision);
 };
 
 // Changes a file in one go.

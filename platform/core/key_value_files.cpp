@@ -55,18 +55,19 @@ int PLIBCFileCheckKeyValue(const char* szPath, const char* szKey, const char* sz
 int PLIBCFileSetKeyValue(const char* szPath, const char* szKey, const char* szValue, const char* szFormat) {
   if (szPath == nullptr || szKey == nullptr || szValue == nullptr || szFormat == nullptr) return REFUSE_NULL(), -1;
 
-  return ChangeSettings(szPath, kMode, [&](std::string_view text, Bytes& content) {
+  return ChangeSettings(szPath, kMode, [&](std::string_view text, Revision& revision) {
     const LinePlace end{text.size(), text.size()};
     const LinePlace place = FindKey(text, szKey, ValueForm::kShell).value_or(end);
-    content.Append(Slice(text, 0, place.begin));
-    EndLine(content);
-    AppendPair(content, szFormat, {szKey, szValue}, ValueForm::kShell);
-    content.Append(Slice(text, place.end));
+    revision.before = Slice(text, 0, place.begin);
+    EndLine(revision.content, revision.before);
+    AppendPair(revision.content, szFormat, {szKey, szValue}, ValueForm::kShell);
+    revision.behind = Slice(text, place.end);
   });
 }
 
 int PLIBCFileRemoveKey(const char* szPath, const char* szKey) {
   if (szPath == nullptr || szKey == nullptr) return REFUSE_NULL(), -1;
-  return ShortenSettings(szPath, ERR_KEY_NOT_FOUND,
-                         [&](std::string_view text, Bytes& content) { AppendWithout(content, text, szKey); });
+  return ShortenSettings(szPath, ERR_KEY_NOT_FOUND, [&](std::string_view text, Revision& revision) {
+    AppendWithout(revision.content, text, szKey);
+  });
 }

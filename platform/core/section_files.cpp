@@ -45,37 +45,38 @@ void AppendAllButPairs(Bytes& content, std::string_view text) {
 }
 
 // The text and, behind it, the header of a new section.
-void ComposeNewHeader(std::string_view text, const char* szSection, Bytes& content) {
-  content.Append(text);
-  EndLine(content);
-  AppendHeader(content, szSection);
+void ComposeNewHeader(std::string_view text, const char* szSection, Revision& revision) {
+  revision.before = text;
+  EndLine(revision.content, text);
+  AppendHeader(revision.content, szSection);
 }
 
 // The text with the pairs of one section replaced, and its header when it gets a new name.
 void ComposeReplaced(std::string_view text, const SectionPlace& place, const char* szNewName, const NewPairs& pairs,
-                     Bytes& content) {
+                     Revision& revision) {
   const std::string_view body = Slice(text, place.body, place.end);
   const LinePlace old = PlaceOfPairs(body);
 
-  content.Append(Slice(text, 0, place.header));
+  Bytes& content = revision.content;
+  revision.before = Slice(text, 0, place.header);
   if (szNewName != nullptr) {
     AppendHeader(content, szNewName);
   } else {
     content.Append(Slice(text, place.header, place.body));
   }
   content.Append(Slice(body, 0, old.begin));
-  EndLine(content);
+  EndLine(content, content.view());
   AppendPairs(content, pairs, szNewName != nullptr ? LineEnds::kLf : LineEndsOf(text, place));
   AppendAllButPairs(content, Slice(body, old.begin));
-  content.Append(Slice(text, place.end));
+  revision.behind = Slice(text, place.end);
 }
 
 void ComposeSection(std::string_view text, const char* szSection, const char* szNewName, const NewPairs& pairs,
-                    Bytes& content) {
+                    Revision& revision) {
   const std::optional<SectionPlace> place = FindSection(text, szSection);
-  if (place) return ComposeReplaced(text, *place, szNewName, pairs, content);
-  ComposeNewHeader(text, szNewName != nullptr ? szNewName : szSection, content);
-  AppendPairs(content, pairs, LineEnds::kLf);
+  if (place) return ComposeReplaced(text, *place, szNewName, pairs, revision);
+  ComposeNewHeader(text, szNewName != nullptr ? szNewName : szSection, revision);
+  AppendPairs(revision.content, pairs, LineEnds::kLf);
 }
 
 // Where the line of a key is to stand in a text: in place of the old one, or behind the section's last pair.
@@ -87,18 +88,18 @@ LinePlace PlaceOfKey(std::string_view text, const SectionPlace& section, std::st
 }
 
 void ComposeValue(std::string_view text, const char* szSection, const Pair& pair, const char* szFormat,
-                  Bytes& content) {
+                  Revision& revision) {
   const std::optional<SectionPlace> section = FindSection(text, szSection);
   if (!section) {
-    ComposeNewHeader(text, szSection, content);
-    return AppendPair(content, szFormat, pair, ValueForm::kPlain);
+    ComposeNewHeader(text, szSection, revision);
+    return AppendPair(revision.content, szFormat, pair, ValueForm::kPlain);
   }
 
   const LinePlace place = PlaceOfKey(text, *section, pair.key);
-  content.Append(Slice(text, 0, place.begin));
-  EndLine(content);
-  AppendPair(content, szFormat, pair, ValueForm::kPlain, LineEndsOf(text, *section));
-  content.Append(Slice(text, place.end));
+  revision.before = Slice(text, 0, place.begin);
+  EndLine(revision.content, revision.before);
+  AppendPair(revision.content, szFormat, pair, ValueForm::kPlain, LineEndsOf(text, *section));
+  revision.behind = Slice(text, place.end);
 }
 
 // Appends a text without its sections of a name.
@@ -118,8 +119,8 @@ int WriteSection(const char* szPath, const char* szSection, const char* szNewNam
     LOG("%s is not written: a pair of [%s] found no memory", szPath, szSection);
     return PLIBCErrSet(ERR_OUT_OF_MEMORY), -1;
   }
-  return ChangeSettings(szPath, kMode, [&](std::string_view text, Bytes& content) {
-    ComposeSection(text, szSection, szNewName, pairs, content);
+  return ChangeSettings(szPath, kMode, [&](std::string_view text, Revision& revision) {
+    ComposeSection(text, szSection, szNewName, pairs, revision);
   });
 }
 
@@ -178,14 +179,15 @@ int PLIBCFileSetSectionValue(const char* szPath, const char* szSection, const ch
   if (szPath == nullptr || szSection == nullptr || szKey == nullptr || szValue == nullptr || szFormat == nullptr) {
     return REFUSE_NULL(), -1;
   }
-  const int result = ChangeSettings(szPath, kMode, [&](std::string_view text, Bytes& content) {
-    ComposeValue(text, szSection, {szKey, szValue}, szFormat, content);
+  const int result = ChangeSettings(szPath, kMode, [&](std::string_view text, Revision& revision) {
+    ComposeValue(text, szSection, {szKey, szValue}, szFormat, revision);
   });
   return result > 0 ? 0 : result;
 }
 
 int PLIBCFileRemoveSection(const char* szPath, const char* szSection) {
   if (szPath == nullptr || szSection == nullptr) return REFUSE_NULL(), -1;
-  return ShortenSettings(szPath, ERR_SECTION_NOT_FOUND,
-                         [&](std::string_view text, Bytes& content) { AppendWithout(content, text, szSection); });
+  return ShortenSettings(szPath, ERR_SECTION_NOT_FOUND, [&](std::string_view text, Revision& revision) {
+    AppendWithout(revision.content, text, szSection);
+  });
 }

@@ -69,6 +69,6 @@ void AppendHeader(Bytes& to, std::string_view name) {
   if (!one || SectionOfLine(line.text()) != name) to.Fail(EINVAL);
 }
 
-void EndLine(Bytes& to) {
-  if (!to.view().empty() && !to.view().ends_with('\n')) to.Append("\n");
+void EndLine(Bytes& to, std::string_view text) {
+  if (!text.empty() && !text.ends_with('\n')) to.Append("\n");
 }

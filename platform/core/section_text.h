@@ -129,7 +129,7 @@ void AppendPair(Bytes& to, const char* szFormat, Pair pair, ValueForm form, Line
 // Appends a section's header; fails with EINVAL when it would not read back as that name.
 void AppendHeader(Bytes& to, std::string_view name);
 
-// Ends the last line, if it has no end yet, so that a line can follow.
-void EndLine(Bytes& to);
+// Ends the last line of the text that `to` stands behind, if it has no end yet, so that a line can follow.
+void EndLine(Bytes& to, std::string_view text);
 
 #endif  // MERO_PLATFORM_SECTION_TEXT_H

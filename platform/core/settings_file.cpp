@@ -32,8 +32,8 @@ int ChangeSettings(const char* szPath, mode_t mode, Composer compose) {
 int ShortenSettings(const char* szPath, MERO_ERROR absent, Composer compose) {
   Result<FileEdit> edit = FileEdit::Open(szPath, 0);
   if (!edit.ok()) return ReportUnread(szPath, edit.error());
-  Bytes content;
-  compose(edit->text(), content);
-  if (content.view().size() == edit->text().size()) return PLIBCErrSet(absent), 0;
-  return ReportUnlessWritten(szPath, edit->Commit(content));
+  Revision revision;
+  compose(edit->text(), revision);
+  if (revision.size() == edit->text().size()) return PLIBCErrSet(absent), 0;
+  return ReportUnlessWritten(szPath, edit->Commit(revision));
 }

@@ -198,10 +198,10 @@ void AppendLine(Bytes& content, const ConfLine& line, const MERO_DHCPD_CONF& con
 
 Status WriteConf(const char* szPath, const MERO_DHCPD_CONF& conf) {
   if (Status status = MakeDirectory(kDhcpDirectory); !status.ok()) return status;
-  return EditFile(szPath, 0644, [&](std::string_view, Bytes& content) {
-    content.Append(kHeading);
-    for (const ConfLine& line : kLines) AppendLine(content, line, conf);
-    content.Append(kEnding);
+  return EditFile(szPath, 0644, [&](std::string_view, Revision& revision) {
+    revision.content.Append(kHeading);
+    for (const ConfLine& line : kLines) AppendLine(revision.content, line, conf);
+    revision.content.Append(kEnding);
   });
 }
 
