@@ -206,6 +206,9 @@ class Supervisor {
         return Reply(0, -plan_.error, 0);
       case Interference::kShorten:
         return writes ? Reply(WriteHalf(), 0, 0) : LetThrough();
+      case Interference::kMeanwhile:
+        plan_.meanwhile();
+        return LetThrough();
     }
   }
 

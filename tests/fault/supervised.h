@@ -20,13 +20,15 @@ enum class Interference {
   kTearWrite,  // as kKill, but of a write one half is done first
   kFail,       // the call fails, without effect
   kShorten,    // of a write only one half is done; other calls are let through
+  kMeanwhile,  // something happens elsewhere, and the call is let through
 };
 
 struct Plan {
   Interference interference = Interference::kNone;
   int call = 0;  // which of the operation's calls on files, from 1 on
   int error = 0;
-  std::string name;  // counts only calls of that name; empty for all
+  std::string name = {};                 // counts only calls of that name; empty for all
+  std::function<void()> meanwhile = {};  // what happens, in this process
 };
 
 struct Outcome {
