@@ -1,19 +1,23 @@
-// What known networks cost: listing them by their last save, and saving one.
+// What known networks cost: listing them by their last save, and saving one; with the store in the kernel's cache
+// (warm), and dropped from it before each time (cold).
 //
 // The store lies on the file system of the directory that the program is run in.
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
+#include <sys/mman.h>
 #include <sys/mount.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include "bench/support.h"
 #include "common/known_networks_file.h"
@@ -68,67 +72,124 @@ void MakeStore(int64_t networks) {
   while (age() < std::chrono::milliseconds(100)) std::this_thread::sleep_for(std::chrono::milliseconds(5));
 }
 
-void ReportPerNetwork(benchmark::State& state) {
+enum class Cache { kWarm, kCold };
+
+// Whether any page of an open file is in the kernel's cache.
+bool IsCached(int file) {
+  struct stat info;
+  Require(::fstat(file, &info) == 0, "look at the store");
+  const auto size = static_cast<size_t>(info.st_size);
+  void* map = ::mmap(nullptr, size, PROT_READ, MAP_SHARED, file, 0);
+  Require(map != MAP_FAILED, "map the store");
+  std::vector<unsigned char> pages(size / static_cast<size_t>(::getpagesize()) + 1);
+  Require(::mincore(map, size, pages.data()) == 0 && ::munmap(map, size) == 0, "look for the store in the cache");
+  return std::ranges::any_of(pages, [](unsigned char page) { return (page & 1) != 0; });
+}
+
+// Drops the store from the kernel's cache. A page that is just being put there stays the first time.
+void DropStore() {
+  const int store = ::open(kKnownNetworksPath, O_RDONLY | O_CLOEXEC);
+  Require(::fdatasync(store) == 0, "flush the store");
+  for (int tries = 0; IsCached(store); ++tries) {
+    Require(tries < 100 && ::posix_fadvise(store, 0, 0, POSIX_FADV_DONTNEED) == 0, "drop the store from the cache");
+  }
+  ::close(store);
+}
+
+// Measures some work on a store of as many networks as the benchmark is for. Each time takes the number of the round.
+template <class Work>
+void Measure(benchmark::State& state, Cache cache, Work work) {
+  MakeStore(state.range(0));
+  int64_t round = 0;
+  for (auto _ : state) {
+    if (cache == Cache::kCold) {
+      state.PauseTiming();
+      DropStore();
+      state.ResumeTiming();
+    }
+    work(round++);
+  }
   using Counter = benchmark::Counter;
   state.counters["per_network"] =
       Counter(static_cast<double>(state.range(0)), Counter::kIsIterationInvariantRate | Counter::kInvert);
   state.SetComplexityN(state.range(0));
 }
 
-void EnumerateByLastSave(benchmark::State& state) {
-  MakeStore(state.range(0));
-  for (auto _ : state) {
+void EnumerateByLastSave(benchmark::State& state, Cache cache) {
+  Measure(state, cache, [&](int64_t) {
     WIRELESS_LIST head;
     Require(MEROWirelessConfEnumByAtime(&head) == 0 && CountAndFree<WIRELESS_NETWORK_CONFIG>(head) == state.range(0),
             "enumerate");
-  }
-  ReportPerNetwork(state);
+  });
 }
-BENCHMARK(EnumerateByLastSave)->RangeMultiplier(10)->Range(10, 10'000)->Complexity(benchmark::oN);
 
 #ifdef WITH_GLIB
-void LoadAndSortAsKeyFile(benchmark::State& state) {
-  MakeStore(state.range(0));
-  for (auto _ : state) {
+void LoadAndSortAsKeyFile(benchmark::State& state, Cache cache) {
+  Measure(state, cache, [&](int64_t) {
     Require(SortedGroupsOfKeyFile(kKnownNetworksPath) == static_cast<size_t>(state.range(0)), "load a key file");
-  }
-  ReportPerNetwork(state);
+  });
 }
-BENCHMARK(LoadAndSortAsKeyFile)->RangeMultiplier(10)->Range(10, 10'000)->Complexity(benchmark::oN);
 #endif
 
-constexpr int kStored = 1000;
-
-void SaveOneOf1000(benchmark::State& state) {
-  MakeStore(kStored);
-  int number = 0;
-  for (auto _ : state) {
-    const WIRELESS_NETWORK_CONFIG config = NetworkOf(number++ % kStored);
-    Require(MEROWirelessConfSet(&config) == 0, "save");
-  }
+// The least that anything can do that looks at the whole store.
+void ReadStore(benchmark::State& state, Cache cache) {
+  Measure(state, cache, [](int64_t) {
+    const int store = ::open(kKnownNetworksPath, O_RDONLY | O_CLOEXEC);
+    struct stat info;
+    Require(::fstat(store, &info) == 0, "read the store");
+    const auto size = static_cast<size_t>(info.st_size);
+    void* room = std::malloc(size);
+    Require(::read(store, room, size) == info.st_size && ::close(store) == 0, "read the store");
+    benchmark::DoNotOptimize(room);
+    std::free(room);
+  });
 }
-BENCHMARK(SaveOneOf1000)->UseRealTime();
+
+void SaveOne(benchmark::State& state, Cache cache) {
+  Measure(state, cache, [&](int64_t round) {
+    const WIRELESS_NETWORK_CONFIG config = NetworkOf(static_cast<int>(round % state.range(0)));
+    Require(MEROWirelessConfSet(&config) == 0, "save");
+  });
+}
 
 // Puts a file of the store's size in the store's place, as little as can be done for one of the two to be there whole
-// after a crash.
+// after a crash; with the directory flushed too, for the new one to be there.
 void WriteFsyncRename(benchmark::State& state, bool flushDirectory) {
-  MakeStore(kStored);
-  std::ifstream store(kKnownNetworksPath, std::ios::binary);
-  const std::string content(std::istreambuf_iterator<char>(store), {});
+  std::string content;
+  for (int i = 0; i < state.range(0); ++i) content += SectionOf(i);
   const fs::path directory = fs::path(kKnownNetworksPath).parent_path();
   const std::string beside = directory / "beside";
-  for (auto _ : state) {
+  Measure(state, Cache::kWarm, [&](int64_t) {
     const int file = ::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
     Require(::write(file, content.data(), content.size()) == static_cast<ssize_t>(content.size()), "write");
     Require(::fsync(file) == 0 && ::close(file) == 0, "flush");
     Require(::rename(beside.c_str(), kKnownNetworksPath) == 0, "rename");
-    if (!flushDirectory) continue;
+    if (!flushDirectory) return;
     const int in = ::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     Require(::fsync(in) == 0 && ::close(in) == 0, "flush the directory");
-  }
+  });
 }
-BENCHMARK_CAPTURE(WriteFsyncRename, one_or_the_other, false)->UseRealTime();
-BENCHMARK_CAPTURE(WriteFsyncRename, the_new_one, true)->UseRealTime();
+
+void ForTenToTenThousand(benchmark::internal::Benchmark* benchmark) {
+  benchmark->RangeMultiplier(10)->Range(10, 10'000)->Complexity(benchmark::oN);
+}
+
+void OnTheClock(benchmark::internal::Benchmark* benchmark) {
+  benchmark->Apply(ForTenToTenThousand)->UseRealTime();
+}
+
+BENCHMARK_CAPTURE(EnumerateByLastSave, warm, Cache::kWarm)->Apply(ForTenToTenThousand);
+BENCHMARK_CAPTURE(EnumerateByLastSave, cold, Cache::kCold)->Apply(OnTheClock);
+#ifdef WITH_GLIB
+BENCHMARK_CAPTURE(LoadAndSortAsKeyFile, warm, Cache::kWarm)->Apply(ForTenToTenThousand);
+BENCHMARK_CAPTURE(LoadAndSortAsKeyFile, cold, Cache::kCold)->Apply(OnTheClock);
+#endif
+BENCHMARK_CAPTURE(ReadStore, warm, Cache::kWarm)->Apply(ForTenToTenThousand);
+BENCHMARK_CAPTURE(ReadStore, cold, Cache::kCold)->Apply(OnTheClock);
+BENCHMARK_CAPTURE(SaveOne, warm, Cache::kWarm)->Apply(OnTheClock);
+BENCHMARK_CAPTURE(SaveOne, cold, Cache::kCold)->Apply(OnTheClock);
+BENCHMARK_CAPTURE(WriteFsyncRename, one_or_the_other, false)->Apply(OnTheClock);
+BENCHMARK_CAPTURE(WriteFsyncRename, the_new_one, true)->Apply(OnTheClock);
 
 }  // namespace
 
