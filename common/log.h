@@ -11,14 +11,22 @@ template <size_t kSize>
 struct UnitName {
   char text[kSize] = {};
 
-  consteval UnitName(const char (&file)[kSize]) {
+  template <size_t kFileSize>
+  consteval UnitName(const char (&file)[kFileSize]) {
     for (size_t i = 0; i < kSize && file[i] != '.'; ++i) text[i] = file[i];
   }
 };
 
+template <size_t kFileSize>
+UnitName(const char (&file)[kFileSize]) -> UnitName<kFileSize - (sizeof ".cpp" - 1)>;
+
+// Takes no more room than the name does: unless an alignment is asked for, compilers choose a larger one for an array.
+template <UnitName kUnit>
+alignas(1) inline constexpr UnitName kUnitName = kUnit;
+
 template <UnitName kUnit>
 constexpr const char* TextOfUnit() {
-  return kUnit.text;
+  return kUnitName<kUnit>.text;
 }
 
 // Reports `format` for a unit and a source line that are given. All three are expressions, so that a failure can be

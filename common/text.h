@@ -15,6 +15,16 @@
   szTo[size] = '\0';
 }
 
+// The same of a whole text, which callers need not measure.
+[[gnu::noinline]] inline void CopyText(char* szTo, size_t cbTo, const char* szText) {
+  CopyText(szTo, cbTo, std::string_view(szText));
+}
+
+template <size_t kSize>
+void CopyText(char (&szTo)[kSize], const char* szText) {
+  CopyText(szTo, kSize, szText);
+}
+
 template <size_t kSize>
 void CopyText(char (&szTo)[kSize], std::string_view text) {
   CopyText(szTo, kSize, text);
