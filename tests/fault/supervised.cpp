@@ -5,7 +5,6 @@
 #include "tests/fault/supervised.h"
 
 #include <fcntl.h>
-#include <gtest/gtest.h>
 #include <linux/filter.h>
 #include <linux/seccomp.h>
 #include <poll.h>
@@ -24,6 +23,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
 #include <iterator>
 
 #include "platform.h"
@@ -78,6 +78,40 @@ const SystemCall kNames[] = {
 const SystemCall* CallOf(int number) {
   const SystemCall* call = std::ranges::find(kNames, number, &SystemCall::number);
   return call != std::end(kNames) ? call : nullptr;
+}
+
+// Those by which processes come into being.
+constexpr int kForks[] = {
+#ifdef SYS_fork
+    SYS_fork,
+#endif
+#ifdef SYS_vfork
+    SYS_vfork,
+#endif
+    SYS_clone,
+    SYS_clone3,
+};
+
+constexpr int kSleeps[] = {
+    SYS_clock_nanosleep,
+#ifdef SYS_clock_nanosleep_time64
+    SYS_clock_nanosleep_time64,
+#endif
+};
+
+// Those of an allocator, which calls the kernel whenever it happens to need memory.
+constexpr int kMemory[] = {
+#ifdef SYS_mmap
+    SYS_mmap,
+#endif
+#ifdef SYS_mmap2
+    SYS_mmap2,
+#endif
+    SYS_brk,   SYS_madvise, SYS_mprotect, SYS_mremap, SYS_munmap,
+};
+
+bool IsAmong(const auto& numbers, int number) {
+  return std::ranges::find(numbers, number) != std::end(numbers);
 }
 
 void Require(bool done, const char* szWhat) {
@@ -161,11 +195,19 @@ class Supervisor {
     return NextCall();
   }
 
-  // An allocator calls the kernel whenever it happens to need memory; only the calls of the operation itself count.
+  // Only the calls of the operation itself count, but for the processes that those which it started start.
   void Answer() {
-    if (call_.data.nr == kMark) return PassMark();
-    const SystemCall* call = CallOf(call_.data.nr);
-    if (!inOperation_ || call == nullptr) return LetThrough();
+    const int number = call_.data.nr;
+    const bool own = call_.pid == static_cast<__u32>(child_);
+    if (own && number == kMark) return PassMark();
+    if (!inOperation_) return LetThrough();
+    if (IsAmong(kForks, number)) ++outcome_.cost.processes;
+    if (!own) return LetThrough();
+    if (!IsAmong(kMemory, number)) ++outcome_.cost.calls;
+    if (plan_.withoutSleeps && IsAmong(kSleeps, number)) return SkipSleep();
+
+    const SystemCall* call = CallOf(number);
+    if (call == nullptr) return LetThrough();
     if (IsPlanned(*call)) {
       outcome_.reached = true;
       outcome_.call = *call;
@@ -173,6 +215,16 @@ class Supervisor {
     }
     if (!outcome_.reached) outcome_.before.push_back(*call);
     LetThrough();
+  }
+
+  // The time that is asked for begins with its seconds.
+  void SkipSleep() {
+    long seconds = 0;
+    const iovec here = {&seconds, sizeof seconds};
+    const iovec there = {reinterpret_cast<void*>(static_cast<uintptr_t>(call_.data.args[2])), sizeof seconds};
+    Require(::process_vm_readv(child_, &here, 1, &there, 1, 0) == sizeof seconds, "read how long it sleeps");
+    outcome_.cost.secondsSlept += seconds;
+    Reply(0, 0, 0);
   }
 
   bool IsPlanned(const SystemCall& call) {
@@ -188,7 +240,20 @@ class Supervisor {
     } else {
       outcome_.descriptorsLeft = CountDescriptors() - descriptorsBefore_;
     }
+    CountBytes(inOperation_ ? -1 : 1);
     LetThrough();
+  }
+
+  // What the child has read and written so far, in its main thread.
+  void CountBytes(int sign) {
+    const std::string pid = std::to_string(child_);
+    std::ifstream counters("/proc/" + pid + "/task/" + pid + "/io");
+    std::string name;
+    int64_t bytes[2] = {};
+    for (int64_t& count : bytes) counters >> name >> count;
+    Require(counters.good(), "count bytes");
+    outcome_.cost.bytesRead += sign * bytes[0];
+    outcome_.cost.bytesWritten += sign * bytes[1];
   }
 
   void Interfere() {

@@ -4,6 +4,7 @@
 
 #include <sys/types.h>
 
+#include <cstdint>
 #include <functional>
 #include <string>
 #include <vector>
@@ -29,6 +30,16 @@ struct Plan {
   int error = 0;
   std::string name = {};                 // counts only calls of that name; empty for all
   std::function<void()> meanwhile = {};  // what happens, in this process
+  bool withoutSleeps = false;            // a sleep of the operation is over at once
+};
+
+// The costs of an operation.
+struct Cost {
+  int processes = 0;  // that it started, and that these started
+  int calls = 0;      // that it made itself, but for those of an allocator
+  int64_t bytesRead = 0;
+  int64_t bytesWritten = 0;
+  int64_t secondsSlept = 0;  // the naps of less than one aside
 };
 
 struct Outcome {
@@ -39,6 +50,7 @@ struct Outcome {
   int result = -1;  // what follows is of an operation that was not killed
   int code = 0;
   std::vector<std::string> reports;
+  Cost cost;
   int descriptorsLeft = 0;  // how many more are open behind the operation than before it
 };
 
