@@ -5,7 +5,6 @@
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
 #include <sys/mman.h>
-#include <sys/mount.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -24,7 +23,6 @@
 #include "common/paths.h"
 #include "common/text.h"
 #include "platform.h"
-#include "private_machine.h"
 #ifdef WITH_GLIB
 #include "key_file.h"
 #endif
@@ -152,22 +150,10 @@ void SaveOne(benchmark::State& state, Cache cache) {
   });
 }
 
-// Puts a file of the store's size in the store's place, as little as can be done for one of the two to be there whole
-// after a crash; with the directory flushed too, for the new one to be there.
 void WriteFsyncRename(benchmark::State& state, bool flushDirectory) {
   std::string content;
   for (int i = 0; i < state.range(0); ++i) content += SectionOf(i);
-  const fs::path directory = fs::path(kKnownNetworksPath).parent_path();
-  const std::string beside = directory / "beside";
-  Measure(state, Cache::kWarm, [&](int64_t) {
-    const int file = ::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
-    Require(::write(file, content.data(), content.size()) == static_cast<ssize_t>(content.size()), "write");
-    Require(::fsync(file) == 0 && ::close(file) == 0, "flush");
-    Require(::rename(beside.c_str(), kKnownNetworksPath) == 0, "rename");
-    if (!flushDirectory) return;
-    const int in = ::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    Require(::fsync(in) == 0 && ::close(in) == 0, "flush the directory");
-  });
+  Measure(state, Cache::kWarm, [&](int64_t) { Replace(kKnownNetworksPath, content, flushDirectory); });
 }
 
 void ForTenToTenThousand(benchmark::internal::Benchmark* benchmark) {
@@ -197,13 +183,6 @@ int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return EXIT_FAILURE;
 
-  // A relative path, which leads there also where the private machine has its own /tmp or /var.
-  char szStore[] = "store-XXXXXX";
-  Require(::mkdtemp(szStore) != nullptr, "make a directory for the store");
-  EnterPrivateMachine();
-  Require(::mount(szStore, "/usr/mero/etc", nullptr, MS_BIND, nullptr) == 0, "mount the store");
-  benchmark::RunSpecifiedBenchmarks();
-  Require(::umount("/usr/mero/etc") == 0, "unmount the store");
-  fs::remove_all(szStore);
+  MeasureOnDisk([] { benchmark::RunSpecifiedBenchmarks(); });
   return EXIT_SUCCESS;
 }

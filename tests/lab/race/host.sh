@@ -90,6 +90,11 @@ fetch_peers() {  # PACKAGE...
   mv "$new" "$peers"
 }
 
+fetch_contenders() {
+  # shellcheck disable=SC2046  # names are single words
+  fetch_peers $(race_packages $(contenders))
+}
+
 # ---- The layer ---------------------------------------------------------------------------------------------------------
 
 # Where a file is really, of those directories that lead elsewhere since /usr is all there is.
@@ -255,8 +260,7 @@ race() {
   bands=$(chosen '2.4 5' "${words[@]}") names=$(chosen "$(contenders | xargs)" "${words[@]}")
 
   prepare
-  # shellcheck disable=SC2046  # names are single words
-  fetch_peers $(race_packages $(contenders))
+  fetch_contenders
   # shellcheck disable=SC2034  # for the machine
   printf -v race 'EVENTS=%q AIRS=%q BANDS=%q CONTENDERS=%q ROUNDS=%q' "$events" "$airs" "$bands" "$names" "$rounds"
   # shellcheck disable=SC2086
