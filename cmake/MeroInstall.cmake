@@ -35,4 +35,5 @@ install(FILES ${CMAKE_CURRENT_BINARY_DIR}/merowireless-core-config-version.cmake
 file(GLOB documents CONFIGURE_DEPENDS SECURITY.md docs/[!.]*.md)
 list(REMOVE_ITEM documents ${CMAKE_CURRENT_SOURCE_DIR}/docs/appliance.md)
 install(FILES ${documents} DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT program)
+install(DIRECTORY docs/pictures DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT program FILES_MATCHING PATTERN *.svg)
 install(DIRECTORY examples DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/libmerowireless-core-dev COMPONENT development)

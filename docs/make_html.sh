@@ -75,11 +75,11 @@ contents() {
   echo '</dl>'
 }
 
-# Each link that leads to no file, or to no place in it.
+# Each link, or source of a picture, that leads to no file, or to no place in it.
 dead_links() {
   cd "$directory"
   find . -name '*.html' | while read -r page; do
-    grep -oE 'href="[^"]*"' "$page" | cut -d '"' -f 2 | sort -u | grep -vE '^(https|mailto):' | while read -r link; do
+    grep -oE '(href|src)="[^"]*"' "$page" | cut -d '"' -f 2 | sort -u | grep -vE '^(https|mailto):' | while read -r link; do
       case $link in
         '#'*) to=$page ;;
         *) to=$(dirname "$page")/${link%#*} ;;
@@ -108,6 +108,8 @@ for header in include/*.h; do
 done
 contents | write_page index.html libmerowireless-core
 cp docs/style.css "$directory/docs"
+mkdir "$directory/docs/pictures"
+cp docs/pictures/*.svg "$directory/docs/pictures"
 
 dead=$(dead_links)
 [ -z "$dead" ] || { echo "$dead" >&2 && exit 1; }

@@ -15,7 +15,7 @@ command_from() {
   chmod +x "$1"
 }
 
-mkdir -p bin docs lib tests/lab/scenarios
+mkdir -p bench bin build/bench docs/pictures lib tests/lab/scenarios
 cp "$source/run" .
 touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
 git init --quiet
@@ -26,12 +26,15 @@ git init --quiet
   command_from bin/apt-get <<<'[[ $1 == update ]] || printf "%s\n" "${@:4}" >>packages'
   command_from bin/cmake <<<'echo "cmake $*" >>calls'
   command_from bin/clang-tidy <<<'echo "clang-tidy ${*: -1}" >>calls'
+  command_from bench/pictures <<<'echo "pictures $* $(cat "$1"/scanning.tsv)" >>calls'
+  command_from bench/tables <<<'echo "tables $* with $PEERS" >>calls'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
 }
 # As the real one does, it names one scenario after the other.
 command_from tests/lab/lab <<'END'
 case $1 in
   packages) echo qemu ;;
+  peers) echo /peers ;;
   list) for name in a-scan b-join; do echo "$name  What it shows." && sleep 0.1; done ;;
   *) echo "lab $*" >>calls ;;
 esac
@@ -74,6 +77,20 @@ case $1 in
     run docs
     expect_calls 'make_html.sh . build/docs'
     expect_packages cmark-gfm mandoc
+    ;;
+  bench)
+    run bench size
+    expect_calls 'cmake --preset release' 'cmake --build --preset bench' 'tables build size with '
+    run bench save starting
+    grep -qx 'tables build save starting with /peers' calls
+    run bench
+    grep -qx 'tables build with /peers' calls
+    ;;
+  pictures)
+    echo 'Scan/10 300' >build/bench/scanning.tsv
+    run bench pictures
+    expect_calls 'pictures docs/pictures Scan/10 300'
+    expect_packages gnuplot-nox
     ;;
   lint)
     run test lint
