@@ -67,10 +67,11 @@ BRIDGE_INFO ReadBridge(const NetworkScript& script, const char* szBridge) {
 // anything is written, so that no record is written half.
 bool IsWord(const char* szField, size_t cbField) {
   const size_t size = ::strnlen(szField, cbField);
-  return size < cbField && std::all_of(szField, szField + size, [](char c) {
-           constexpr char kSpecial[] = "\"'\\`$&|;<>()#*?[]{}~!";
-           return static_cast<unsigned char>(c) > ' ' && c != '\x7f' && std::strchr(kSpecial, c) == nullptr;
-         });
+  const auto isOrdinary = [](char c) {
+    constexpr char kSpecial[] = "\"'\\`$&|;<>()#*?[]{}~!";
+    return static_cast<unsigned char>(c) > ' ' && c != '\x7f' && std::strchr(kSpecial, c) == nullptr;
+  };
+  return size < cbField && std::all_of(szField, szField + size, isOrdinary);
 }
 
 template <size_t kSize>

@@ -15,7 +15,7 @@
 
 #define ENUMERATION(type)                      \
   MUST(type##_has_32_bits, sizeof(type) == 4); \
-  MUST(type##_is_signed, (type)-1 < (type)0)
+  MUST(type##_is_signed, (type)(-1) < (type)(0))
 #define CONSTANT(name, value) MUST(name##_is_##value, (name) == (value))
 #define RECORD(type, size64, size32) MUST(type##_has_its_size, sizeof(type) == OF_WORD(size64, size32))
 #define FIELD(type, field, at64, at32, size64, size32)                              \

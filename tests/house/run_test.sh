@@ -28,6 +28,9 @@ git init --quiet
   command_from bin/clang-tidy <<<'echo "clang-tidy ${*: -1}" >>calls'
   command_from bench/pictures <<<'echo "pictures $* $(cat "$1"/scanning.tsv)" >>calls'
   command_from bench/tables <<<'echo "tables $* with $PEERS" >>calls'
+  command_from bin/clang-format <<<'echo "clang-format of this machine $*" >>calls'
+  command_from bin/clang-format-19 <<<'echo "clang-format-19 $*" >>calls'
+  command_from bin/shellcheck <<<'exit 0'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
 }
 # As the real one does, it names one scenario after the other.
@@ -96,6 +99,14 @@ case $1 in
     run test lint
     expect_calls 'cmake --preset release' 'clang-tidy lib/unit.cpp'
     expect_packages "${building[@]}" clang-tidy
+    ;;
+  format) # Which version it was, the machine decided.
+    run format
+    expect_calls 'clang-format-19 -i lib/unit.cpp'
+    expect_packages clang-format-19
+    { run test style || :; } >shown # the checks of the house are not here
+    grep -qx 'clang-format-19 --dry-run --Werror lib/unit.cpp' calls
+    expect_packages clang-format-19 shellcheck
     ;;
   scenario) # The list was piped into a search that ended at the first name, which failed the list.
     run lab a-scan

@@ -283,19 +283,16 @@ TEST_F(BridgeConfiguration, IsRefusedWhenATextDoesNotEnd) {
   };
   const std::string longName(16, 'x');
   const std::string longAddress(20, 'x');
-  refuse(
-      [](Bridge & b) -> auto& { return b.netInfo.szInterface; }, "'" + longName + "' and 'lbr0' do not name a bridge");
-  refuse(
-      [](Bridge & b) -> auto& { return b.bridgeInfo.szIfName; }, "'lbr0' and '" + longName + "' do not name a bridge");
-  refuse(
-      [](Bridge & b) -> auto& { return b.bridgeInfo.info.szPrimary; },
-      "'" + longName + "' is no first member for lbr0");
-  refuse(
-      [](Bridge & b) -> auto& { return b.netInfo.szIp; },
-      "'" + longAddress + "' and '255.255.255.0' are no address and mask for lbr0");
-  refuse(
-      [](Bridge & b) -> auto& { return b.netInfo.szMask; },
-      "'10.1.14.1' and '" + longAddress + "' are no address and mask for lbr0");
+  refuse([](Bridge& b) -> auto& { return b.netInfo.szInterface; },
+         "'" + longName + "' and 'lbr0' do not name a bridge");
+  refuse([](Bridge& b) -> auto& { return b.bridgeInfo.szIfName; },
+         "'lbr0' and '" + longName + "' do not name a bridge");
+  refuse([](Bridge& b) -> auto& { return b.bridgeInfo.info.szPrimary; },
+         "'" + longName + "' is no first member for lbr0");
+  refuse([](Bridge& b) -> auto& { return b.netInfo.szIp; },
+         "'" + longAddress + "' and '255.255.255.0' are no address and mask for lbr0");
+  refuse([](Bridge& b) -> auto& { return b.netInfo.szMask; },
+         "'10.1.14.1' and '" + longAddress + "' are no address and mask for lbr0");
 }
 
 TEST_F(BridgeConfiguration, IsNotWrittenWhereThereIsNoRoomForFiles) {

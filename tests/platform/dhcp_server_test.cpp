@@ -497,7 +497,7 @@ TEST_F(DhcpServerFiles, AreRefusedForATextThatDoesNotEnd) {
     ExpectRefused(conf,
                   "A DHCP server's " + std::string(field.szName) + " cannot be '" + std::string(field.size, 'x') + "'");
   }
-  for (char(MERO_DHCPD_CONF::*field)[4096] : {&MERO_DHCPD_CONF::szDomain, &MERO_DHCPD_CONF::szLeaseFile}) {
+  for (char(MERO_DHCPD_CONF::* field)[4096] : {&MERO_DHCPD_CONF::szDomain, &MERO_DHCPD_CONF::szLeaseFile}) {
     MERO_DHCPD_CONF conf = Server();
     std::memset(conf.*field, 'x', sizeof(conf.*field));
     EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 0);

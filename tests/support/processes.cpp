@@ -27,7 +27,7 @@ int Memory(const std::string& text = "") {
 
 // The offset is the writer's too, and stays where it is.
 std::string TextSoFar(int fd) {
-  struct stat status {};
+  struct stat status{};
   if (::fstat(fd, &status) < 0) std::abort();
   std::string text(static_cast<std::size_t>(status.st_size), '\0');
   if (::pread(fd, text.data(), text.size(), 0) < 0) std::abort();

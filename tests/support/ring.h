@@ -48,7 +48,7 @@ class Ring {
 
   // A member of each record, from first to last.
   template <class Member>
-  std::vector<Member> Each(Member Record::*member) {
+  std::vector<Member> Each(Member Record::* member) {
     std::vector<Member> values;
     for (const Record* record : Records()) values.push_back(record->*member);
     return values;

@@ -176,8 +176,7 @@ void DescribeSharing(CLI::App& command, NetworkToShare& values) {
 
 // An option whose value stays absent when it is not given.
 CLI::Option* AddChange(CLI::App& command, const char* szName, std::optional<std::string>& value, const char* szHelp) {
-  return command.add_option_function<std::string>(
-      szName, [&value](const std::string& text) { value = text; }, szHelp);
+  return command.add_option_function<std::string>(szName, [&value](const std::string& text) { value = text; }, szHelp);
 }
 
 void DescribeEditing(CLI::App& command, NetworkToEdit& values) {

@@ -14,7 +14,7 @@ std::chrono::nanoseconds Duration(const timespec& time) {
 }  // namespace
 
 std::optional<std::chrono::nanoseconds> AgeOfMarker(const std::string& path) {
-  struct stat marker {};
+  struct stat marker{};
   if (::lstat(path.c_str(), &marker) < 0 || !S_ISREG(marker.st_mode) || marker.st_uid != 0) return std::nullopt;
   timespec now{};
   ::clock_gettime(CLOCK_REALTIME, &now);

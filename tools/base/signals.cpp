@@ -10,7 +10,7 @@ namespace {
 const Signals* g_outermost = nullptr;
 
 bool IsIgnored(int signal) {
-  struct sigaction action {};
+  struct sigaction action{};
   return ::sigaction(signal, nullptr, &action) == 0 && action.sa_handler == SIG_IGN;
 }
 

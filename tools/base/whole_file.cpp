@@ -67,7 +67,7 @@ bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode) {
 
 // Links are not followed: in a directory that others may write, they could lead anywhere.
 void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes) {
-  struct stat there {};
+  struct stat there{};
   if (::lstat(path.c_str(), &there) == 0 && !S_ISREG(there.st_mode)) {
     throw Failure(Exit::kFailed, shown + " is no plain file, and was not replaced", "give a name of its own");
   }

@@ -50,9 +50,7 @@ Shown ShowInForce(const Country& of, bool) {
 
 constexpr Field<Country> kFields[] = {
     {"country", "country", [](const Country& of) { return TextOrNothing(of.saved); }, Layout::kLeft,
-     [](const Country& of, bool) {
-       return of.saved.empty() ? Shown{"none is set", Tone::kFair} : Shown{of.saved};
-     }},
+     [](const Country& of, bool) { return of.saved.empty() ? Shown{"none is set", Tone::kFair} : Shown{of.saved}; }},
     {"kernel", "kernel's rules", [](const Country& of) { return TextOrNothing(of.rules.kernel); }, Layout::kLeft,
      [](const Country& of, bool) {
        return of.rules.areThere() ? Shown{NameOfRules(of.rules.kernel)} : Shown{"-", Tone::kFaint};

@@ -205,7 +205,7 @@ ApPlan PlanForAp(const SettingsDocument& document) {
 class FormerSettings {
  public:
   FormerSettings() : text_(TextOfFile(kApSettingsPath)) {
-    struct stat status {};
+    struct stat status{};
     if (text_ ? ::stat(kApSettingsPath, &status) == 0 : errno == ENOENT) {
       mode_ = status.st_mode & ALLPERMS;
       return;

@@ -71,7 +71,7 @@ struct Stamp {
 };
 
 Stamp StampOfKnown() {
-  struct stat file {};
+  struct stat file{};
   return ::stat(kKnownNetworksPath, &file) == 0 ? Stamp{file.st_ino, file.st_mtim.tv_sec} : Stamp{};
 }
 

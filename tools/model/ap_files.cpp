@@ -46,7 +46,7 @@ bool HasOtherGuests(const std::string& interface, const MERO_HOSTAP_GUEST_NET& g
 
 struct GuestRight {
   const char* szKey;
-  BOOL MERO_AP_ACCESS_RULE::*value;
+  BOOL MERO_AP_ACCESS_RULE::* value;
 };
 
 constexpr GuestRight kGuestRights[] = {

@@ -45,7 +45,7 @@ FormerAp::FormerAp(std::string interface, const std::string& nextBridge) : inter
 // A file that is there and cannot be read could not be put back either.
 void FormerAp::Keep(const std::string& path) {
   auto text = TextOfFile(path);
-  struct stat status {};
+  struct stat status{};
   if (text ? ::stat(path.c_str(), &status) < 0 : errno != ENOENT) {
     throw Failed(path + " cannot be read, and nothing was changed: " + std::strerror(errno),
                  "the access point that is on the air could not be brought back without it");

@@ -36,8 +36,8 @@ Failure NotChanged(const std::string& path) {
 
 // Whether a path still names an open file: while its lock was waited for, the holder has removed it.
 bool Names(const std::string& path, int fd) {
-  struct stat named {};
-  struct stat open {};
+  struct stat named{};
+  struct stat open{};
   return ::lstat(path.c_str(), &named) == 0 && ::fstat(fd, &open) == 0 && named.st_ino == open.st_ino &&
          named.st_dev == open.st_dev;
 }
@@ -87,7 +87,7 @@ void SettingsChange::Copy() const {
     if (errno == ENOENT) return;
     throw NotChanged(path_);
   }
-  struct stat model {};
+  struct stat model{};
   if (::fstat(file.get(), &model) < 0 || ::fchown(copy.get(), model.st_uid, model.st_gid) < 0 ||
       ::fchmod(copy.get(), model.st_mode & ALLPERMS) < 0) {
     throw NotChanged(path_);

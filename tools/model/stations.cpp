@@ -145,9 +145,7 @@ constexpr Field<Station> kFields[] = {
     {"since", "FOR", [](const Station& of) { return of.since != 0 ? Value(UtcText(of.since)) : nullptr; },
      Layout::kLeft, ShowSince},
     {"guest", "GUEST", [](const Station& of) { return Value(of.isGuest()); }, Layout::kLeft,
-     [](const Station& of, bool) {
-       return of.isGuest() ? Shown{"yes"} : Shown{"-", Tone::kFaint};
-     }},
+     [](const Station& of, bool) { return of.isGuest() ? Shown{"yes"} : Shown{"-", Tone::kFaint}; }},
     {"state", "", [](const Station& of) { return Value(of.isLetIn ? "joined" : "joining"); }},
 };
 

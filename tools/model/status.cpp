@@ -80,7 +80,7 @@ std::string RateText(int kilobits) {
   return std::to_string(kilobits / 1000) + (tenths == "0" ? "" : "." + tenths) + " Mbit/s";
 }
 
-template <auto Link::*member>
+template <auto Link::* member>
 Value OfLink(const Status& status) {
   const auto& held = status.link.*member;
   if constexpr (requires { held.empty(); })
@@ -111,9 +111,7 @@ Shown ShowSince(const Status& status, bool) {
 
 constexpr Field<Status> kStatusFields[] = {
     {"state", "status", [](const Status& of) { return Value(StateOf(of).szKey); }, Layout::kLeft,
-     [](const Status& of, bool) {
-       return Shown{StateOf(of).szText, StateOf(of).tone};
-     }},
+     [](const Status& of, bool) { return Shown{StateOf(of).szText, StateOf(of).tone}; }},
     {"name", "network", [](const Status& of) { return of.isConnected() ? Value(of.name) : nullptr; }},
     {"auth", "security", AuthOf, Layout::kLeft, ShowAuth},
     {"standard", "standard", StandardOf, Layout::kLeft, ShowStandard},
@@ -163,7 +161,7 @@ bool IsLetIn(const std::string& interface) {
 
 // Asks the library one thing about the connection; without an answer `answer` stays as it is.
 template <class Answer>
-void Ask(WIRELESS_REQUEST request, Answer WIRELESS_INFO::*member, Answer& answer) {
+void Ask(WIRELESS_REQUEST request, Answer WIRELESS_INFO::* member, Answer& answer) {
   WIRELESS_INFO info{};
   if (MEROWirelessCurInfoGet(request, &info) == 0) answer = info.*member;
 }

@@ -182,9 +182,7 @@ std::string HarmlessDocument(std::string_view document, bool utf8) {
 }
 
 Shown Output::Show(const Value& value) const {
-  return std::visit(Overloaded{[](std::nullptr_t) {
-                                 return Shown{"-", Tone::kFaint};
-                               },
+  return std::visit(Overloaded{[](std::nullptr_t) { return Shown{"-", Tone::kFaint}; },
                                [](bool held) { return Shown{held ? "yes" : "no"}; },
                                [](std::int64_t held) { return Shown{std::to_string(held)}; },
                                [&](const std::string& held) {
