@@ -23,7 +23,6 @@ git init --quiet
 {
   command_from bin/dpkg-query <<<'exit 1'
   command_from bin/sudo <<<'exec "$@"'
-  command_from bin/apt-get <<<'[[ $1 == update ]] || printf "%s\n" "${@:4}" >>packages'
   command_from bin/cmake <<<'echo "cmake $*" >>calls'
   command_from bin/clang-tidy <<<'echo "clang-tidy ${*: -1}" >>calls'
   command_from bench/pictures <<<'echo "pictures $* $(cat "$1"/scanning.tsv)" >>calls'
@@ -33,6 +32,18 @@ git init --quiet
   command_from bin/shellcheck <<<'exit 0'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
 }
+# The packages in `exclusions`, one a line, exclude a cross compiler, which the real one removes without a question too.
+command_from bin/apt-get <<'END'
+packages=()
+for word; do [[ $word == -* || $word == install ]] || packages+=("$word"); done
+[[ $1 != update ]] || exit 0
+if [[ $1 == --simulate ]]; then
+  if printf '%s\n' "${packages[@]}" | grep -qxFf exclusions; then echo 'Remv gcc-aarch64-linux-gnu [4:12.2.0-3]'; fi
+elif [[ " $* " == *' --no-remove '* ]]; then
+  printf '%s\n' "${packages[@]}" >>packages
+fi
+END
+: >exclusions
 # As the real one does, it names one scenario after the other.
 command_from tests/lab/lab <<'END'
 case $1 in
@@ -107,6 +118,25 @@ case $1 in
     { run test style || :; } >shown # the checks of the house are not here
     grep -qx 'clang-format-19 --dry-run --Werror lib/unit.cpp' calls
     expect_packages clang-format-19 shellcheck
+    ;;
+  exclusion) # A compiler of the developer's was removed.
+    echo cmake >exclusions
+    if run build >shown; then
+      echo "a package was removed"
+      exit 1
+    fi
+    expect_calls
+    expect_packages
+    grep -qx 'cmake cannot be installed beside gcc-aarch64-linux-gnu' said
+    grep -q '^run: nothing was installed and nothing removed' said
+    ;;
+  without) # One that only adds to the tests excludes something.
+    printf '%s\n' gcc-multilib >exclusions
+    { run test unit || :; } >shown # there are no tests
+    grep -qx 'cmake --build --preset tests' calls
+    grep -qx g++-multilib packages
+    [[ $(grep -cx gcc-multilib packages) -eq 0 ]]
+    grep -qx 'going without gcc-multilib, which cannot be installed beside gcc-aarch64-linux-gnu' said
     ;;
   scenario) # The list was piped into a search that ended at the first name, which failed the list.
     run lab a-scan
