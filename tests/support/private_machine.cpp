@@ -40,6 +40,30 @@ void MakeDirectory(const std::string& path) {
   Require(::mkdir(path.c_str(), 0755) == 0 || errno == EEXIST, "make " + path);
 }
 
+bool MakeMountsPrivate(const char* szPath) {
+  return ::mount(nullptr, szPath, nullptr, MS_REC | MS_PRIVATE, nullptr) == 0;
+}
+
+bool IsTop() {
+  struct stat here{};
+  struct stat above{};
+  Require(::stat(".", &here) == 0 && ::stat("..", &above) == 0, "the directory above");
+  return here.st_dev == above.st_dev && here.st_ino == above.st_ino;
+}
+
+// Has "/", which somebody has changed to a plain directory (chroot), become a mount point. Until the mounts that it
+// stands among are private, a new one would be seen by the machine outside: this climbs to the top of them first.
+void MountRoot() {
+  const std::string working = std::filesystem::current_path();
+  const int root = ::open("/", O_PATH | O_DIRECTORY | O_CLOEXEC);
+  Require(root >= 0 && ::chdir("/") == 0 && ::chroot(kUpper.c_str()) == 0, "leave " + kUpper);
+  while (!IsTop()) Require(::chdir("..") == 0, "climb");
+  Require(MakeMountsPrivate("."), "private mounts");
+  Require(::fchdir(root) == 0 && ::mount(".", kUpper.c_str() + 1, nullptr, MS_BIND | MS_REC, nullptr) == 0, "mount /");
+  Require(::chdir(kUpper.c_str() + 1) == 0 && ::chroot(".") == 0 && ::chdir(working.c_str()) == 0, "enter /");
+  ::close(root);
+}
+
 // A user other than root becomes the root of a user namespace.
 void EnterNamespaces() {
   const uid_t uid = ::getuid();
@@ -75,7 +99,10 @@ void EnterPrivateMachine() {
   ::umask(022);
   ::setenv("LC_ALL", "C", 1);
   EnterNamespaces();
-  Require(::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) == 0, "private mounts");
+  if (!MakeMountsPrivate("/")) {
+    MountRoot();
+    Require(MakeMountsPrivate("/"), "private mounts");
+  }
   Mount("tmpfs", kUpper, "");
   for (const char* name : {"etc", "run", "tmp", "usr", "var"}) MakeWritable(name);
   ForgetAppliance();
