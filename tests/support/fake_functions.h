@@ -5,6 +5,16 @@
 
 #include <cstddef>
 #include <tuple>
+#include <type_traits>
+
+// TYPE_OF(name) is the type of a function and no more. What else a header says of it, such as which of its arguments
+// are never null, decltype(::name) would bring along, and a compiler would warn that no template can keep it.
+template <class R, class... Args>
+std::type_identity<R(Args...)> TypeOf(R (*)(Args...));
+template <class R, class... Args>
+std::type_identity<R(Args...) noexcept> TypeOf(R (*)(Args...) noexcept);
+
+#define TYPE_OF(name) decltype(TypeOf(&::name))::type
 
 template <class Function>
 struct Signature;
@@ -38,8 +48,8 @@ using Argument = std::tuple_element_t<kIndex, typename Signature<Function>::Argu
 #define ARGUMENTS_5 ARGUMENTS_4, e
 
 // The head of the function `name`, which has `count` parameters: what follows is its body.
-#define STAND_IN_FOR(name, count)                                                                     \
-  extern "C" Signature<decltype(::name)>::Result name(PARAMETERS_##count(decltype(::name))) noexcept( \
-      Signature<decltype(::name)>::kNoexcept)
+#define STAND_IN_FOR(name, count)                                                               \
+  extern "C" Signature<TYPE_OF(name)>::Result name(PARAMETERS_##count(TYPE_OF(name))) noexcept( \
+      Signature<TYPE_OF(name)>::kNoexcept)
 
 #endif  // MERO_TESTS_SUPPORT_FAKE_FUNCTIONS_H

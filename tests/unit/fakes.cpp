@@ -9,8 +9,6 @@
 #include <cstdarg>
 #include <ctime>
 
-#include "tests/support/fake_functions.h"
-
 namespace fake {
 namespace {
 
@@ -130,7 +128,7 @@ Inside::~Inside() {
   g_insidePlatform -= depth_;
 }
 
-#define DEFINE_FAKE(name, origin, count) Fake<decltype(::name)> name(#name, Origin::origin);
+#define DEFINE_FAKE(name, origin, count) Fake<TYPE_OF(name)> name(#name, Origin::origin);
 MERO_FAKES(DEFINE_FAKE)
 #undef DEFINE_FAKE
 

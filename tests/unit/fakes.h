@@ -31,6 +31,7 @@
 
 #include "memory.h"
 #include "platform.h"
+#include "tests/support/fake_functions.h"
 
 // Every faked function, where it is from, and the number of its parameters. Two are apart: time() has NowIs() below,
 // and what goes to syslog() is recorded and goes no further.
@@ -224,7 +225,7 @@ class Fake<Result(Args...)> {
   Result (*real_)(Args...) = nullptr;
 };
 
-#define DECLARE(name, origin, count) extern Fake<decltype(::name)> name;
+#define DECLARE(name, origin, count) extern Fake<TYPE_OF(name)> name;
 MERO_FAKES(DECLARE)
 #undef DECLARE
 
