@@ -51,26 +51,25 @@ bool Reserve(PLIBSZLIST& list, int nCapacity) {
   return true;
 }
 
-// The same for names that differ only in the case of their letters; never 0.
+// The same for names that differ only in the case of their letters.
 uint32_t HashOfName(const char* szName) {
   uint32_t hash = 2166136261u;
   for (; *szName != '\0'; ++szName) hash = (hash ^ static_cast<unsigned char>(ToLower(*szName))) * 16777619u;
-  return hash | 1;
+  return hash;
 }
 
-// Takes their sections from the items that repeat a name, since the first of a name counts: what is asked for by such
-// an item is looked for by its name. So is, once in a blue moon, an item whose hash is another's. False when memory ran
+// Has the items that repeat a name share the section of the first, which is the one that counts. False when memory ran
 // out.
-bool ForgetRepeated(PLIBSZLIST& list) {
+bool ShareRepeated(PLIBSZLIST& list) {
   const size_t nSlots = std::bit_ceil(2 * static_cast<size_t>(list.nItem));
-  auto* slots = static_cast<uint32_t*>(std::calloc(nSlots, sizeof(uint32_t)));
+  auto** slots = static_cast<char**>(std::calloc(nSlots, sizeof(char*)));
   if (slots == nullptr) return false;
   for (int i = 0; i < list.nItem; ++i) {
-    const uint32_t hash = HashOfName(list.ppszItem[i]);
-    size_t slot = (hash >> 1) & (nSlots - 1);
-    while (slots[slot] != 0 && slots[slot] != hash) slot = (slot + 1) & (nSlots - 1);
-    if (slots[slot] == hash) SectionBefore(list.ppszItem[i]) = {};
-    slots[slot] = hash;
+    char* szItem = list.ppszItem[i];
+    size_t slot = HashOfName(szItem) & (nSlots - 1);
+    while (slots[slot] != nullptr && !EqualIgnoringCase(slots[slot], szItem)) slot = (slot + 1) & (nSlots - 1);
+    if (slots[slot] == nullptr) slots[slot] = szItem;
+    SectionBefore(szItem) = SectionBefore(slots[slot]);
   }
   std::free(slots);
   return true;
@@ -104,7 +103,7 @@ bool CanKeepFile(const PLIBSZLIST& list) {
 void KeepFile(PLIBSZLIST& list, Bytes&& file) {
   auto& keeper = static_cast<TextList&>(list);
   // Without sections there is nothing to keep, and the list stays one that can.
-  if (list.nItem == 0 || !ForgetRepeated(list)) return;
+  if (list.nItem == 0 || !ShareRepeated(list)) return;
   keeper.file = std::move(file);
   keeper.older = std::exchange(g_newest, &keeper);
 }

@@ -115,6 +115,16 @@ TEST_F(Walk, ReadsTheFileOnceHoweverManyNetworksThereAre) {
   }
 }
 
+// Each name that repeats another had the file read, which took seconds for some thousands of them.
+TEST_F(Walk, ReadsTheFileOnceHoweverOftenANameRepeats) {
+  std::string text;
+  for (int i = 0; i < 100; ++i) text += TextOf(0, i == 0 ? "old" : "second");
+  WriteText(kKnownNetworksPath, text);
+  OpenCounter opens(kKnownNetworksPath);
+  WalkOver(100);
+  EXPECT_EQ(opens.Take(), 1);
+}
+
 TEST_F(Walk, ReadsTheFileForANameThatIsNotTheListsOwn) {
   WriteText(kKnownNetworksPath, Networks(4));
   const ListedNetworks networks;
