@@ -4,6 +4,7 @@
 
 #include <sys/types.h>
 
+#include <algorithm>
 #include <climits>
 #include <string_view>
 
@@ -22,6 +23,12 @@ struct Revision {
   std::string_view behind;
 
   size_t size() const { return before.size() + content.view().size() + behind.size(); }
+
+  // Whether the old text stays as it is.
+  bool Keeps(std::string_view text) const {
+    const std::string_view added = content.view();
+    return size() == text.size() && std::equal(added.begin(), added.end(), text.begin() + before.size());
+  }
 };
 
 class FileEdit {
@@ -42,7 +49,8 @@ class FileEdit {
   void Abandon();
 
   // Replaces the content, unless it failed to be built. The file holds the old content or the new one, whole, whenever
-  // this is interrupted.
+  // this is interrupted. What is there already is flushed and not written: a flash wears out, and most of what is set
+  // has been set before.
   Status Commit(const Revision& revision);
 
  private:

@@ -9,6 +9,7 @@
 #include <fstream>
 #include <functional>
 #include <set>
+#include <string_view>
 
 #include "tests/platform/platform_test.h"
 #include "tests/support/processes.h"
@@ -78,6 +79,23 @@ TEST_F(AFileThatIsChanged, IsReplacedAsAWholeSoThatReadersNeverSeeAPart) {
     EXPECT_EQ(std::string(std::istreambuf_iterator<char>(reader), {}), change.szBefore) << change.szName;
     EXPECT_EQ(ReadText(kFile), change.szAfter) << change.szName;
     EXPECT_THAT(NamesIn(kDirectory), ElementsAre("file")) << change.szName;
+  }
+}
+
+// Every key that was set, with its old value too, was a file written and flushed anew.
+TEST_F(AFileThatIsChanged, IsNotWrittenWhereItHoldsTheVeryValueAlready) {
+  for (const Change& change : kChanges) {
+    if (std::string_view(change.szName).starts_with("set")) {
+      WriteText(kFile, change.szAfter);
+      const int file = ::open(kFile, O_RDONLY | O_CLOEXEC);
+      ASSERT_TRUE(change.make(kFile)) << change.szName;
+      struct stat before;
+      struct stat after;
+      ASSERT_EQ(::fstat(file, &before) + ::stat(kFile, &after), 0);
+      EXPECT_EQ(before.st_ino, after.st_ino) << change.szName;
+      EXPECT_EQ(ReadText(kFile), change.szAfter) << change.szName;
+      ::close(file);
+    }
   }
 }
 
