@@ -11,14 +11,20 @@ TEST(Abi, ServesAProgramInC99) {
   EXPECT_EQ(std::system(C_PROGRAM), 0);
 }
 
-#ifdef MUSL_DIRECTORY
+#ifdef musl_DIRECTORY
 TEST(Musl, ServesAProgramInC99) {
-  EXPECT_EQ(std::system(MUSL_DIRECTORY "/program"), 0);
+  EXPECT_EQ(std::system(musl_DIRECTORY "/program"), 0);
 }
 
 // It cannot be told to close all descriptors from one on.
 TEST(Musl, HasAProgramInheritTheStandardDescriptorsAndNothingElse) {
-  EXPECT_EQ(Shell(MUSL_DIRECTORY "/inherits"), "0\n1\n2\n3\n");  // 3 is the listing itself
+  EXPECT_EQ(Shell(musl_DIRECTORY "/inherits"), "0\n1\n2\n3\n");  // 3 is the listing itself
+}
+#endif
+
+#ifdef m32_DIRECTORY
+TEST(M32, ServesAProgramInC99) {
+  EXPECT_EQ(std::system(m32_DIRECTORY "/program"), 0);
 }
 #endif
 

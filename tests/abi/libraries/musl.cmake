@@ -17,5 +17,8 @@ file(CREATE_LINK /usr/include/linux ${kernel}/linux SYMBOLIC)
 file(CREATE_LINK /usr/include/asm-generic ${kernel}/asm-generic SYMBOLIC)
 file(CREATE_LINK /usr/include/${triple}-gnu/asm ${kernel}/asm SYMBOLIC)
 
+# Packed relocations are understood since musl 1.2.4.
+set(MERO_HAS_PACKED_RELOCATIONS OFF CACHE BOOL "")
+
 string(JOIN " " CMAKE_CXX_FLAGS_INIT --target=${triple}-musl -nostdinc -D_LIBCPP_HAS_MUSL_LIBC
   -isystem ${llvm}/include/c++/v1 -isystem /usr/include/${triple}-musl -isystem ${clang}/include -isystem ${kernel})
