@@ -24,7 +24,8 @@
 
 namespace {
 
-constexpr char kOrdinaryTool[] = "/sbin/iwlist.distrib";
+// Where the package moves wireless-tools' own aside to: that of Debian 12, and that of 13, which says /usr/sbin/iwlist.
+constexpr const char* kOrdinaryTools[] = {"/sbin/iwlist.distrib", "/usr/sbin/iwlist.ordinary"};
 
 // Longer than a radio takes that goes over all channels while it is connected.
 constexpr std::chrono::seconds kPatience{10};
@@ -65,10 +66,14 @@ bool HasJustScanned(const char* interface) {
 
 // Runs the ordinary tool in place of this program; returns only when that cannot be done.
 int HandOver(char* const argv[]) {
-  execv(kOrdinaryTool, argv);
-  const int status = errno == ENOENT ? 127 : 126;
-  std::fprintf(stderr, "iwlist: cannot run the ordinary tool %s: %s\n", kOrdinaryTool, std::strerror(errno));
-  return status;
+  for (const char* szTool : kOrdinaryTools) {
+    execv(szTool, argv);
+    if (errno == ENOENT) continue;
+    std::fprintf(stderr, "iwlist: cannot run the ordinary tool %s: %s\n", szTool, std::strerror(errno));
+    return 126;
+  }
+  std::fprintf(stderr, "iwlist: the ordinary tool is neither %s nor %s\n", kOrdinaryTools[0], kOrdinaryTools[1]);
+  return 127;
 }
 
 }  // namespace

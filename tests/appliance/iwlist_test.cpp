@@ -17,7 +17,8 @@ namespace {
 
 class ListingTool : public testing::Test {
  protected:
-  static constexpr char kOrdinaryTool[] = "/sbin/iwlist.distrib";
+  static constexpr char kOrdinaryTool[] = "/sbin/iwlist.distrib";  // of Debian 12
+  static constexpr char kLaterTool[] = "/usr/sbin/iwlist.ordinary";
 
   // Shows its arguments and ends with a status of its own.
   static constexpr char kShowArguments[] =
@@ -26,7 +27,9 @@ class ListingTool : public testing::Test {
       "echo complaint >&2\n"
       "exit 7\n";
 
-  void SetUp() override { std::filesystem::remove(kOrdinaryTool); }
+  void SetUp() override {
+    for (const char* szTool : {kOrdinaryTool, kLaterTool}) std::filesystem::remove(szTool);
+  }
 
   static void InstallOrdinaryTool(const char* script, mode_t mode = 0755) { WriteText(kOrdinaryTool, script, mode); }
 
@@ -73,11 +76,19 @@ TEST_F(ListingTool, HandsOverACallWithoutArguments) {
   EXPECT_EQ(ran_.status, 0);
 }
 
+// An upgrade from Debian 12 to 13 removes the one and brings the other, and none of ours runs meanwhile.
+TEST_F(ListingTool, HandsOverToTheOrdinaryToolOfDebian13) {
+  WriteText(kLaterTool, kShowArguments, 0755);
+  Run({"wlan0", "scanning"});
+  EXPECT_EQ(ran_.out, "<wlan0><scanning>");
+  EXPECT_EQ(ran_.status, 7);
+}
+
 TEST_F(ListingTool, SaysThatTheOrdinaryToolIsMissing) {
   Run({"wlan0", "scanning"});
   EXPECT_EQ(ran_.status, 127);
   EXPECT_EQ(ran_.out, "");
-  EXPECT_EQ(ran_.err, "iwlist: cannot run the ordinary tool /sbin/iwlist.distrib: No such file or directory\n");
+  EXPECT_EQ(ran_.err, "iwlist: the ordinary tool is neither /sbin/iwlist.distrib nor /usr/sbin/iwlist.ordinary\n");
 }
 
 TEST_F(ListingTool, SaysThatTheOrdinaryToolCannotBeRun) {

@@ -122,8 +122,8 @@ TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
   const std::string state = Tells("printf '%s' \"$state\"");
   const std::string leaseLock = RunInShell("sed -n 's/^lock=//p' " APPLIANCE_KIT "/sbin/udhcpc.lease").out;
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.postrm"),
-            (Paths{"/sbin/iwlist", "/sbin/iwlist.distrib", state, leaseLock.substr(0, leaseLock.find('\n')),
-                   kAdapterInfoPath}));
+            (Paths{"/sbin/iwlist", "/sbin/iwlist.distrib", "/usr/sbin/iwlist", "/usr/sbin/iwlist.ordinary", state,
+                   leaseLock.substr(0, leaseLock.find('\n')), kAdapterInfoPath}));
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.prerm"),
             (Paths{state + "/hostapd-*.pid", state + "/hostapd-", kNetworkScriptPath}));
   EXPECT_EQ(Tells("printf '%s' \"$hostapd_run-if0.pid\""), state + "/hostapd-if0.pid");

@@ -63,9 +63,12 @@ make_system() { # ARCHIVE DIRECTORY
   # shellcheck source=/dev/null
   suite=$(. /etc/os-release && echo "$VERSION_CODENAME")
   echo "making a Debian system" >&2
+  # shellcheck disable=SC2016  # the directory is mmdebstrap's to name
   debian_archives |
     mmdebstrap --quiet --format=tar --variant=apt --include="cmake,g++,make,pkgconf,$(dependencies "$2")" \
-      --aptopt='APT::Install-Recommends "false"' "$suite" "$1.new" - >&2
+      --aptopt='APT::Install-Recommends "false"' --customize-hook='mkdir "$1/srv/tools"' \
+      --customize-hook='chroot "$1" sh -c "cd /srv/tools && apt-get -o APT::Sandbox::User=root download wireless-tools"' \
+      "$suite" "$1.new" - >&2
   mv "$1.new" "$1"
 }
 
@@ -116,6 +119,18 @@ make_upgrades() {
   done
 }
 
+# The tools as Debian 13 has them, which says /usr/sbin where Debian 12 says /sbin: of a later version.
+make_later_tools() {
+  local work=$root/tmp/work package
+  package=$(echo "$root"/srv/tools/*.deb)
+  dpkg-deb --raw-extract "$package" "$work"
+  if [[ -d $work/sbin ]]; then mv "$work/sbin" "$work/usr/"; fi
+  sed -Ei 's/^(Version: .*)/\1+later/' "$work/DEBIAN/control"
+  mkdir "$root/tmp/later-tools"
+  dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/later-tools/${package##*/}" >/dev/null
+  rm -r "$work"
+}
+
 apt() { quietly inside apt-get --yes -o Dpkg::Use-Pty=0 "$@"; }
 
 install_from() { # DIRECTORY [OPTION...]
@@ -145,6 +160,11 @@ iwlist_passes_on() {
 
 iwlist_lists() {
   [[ $(inside iwlist wlan0 scanning mero 2>&1) == 'iwlist: '* ]]
+}
+
+# Whoever brings the ordinary tool, ours stays where the library looks for it.
+listing_tool_outlasts() { # COMMAND...
+  quietly "$@" && iwlist_lists && iwlist_passes_on
 }
 
 settings_are_told() {
@@ -316,6 +336,7 @@ look_at_packages() { # ARCHIVE DIRECTORY
   local ours cc='scan_one.c -o scan-one $(pkg-config --cflags --libs libmerowireless-core)'
   enter_system "$1" "$2"
   make_upgrades
+  make_later_tools
   mapfile -t ours < <(names)
   pretend_systemd
   files >"$root/tmp/before"
@@ -349,6 +370,12 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'an upgrade leaves joining a network by itself enabled' autoconnect_is_enabled
   check 'settings are kept in an upgrade' settings_are_kept
   check 'the listing tool still passes on after an upgrade' iwlist_passes_on
+  check 'the listing tool stays when wireless-tools is installed again' \
+    listing_tool_outlasts inside sh -c 'dpkg --install /srv/tools/*.deb'
+  check 'the listing tool stays when wireless-tools becomes that of Debian 13' \
+    listing_tool_outlasts inside sh -c 'dpkg --install /tmp/later-tools/*.deb'
+  check 'the listing tool stays when that is installed again' \
+    listing_tool_outlasts inside sh -c 'dpkg --install /tmp/later-tools/*.deb'
 
   check "the libraries' notes stay while they are there for another architecture" note_stays_for_another_architecture
   start_daemon
@@ -385,7 +412,7 @@ look_at_packages() { # ARCHIVE DIRECTORY
 
 case $#,${1:-} in
 1,*)
-  archive=$(dirname "$1")/package-test-$(dependencies "$1" | cksum | cut -d ' ' -f 1).tar
+  archive=$(dirname "$1")/package-test-$({ declare -f make_system && dependencies "$1"; } | cksum | cut -d ' ' -f 1).tar
   [[ -e $archive ]] || make_system "$archive" "$1"
   root=$(mktemp -d)
   trap 'rmdir "$root"' EXIT
