@@ -90,7 +90,7 @@ TEST_F(AnAdapter, DoesNotScanWhileItKnowsOfNetworks) {
 TEST_F(AnAdapter, ThatIsNoClientsDoesNotScan) {
   for (const WIRELESS_OPMODE mode :
        {WIRELESS_OPMODE_AUTO, WIRELESS_OPMODE_ADHOC, WIRELESS_OPMODE_MASTER, WIRELESS_OPMODE_MONITOR}) {
-    driver_.mode = mode;
+    driver_.mode = static_cast<unsigned>(mode);
     driver_.told.clear();
     EXPECT_EQ(PLIBNetIfUp("wlan3"), 1) << mode;
     EXPECT_THAT(driver_.told, ElementsAre("up")) << mode;

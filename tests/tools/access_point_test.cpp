@@ -33,8 +33,6 @@ void RecordSaves(std::string (*show)(const MERO_AP_CONF&)) {
   };
 }
 
-constexpr char kPid[] = "/var/run/rc.network/hostapd-wlan0.pid";
-
 class AccessPoint : public ToolTest {
  protected:
   AccessPoint() { library::SavedAp(library::Office()); }

@@ -199,14 +199,14 @@ std::set<std::string> WordsOnScreen(const std::vector<std::string>& words, unsig
 // Lines were broken in the middle of a word, and tables made no sense.
 TEST_F(Forms, FitAScreenOfFortyColumnsWordByWord) {
   ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr);
-  for (const auto& [world, words] : kCommands) {
+  for (const auto& command : kCommands) {
     const auto wordsAt = [&](unsigned short columns) {
       library::Reset();
       library::g_now = library::kNow;
-      world();
-      return WordsOnScreen(words, columns);
+      command.world();
+      return WordsOnScreen(command.words, columns);
     };
-    EXPECT_EQ(wordsAt(40), wordsAt(300)) << Joined(words);
+    EXPECT_EQ(wordsAt(40), wordsAt(300)) << Joined(command.words);
   }
   Shell("ip link delete wlan0");
   for (const std::vector<std::string>& wrong : {std::vector<std::string>{"scan", "--renwe"}, {"forget", "Nowhere"}}) {
