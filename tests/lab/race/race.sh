@@ -4,34 +4,25 @@
 # shellcheck shell=bash
 
 # What is to be run, from the host: EVENTS, AIRS, BANDS, CONTENDERS and ROUNDS.
-eval "$LAB_RACE"
+eval "$LAB_PLAN"
 
 readonly NETWORK=home SECRET='deux croissants' PATIENCE=60 SETTLING=2
-readonly WATCH=/run/lab/products/usr/bin/race-watch GROUPS_OF_ALL=/sys/fs/cgroup
 readonly FIGURES=$LOGS/figures.tsv
 readonly -a NEIGHBOUR_CHANNELS=(1 1 6 6 11 36 40 149)
-readonly QUIET_FREQUENCY=5805
 readonly said=/run/lab/contender.log
 
 declare -A FIGURE
 
-contender_file() {  # CONTENDER
-  printf '%s/race/contenders/%s.sh' "$LAB" "$1"
-}
-
-# has CONTENDER KEY: its file says so in a line.
-has() {
-  grep -q "^# $2\(:\|$\)" "$(contender_file "$1")"
-}
-
-channel() {
-  case $band in 2.4) printf 6 ;; 5) printf 36 ;; esac
+# contender VERB [COMMAND...]: runs a contender's own script in the appliance, behind the command if there is one.
+contender() {
+  peer nas "$name" NAME="$NETWORK" PASSPHRASE="$SECRET" PROTECTION=wpa2 ADDRESS="$access_point_address" BAND="$band" \
+    CHANNEL="$(channel_in "$band")" WIDTH=20 "$@"
 }
 
 # Where a contender's access point is heard; some know one channel alone.
 frequency() {
   if has "$name" Channel; then
-    printf '%d' $((2407 + 5 * $(sed -n 's/^# Channel: //p' "$(contender_file "$name")")))
+    printf '%d' $((2407 + 5 * $(sed -n 's/^# Channel: //p' "$(peer_file "$name")")))
   else
     case $band in 2.4) printf 2437 ;; 5) printf 5180 ;; esac
   fi
@@ -41,60 +32,11 @@ mode() {
   case $band in 2.4) printf g ;; 5) printf a ;; esac
 }
 
-# contender VERB [COMMAND...]: runs a contender's own script in the appliance, behind the command if there is one.
-contender() {
-  inside nas "${@:2}" env NAME="$NETWORK" PASSPHRASE="$SECRET" ADDRESS="$access_point_address" BAND="$band" \
-    CHANNEL="$(channel)" sh -c "$(<"$(contender_file "$name")")" "$name" "$1" </dev/null
-}
-
 microseconds() {
   printf '%s' "${EPOCHREALTIME/./}"
 }
 
-# ---- The appliance ---------------------------------------------------------------------------------------------------
-
-# An appliance that has just been switched on for the first time, beside a radio that has heard nothing.
-fresh() {
-  loses_power nas
-  rm -rf /run/lab/nas.layers
-  restore_interface "/sys/class/ieee80211/${RADIO_OF[nas]}"
-  has_power nas
-  disown # its end is no news
-  cp -a /dev/rfkill "/proc/${INIT_OF[nas]}/root/dev/"
-  forget_networks nas
-  inside nas mount -t cgroup2 cgroup2 "$GROUPS_OF_ALL"
-}
-
-# Some take the interface away, and make one of their own.
-restore_interface() {  # RADIO
-  local interface
-  [[ ! -d $1/device/net ]] || for interface in "$1"/device/net/*; do iw dev "${interface##*/}" del; done
-  iw phy "${1##*/}" interface add wlan0 type managed
-}
-
-# A scan can have the kernel forget what it heard before, and is over soon where nobody is.
-forget_networks() {  # NAME
-  ip -n "$1" link set wlan0 up
-  ip netns exec "$1" iw dev wlan0 scan freq $QUIET_FREQUENCY flush >/dev/null
-  [[ ! $(ip netns exec "$1" iw dev wlan0 scan dump) ]] || fail "the radio of $1 still knows of networks"
-  ip -n "$1" link set wlan0 down
-}
-
-start_bus() {
-  grep -q '^messagebus:' "/proc/${INIT_OF[nas]}/root/etc/passwd" ||
-    inside nas tee -a /etc/passwd >/dev/null <<<'messagebus:x:999:999::/:/bin/false'
-  inside nas mkdir -p /run/dbus
-  inside nas dbus-uuidgen --ensure=/etc/machine-id
-  inside nas "${WATCH##*/lab/products}" start "$GROUPS_OF_ALL/bus" dbus-daemon --system --nofork --nopidfile \
-    >/run/lab/bus.log 2>&1 &
-  within 10 inside nas test -S /run/dbus/system_bus_socket || fail "no bus: $(</run/lab/bus.log)"
-}
-
 # ---- What is read of a contender -------------------------------------------------------------------------------------
-
-members() {  # GROUP
-  cat "$GROUPS_OF_ALL/$1/cgroup.procs"
-}
 
 # memory GROUP: the KiB of its processes, each page by its share.
 memory() {
@@ -113,23 +55,11 @@ last_process() {
   inside nas cat /proc/loadavg | awk '{ print $5 }'
 }
 
-# told FILE WHAT: the number behind that word; nothing if it was not told.
-told() {
-  awk -v what="$2" '$1 == what { print $2 }' "$1"
-}
-
 # since FILE WHAT: the microseconds from the start to what was told.
 since() {
   local time
   time=$(told "$1" "$2")
   [[ ! $time ]] || printf '%s' $((time - started))
-}
-
-watch() {  # NETNS-COMMAND... : a watcher, whose word goes to the file $watched
-  : >"$watched"
-  "$@" >"$watched" 2>&1 &
-  watcher=$!
-  within 10 grep -q '^watching$' "$watched" || fail "it cannot be watched: $(<"$watched")"
 }
 
 # The contender runs, as its script does for this verb. What it says is in memory: to write a log takes messages to the
@@ -166,17 +96,6 @@ scan() {
   else
     say "$name does not list the network: $list"
   fi
-}
-
-is_empty() {  # GROUP
-  [[ ! $(members "$1") ]]
-}
-
-end_members() {  # GROUP
-  # One that has ended meanwhile is no mistake.
-  members "$1" | xargs -r kill 2>/dev/null || :
-  within 5 is_empty "$1" || echo 1 >"$GROUPS_OF_ALL/$1/cgroup.kill"
-  within 5 is_empty "$1" || fail "$name does not end"
 }
 
 stop() {  # VERB
@@ -221,12 +140,12 @@ in_milliseconds() {  # MICROSECONDS
 # ---- Joining ---------------------------------------------------------------------------------------------------------
 
 join_once() {  # STATE ROUND
-  local watched=/run/lab/join.watch label=join.$name.$air.$band.$1 watcher starter started what
+  local watched=/run/lab/join.watch label=join.$name.$air.$band.$1 starter started what
   local processor_before bus_before
   FIGURE=()
-  watch ip netns exec nas "$WATCH" join $PATIENCE
+  watch "$watched" ip netns exec nas "$WATCH" join $PATIENCE
   start joins
-  wait "$watcher" || say "$name has not joined: $(<"$watched")"
+  wait "$WATCHER" || say "$name has not joined: $(<"$watched")"
   read_start
   for what in authorized address ping; do FIGURE[$what]=$(since "$watched" $what); done
   settle
@@ -238,9 +157,9 @@ join_once() {  # STATE ROUND
 # has_its_starts TO-PREPARE ONCE ROUND: a contender's first start and its second, on an appliance that is new to it; a
 # practice round has no second.
 has_its_starts() {
-  fresh
+  fresh nas
   contender "$1" >/run/lab/prepared.log 2>&1 || fail "$name cannot be prepared: $(</run/lab/prepared.log)"
-  ! has "$name" Bus || start_bus
+  ! has "$name" Bus || start_bus nas
   "$2" cold "$3"
   (($3 == 0)) || "$2" warm "$3"
   ! has "$name" Bus || end_members bus
@@ -290,22 +209,22 @@ stop_station() {
 }
 
 serve_once() {  # STATE ROUND
-  local watched label=ap.$name.$air.$band.$1 watcher beacon_watcher starter started
+  local watched label=ap.$name.$air.$band.$1 beacon_watcher starter started
   local processor_before bus_before
   FIGURE=()
   start_station
   watched=/run/lab/beacon.watch
-  watch "$WATCH" beacon hwsim0 "$NETWORK" $PATIENCE
-  beacon_watcher=$watcher
+  watch "$watched" "$WATCH" beacon hwsim0 "$NETWORK" $PATIENCE
+  beacon_watcher=$WATCHER
   watched=/run/lab/station.watch
-  watch ip netns exec guest "$WATCH" join $PATIENCE
+  watch "$watched" ip netns exec guest "$WATCH" join $PATIENCE
   start serves
   if wait "$beacon_watcher"; then
     ip netns exec guest wpa_cli -p /run/lab/guest -i wlan0 enable_network 0 >/dev/null
-    wait "$watcher" || say "no station has joined $name: $(<"$watched")"
+    wait "$WATCHER" || say "no station has joined $name: $(<"$watched")"
   else
     say "$name is not on the air"
-    kill "$watcher"
+    kill "$WATCHER"
   fi
   read_start
   FIGURE[beacon]=$(since /run/lab/beacon.watch beacon)
@@ -339,14 +258,14 @@ neighbour() {  # NAME CHANNEL SIGNAL
 
 # The network that is joined; on another band it is the same one's next access point.
 put_up_network() {  # NAME
-  access_point "$1" ssid="$NETWORK" hw_mode="$(mode)" channel="$(channel)" signal=-45 \
+  access_point "$1" ssid="$NETWORK" hw_mode="$(mode)" channel="$(channel_in "$band")" signal=-45 \
     wpa=2 wpa_passphrase="$SECRET" rsn_pairwise=CCMP
   serve "$1" 10.2.0
   access_point_address=$(address_of "$1")
 }
 
 change_band() {
-  hostapd_conf ssid="$NETWORK" hw_mode="$(mode)" channel="$(channel)" \
+  hostapd_conf ssid="$NETWORK" hw_mode="$(mode)" channel="$(channel_in "$band")" \
     wpa=2 wpa_passphrase="$SECRET" rsn_pairwise=CCMP >/run/lab/router.conf
   switch_on router
 }

@@ -4,7 +4,7 @@
 # Limit: 600 s
 # shellcheck shell=bash
 
-LAB_RACE='EVENTS="join ap" AIRS=alone BANDS=2.4 CONTENDERS=bare ROUNDS=1'
+LAB_PLAN='EVENTS="join ap" AIRS=alone BANDS=2.4 CONTENDERS=bare ROUNDS=1'
 # shellcheck source=tests/lab/race/race.sh
 . "$LAB/race/race.sh"
 

@@ -1,10 +1,10 @@
-// race-watch: starts a contender of the race, and sees by the kernel and by the air what becomes of it.
+// peer-watch: starts a peer, and sees by the kernel and by the air what becomes of it.
 //
-//   race-watch start GROUP COMMAND...          tells the number of the last process and the time, and becomes the
+//   peer-watch start GROUP COMMAND...          tells the number of the last process and the time, and becomes the
 //                                              command, in that control group
-//   race-watch join SECONDS                    tells when the kernel lets the wireless interface's traffic pass, when
-//                                              it has an address, and when its network's first machine answers a ping
-//   race-watch beacon INTERFACE NAME SECONDS   tells when the first beacon of that network is on the air
+//   peer-watch join SECONDS                    tells when the kernel lets the wireless interface's traffic pass, when
+//                                              it has an address, and when the first machine of its network answers
+//   peer-watch beacon INTERFACE NAME SECONDS   tells when the first beacon of that network is on the air
 //
 // Each thing told is a line of its name and the time, in microseconds of the machine's monotonic clock. A watcher says
 // "watching" once it does, and exits with 1 when its seconds were not enough.
@@ -265,9 +265,9 @@ bool WatchBeacon(const std::string& interface, std::string_view name, Clock::tim
 }
 
 int Usage() {
-  std::cerr << "usage: race-watch start GROUP COMMAND...\n"
-               "       race-watch join SECONDS\n"
-               "       race-watch beacon INTERFACE NAME SECONDS\n";
+  std::cerr << "usage: peer-watch start GROUP COMMAND...\n"
+               "       peer-watch join SECONDS\n"
+               "       peer-watch beacon INTERFACE NAME SECONDS\n";
   return 2;
 }
 
@@ -285,7 +285,7 @@ int main(int argc, char** argv) {
   try {
     return Run(argc, argv);
   } catch (const std::exception& error) {
-    std::cerr << "race-watch: " << error.what() << '\n';
+    std::cerr << "peer-watch: " << error.what() << '\n';
     return 1;
   }
 }

@@ -2,17 +2,32 @@
 # The daemons themselves: a supplicant, whose own tool starts busybox's DHCP client once it has joined; hostapd and a
 # DHCP server.
 # Title: bare daemons
+# Client: wpa_supplicant
 # Join: wpasupplicant busybox iproute2
 # Access point: hostapd dnsmasq-base iproute2
 set -eu
+
+# The lines of a network's block that its protection asks for.
+protection() {
+	case $PROTECTION in
+	open) echo 'key_mgmt=NONE' ;;
+	wep) printf 'key_mgmt=NONE\nwep_key0="%s"\n' "$PASSPHRASE" ;;
+	wpa | wpa2 | mixed) printf 'psk="%s"\n' "$PASSPHRASE" ;;
+	peap | ttls)
+		printf 'key_mgmt=WPA-EAP\neap=%s\nidentity="%s"\npassword="%s"\n' "$PROTECTION" "$USER_NAME" "$PASSPHRASE" |
+			sed '/^eap=/y/aelpst/AELPST/'
+		case $PROTECTION in peap) echo 'phase2="auth=MSCHAPV2"' ;; *) echo 'phase2="autheap=MSCHAPV2"' ;; esac
+		;;
+	esac
+}
 
 case $1 in
 knows)
 	cat >/etc/wpa_supplicant.conf <<-END
 		ctrl_interface=/run/wpa_supplicant
 		network={
-		  ssid="$NAME"
-		  psk="$PASSPHRASE"
+		ssid="$NAME"
+		$(protection)
 		}
 	END
 	# shellcheck disable=SC2016  # for the scripts
