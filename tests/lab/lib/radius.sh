@@ -1,12 +1,12 @@
 # A RADIUS server: hostapd has one of its own.
 # shellcheck shell=bash
 
-# radius_server NAME: starts one beside an access point or an appliance, on its loopback interface. Its users are peter,
-# by PEAP, and tina, by TTLS.
+# radius_server NAME [KEY OPTION]: starts one beside an access point or an appliance, on its loopback interface. Its users are
+# peter, by PEAP, and tina, by TTLS. Its certificate has a key that is made soon, or another kind, as openssl calls it.
 radius_server() {
   local log=$LOGS/radius
   say "RADIUS server beside $1"
-  openssl req -x509 -newkey ec -pkeyopt ec_paramgen_curve:prime256v1 -noenc -days 30 -subj /CN=radius \
+  openssl req -x509 -newkey "${2:-ec}" -pkeyopt "${3:-ec_paramgen_curve:prime256v1}" -noenc -days 30 -subj /CN=radius \
     -keyout /run/lab/radius.key -out /run/lab/radius.pem 2>"$log" || fail "no certificate: $(cat "$log")"
   echo '127.0.0.1 between us' >/run/lab/radius.clients
   cat >/run/lab/radius.users <<'END'

@@ -14,9 +14,11 @@ protection() {
 	wep) printf 'key_mgmt=NONE\nwep_key0="%s"\n' "$PASSPHRASE" ;;
 	wpa | wpa2 | mixed) printf 'psk="%s"\n' "$PASSPHRASE" ;;
 	peap | ttls)
-		printf 'key_mgmt=WPA-EAP\neap=%s\nidentity="%s"\npassword="%s"\n' "$PROTECTION" "$USER_NAME" "$PASSPHRASE" |
-			sed '/^eap=/y/aelpst/AELPST/'
-		case $PROTECTION in peap) echo 'phase2="auth=MSCHAPV2"' ;; *) echo 'phase2="autheap=MSCHAPV2"' ;; esac
+		printf 'key_mgmt=WPA-EAP\nidentity="%s"\npassword="%s"\n' "$USER_NAME" "$PASSPHRASE"
+		case $PROTECTION in
+		peap) printf 'eap=PEAP\nphase2="auth=MSCHAPV2"\n' ;;
+		ttls) printf 'eap=TTLS\nphase2="autheap=MSCHAPV2"\n' ;;
+		esac
 		;;
 	esac
 }
