@@ -74,8 +74,7 @@ joins() {
   points=$(others_points | grep -Fx "$(xargs -n 1 <<<"$clients")" | xargs) || : # there may be none left
 
   prepare
-  # shellcheck disable=SC2046  # names are single words
-  fetch_peers $(peer_packages $(peers))
+  fetch_all_peers
   # shellcheck disable=SC2034  # for the machine
   printf -v plan 'ROLES=%q BANDS=%q NETWORKS=%q PROTECTIONS=%q CLIENTS=%q POINTS=%q OURS=%q PATIENCE=30' "$roles" "$bands" "$networks" \
     "$(chosen "$protections" "${words[@]}")" "$clients" "$points" "$ours"

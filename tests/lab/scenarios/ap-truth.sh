@@ -117,7 +117,7 @@ on nas merowireless ap set --bridge lbr0 --wifi-sched /var/lib/never --ieee80211
 inside nas tee /usr/local/sbin/dnsmasq >/dev/null <<<$'#!/bin/sh\nsleep 1; touch /run/slow; exec /usr/sbin/dnsmasq "$@"'
 inside nas chmod 755 /usr/local/sbin/dnsmasq
 ip link set hwsim0 up
-/run/lab/products/usr/bin/race-watch beacon hwsim0 bureau 10 >/run/lab/beacon 2>&1 &
+/run/lab/products/usr/bin/peer-watch beacon hwsim0 bureau 10 >/run/lab/beacon 2>&1 &
 watcher=$!
 within 10 grep -qx watching /run/lab/beacon || fail 'nobody listens to the air'
 on nas merowireless ap enable
@@ -127,7 +127,7 @@ inside nas rm /run/slow /usr/local/sbin/dnsmasq
 ! wait "$watcher" || fail 'the access point was on the air at an hour that its schedule has it off'
 
 say '-- and on at the hour that has it on'
-/run/lab/products/usr/bin/race-watch beacon hwsim0 bureau 10 >/run/lab/beacon 2>&1 &
+/run/lab/products/usr/bin/peer-watch beacon hwsim0 bureau 10 >/run/lab/beacon 2>&1 &
 watcher=$!
 within 10 grep -qx watching /run/lab/beacon || fail 'nobody listens to the air'
 on nas merowireless ap set --wifi-sched /var/lib/always
