@@ -116,8 +116,9 @@ int64_t CountOf(int (*enumerate)(WIRELESS_LIST*)) {
   return count;
 }
 
-bool Save() {
-  const WIRELESS_NETWORK_CONFIG config = KnownNetwork(3);
+bool SaveOtherSecret() {
+  WIRELESS_NETWORK_CONFIG config = KnownNetwork(3);
+  CopyText(config.szKey, "correct horse stapler");
   return MEROWirelessConfSet(&config) == 0;
 }
 
@@ -151,8 +152,9 @@ bool NameSection() {
   return MEROWirelessApConfigSecNameGet(szSection, sizeof szSection) == TRUE;
 }
 
-bool SaveApSettings() {
+bool SaveOtherChannel() {
   MERO_AP_CONF conf = ApSettings();
+  conf.hostapConf.channel = 1;
   return MEROWirelessSetAPConfig(&conf) == TRUE;
 }
 
@@ -182,7 +184,7 @@ std::vector<Exported> AllFunctions() {
   const Least scanning = {.pipes = 2, .listings = 1, .sockets = 1, .asks = kFlags, .sleeps = 1, .piped = 2 * listing};
   const std::vector<std::string> ofJoin = {kJoinMarkerPath, kSupplicantConfigPath, kConnectionRecordPath};
   return {
-      Row("MEROWirelessConfSet", {0, 5}, "one of 10, again", SomeNetworksAreKnown, Save,
+      Row("MEROWirelessConfSet", {0, 5}, "one of 10, another secret", SomeNetworksAreKnown, SaveOtherSecret,
           {.reads = {kKnownNetworksPath}, .replaced = {kKnownNetworksPath}}),
       Row("MEROWirelessConfEnum", {0, 1}, "10 networks", SomeNetworksAreKnown,
           [] { return CountOf<WIRELESS_NETWORK_CONFIG>(MEROWirelessConfEnum) == kNetworks; },
@@ -243,7 +245,7 @@ std::vector<Exported> AllFunctions() {
       Row("MEROWirelessGetAPConfig", {0, 1}, "", ThereAreApSettings, ReadApSettings, {.reads = {kApSettingsPath}}),
       Row("MEROWirelessApConfigSecNameGet", {0, 1}, "", ThereAreApSettings, NameSection, {.reads = {kAdapterInfoPath}}),
       // The section is looked for by a command.
-      Row("MEROWirelessSetAPConfig", {2, 4}, "again", ThereAreApSettings, SaveApSettings,
+      Row("MEROWirelessSetAPConfig", {2, 4}, "another channel", ThereAreApSettings, SaveOtherChannel,
           {.pipes = 1, .piped = header, .reads = {kApSettingsPath}, .replaced = {kApSettingsPath}}),
       Row("MEROWirelessCheckBlock", {0, 2}, "", ThereAreApSettings, [] { return MEROWirelessCheckBlock() == 1; },
           {.reads = {kApSettingsPath, kAdapterInfoPath}}),
