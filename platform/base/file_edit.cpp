@@ -202,10 +202,10 @@ void FileEdit::Abandon() {
 
 Status FileEdit::Commit(const Revision& revision) {
   if (Status status = revision.content.status(); !status.ok()) return status;
-  if (revision.Keeps(text())) return ::fsync(file_.get()) < 0 ? Status::Failed(errno) : FlushDirectory(szPath_);
   const Beside beside(kNewFormat, szPath_);
   if (!beside.fits()) return Status::Failed(ENAMETOOLONG);
   if (Status status = RemoveOrMoveAside(beside.c_str()); !status.ok() && status.error() != ENOENT) return status;
+  if (revision.Keeps(text())) return ::fsync(file_.get()) < 0 ? Status::Failed(errno) : FlushDirectory(szPath_);
 
   Status status = WriteBeside(beside.c_str(), revision, file_.get());
   if (status.ok()) status = Status::Of(::rename(beside.c_str(), szPath_));

@@ -99,6 +99,19 @@ TEST_F(AFileThatIsChanged, IsNotWrittenWhereItHoldsTheVeryValueAlready) {
   }
 }
 
+// What a killed writer had left, with its secrets, stayed for as long as nothing else was set.
+TEST_F(AFileThatIsChanged, HasNothingOfAKilledWriterBesideItAlsoWhereItIsNotWritten) {
+  const std::string left = fs::path(kFile).parent_path() / ("." + fs::path(kFile).filename().string() + ".new");
+  for (const Change& change : kChanges) {
+    if (std::string_view(change.szName).starts_with("set")) {
+      WriteText(kFile, change.szAfter);
+      WriteText(left, "secret");
+      ASSERT_TRUE(change.make(kFile)) << change.szName;
+      EXPECT_FALSE(fs::exists(left)) << change.szName;
+    }
+  }
+}
+
 TEST_F(AFileThatIsChanged, KeepsItsMode) {
   for (const mode_t mode : {0600u, 0644u, 0666u, 0640u, 0400u, 04755u}) {
     for (const Change& change : kChanges) {
