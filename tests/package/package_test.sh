@@ -1,10 +1,11 @@
 #!/usr/bin/env bash
-# package_test.sh DIRECTORY: what the packages in that directory do to a Debian system of their own. Says `ok` or
-# `not ok` and what it is about, in a line each; fails if anything did.
+# package_test.sh DIRECTORY [SUITE]: what the packages in that directory do to a Debian system of their own; with a
+# suite, what becomes of them when that system is upgraded to the Debian of that name. Says `ok` or `not ok` and what it
+# is about, in a line each; fails if anything did.
 #
 # The system is made by mmdebstrap, of the Debian archives that this machine uses, and kept beside the packages for the
-# next time. It has compilers and what the packages depend on, and nothing of ours; while it is looked at, it has no
-# network.
+# time. It has compilers and what the packages depend on, and nothing of ours; while it is looked at, it has no
+# network, unless it is upgraded.
 set -euo pipefail
 
 here=$(dirname "$(realpath "$0")")
@@ -46,10 +47,16 @@ quietly() {
 
 # ---- The system -------------------------------------------------------------------------------------------------
 
-debian_archives() {
+this_suite() {
+  # shellcheck source=/dev/null
+  (. /etc/os-release && echo "$VERSION_CODENAME")
+}
+
+# Those that this machine uses, as they are for a suite.
+debian_archives() { # SUITE
   # shellcheck disable=SC2016  # the fields are apt's
   apt-get indextargets --format 'deb $(REPO_URI) $(RELEASE) $(COMPONENT)' 'Created-By: Packages' 'Origin: Debian' |
-    sort -u
+    sed -E "s/ $(this_suite)(\\S*)/ $1\\1/" | sort -u
 }
 
 dependencies() { # DIRECTORY
@@ -60,11 +67,10 @@ dependencies() { # DIRECTORY
 
 make_system() { # ARCHIVE DIRECTORY
   local suite
-  # shellcheck source=/dev/null
-  suite=$(. /etc/os-release && echo "$VERSION_CODENAME")
+  suite=$(this_suite)
   echo "making a Debian system" >&2
   # shellcheck disable=SC2016  # the directory is mmdebstrap's to name
-  debian_archives |
+  debian_archives "$suite" |
     mmdebstrap --quiet --format=tar --variant=apt --include="cmake,g++,make,pkgconf,$(dependencies "$2")" \
       --aptopt='APT::Install-Recommends "false"' --customize-hook='mkdir "$1/srv/tools"' \
       --customize-hook='chroot "$1" sh -c "cd /srv/tools && apt-get -o APT::Sandbox::User=root download wireless-tools"' \
@@ -331,6 +337,50 @@ only_settings_are_new() { # [PATTERN]
     <(files | diff "$root/tmp/before" - | sed -nE 's/^[<>] (\S+) .*/\1/p' | grep -vE "${1:-^$}" | sort -u) >&2
 }
 
+# As whoever runs the machine does it: the answers to questions are those that come first.
+upgrade_system() { # SUITE
+  rm -f "$root"/etc/apt/sources.list.d/*
+  debian_archives "$1" >"$root/etc/apt/sources.list"
+  cat /etc/resolv.conf >"$root/etc/resolv.conf"
+  apt -o APT::Sandbox::User=root update && apt -o Dpkg::Options::=--force-confold full-upgrade
+}
+
+is_of_suite() { # SUITE
+  [[ $(<"$root/etc/os-release") == *"VERSION_CODENAME=$1"* ]]
+}
+
+tools_are_reinstalled() {
+  apt -o APT::Sandbox::User=root install --reinstall wireless-tools
+}
+
+# What there is besides the kit's: nothing is left of the old system's.
+one_ordinary_tool_is_aside() {
+  local aside=("$root"/usr/sbin/iwlist.*)
+  [[ ${#aside[@]} -eq 1 && ${aside[0]} == */iwlist.ordinary ]]
+}
+
+look_at_upgrade() { # ARCHIVE DIRECTORY SUITE
+  local ours
+  enter_system "$1" "$2"
+  mapfile -t ours < <(names)
+  check 'the packages can be installed' install_from packages
+  write_settings
+  check 'the system can be upgraded with the packages on it' upgrade_system "$3"
+  check 'the upgrade of the system has taken place' is_of_suite "$3"
+  check 'the packages are still installed' is_installed
+  check 'the listing tool is still ours' listing_tool_outlasts true
+  check 'the ordinary listing tool is the new one alone' one_ordinary_tool_is_aside
+  check 'the listing tool stays when wireless-tools is installed again' listing_tool_outlasts tools_are_reinstalled
+  check 'a scan without an adapter says so' scan_says_that_there_is_no_adapter
+  check 'settings are kept' settings_are_kept
+  check 'the packages can be installed again' install_from packages --reinstall
+  check 'the listing tool is ours after that' listing_tool_outlasts true
+  check 'the packages can be removed' apt remove "${ours[@]}"
+  check 'the ordinary listing tool is back' iwlist_passes_on
+
+  [[ $failures -eq 0 ]]
+}
+
 look_at_packages() { # ARCHIVE DIRECTORY
   # shellcheck disable=SC2016  # for the shell in the system
   local ours cc='scan_one.c -o scan-one $(pkg-config --cflags --libs libmerowireless-core)'
@@ -411,19 +461,21 @@ look_at_packages() { # ARCHIVE DIRECTORY
 }
 
 case $#,${1:-} in
-1,*)
+1,* | 2,*)
+  network=(--net)
+  [[ $# -eq 1 ]] || network=()
   archive=$(dirname "$1")/package-test-$({ declare -f make_system && dependencies "$1"; } | cksum | cut -d ' ' -f 1).tar
   [[ -e $archive ]] || make_system "$archive" "$1"
   root=$(mktemp -d)
   trap 'rmdir "$root"' EXIT
-  unshare --mount --net --pid --fork --kill-child "$0" "$archive" "$1" "$root"
+  unshare --mount "${network[@]}" --pid --fork --kill-child "$0" "$archive" "$1" "$root" "${2:-}"
   ;;
-3,*)
+4,*)
   root=$3
-  look_at_packages "$1" "$2"
+  if [[ $4 ]]; then look_at_upgrade "$1" "$2" "$4"; else look_at_packages "$1" "$2"; fi
   ;;
 *)
-  echo "usage: $0 DIRECTORY" >&2
+  echo "usage: $0 DIRECTORY [SUITE]" >&2
   exit 2
   ;;
 esac
