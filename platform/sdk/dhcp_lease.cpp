@@ -45,9 +45,11 @@ Status Lease(const char* szIfName, int seconds) {
   return Status::Ok();
 }
 
-Result<ifreq> Ask(const Descriptor& control, const char* szIfName, int what) {
+// A request is of another type in each libc.
+template <auto kWhat>
+Result<ifreq> Ask(const Descriptor& control, const char* szIfName) {
   Result<ifreq> request = RequestFor<ifreq>(szIfName);
-  if (request.ok() && ::ioctl(control.get(), what, &*request) < 0) return Status::Failed(errno);
+  if (request.ok() && ::ioctl(control.get(), kWhat, &*request) < 0) return Status::Failed(errno);
   return request;
 }
 
@@ -61,12 +63,12 @@ void WriteAddress(const ifreq& request, char (&szAddress)[kSize]) {
 Status Describe(NETINFO& netInfo) {
   Result<Descriptor> control = OpenControl();
   if (!control.ok()) return control.status();
-  Result<ifreq> hardware = Ask(*control, netInfo.szInterface, SIOCGIFHWADDR);
+  Result<ifreq> hardware = Ask<SIOCGIFHWADDR>(*control, netInfo.szInterface);
   if (!hardware.ok()) return hardware.status();
-  Result<ifreq> address = Ask(*control, netInfo.szInterface, SIOCGIFADDR);
+  Result<ifreq> address = Ask<SIOCGIFADDR>(*control, netInfo.szInterface);
   if (address.error() == EADDRNOTAVAIL) return Status::Failed(ETIMEDOUT);
   if (!address.ok()) return address.status();
-  Result<ifreq> mask = Ask(*control, netInfo.szInterface, SIOCGIFNETMASK);
+  Result<ifreq> mask = Ask<SIOCGIFNETMASK>(*control, netInfo.szInterface);
   if (!mask.ok()) return mask.status();
 
   std::memcpy(netInfo.rgbMac, hardware->ifr_hwaddr.sa_data, sizeof netInfo.rgbMac);
