@@ -9,7 +9,7 @@
 set -euo pipefail
 
 here=$(dirname "$(realpath "$0")")
-readonly here
+readonly here later=$here/../support/later-package
 
 readonly settings=(
   /usr/mero/etc/wireless.conf
@@ -112,17 +112,9 @@ names() { (cd "$root/tmp/packages" && printf '%s\n' *.deb | sed 's/_.*//'); }
 
 # The same packages, of a later version; and the kit of one that cannot be installed.
 make_upgrades() {
-  local package work=$root/tmp/work
-  for package in "$root"/tmp/packages/*.deb; do
-    dpkg-deb --raw-extract "$package" "$work"
-    sed -Ei 's/^(Version: .*)/\1+later/; s/(\(= [^)]*)\)/\1+later)/' "$work/DEBIAN/control"
-    dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/upgrades/${package##*/}" >/dev/null
-    if [[ $package == */merowireless-appliance_* ]]; then
-      sed -i '1a exit 1' "$work/DEBIAN/preinst"
-      dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/failing/${package##*/}" >/dev/null
-    fi
-    rm -r "$work"
-  done
+  local package
+  for package in "$root"/tmp/packages/*.deb; do "$later" "$package" "$root/tmp/upgrades"; done
+  "$later" "$root"/tmp/packages/merowireless-appliance_*.deb "$root/tmp/failing" '1a exit 1'
 }
 
 # The tools as Debian 13 has them, which says /usr/sbin where Debian 12 says /sbin: of a later version.

@@ -6,6 +6,10 @@ declare -A RADIO_OF=()
 # give_radio NAME: makes a network namespace of that name, with a radio in it.
 give_radio() {
   local radio=phy${#RADIO_OF[@]}
+  [[ ! $PART ]] || {
+    make_radio "$1"
+    return
+  }
   [[ -d /sys/class/ieee80211/$radio/device/net ]] || fail "no radio is left for $1: the lab has $RADIOS"
   put_radio "$1" "$radio"
   RADIO_OF[$1]=$radio

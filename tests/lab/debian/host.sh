@@ -1,0 +1,109 @@
+# The machine that boots a Debian system of its own, on the host: its disk, and the archive that its apt installs our
+# packages from. Part of `lab`.
+# shellcheck shell=bash
+# shellcheck disable=SC2154  # what `lab` sets
+
+readonly packages=$build/packages
+readonly archive=$work/archive
+
+# What the lab needs of the host for such a machine, besides its other needs.
+readonly -a debian_needs=(dpkg-scanpackages=dpkg-dev mke2fs=e2fsprogs mmdebstrap=mmdebstrap)
+
+# Besides what our packages depend on. The lab's own programs in it need some of these.
+readonly -a system_packages=(busybox dbus kmod libnl-genl-3-200 systemd-sysv udev wireless-regdb)
+
+# What a Debian system does by itself now and then, and is nothing of ours.
+readonly -a idle_units=(apt-daily-upgrade.timer apt-daily.timer dpkg-db-backup.timer e2scrub_all.timer
+  e2scrub_reap.service fstrim.timer getty@tty1.service proc-sys-fs-binfmt_misc.automount systemd-pstore.service)
+
+# ---- Its disk ------------------------------------------------------------------------------------------------------------
+
+own_suite() {
+  # shellcheck source=/dev/null
+  (. /etc/os-release && printf '%s' "$VERSION_CODENAME")
+}
+
+# The archives that the host's apt uses, for a suite of Debian's.
+archives_of() {  # SUITE
+  # shellcheck disable=SC2016  # the fields are apt's
+  apt-get indextargets --format 'deb $(REPO_URI) $(RELEASE) $(COMPONENT)' 'Created-By: Packages' 'Origin: Debian' |
+    sed "s/ $(own_suite)/ $1/" | sort -u
+}
+
+dependencies_of_packages() {
+  local package
+  for package in "$packages"/*.deb; do dpkg-deb --field "$package" Depends; done |
+    tr ',' '\n' | sed -E 's/^ *([^ ]+).*/\1/; /mero/d; /^$/d' | sort -u
+}
+
+# Run by mmdebstrap as the system's root: the last touches, and the disk, which is left in the system for a moment.
+finishing() {
+  cat <<'END'
+set -eu
+cd "$1"
+echo nas >etc/hostname
+printf '127.0.0.1 localhost\n127.0.1.1 nas\n' >etc/hosts
+echo 0123456789abcdef0123456789abcdef >etc/machine-id
+echo 'deb [trusted=yes] file:/var/lib/lab/archive ./' >etc/apt/sources.list
+rm -rf etc/apt/sources.list.d/* etc/resolv.conf var/lib/apt/lists/* var/cache/apt/*.bin
+mkdir -p lib/modules var/lib/lab
+# What mmdebstrap takes away again later.
+rm -f usr/sbin/policy-rc.d
+[ ! -e sbin/start-stop-daemon.REAL ] || mv sbin/start-stop-daemon.REAL sbin/start-stop-daemon
+for unit in $IDLE_UNITS; do ln -sf /dev/null "etc/systemd/system/$unit"; done
+# Without what is mounted in it now.
+mkdir "$1.system"
+mount --bind . "$1.system"
+mke2fs -q -t ext4 -d "$1.system" "$1.disk" 768M
+umount "$1.system"
+rmdir "$1.system"
+mv "$1.disk" ./disk
+END
+}
+
+make_disk() {  # SUITE DISK
+  local include
+  printf 'lab: making a Debian system (%s)\n' "$1" >&2
+  include=$({ printf '%s\n' "${system_packages[@]}"; dependencies_of_packages; } | paste --serial --delimiters=,)
+  rm -f "$2.new"
+  archives_of "$1" |
+    IDLE_UNITS=${idle_units[*]} mmdebstrap --quiet --format=null --variant=minbase --include="$include" \
+      --aptopt='APT::Install-Recommends "false"' --dpkgopt='path-exclude=/usr/share/doc/*' \
+      --dpkgopt='path-exclude=/usr/share/locale/*' --dpkgopt='path-exclude=/usr/share/man/*' \
+      --customize-hook="$(finishing)" --customize-hook="download /disk '$2.new'" "$1" - >&2 ||
+    die "a Debian system ($1) cannot be made: its archives are those of this machine's apt, which have to be within reach"
+  cp --sparse=always "$2.new" "$2.sparse"
+  rm "$2.new"
+  mv "$2.sparse" "$2"
+}
+
+# ---- The archive ---------------------------------------------------------------------------------------------------------
+
+# As anybody would make one for some packages: `now` has ours, `later` the same of a later version.
+make_archive() {
+  local package
+  rm -rf "$archive"
+  mkdir -p "$archive/now" "$archive/later"
+  for package in "$packages"/*.deb; do
+    [[ $package == *-dbgsym_* ]] || cp "$package" "$archive/now/"
+  done
+  for package in "$archive"/now/*.deb; do
+    "$lab/../support/later-package" "$package" "$archive/later" || die "no later version of $package can be made"
+  done
+  for package in now later; do
+    (cd "$archive/$package" && dpkg-scanpackages . >Packages 2>/dev/null) || die 'the archive of packages cannot be made'
+  done
+}
+
+# Leaves the machine's disk in `disk`; what is written there in a run is gone with it.
+prepare_debian() {
+  local suite=${MERO_LAB_DEBIAN:-$(own_suite)} need
+  for need in "${debian_needs[@]}"; do
+    type -P "${need%%=*}" >/dev/null || die "Debian packages are missing: apt-get install ${debian_needs[*]#*=}"
+  done
+  compgen -G "$packages/merowireless-appliance_*.deb" >/dev/null || die "$packages has no packages: ./run package makes them"
+  make_archive
+  # Another system is made when what it is made of is another.
+  disk=$work/$suite-$(dependencies_of_packages | cat - "$lab/debian/host.sh" | cksum | cut -d ' ' -f 1).disk
+  [[ -e $disk ]] || make_disk "$suite" "$disk"
+}
