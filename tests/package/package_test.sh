@@ -10,6 +10,8 @@ set -euo pipefail
 
 here=$(dirname "$(realpath "$0")")
 readonly here later=$here/../support/later-package
+# shellcheck source=tests/support/debian.sh
+. "$here/../support/debian.sh"
 
 readonly settings=(
   /usr/mero/etc/wireless.conf
@@ -32,9 +34,7 @@ check() { # TEXT COMMAND...
   fi
 }
 
-inside() {
-  chroot "$root" env -i PATH=/usr/sbin:/usr/bin:/sbin:/bin DEBIAN_FRONTEND=noninteractive LC_ALL=C.UTF-8 "$@"
-}
+inside() { inside_debian "$root" "$@"; }
 
 # Runs a command quietly, and shows what it said if it fails.
 quietly() {
@@ -47,18 +47,6 @@ quietly() {
 
 # ---- The system -------------------------------------------------------------------------------------------------
 
-this_suite() {
-  # shellcheck source=/dev/null
-  (. /etc/os-release && echo "$VERSION_CODENAME")
-}
-
-# Those that this machine uses, as they are for a suite.
-debian_archives() { # SUITE
-  # shellcheck disable=SC2016  # the fields are apt's
-  apt-get indextargets --format 'deb $(REPO_URI) $(RELEASE) $(COMPONENT)' 'Created-By: Packages' 'Origin: Debian' |
-    sed -E "s/ $(this_suite)(\\S*)/ $1\\1/" | sort -u
-}
-
 dependencies() { # DIRECTORY
   local package
   for package in "$1"/*.deb; do dpkg-deb --field "$package" Depends; done |
@@ -66,23 +54,16 @@ dependencies() { # DIRECTORY
 }
 
 make_system() { # ARCHIVE DIRECTORY
-  local suite
-  suite=$(this_suite)
   echo "making a Debian system" >&2
   # shellcheck disable=SC2016  # the directory is mmdebstrap's to name
-  debian_archives "$suite" |
-    mmdebstrap --quiet --format=tar --variant=apt --include="cmake,g++,make,pkgconf,$(dependencies "$2")" \
-      --aptopt='APT::Install-Recommends "false"' --customize-hook='mkdir "$1/srv/tools"' \
-      --customize-hook='chroot "$1" sh -c "cd /srv/tools && apt-get -o APT::Sandbox::User=root download wireless-tools"' \
-      "$suite" "$1.new" - >&2
+  make_debian "$(debian_suite)" "$1.new" --format=tar --variant=apt \
+    --include="cmake,g++,make,pkgconf,$(dependencies "$2")" --customize-hook='mkdir "$1/srv/tools"' \
+    --customize-hook='chroot "$1" sh -c "cd /srv/tools && apt-get -o APT::Sandbox::User=root download wireless-tools"'
   mv "$1.new" "$1"
 }
 
 enter_system() { # ARCHIVE DIRECTORY
-  mount -t tmpfs system "$root"
-  tar --extract --file "$1" --directory "$root"
-  mount -t proc proc "$root/proc"
-  mount -t sysfs -o ro sys "$root/sys"
+  mount_debian "$1" "$root"
   mkdir "$root/tmp/packages" "$root/tmp/upgrades" "$root/tmp/failing"
   cp "$2"/*.deb "$root/tmp/packages/"
 }
@@ -333,7 +314,6 @@ only_settings_are_new() { # [PATTERN]
 upgrade_system() { # SUITE
   rm -f "$root"/etc/apt/sources.list.d/*
   debian_archives "$1" >"$root/etc/apt/sources.list"
-  cat /etc/resolv.conf >"$root/etc/resolv.conf"
   apt -o APT::Sandbox::User=root update && apt -o Dpkg::Options::=--force-confold full-upgrade
 }
 
@@ -456,7 +436,7 @@ case $#,${1:-} in
 1,* | 2,*)
   network=(--net)
   [[ $# -eq 1 ]] || network=()
-  archive=$(dirname "$1")/package-test-$({ declare -f make_system && dependencies "$1"; } | cksum | cut -d ' ' -f 1).tar
+  archive=$(dirname "$1")/package-test-$({ declare -f make_system make_debian && dependencies "$1"; } | cksum | cut -d ' ' -f 1).tar
   [[ -e $archive ]] || make_system "$archive" "$1"
   root=$(mktemp -d)
   trap 'rmdir "$root"' EXIT

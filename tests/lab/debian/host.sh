@@ -3,6 +3,9 @@
 # shellcheck shell=bash
 # shellcheck disable=SC2154  # what `lab` sets
 
+# shellcheck source=tests/support/debian.sh
+. "$lab/../support/debian.sh"
+
 readonly packages=$build/packages
 readonly archive=$work/archive
 
@@ -17,18 +20,6 @@ readonly -a idle_units=(apt-daily-upgrade.timer apt-daily.timer dpkg-db-backup.t
   e2scrub_reap.service fstrim.timer getty@tty1.service proc-sys-fs-binfmt_misc.automount systemd-pstore.service)
 
 # ---- Its disk ------------------------------------------------------------------------------------------------------------
-
-own_suite() {
-  # shellcheck source=/dev/null
-  (. /etc/os-release && printf '%s' "$VERSION_CODENAME")
-}
-
-# The archives that the host's apt uses, for a suite of Debian's.
-archives_of() {  # SUITE
-  # shellcheck disable=SC2016  # the fields are apt's
-  apt-get indextargets --format 'deb $(REPO_URI) $(RELEASE) $(COMPONENT)' 'Created-By: Packages' 'Origin: Debian' |
-    sed "s/ $(own_suite)/ $1/" | sort -u
-}
 
 dependencies_of_packages() {
   local package
@@ -66,11 +57,8 @@ make_disk() {  # SUITE DISK
   printf 'lab: making a Debian system (%s)\n' "$1" >&2
   include=$({ printf '%s\n' "${system_packages[@]}"; dependencies_of_packages; } | paste --serial --delimiters=,)
   rm -f "$2.new"
-  archives_of "$1" |
-    IDLE_UNITS=${idle_units[*]} mmdebstrap --quiet --format=null --variant=minbase --include="$include" \
-      --aptopt='APT::Install-Recommends "false"' --dpkgopt='path-exclude=/usr/share/doc/*' \
-      --dpkgopt='path-exclude=/usr/share/locale/*' --dpkgopt='path-exclude=/usr/share/man/*' \
-      --customize-hook="$(finishing)" --customize-hook="download /disk '$2.new'" "$1" - >&2 ||
+  IDLE_UNITS=${idle_units[*]} make_debian "$1" - --format=null --variant=minbase --include="$include" "${debian_lean[@]}" \
+    --customize-hook="$(finishing)" --customize-hook="download /disk '$2.new'" ||
     die "a Debian system ($1) cannot be made: its archives are those of this machine's apt, which have to be within reach"
   cp --sparse=always "$2.new" "$2.sparse"
   rm "$2.new"
@@ -97,7 +85,7 @@ make_archive() {
 
 # Leaves the machine's disk in `disk`; what is written there in a run is gone with it.
 prepare_debian() {
-  local suite=${MERO_LAB_DEBIAN:-$(own_suite)} need
+  local suite=${MERO_LAB_DEBIAN:-$(debian_suite)} need
   for need in "${debian_needs[@]}"; do
     type -P "${need%%=*}" >/dev/null || die "Debian packages are missing: apt-get install ${debian_needs[*]#*=}"
   done
