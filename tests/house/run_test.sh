@@ -15,8 +15,8 @@ command_from() {
   chmod +x "$1"
 }
 
-mkdir -p bench bin build/bench docs/pictures lib tests/lab/scenarios
-cp "$source/run" .
+mkdir -p bench bin build/bench docs/pictures lib tests/everywhere tests/lab/scenarios
+cp "$source"/{.gitignore,run} .
 touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
 git init --quiet
 # shellcheck disable=SC2016  # for the shells of the commands
@@ -30,6 +30,7 @@ git init --quiet
   command_from bin/clang-format <<<'echo "clang-format of this machine $*" >>calls'
   command_from bin/clang-format-19 <<<'echo "clang-format-19 $*" >>calls'
   command_from bin/shellcheck <<<'exit 0'
+  command_from tests/everywhere/everywhere <<<'echo "everywhere $*" >>calls; tar --list --file "$1/source.tar" | sort >"$1/files"'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
 }
 # The packages in `exclusions`, one a line, exclude a cross compiler, which the real one removes without a question too.
@@ -153,6 +154,30 @@ case $1 in
     expect_calls
     expect_packages
     grep -q '^b-join ' said
+    ;;
+  everywhere)
+    run everywhere -k new
+    expect_calls 'everywhere build/everywhere -k new'
+    expect_packages e2fsprogs mmdebstrap
+    sort build/everywhere/packages | grep -qx 'any cmake'
+    grep -qx 'amd64 qemu' build/everywhere/packages
+    grep -qx 'lib/unit.cpp' build/everywhere/files
+    [[ $(grep -c '^build/' build/everywhere/files) -eq 0 ]]
+    ;;
+  skipped) # That a test was skipped was told, and not why.
+    command_from bin/ctest <<'END'
+mkdir -p build/Testing/Temporary
+{
+  printf '%s\n' '1/3 Testing: unit.A' '1/3 Test: unit.A' 'Output:' 'first' '' 'a.cpp:7: Skipped' 'there is no air' '' 'foot'
+  printf '%s\n' '<end of output>' 'Test Passed.' '2/3 Test: unit.B' 'Output:' 'first' 'there is no sea' '<end of output>'
+  printf '%s\n' 'Test Passed.' '3/3 Test: unit.C' 'Output:' 'last' '<end of output>'
+} >build/Testing/Temporary/LastTest.log
+printf '%s\n' '1/3 Test #1: unit.A ...***Skipped   0.01 sec' '2/3 Test #12: unit.B ...***Skipped   0.01 sec' \
+  '3/3 Test #3: unit.C ...   Passed   0.01 sec' '100% tests passed, 0 tests failed out of 3'
+END
+    run test unit
+    grep '^skipped: ' said | diff - <(printf 'skipped: unit.%s\n' 'A: there is no air' 'B: there is no sea')
+    grep -qxE 'unit +[0-9]+ s +1 passed +0 failed +2 skipped' said
     ;;
   arguments)
     for name in build demo docs format lint package; do
