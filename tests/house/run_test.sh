@@ -2,7 +2,7 @@
 # run_test.sh CASE
 #
 # Looks at what ./run asks of the machine that it runs on: a copy of it stands in a house of its own, where no package is
-# installed, and where the commands that it calls note what they are called for.
+# installed but those in `installed`, and where the commands that it calls note what they are called for.
 set -euo pipefail
 source=$(realpath "$(dirname "$0")/../..")
 house=$(mktemp -d)
@@ -21,7 +21,7 @@ touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
 git init --quiet
 # shellcheck disable=SC2016  # for the shells of the commands
 {
-  command_from bin/dpkg-query <<<'exit 1'
+  command_from bin/dpkg-query <<<'grep -x "${*: -1} .*" installed | cut -d " " -f 2-'
   command_from bin/sudo <<<'exec "$@"'
   command_from bin/cmake <<<'echo "cmake $*" >>calls'
   command_from bin/clang-tidy <<<'echo "clang-tidy ${*: -1}" >>calls'
@@ -34,10 +34,13 @@ git init --quiet
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
 }
 # The packages in `exclusions`, one a line, exclude a cross compiler, which the real one removes without a question too.
+# Those in `unknown` are in no archive. With `offline`, no archive is within reach.
 command_from bin/apt-get <<'END'
 packages=()
 for word; do [[ $word == -* || $word == install ]] || packages+=("$word"); done
+[[ ! -e offline || $1 == --simulate ]] || exit 100
 [[ $1 != update ]] || exit 0
+if printf '%s\n' "${packages[@]}" | grep -qxFf unknown; then exit 100; fi
 if [[ $1 == --simulate ]]; then
   if printf '%s\n' "${packages[@]}" | grep -qxFf exclusions; then echo 'Remv gcc-aarch64-linux-gnu [4:12.2.0-3]'; fi
 elif [[ " $* " == *' --no-remove '* ]]; then
@@ -45,6 +48,8 @@ elif [[ " $* " == *' --no-remove '* ]]; then
 fi
 END
 : >exclusions
+: >unknown
+: >installed
 # As the real one does, it names one scenario after the other.
 command_from tests/lab/lab <<'END'
 case $1 in
@@ -110,15 +115,15 @@ case $1 in
   lint)
     run test lint
     expect_calls 'cmake --preset release' 'clang-tidy lib/unit.cpp'
-    expect_packages "${building[@]}" clang-tidy
+    expect_packages "${building[@]}" clang-tidy git
     ;;
   format) # Which version it was, the machine decided.
     run format
     expect_calls 'clang-format-19 -i lib/unit.cpp'
-    expect_packages clang-format-19
+    expect_packages clang-format-19 git
     { run test style || :; } >shown # the checks of the house are not here
     grep -qx 'clang-format-19 --dry-run --Werror lib/unit.cpp' calls
-    expect_packages clang-format-19 shellcheck
+    expect_packages clang-format-19 git shellcheck
     ;;
   exclusion) # A compiler of the developer's was removed.
     echo cmake >exclusions
@@ -138,6 +143,37 @@ case $1 in
     grep -qx g++-multilib packages
     [[ $(grep -cx gcc-multilib packages) -eq 0 ]]
     grep -qx 'going without gcc-multilib, which cannot be installed beside gcc-aarch64-linux-gnu' said
+    ;;
+  unknown) # Where no such compiler is made, there were no tests.
+    echo gcc-multilib >unknown
+    { run test unit || :; } >shown # there are no tests
+    grep -qx 'cmake --build --preset tests' calls
+    grep -qx g++-multilib packages
+    grep -qx 'going without gcc-multilib, which apt cannot install' said
+    ;;
+  offline) # One package that only adds to the tests was missing, and ended them.
+    { run test unit || :; } >shown # there are no tests
+    grep -vx musl-tools packages | sed 's/$/ all installed/' >installed
+    touch offline
+    { run test unit || :; } >shown
+    grep -qx 'cmake --build --preset tests' calls
+    grep -qx 'going without musl-tools' said
+    ;;
+  processors) # A library that was there for two processors was fetched again each time.
+    for name in "${building[@]}"; do printf '%s arm64 installed\n%s %s installed\n' "$name" "$name" "$(dpkg --print-architecture)"; done \
+      >installed
+    run build
+    expect_packages
+    for name in "${building[@]}"; do printf '%s arm64 installed\n' "$name"; done >installed
+    run build
+    expect_packages "${building[@]}"
+    ;;
+  unversioned) # Nothing was looked at, and nothing found.
+    rm -r .git
+    { run test lint && exit 1; } >shown
+    grep -q '^run: there are no sources' said
+    { run test style && exit 1; } >shown
+    grep -q ' 0 passed  *6 failed' said
     ;;
   scenario) # The list was piped into a search that ended at the first name, which failed the list.
     run lab a-scan
