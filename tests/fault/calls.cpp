@@ -322,7 +322,7 @@ int64_t SizesOf(const std::vector<std::string>& paths) {
 }  // namespace
 
 int Least::opens() const {
-  return static_cast<int>(listings + reads.size() + 2 * replaced.size() + written.size());
+  return listings + static_cast<int>(reads.size() + 2 * replaced.size() + written.size());
 }
 
 int Least::calls() const {
