@@ -85,7 +85,7 @@ make_archive() {
 
 # Leaves the machine's disk in `disk`; what is written there in a run is gone with it.
 prepare_debian() {
-  local suite=${MERO_LAB_DEBIAN:-$(debian_suite)} need
+  local need
   for need in "${debian_needs[@]}"; do
     type -P "${need%%=*}" >/dev/null || die "Debian packages are missing: apt-get install ${debian_needs[*]#*=}"
   done
