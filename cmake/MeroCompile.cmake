@@ -9,5 +9,6 @@ if(MERO_SANITIZE)
   # The vptr check needs run-time type information, which the libraries do without.
   set(sanitizers -fsanitize=address,undefined -fno-sanitize=vptr -fno-sanitize-recover=all -fno-omit-frame-pointer)
   add_compile_options(${sanitizers})
+  add_compile_definitions(MERO_SANITIZE)
   add_link_options(${sanitizers})
 endif()

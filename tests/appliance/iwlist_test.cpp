@@ -111,7 +111,7 @@ TEST_F(ListingTool, AnswersTheMeroFormItselfAndSaysThatThereIsNoSuchInterface) {
   }
 }
 
-#ifndef __SANITIZE_ADDRESS__  // whose run time is the shared one
+#ifndef MERO_SANITIZE  // whose run time is the shared one
 // Loading them took longer than the listing, and a scan has it made up to five times.
 TEST_F(ListingTool, LoadsNeitherTheLibraryOfItsLanguageNorTheOneThatRunsIt) {
   const std::string loaded = Shell("LD_TRACE_LOADED_OBJECTS=1 " IWLIST_PROGRAM);

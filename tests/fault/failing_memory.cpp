@@ -9,15 +9,7 @@
 #include <cstddef>
 #include <cstring>
 
-#if defined(__has_feature)
-#if __has_feature(address_sanitizer)
-#define BEHIND_SANITIZER
-#endif
-#elif defined(__SANITIZE_ADDRESS__)
-#define BEHIND_SANITIZER
-#endif
-
-#ifdef BEHIND_SANITIZER
+#ifdef MERO_SANITIZE
 #define REAL(name) __interceptor_##name
 #else
 #define REAL(name) __libc_##name
