@@ -21,6 +21,9 @@ readonly settings=(
   /etc/sysconfig/network-scripts/ifcfg-lbr0
 )
 
+# What the kit says that cannot be installed.
+readonly refusal='this kit refuses to be installed'
+
 failures=0
 
 check() { # TEXT COMMAND...
@@ -64,7 +67,7 @@ make_system() { # ARCHIVE DIRECTORY
 
 enter_system() { # ARCHIVE DIRECTORY
   mount_debian "$1" "$root"
-  mkdir "$root/tmp/packages" "$root/tmp/upgrades" "$root/tmp/failing"
+  mkdir "$root"/tmp/{packages,released,upgrades,failing}
   cp "$2"/*.deb "$root/tmp/packages/"
 }
 
@@ -91,11 +94,14 @@ files() {
 
 names() { (cd "$root/tmp/packages" && printf '%s\n' *.deb | sed 's/_.*//'); }
 
-# The same packages, of a later version; and the kit of one that cannot be installed.
-make_upgrades() {
+# The same packages, of a later version, and as the first release had them; and the kit of one that cannot be installed.
+make_other_versions() {
   local package
-  for package in "$root"/tmp/packages/*.deb; do "$later" "$package" "$root/tmp/upgrades"; done
-  "$later" "$root"/tmp/packages/merowireless-appliance_*.deb "$root/tmp/failing" '1a exit 1'
+  for package in "$root"/tmp/packages/*.deb; do
+    "$later" "$package" "$root/tmp/upgrades"
+    "$here/released-package" "$package" "$root/tmp/released"
+  done
+  "$later" "$root"/tmp/packages/merowireless-appliance_*.deb "$root/tmp/failing" "\$a echo '$refusal' >&2; exit 1"
 }
 
 # The tools as Debian 13 has them, which says /usr/sbin where Debian 12 says /sbin: of a later version.
@@ -103,7 +109,10 @@ make_later_tools() {
   local work=$root/tmp/work package
   package=$(echo "$root"/srv/tools/*.deb)
   dpkg-deb --raw-extract "$package" "$work"
-  if [[ -d $work/sbin ]]; then mv "$work/sbin" "$work/usr/"; fi
+  if [[ -d $work/sbin ]]; then
+    mv "$work/sbin" "$work/usr/"
+    sed -i 's,  sbin/,  usr/sbin/,' "$work/DEBIAN/md5sums"
+  fi
   sed -Ei 's/^(Version: .*)/\1+later/' "$work/DEBIAN/control"
   mkdir "$root/tmp/later-tools"
   dpkg-deb --root-owner-group -Znone --build "$work" "$root/tmp/later-tools/${package##*/}" >/dev/null
@@ -139,6 +148,10 @@ iwlist_passes_on() {
 
 iwlist_lists() {
   [[ $(inside iwlist wlan0 scanning mero 2>&1) == 'iwlist: '* ]]
+}
+
+loses_listing_tool() { # COMMAND...
+  quietly "$@" && ! iwlist_lists 2>/dev/null
 }
 
 # Whoever brings the ordinary tool, ours stays where the library looks for it.
@@ -222,10 +235,14 @@ settings_are_kept() {
   done
 }
 
-is_upgraded() {
+version_of_kit() {
   # shellcheck disable=SC2016  # the field is dpkg's
-  [[ $(inside dpkg-query --show --showformat '${Version}' merowireless-appliance) == *+later ]]
+  inside dpkg-query --show --showformat '${Version}' merowireless-appliance
 }
+
+is_upgraded() { [[ $(version_of_kit) == *+later ]]; }
+is_of_release() { [[ $(version_of_kit) == 0.1.0 ]]; }
+is_later_than_release() { ! is_of_release; }
 
 # A process that the kit's scripts take for an access point's daemon.
 start_daemon() {
@@ -272,8 +289,14 @@ things_are_kept() {
   [[ $(<"$root${in_the_way[0]}/thesis") == "somebody's" && $(<"$root/var/tmp/diary") == "somebody's" ]]
 }
 
+# It fails at its last step before files are replaced.
 failing_upgrade_is_undone() {
-  ! inside sh -c 'dpkg --install /tmp/failing/*.deb' >/dev/null 2>&1 && is_installed && ! is_upgraded
+  local said
+  if said=$(inside sh -c 'dpkg --install /tmp/failing/*.deb' 2>&1) || [[ $said != *"$refusal"* ]]; then
+    printf '%s\n' "$said" >&2
+    return 1
+  fi
+  is_installed && ! is_upgraded
 }
 
 is_installed() {
@@ -326,9 +349,25 @@ tools_are_reinstalled() {
 }
 
 # What there is besides the kit's: nothing is left of the old system's.
-one_ordinary_tool_is_aside() {
+one_ordinary_tool_is_aside() { # [NAME]
   local aside=("$root"/usr/sbin/iwlist.*)
-  [[ ${#aside[@]} -eq 1 && ${aside[0]} == */iwlist.ordinary ]]
+  [[ ${#aside[@]} -eq 1 && ${aside[0]} == */"${1:-iwlist.ordinary}" ]]
+}
+
+# That it passes on does not tell: the kit has to be gone.
+ordinary_tool_is_back() {
+  local ordinary=("$root"/usr/sbin/iwlist.*)
+  [[ ! -e ${ordinary[0]} && ! $(inside dpkg --verify wireless-tools) ]] && iwlist_passes_on && nothing_is_diverted
+}
+
+# Every name of the kit's that is left would be one that no package can ever have.
+nothing_is_diverted() {
+  local diverted
+  diverted=$(inside dpkg-divert --list merowireless-appliance)
+  [[ ! $diverted ]] || {
+    printf '%s\n' "$diverted" >&2
+    return 1
+  }
 }
 
 look_at_upgrade() { # ARCHIVE DIRECTORY SUITE
@@ -348,21 +387,12 @@ look_at_upgrade() { # ARCHIVE DIRECTORY SUITE
   check 'the packages can be installed again' install_from packages --reinstall
   check 'the listing tool is ours after that' listing_tool_outlasts true
   check 'the packages can be removed' apt remove "${ours[@]}"
-  check 'the ordinary listing tool is back' iwlist_passes_on
+  check 'the ordinary listing tool is back, and nothing is diverted' ordinary_tool_is_back
 
   [[ $failures -eq 0 ]]
 }
 
-look_at_packages() { # ARCHIVE DIRECTORY
-  # shellcheck disable=SC2016  # for the shell in the system
-  local ours cc='scan_one.c -o scan-one $(pkg-config --cflags --libs libmerowireless-core)'
-  enter_system "$1" "$2"
-  make_upgrades
-  make_later_tools
-  mapfile -t ours < <(names)
-  pretend_systemd
-  files >"$root/tmp/before"
-
+look_at_installation() {
   check 'the packages can be installed' install_from packages
   check 'bridges are made at once' asked_for ' start mero-network.service'
   check 'an adapter that is there already is told of' asked_for '^udevadm trigger --action=add .*wlan'
@@ -374,13 +404,18 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'the listing tool passes the others on' iwlist_passes_on
   check 'the kit tells what settings hold' settings_are_told
   check 'bash completes the program' completes_in_bash
+}
 
+look_at_example() {
+  # shellcheck disable=SC2016  # for the shell in the system
+  local cc='scan_one.c -o scan-one $(pkg-config --cflags --libs libmerowireless-core)'
   check 'the example builds with pkg-config and runs' builds_and_runs scan-one "cc -Wall -Wextra -Werror $cc"
   check 'the example builds as C++ and runs' builds_and_runs scan-one "c++ -Wall -Wextra -Werror -x c++ $cc"
   check 'the example builds with CMake and runs' builds_and_runs build/scan-one 'cmake -B build && cmake --build build'
-
   check 'pkg-config finds the headers where they are moved to' is_found_elsewhere
+}
 
+look_at_upgrades() {
   write_settings
   write_own_files
   enable_autoconnect
@@ -398,7 +433,9 @@ look_at_packages() { # ARCHIVE DIRECTORY
     listing_tool_outlasts inside sh -c 'dpkg --install /tmp/later-tools/*.deb'
   check 'the listing tool stays when that is installed again' \
     listing_tool_outlasts inside sh -c 'dpkg --install /tmp/later-tools/*.deb'
+}
 
+look_at_removal() {
   check "the libraries' notes stay while they are there for another architecture" note_stays_for_another_architecture
   start_daemon
   check 'the packages can be removed' apt remove "${ours[@]}"
@@ -406,13 +443,16 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'units of adapters end when the kit is removed' asked_for 'systemctl stop mero-wireless@\*\.service'
   check 'settings are kept when packages are removed' settings_are_kept
   check 'access points end when the kit is removed' daemon_has_ended
-  check 'the ordinary listing tool is back' iwlist_passes_on
+  check 'the ordinary listing tool is back, and nothing is diverted' ordinary_tool_is_back
   check 'until packages are purged, nothing but settings and notes of systemd is left' \
     only_settings_are_new "^(etc|var/lib)/systemd/|^${connection#/}\$"
   check 'the packages can be purged' quietly inside dpkg --purge "${ours[@]}"
   check 'settings are kept when packages are purged' settings_are_kept
   check 'when packages are purged, nothing but settings is left' only_settings_are_new
+}
 
+# Among what somebody has put in the way.
+look_at_packages_among_things() {
   check 'the packages can be installed after all' install_from packages
   put_things_in_the_way
   check 'an upgrade that fails is undone, whatever lies about' failing_upgrade_is_undone
@@ -422,13 +462,57 @@ look_at_packages() { # ARCHIVE DIRECTORY
   check 'the packages can be removed, whatever lies about, and tell of what stays' removal_tells \
     "rm: cannot remove '${in_the_way[0]}'" "rm: cannot remove '$busy'" 'the access point on wlan0 may still run'
   check 'what somebody has put in the way is kept' things_are_kept
-  check 'the ordinary listing tool is back after all' iwlist_passes_on
+  check 'the ordinary listing tool is back after all, and nothing is diverted' ordinary_tool_is_back
   check 'the packages can be purged, whatever lies about' quietly inside dpkg --purge "${ours[@]}"
   take_them_away
   check 'the packages can be purged once more' quietly inside dpkg --purge "${ours[@]}"
   rm "$root$busy" "$root/var/tmp/diary"
   check 'nothing but settings is left after all' only_settings_are_new
+}
 
+# The first release knew one name of the listing tool.
+look_at_release() {
+  check 'the tools can be those of this system again' quietly inside sh -c 'dpkg --install /srv/tools/*.deb'
+  check 'the packages of the first release can be installed' install_from released
+  check 'apt takes these packages for later ones' install_from packages
+  check 'the upgrade from the first release has taken place' is_later_than_release
+  check 'the listing tool is ours after that' listing_tool_outlasts true
+  check 'the packages can be removed after that' apt remove "${ours[@]}"
+  check 'the ordinary listing tool is back after that, and nothing is diverted' ordinary_tool_is_back
+
+  check 'the first release can be installed once more' install_from released
+  check 'the listing tool of the first release is lost when wireless-tools becomes that of Debian 13' \
+    loses_listing_tool inside sh -c 'dpkg --install /tmp/later-tools/*.deb'
+  check 'an upgrade from there that fails is undone' failing_upgrade_is_undone
+  check 'the ordinary listing tool is there after that' iwlist_passes_on
+  check 'an upgrade brings the listing tool back' install_from packages
+  check 'the listing tool is ours again' listing_tool_outlasts true
+  check 'one ordinary listing tool is aside' one_ordinary_tool_is_aside
+
+  check 'the first release can be had back' install_from released --allow-downgrades
+  check 'the first release is back' is_of_release
+  check 'the ordinary listing tool is where the first release looks for it' one_ordinary_tool_is_aside iwlist.distrib
+  check 'an upgrade from there that fails is undone, too' failing_upgrade_is_undone
+  check 'the ordinary listing tool is still where the first release looks for it' \
+    one_ordinary_tool_is_aside iwlist.distrib
+  check 'the first release can be removed' apt remove "${ours[@]}"
+  check 'the ordinary listing tool is back after the first release, and nothing is diverted' ordinary_tool_is_back
+}
+
+look_at_packages() { # ARCHIVE DIRECTORY
+  local ours
+  enter_system "$1" "$2"
+  make_other_versions
+  make_later_tools
+  mapfile -t ours < <(names)
+  pretend_systemd
+  files >"$root/tmp/before"
+  look_at_installation
+  look_at_example
+  look_at_upgrades
+  look_at_removal
+  look_at_packages_among_things
+  look_at_release
   [[ $failures -eq 0 ]]
 }
 
