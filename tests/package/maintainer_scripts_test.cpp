@@ -151,17 +151,31 @@ TEST_F(PackageScripts, EndTheAccessPointsThatRun) {
   EXPECT_EQ(Told("/tmp/started"), "restart wlan0 \nrestart wlan1 \n");
 }
 
+// The supplicant and the DHCP client of a network that was joined ran on, with files that were gone.
+TEST_F(PackageScripts, EndTheClientsOfAdaptersThatAreThere) {
+  for (const char* szInterface : {"gwlan", "wlan0", "wlan1"}) {
+    fs::create_directories(std::string("/tmp/adapters/") + szInterface + "/phy80211");
+  }
+  WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+  WriteText("/tmp/prerm", RunInShell("sed s,/sys/class/net/\\*,/tmp/adapters/*, " PACKAGE_SCRIPTS
+                                     "/merowireless-appliance.prerm").out);
+  fs::create_directories("/run/systemd/system");
+  SetStartScript("echo \"$*\" >>/tmp/asked\n");
+  EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH sh /tmp/prerm remove").out, "");
+  EXPECT_EQ(Told("/tmp/asked"), "stop mero-wireless@*.service\nrestart wlan0 \nrestart wlan1 \n");
+}
+
 TEST_F(PackageScripts, GoOnWithoutAStartScriptThatWorks) {
   const char* const broken[] = {"exit 1\n", "fi\n", "kill -9 $$\n", "exec sleep 60\n", "cat >/dev/null; exit 1\n"};
   for (const char* szScript : broken) {
     SetStartScript(szScript);
     WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-    EXPECT_THAT(Remove().out, HasSubstr("the access point on wlan0 may still run")) << szScript;
+    EXPECT_THAT(Remove().out, HasSubstr("the access point or the client on wlan0 may still run")) << szScript;
     EXPECT_FALSE(Exists(kState)) << szScript;
   }
   fs::remove(kStart);
   WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-  EXPECT_THAT(Remove().out, HasSubstr("the access point on wlan0 may still run"));
+  EXPECT_THAT(Remove().out, HasSubstr("the access point or the client on wlan0 may still run"));
 }
 
 TEST_F(PackageScripts, RemoveNothingInAnUpgradeNorWhenOneFails) {

@@ -460,7 +460,8 @@ look_at_packages_among_things() {
   check 'the listing tool passes on after all that' iwlist_passes_on
   break_start_script
   check 'the packages can be removed, whatever lies about, and tell of what stays' removal_tells \
-    "rm: cannot remove '${in_the_way[0]}'" "rm: cannot remove '$busy'" 'the access point on wlan0 may still run'
+    "rm: cannot remove '${in_the_way[0]}'" "rm: cannot remove '$busy'" \
+    'the access point or the client on wlan0 may still run'
   check 'what somebody has put in the way is kept' things_are_kept
   check 'the ordinary listing tool is back after all, and nothing is diverted' ordinary_tool_is_back
   check 'the packages can be purged, whatever lies about' quietly inside dpkg --purge "${ours[@]}"
