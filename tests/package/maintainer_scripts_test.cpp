@@ -206,6 +206,54 @@ TEST_F(PackageScripts, TellOfAdaptersAgainWhenARemovalIsBrokenOff) {
   EXPECT_THAT(Told("/tmp/asked"), HasSubstr("trigger --action=add"));
 }
 
+// Removed, the program had run on from a file that was gone; upgraded, it had been the former version's.
+TEST_F(PackageScripts, HaveWhatJoinsNetworksRunTheProgramThatIsThere) {
+  const std::string unit = "mero-wireless-autoconnect.service";
+  const struct {
+    std::string script;
+    std::string arguments;
+    std::string active;  // units
+    std::string asked;
+  } rows[] = {
+      {"prerm", "remove", unit, "stop " + unit + "\n"},
+      {"prerm", "remove", "", ""},
+      {"prerm", "upgrade 2", unit, ""},
+      {"postinst", "configure 1", unit, "try-restart " + unit + "\n"},
+      {"postinst", "configure 1", "mero-wireless@wlan0.service", ""},
+      {"postinst", "configure", "mero-wireless@wlan0.service", "start " + unit + "\n"},
+      {"postinst", "abort-remove", "mero-wireless@wlan0.service", "start " + unit + "\n"},
+      {"postinst", "configure", "", ""},
+      {"postinst", "abort-upgrade 2", unit, ""},
+  };
+  fs::create_directories("/run/systemd/system");
+  for (const auto& row : rows) {
+    fs::remove("/tmp/asked");
+    Install("systemctl", "[ \"$*\" = \"--quiet is-active " + row.active + "\" ]\n");
+    const std::string what = row.script + " " + row.arguments + " with " + row.active;
+    const Ran ran = Script("merowireless." + row.script, row.arguments);
+    EXPECT_EQ(ran.status, 0) << what;
+    EXPECT_EQ(ran.out, "") << what;
+    EXPECT_EQ(Told("/tmp/asked 2>/dev/null"), row.asked) << what;
+  }
+  fs::remove("/tmp/asked");
+  fs::remove_all("/run/systemd/system");
+  EXPECT_EQ(Script("merowireless.postinst", "configure").status, 0);
+  EXPECT_EQ(Script("merowireless.prerm", "remove").status, 0);
+  EXPECT_EQ(Told("/tmp/asked 2>/dev/null"), "");
+}
+
+TEST_F(PackageScripts, TellThatWhatJoinsNetworksCannotBeEnded) {
+  fs::create_directories("/run/systemd/system");
+  Install("systemctl", "exit 0\n");
+  Install("deb-systemd-invoke", "exit 1\n");
+  const Ran removed = Script("merowireless.prerm", "remove");
+  EXPECT_EQ(removed.status, 0);
+  EXPECT_THAT(removed.out, HasSubstr("merowireless autoconnect may still run\n"));
+  const Ran upgraded = Script("merowireless.postinst", "configure 1");
+  EXPECT_EQ(upgraded.status, 0);
+  EXPECT_THAT(upgraded.out, HasSubstr("merowireless autoconnect may not run, or be that of the former version\n"));
+}
+
 TEST_F(PackageScripts, UndoAnInstallationThatFails) {
   WriteText(std::string(kAdapter) + "/thesis.txt", "mine\n");
   EXPECT_EQ(Script("merowireless-appliance.preinst", "install").status, 0);

@@ -177,10 +177,16 @@ builds_and_runs() { # PROGRAM COMMAND
   [[ $status -eq 1 ]]
 }
 
+readonly restart_of_program=' try-restart mero-wireless-autoconnect.service'
+
 # Whether systemd was asked for something in the last change, by a pattern.
 asked_for() { grep -qE -- "$1" "$root/tmp/asked"; }
 
-nothing_is_started_anew() { asked_for daemon-reload && ! asked_for ' (stop|restart|try-restart|kill) '; }
+# The program is what has a network joined, and finds the connection as it was.
+only_the_program_is_started_anew() {
+  asked_for daemon-reload && asked_for "$restart_of_program\$" &&
+    ! grep -vE -- "$restart_of_program\$" "$root/tmp/asked" | grep -E ' (stop|restart|try-restart|kill) ' >&2
+}
 
 has_changelogs() {
   local package
@@ -423,7 +429,7 @@ look_at_upgrades() {
   check 'settings are kept when packages are installed again' settings_are_kept
   check 'the packages can be upgraded' install_from upgrades
   check 'the upgrade has taken place' is_upgraded
-  check 'an upgrade leaves the network as it is' nothing_is_started_anew
+  check 'an upgrade leaves the network as it is, and starts the program anew' only_the_program_is_started_anew
   check 'an upgrade leaves joining a network by itself enabled' autoconnect_is_enabled
   check 'settings are kept in an upgrade' settings_are_kept
   check 'the listing tool still passes on after an upgrade' iwlist_passes_on
@@ -440,6 +446,8 @@ look_at_removal() {
   start_daemon
   check 'the packages can be removed' apt remove "${ours[@]}"
   check "the libraries' notes go with them" note_is_gone
+  check 'what joins networks by itself ends when the program is removed' \
+    asked_for 'systemctl stop mero-wireless-autoconnect\.service'
   check 'units of adapters end when the kit is removed' asked_for 'systemctl stop mero-wireless@\*\.service'
   check 'settings are kept when packages are removed' settings_are_kept
   check 'access points end when the kit is removed' daemon_has_ended
