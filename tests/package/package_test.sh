@@ -4,8 +4,8 @@
 # is about, in a line each; fails if anything did.
 #
 # The system is made by mmdebstrap, of the Debian archives that this machine uses, and kept beside the packages for the
-# time. It has compilers and what the packages depend on, and nothing of ours; while it is looked at, it has no
-# network, unless it is upgraded.
+# time. It has compilers and what the packages depend on, and nothing of ours. While it is looked at, it has no network:
+# what an upgrade of the system takes is fetched before.
 set -euo pipefail
 
 here=$(dirname "$(realpath "$0")")
@@ -37,7 +37,13 @@ check() { # TEXT COMMAND...
   fi
 }
 
-inside() { inside_debian "$root" "$@"; }
+inside() { inside_debian "$root" "$@" 9<&-; }
+
+# The same in the network of this machine, which descriptor 9 keeps.
+inside_online() {
+  # shellcheck disable=SC2016  # for the shell in that network
+  nsenter --net=/proc/self/fd/9 bash -c 'exec 9<&-; . "$0" && inside_debian "$@"' "$debian_support" "$root" "$@"
+}
 
 # Runs a command quietly, and shows what it said if it fails.
 quietly() {
@@ -82,12 +88,18 @@ pretend_systemd() {
   done
 }
 
-# Every file, and every directory that is empty, with what can be seen of it; besides what apt and dpkg write down for
-# themselves.
+# Every file, and every directory that is empty, with what can be seen of it, and what is in those that are not below
+# /usr; besides what apt and dpkg write down for themselves.
 files() {
-  (cd "$root" && find . -xdev \
-    '(' -path ./tmp -o -path ./var/cache -o -path ./var/log -o -path ./var/lib/apt -o -path ./var/lib/dpkg ')' -prune -o \
-    '(' -not -type d -o -empty ')' -printf '%P %y %m %u:%g %s %l\n') | sort
+  {
+    list_files '(' -not -type d -o -empty ')' -printf '%P %y %m %u:%g %s %l\n'
+    list_files -path ./usr -prune -o -type f -exec sha256sum '{}' + | sed -E 's,^(\S+)  \./(.*),\2 \1,'
+  } | sort
+}
+
+list_files() { # TEST-OF-FIND...
+  (cd "$root" && find . -xdev '(' -path ./tmp -o -path ./var/cache -o -path ./var/log -o -path ./var/lib/apt -o \
+    -path ./var/lib/dpkg ')' -prune -o "$@")
 }
 
 # ---- The packages -----------------------------------------------------------------------------------------------
@@ -119,7 +131,14 @@ make_later_tools() {
   rm -r "$work"
 }
 
-apt() { quietly inside apt-get --yes -o Dpkg::Use-Pty=0 "$@"; }
+readonly apt_get=(apt-get --yes -o Dpkg::Use-Pty=0 -o APT::Sandbox::User=root)
+
+apt() { quietly inside "${apt_get[@]}" "$@"; }
+
+# Only what is fetched comes from the network.
+apt_online() {
+  quietly inside_online "${apt_get[@]}" --download-only "$@" && apt --no-download "$@"
+}
 
 install_from() { # DIRECTORY [OPTION...]
   local directory=$1 packages
@@ -133,6 +152,10 @@ install_from() { # DIRECTORY [OPTION...]
 libraries_are_small() {
   local libraries=("$root"/usr/lib/*/libmero*.so.*.*)
   [[ ${#libraries[@]} -eq 3 ]] && "$here/../abi/size_test.sh" strip readelf 102400 "${libraries[@]}" >/dev/null
+}
+
+has_no_network() {
+  [[ $(inside ls /sys/class/net) == lo && $(inside ip -brief link) == lo\ * ]]
 }
 
 scan_says_that_there_is_no_adapter() {
@@ -167,7 +190,7 @@ completes_in_bash() {
   quietly inside bash -c '. /usr/share/bash-completion/completions/merowireless && complete -p merowireless'
 }
 
-# The example, built by a command in a directory of its own, runs and says that there is no such network.
+# The example, built by a command in a directory of its own, runs: here it ends with 1, as whenever it finds no network.
 builds_and_runs() { # PROGRAM COMMAND
   local status=0
   rm -rf "$root/tmp/example"
@@ -252,12 +275,19 @@ is_later_than_release() { ! is_of_release; }
 
 # A process that the kit's scripts take for an access point's daemon.
 start_daemon() {
+  local tries
   mkdir -p "$root/run/rc.network"
   cp "$root/bin/sleep" "$root/tmp/hostapd"
   chroot "$root" /tmp/hostapd 600 &
   daemon=$!
   echo "$daemon" >"$root/run/rc.network/hostapd-wlan0.pid"
-  until [[ $(<"$root/proc/$daemon/comm") == hostapd ]]; do sleep 0.01; done
+  for ((tries = 0; tries < 1000; tries++)); do
+    if [[ $(<"$root/proc/$daemon/comm") == hostapd ]]; then return; fi
+    kill -0 "$daemon" || break
+    sleep 0.01
+  done
+  echo 'what is to be taken for a daemon does not run' >&2
+  return 1
 }
 
 daemon_has_ended() { [[ ! -e $root/proc/$daemon ]]; }
@@ -343,16 +373,14 @@ only_settings_are_new() { # [PATTERN]
 upgrade_system() { # SUITE
   rm -f "$root"/etc/apt/sources.list.d/*
   debian_archives "$1" >"$root/etc/apt/sources.list"
-  apt -o APT::Sandbox::User=root update && apt -o Dpkg::Options::=--force-confold full-upgrade
+  quietly inside_online "${apt_get[@]}" update && apt_online -o Dpkg::Options::=--force-confold full-upgrade
 }
 
 is_of_suite() { # SUITE
   [[ $(<"$root/etc/os-release") == *"VERSION_CODENAME=$1"* ]]
 }
 
-tools_are_reinstalled() {
-  apt -o APT::Sandbox::User=root install --reinstall wireless-tools
-}
+tools_are_reinstalled() { apt_online install --reinstall wireless-tools; }
 
 # What there is besides the kit's: nothing is left of the old system's.
 one_ordinary_tool_is_aside() { # [NAME]
@@ -388,6 +416,7 @@ look_at_upgrade() { # ARCHIVE DIRECTORY SUITE
   check 'the listing tool is still ours' listing_tool_outlasts true
   check 'the ordinary listing tool is the new one alone' one_ordinary_tool_is_aside
   check 'the listing tool stays when wireless-tools is installed again' listing_tool_outlasts tools_are_reinstalled
+  check 'nothing here can touch the network of this machine' has_no_network
   check 'a scan without an adapter says so' scan_says_that_there_is_no_adapter
   check 'settings are kept' settings_are_kept
   check 'the packages can be installed again' install_from packages --reinstall
@@ -405,6 +434,7 @@ look_at_installation() {
   check 'no network is joined by itself unless that is asked for' autoconnect_is_not_enabled
   check 'the changelog is there' has_changelogs
   check 'the libraries load less than 100 KiB together' libraries_are_small
+  check 'nothing here can touch the network of this machine' has_no_network
   check 'a scan without an adapter says so in one sentence, and exits with 3' scan_says_that_there_is_no_adapter
   check 'the listing tool has its own form' iwlist_lists
   check 'the listing tool passes the others on' iwlist_passes_on
@@ -504,6 +534,9 @@ look_at_release() {
   check 'an upgrade from there that fails is undone, too' failing_upgrade_is_undone
   check 'the ordinary listing tool is still where the first release looks for it' \
     one_ordinary_tool_is_aside iwlist.distrib
+  check 'an upgrade from there can be made' install_from packages
+  check 'the ordinary listing tool is where it is looked for now' one_ordinary_tool_is_aside
+  check 'the first release can be had back once more' install_from released --allow-downgrades
   check 'the first release can be removed' apt remove "${ours[@]}"
   check 'the ordinary listing tool is back after the first release, and nothing is diverted' ordinary_tool_is_back
 }
@@ -527,13 +560,13 @@ look_at_packages() { # ARCHIVE DIRECTORY
 
 case $#,${1:-} in
 1,* | 2,*)
-  network=(--net)
-  [[ $# -eq 1 ]] || network=()
+  outside=/dev/null
+  [[ $# -eq 1 ]] || outside=/proc/self/ns/net
   archive=$(dirname "$1")/package-test-$({ declare -f make_system make_debian && dependencies "$1"; } | cksum | cut -d ' ' -f 1).tar
   [[ -e $archive ]] || make_system "$archive" "$1"
   root=$(mktemp -d)
   trap 'rmdir "$root"' EXIT
-  unshare --mount "${network[@]}" --pid --fork --kill-child "$0" "$archive" "$1" "$root" "${2:-}"
+  unshare --mount --net --pid --fork --kill-child "$0" "$archive" "$1" "$root" "${2:-}" 9<"$outside"
   ;;
 4,*)
   root=$3
