@@ -62,6 +62,11 @@ dependencies() { # DIRECTORY
     tr ',' '\n' | sed -E 's/^ *([^ ]+).*/\1/; /mero/d' | sort -u | paste --serial --delimiters=,
 }
 
+# Another system is made when something of this has changed.
+made_of() { # DIRECTORY
+  declare -f make_system make_debian && debian_origin "$(debian_suite)" && dependencies "$1"
+}
+
 make_system() { # ARCHIVE DIRECTORY
   echo "making a Debian system" >&2
   # shellcheck disable=SC2016  # the directory is mmdebstrap's to name
@@ -369,10 +374,19 @@ only_settings_are_new() { # [PATTERN]
     <(files | diff "$root/tmp/before" - | sed -nE 's/^[<>] (\S+) .*/\1/p' | grep -vE "${1:-^$}" | sort -u) >&2
 }
 
+# Keys that this machine has of its own for an archive.
+take_keys() { # SOURCES
+  local key
+  { grep -oE 'signed-by=/[^] ,]+' "$1" || :; } | sed 's/.*=//' | sort -u | while read -r key; do
+    [[ -e $root$key ]] || install -D --mode 644 "$key" "$root$key"
+  done
+}
+
 # As whoever runs the machine does it: the answers to questions are those that come first.
 upgrade_system() { # SUITE
   rm -f "$root"/etc/apt/sources.list.d/*
   debian_archives "$1" >"$root/etc/apt/sources.list"
+  take_keys "$root/etc/apt/sources.list"
   quietly inside_online "${apt_get[@]}" update && apt_online -o Dpkg::Options::=--force-confold full-upgrade
 }
 
@@ -562,7 +576,7 @@ case $#,${1:-} in
 1,* | 2,*)
   outside=/dev/null
   [[ $# -eq 1 ]] || outside=/proc/self/ns/net
-  archive=$(dirname "$1")/package-test-$({ declare -f make_system make_debian && dependencies "$1"; } | cksum | cut -d ' ' -f 1).tar
+  archive=$(dirname "$1")/package-test-$(made_of "$1" | cksum | cut -d ' ' -f 1).tar
   [[ -e $archive ]] || make_system "$archive" "$1"
   root=$(mktemp -d)
   trap 'rmdir "$root"' EXIT

@@ -16,12 +16,13 @@ debian_suite() {
   (. /etc/os-release && echo "$VERSION_CODENAME")
 }
 
-# The archives that this machine's apt uses, as they are for a suite of Debian's, whatever the architecture.
+# The archives that this machine's apt uses, as they are for a suite of Debian's, whatever the architecture, and however
+# the machine's sources call its own: with what these say of how far each is trusted.
 debian_archives() { # SUITE
   local archives
   # shellcheck disable=SC2016  # the fields are apt's
-  archives=$(apt-get indextargets --format 'deb $(REPO_URI) $(CODENAME) $(COMPONENT)' \
-    'Created-By: Packages' 'Origin: Debian' | sed "s/ $(debian_suite)/ $1/" | sort -u)
+  archives=$(apt-get indextargets --format '$(SOURCESENTRY) $(REPO_URI) $(CODENAME) $(COMPONENT)' \
+    'Created-By: Packages' 'Origin: Debian' | debian_lines | sed "s/ $(debian_suite)/ $1/" | sort -u)
   if [[ ! $archives ]]; then
     echo "this machine's apt has no list of Debian's packages: run apt-get update" >&2
     return 1
@@ -29,20 +30,53 @@ debian_archives() { # SUITE
   printf '%s\n' "$archives"
 }
 
+debian_lines() {
+  local entry archive options
+  while read -r entry archive; do
+    options=$(debian_trust "${entry%:*}" "${entry##*:}")
+    printf 'deb %s%s\n' "${options:+[$options] }" "$archive"
+  done
+}
+
+# An entry of apt's sources is a line of one kind of files, and a paragraph of the other. Keys that stand in it are left
+# out.
+debian_trust() { # FILE NUMBER
+  local option='signed-by|trusted|allow-[a-z-]+|check-[a-z-]+|valid-until-[a-z]+'
+  case $1 in
+    *.list) sed -nE "$2s/^[[:space:]]*deb[[:space:]]+\[([^]]*)\].*/\1/p" "$1" | tr -s '[:blank:]' '\n' ;;
+    *) sed '/^#/d' "$1" | awk -v RS= -v number="$2" 'NR == number' | sed -nE 's/^([A-Za-z-]+): *(\S+)$/\L\1\E=\2/p' ;;
+  esac | sed -nE "/^($option)=/p" | paste --serial --delimiters=' '
+}
+
+# How this machine's apt reaches archives, such as through a proxy, and what it asks of them: a setting in each line.
+debian_settings() {
+  apt-config dump | grep '^Acquire::[^"]* "..*";$' |
+    grep -vE '^Acquire::(cdrom|Changelogs|CompressionTypes|GzipIndexes|IndexTargets|Languages)\>' || : # none
+}
+
+# All that tells where a system comes from: what is kept is of no use when that has changed.
+debian_origin() { # SUITE
+  echo "$1" && debian_archives "$1" && debian_settings
+}
+
+# Its apt has the settings of this machine's.
 make_debian() { # SUITE TARGET [MMDEBSTRAP-OPTION...]
-  debian_archives "$1" | mmdebstrap --quiet --aptopt='APT::Install-Recommends "false"' --dpkgopt=force-unsafe-io \
-    "${@:3}" "$1" "$2" - >&2
+  local options
+  mapfile -t options < <(debian_settings)
+  debian_archives "$1" | mmdebstrap --quiet --aptopt='APT::Install-Recommends "false"' "${options[@]/#/--aptopt=}" \
+    --dpkgopt=force-unsafe-io "${@:3}" "$1" "$2" - >&2
 }
 
 # Tells the archive of a system with some packages, which is made if it is not in the directory; another one that had the
 # same name, suite and architectures before is of no use any more. mmdebstrap takes several architectures, with commas
 # between them: the first is the system's own.
 debian_root() { # DIRECTORY NAME SUITE ARCHITECTURES PACKAGE...
-  local directory=$1 name=$2-$3-$4 suite=$3 architectures=$4 archive include
+  local directory=$1 name=$2-$3-$4 suite=$3 architectures=$4 archive include origin
   shift 4
   include=$(printf '%s\n' "$@" | sort -u | paste --serial --delimiters=,)
-  archive=$directory/$name-$({ declare -f make_debian debian_root && echo "${debian_lean[*]} $include"; } | cksum |
-    cut -d ' ' -f 1).tar
+  origin=$(debian_origin "$suite") || return
+  archive=$directory/$name-$({ declare -f make_debian debian_root && echo "$origin ${debian_lean[*]} $include"; } |
+    cksum | cut -d ' ' -f 1).tar
   mkdir -p "$directory"
   {
     flock 9

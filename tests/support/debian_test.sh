@@ -13,6 +13,28 @@ trap 'rm -r "$work"' EXIT
 apt_knows() { # LINE...
   printf '%s\n' "$@" >"$work/archives"
   apt-get() { cat "$work/archives"; }
+  debian_trust() { :; }
+  debian_suite() { echo bookworm; }
+}
+
+# An archive on this machine that calls itself by the name of its suite.
+make_archive() { # DIRECTORY SUITE CODENAME
+  local architecture release=$1/dists/$2 packages
+  architecture=$(dpkg --print-architecture)
+  packages=main/binary-$architecture/Packages
+  mkdir -p "$release/${packages%/*}"
+  printf 'Package: nothing\nVersion: 1\nArchitecture: all\nFilename: nothing\nSize: 0\n' >"$release/$packages"
+  printf '%s\n' 'Origin: Debian' "Suite: $2" "Codename: $3" "Architectures: $architecture" 'Components: main' \
+    'Date: Sun, 22 Nov 2026 12:00:00 UTC' 'SHA256:' \
+    " $(sha256sum <"$release/$packages" | cut -d ' ' -f 1) $(wc -c <"$release/$packages") $packages" >"$release/Release"
+}
+
+# Has apt be that of a machine whose files of settings and sources are in a directory.
+apt_is_that_of() { # DIRECTORY
+  mkdir -p "$1"/etc/apt/{apt.conf,preferences,sources.list}.d "$1"/var/lib/{apt/lists/partial,dpkg} "$1/var/cache/apt"
+  : >"$1/var/lib/dpkg/status"
+  printf 'Dir "%s";\nDir::State::status "%s";\nAPT::Sandbox::User "";\n' "$1" "$1/var/lib/dpkg/status" >"$1/apt.conf"
+  export APT_CONFIG=$1/apt.conf
   debian_suite() { echo bookworm; }
 }
 
@@ -39,10 +61,39 @@ needs_root() {
 
 case $1 in
   suite) # with those of security and of updates
-    apt_knows 'deb http://archive bookworm main' 'deb http://archive bookworm-updates main' \
-      'deb http://archive bookworm main' 'deb http://security bookworm-security main'
+    apt_knows '/a.list:1 http://archive bookworm main' '/a.list:1 http://archive bookworm-updates main' \
+      '/a.list:2 http://archive bookworm main' '/a.list:3 http://security bookworm-security main'
     debian_archives trixie | diff - <(printf '%s\n' 'deb http://archive trixie main' \
       'deb http://archive trixie-updates main' 'deb http://security trixie-security main')
+    ;;
+  sources) # A machine that called its suite oldstable got no other; what its sources said of trust was lost.
+    make_archive "$work/archive" oldstable bookworm
+    make_archive "$work/security" oldstable-security bookworm-security
+    apt_is_that_of "$work/apt"
+    options="arch=$(dpkg --print-architecture) trusted=yes  check-valid-until=no"
+    printf '%s\n' '# ours' "deb [ $options ] file:$work/archive oldstable main" >"$work/apt/etc/apt/sources.list"
+    printf '%s\n' '# and' '' 'Types: deb' '# by hand' "URIs: file:$work/security" 'Suites: oldstable-security' \
+      'Components: main' 'Trusted: yes' >"$work/apt/etc/apt/sources.list.d/security.sources"
+    apt-get --quiet=2 update
+    debian_archives trixie | diff - <(
+      echo "deb [trusted=yes check-valid-until=no] file:$work/archive/ trixie main"
+      echo "deb [trusted=yes] file:$work/security/ trixie-security main"
+    )
+    ;;
+  settings) # A machine that reaches archives through a proxy alone made no system.
+    apt_knows '/a.list:1 http://archive bookworm main'
+    apt_is_that_of "$work/apt"
+    printf '%s\n' 'Acquire::http::Proxy "http://proxy:3142";' 'Acquire::Check-Valid-Until "false";' \
+      'Acquire::Languages "none";' 'APT::Get::Assume-Yes "true";' >"$work/apt/etc/apt/apt.conf.d/50ours"
+    mmdebstrap() { cat >/dev/null && printf '%s\n' "$@" | grep Acquire | sort >"$work/settings"; }
+    make_debian trixie "$work/system"
+    diff "$work/settings" - <<'END'
+--aptopt=Acquire::AllowDowngradeToInsecureRepositories "0";
+--aptopt=Acquire::AllowInsecureRepositories "0";
+--aptopt=Acquire::AllowWeakRepositories "0";
+--aptopt=Acquire::Check-Valid-Until "false";
+--aptopt=Acquire::http::Proxy "http://proxy:3142";
+END
     ;;
   unknown) # A system was made of nothing, and mmdebstrap said what it was missing.
     apt_knows
@@ -54,7 +105,8 @@ case $1 in
     [[ ! -s $work/out ]]
     grep -q 'run apt-get update$' "$work/said"
     ;;
-  kept) # until something else is to be in it
+  kept) # until something else is to be in it, or it comes from elsewhere
+    apt_knows '/a.list:1 http://archive bookworm main'
     make_debian() { shift && echo "$*" >>"$work/made" && echo "$*" >"$1"; }
     first=$(debian_root "$work/kept" small bookworm amd64 one two)
     [[ $(debian_root "$work/kept" small bookworm amd64 two one) == "$first" ]]
@@ -62,6 +114,12 @@ case $1 in
     second=$(debian_root "$work/kept" small bookworm amd64 one)
     [[ $(wc -l <"$work/made") -eq 3 && -e $second && -e $other && ! -e $first ]]
     grep -q -- '--include=one,two' "$work/made"
+    [[ $(debian_root "$work/kept" small bookworm amd64 one) == "$second" ]]
+    apt_knows '/a.list:1 http://elsewhere bookworm main'
+    third=$(debian_root "$work/kept" small bookworm amd64 one)
+    debian_settings() { echo 'Acquire::http::Proxy "http://proxy:3142";'; }
+    fourth=$(debian_root "$work/kept" small bookworm amd64 one)
+    [[ $third != "$second" && $fourth != "$third" ]]
     ;;
   entered)
     needs_root
