@@ -126,7 +126,8 @@ TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
                    leaseLock.substr(0, leaseLock.find('\n')), kAdapterInfoPath}));
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.prerm"),
             (Paths{state + "/hostapd-*.pid", state + "/hostapd-", kNetworkScriptPath}));
-  EXPECT_THAT(TextOf("../debian/merowireless-appliance.prerm"), HasSubstr("*/" + std::string(kGuestInterface) + "/phy80211) ;;"));
+  EXPECT_THAT(TextOf("../debian/merowireless-appliance.prerm"),
+              HasSubstr("*/" + std::string(kGuestInterface) + "/phy80211) ;;"));
   EXPECT_EQ(Tells("printf '%s' \"$hostapd_run-if0.pid\""), state + "/hostapd-if0.pid");
 }
 

@@ -157,8 +157,9 @@ TEST_F(PackageScripts, EndTheClientsOfAdaptersThatAreThere) {
     fs::create_directories(std::string("/tmp/adapters/") + szInterface + "/phy80211");
   }
   WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-  WriteText("/tmp/prerm", RunInShell("sed s,/sys/class/net/\\*,/tmp/adapters/*, " PACKAGE_SCRIPTS
-                                     "/merowireless-appliance.prerm").out);
+  WriteText(
+      "/tmp/prerm",
+      RunInShell("sed s,/sys/class/net/\\*,/tmp/adapters/*, " PACKAGE_SCRIPTS "/merowireless-appliance.prerm").out);
   fs::create_directories("/run/systemd/system");
   SetStartScript("echo \"$*\" >>/tmp/asked\n");
   EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH sh /tmp/prerm remove").out, "");

@@ -70,8 +70,8 @@ case $1 in
     make_archive "$work/archive" oldstable bookworm
     make_archive "$work/security" oldstable-security bookworm-security
     apt_is_that_of "$work/apt"
-    options="arch=$(dpkg --print-architecture) trusted=yes  check-valid-until=no"
-    printf '%s\n' '# ours' "deb [ $options ] file:$work/archive oldstable main" >"$work/apt/etc/apt/sources.list"
+    line="arch=$(dpkg --print-architecture) trusted=yes  check-valid-until=no"
+    printf '%s\n' '# ours' "deb [ $line ] file:$work/archive oldstable main" >"$work/apt/etc/apt/sources.list"
     printf '%s\n' '# and' '' 'Types: deb' '# by hand' "URIs: file:$work/security" 'Suites: oldstable-security' \
       'Components: main' 'Trusted: yes' >"$work/apt/etc/apt/sources.list.d/security.sources"
     apt-get --quiet=2 update
