@@ -378,16 +378,15 @@ only_settings_are_new() { # [PATTERN]
 take_keys() { # SOURCES
   local key
   { grep -oE 'signed-by=/[^] ,]+' "$1" || :; } | sed 's/.*=//' | sort -u | while read -r key; do
-    [[ -e $root$key ]] || install -D --mode 644 "$key" "$root$key"
+    [[ -e $root$key ]] || install -D --mode 644 "$key" "$root$key" || exit
   done
 }
 
 # As whoever runs the machine does it: the answers to questions are those that come first.
 upgrade_system() { # SUITE
   rm -f "$root"/etc/apt/sources.list.d/*
-  debian_archives "$1" >"$root/etc/apt/sources.list"
-  take_keys "$root/etc/apt/sources.list"
-  quietly inside_online "${apt_get[@]}" update && apt_online -o Dpkg::Options::=--force-confold full-upgrade
+  debian_archives "$1" >"$root/etc/apt/sources.list" && take_keys "$root/etc/apt/sources.list" &&
+    quietly inside_online "${apt_get[@]}" update && apt_online -o Dpkg::Options::=--force-confold full-upgrade
 }
 
 is_of_suite() { # SUITE

@@ -33,7 +33,7 @@ debian_archives() { # SUITE
 debian_lines() {
   local entry archive options
   while read -r entry archive; do
-    options=$(debian_trust "${entry%:*}" "${entry##*:}")
+    options=$(debian_trust "${entry%:*}" "${entry##*:}") || return
     printf 'deb %s%s\n' "${options:+[$options] }" "$archive"
   done
 }
@@ -50,8 +50,8 @@ debian_trust() { # FILE NUMBER
 
 # How this machine's apt reaches archives, such as through a proxy, and what it asks of them: a setting in each line.
 debian_settings() {
-  apt-config dump | grep '^Acquire::[^"]* "..*";$' |
-    grep -vE '^Acquire::(cdrom|Changelogs|CompressionTypes|GzipIndexes|IndexTargets|Languages)\>' || : # none
+  apt-config dump | awk '/^Acquire::[^"]* ".+";$/ &&
+    !/^Acquire::(cdrom|Changelogs|CompressionTypes|GzipIndexes|IndexTargets|Languages)[: ]/'
 }
 
 # All that tells where a system comes from: what is kept is of no use when that has changed.
@@ -62,7 +62,7 @@ debian_origin() { # SUITE
 # Its apt has the settings of this machine's.
 make_debian() { # SUITE TARGET [MMDEBSTRAP-OPTION...]
   local options
-  mapfile -t options < <(debian_settings)
+  mapfile -t options < <(debian_settings) && wait "$!" || return
   debian_archives "$1" | mmdebstrap --quiet --aptopt='APT::Install-Recommends "false"' "${options[@]/#/--aptopt=}" \
     --dpkgopt=force-unsafe-io "${@:3}" "$1" "$2" - >&2
 }
