@@ -6,7 +6,7 @@
 # shellcheck source=tests/support/debian.sh
 . "$lab/../support/debian.sh"
 
-readonly packages=$build/packages
+readonly packages=$build/packages${foreign:+-$foreign}
 readonly archive=$work/archive
 
 # What the lab needs of the host for such a machine, besides its other needs.
@@ -86,6 +86,7 @@ make_archive() {
 # Leaves the machine's disk in `disk`; what is written there in a run is gone with it.
 prepare_debian() {
   local need
+  [[ ! $foreign ]] || die "a machine that boots a Debian system has the host's processor: MERO_LAB_ARCH cannot be $arch"
   for need in "${debian_needs[@]}"; do
     type -P "${need%%=*}" >/dev/null || die "Debian packages are missing: apt-get install ${debian_needs[*]#*=}"
   done
