@@ -44,6 +44,11 @@ constexpr std::string_view Slice(std::string_view text, size_t begin, size_t end
   return {text.data() + begin, end - begin};
 }
 
+// Whether a text ends in another one; unlike string_view::ends_with(), which LLVM's library makes of substr().
+constexpr bool EndsWith(std::string_view text, std::string_view end) {
+  return text.size() >= end.size() && Slice(text, text.size() - end.size()) == end;
+}
+
 // White space and letters of ASCII: the caller's locale must not change how files and names on the air are read.
 constexpr bool IsSpace(char c) {
   return c == ' ' || (c >= '\t' && c <= '\r');

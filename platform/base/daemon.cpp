@@ -36,7 +36,7 @@ bool Runs(pid_t pid, const char* szProgram) {
   name.remove_prefix(name.rfind('/') + 1);
   // The program's file may have been replaced since, by an upgrade say.
   constexpr std::string_view kReplaced = " (deleted)";
-  if (name.ends_with(kReplaced)) name.remove_suffix(kReplaced.size());
+  if (EndsWith(name, kReplaced)) name.remove_suffix(kReplaced.size());
   return name == szProgram;
 }
 
