@@ -13,11 +13,12 @@ readonly archive=$work/archive
 readonly -a debian_needs=(dpkg-scanpackages=dpkg-dev mke2fs=e2fsprogs mmdebstrap=mmdebstrap)
 
 # Besides what our packages depend on. The lab's own programs in it need some of these.
-readonly -a system_packages=(busybox dbus kmod libnl-genl-3-200 systemd-sysv udev wireless-regdb)
+readonly -a system_packages=(busybox dbus kmod libnl-genl-3-200 systemd-resolved systemd-sysv udev wireless-regdb)
 
-# What a Debian system does by itself now and then, and is nothing of ours.
+# What a Debian system does by itself now and then, and is nothing of ours; and what only a scenario about it starts.
 readonly -a idle_units=(apt-daily-upgrade.timer apt-daily.timer dpkg-db-backup.timer e2scrub_all.timer
-  e2scrub_reap.service fstrim.timer getty@tty1.service proc-sys-fs-binfmt_misc.automount systemd-pstore.service)
+  e2scrub_reap.service fstrim.timer getty@tty1.service proc-sys-fs-binfmt_misc.automount systemd-pstore.service
+  systemd-resolved.service)
 
 # ---- Its disk ------------------------------------------------------------------------------------------------------------
 
