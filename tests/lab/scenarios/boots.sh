@@ -6,11 +6,15 @@
 # shellcheck shell=bash
 
 # The warnings that a boot may have: the lab's kernel lacks a module that systemd would like, the library tells how often
-# it has scanned, the program may just be asking the adapter when that is pulled, and nobody tells an access point's name
-# server of others.
+# it has scanned, the program may just be asking the adapter when that is pulled, nobody tells an access point's name
+# server of others, and systemd wonders at a connection that has outlasted the program when that is started anew.
 known_warnings='systemd\[1\]: Failed to find module .autofs4.$'
 known_warnings+='|merowireless\[[0-9]+\]: wireless_network_scan:[0-9]+ Scan [0-9]: (result is un-stable|success)\.$'
 known_warnings+='|dnsmasq\[[0-9]+\]: no servers found in /etc/resolv.conf, will retry$'
+known_warnings+='|systemd\[1\]: mero-wireless-autoconnect.service: Found left-over process [0-9]+ '
+known_warnings+='\((wpa_supplicant|busybox)\) in control group while starting unit. Ignoring.$'
+known_warnings+='|systemd\[1\]: This usually indicates unclean termination of a previous run, or service '
+known_warnings+='implementation deficiencies.$'
 # shellcheck disable=SC2034  # what a word uses
 known_warnings+='|merowireless\[[0-9]+\]: current_info:[0-9]+ Failed to ask the adapter wlan0: No such device$'
 
@@ -66,6 +70,32 @@ boot_2() {
   ip link set wlan0 up
   within 60 answers 10.2.0.1 || fail 'the network does not come back'
   tell_time 'an answer'
+
+  say '-- an upgrade keeps the connection, and has the new program keep it'
+  local before
+  before=$(daemons)
+  [[ $before == *wpa_supplicant* && $before == *udhcpc* ]] || fail "the client's programs are not among these: $before"
+  takes_archive later
+  apt upgrade
+  within 10 unit_is "$KEEPER" active || fail 'nobody keeps the connection'
+  expect_same 'the program that keeps it' /usr/bin/merowireless "$(file_of_keeper)"
+  expect_same 'the daemons after the upgrade' "$before" "$(daemons)"
+
+  say '-- without the program the connection stays as it is'
+  apt remove merowireless
+  expect_unit "$KEEPER" inactive
+  expect_same 'the daemons without the program' "$before" "$(daemons)"
+  apt install merowireless
+  within 10 unit_is "$KEEPER" active || fail 'nobody keeps the connection again'
+
+  say '-- the removal leaves the network'
+  apt remove merowireless merowireless-appliance libmerowireless-core1
+  expect_same 'the daemons after the removal' '' "$(daemons)"
+  expect_same 'the addresses after the removal' '' "$(ipv4_of nas)"
+  expect_same 'the name servers after the removal' '' "$(</etc/resolv.conf)"
+  takes_archive now
+  apt install merowireless merowireless-appliance
+  within 60 is_joined || fail 'the network is not joined after the next installation'
   expect_quiet_journal
 
   say '-- the adapter is to be an access point'
@@ -133,6 +163,10 @@ serves_by_itself() {
 # What runs of the access point, or the client.
 daemons() {
   processes_of nas | grep -E '(hostapd|dnsmasq|udhcpc|wpa_supplicant) ' | grep -vE '/run/lab/|wpa_supplicant -u ' || :
+}
+
+file_of_keeper() {
+  readlink "/proc/$(systemctl show --property MainPID --value "$KEEPER")/exe"
 }
 
 joins_hall() {  # NAME
