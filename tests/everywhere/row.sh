@@ -55,7 +55,7 @@ take_command() { # LEVEL COMMAND...
 }
 
 build() {
-  configure tests && cmake --build --preset tests
+  configure tests && cmake --build --preset tests -- -k 0
 }
 
 # Runs ./run test, of which each level is one of the row's.
