@@ -1,13 +1,26 @@
-# Packed relocations take a fraction of the room, and are understood by the C libraries of the last years.
+# Packed relocations take a fraction of the room, and are understood by the C libraries of the last years. A linker that
+# does not know them for its processor goes without, and says so in a warning.
 include(CheckCXXCompilerFlag)
 include(CheckLinkerFlag)
+set(CMAKE_REQUIRED_LINK_OPTIONS -Wl,--fatal-warnings)
 check_linker_flag(C -Wl,-z,pack-relative-relocs MERO_HAS_PACKED_RELOCATIONS)
+unset(CMAKE_REQUIRED_LINK_OPTIONS)
 
 check_cxx_compiler_flag(-Oz MERO_HAS_OZ)
 if(MERO_HAS_OZ)
   set(MERO_SMALL -Oz)
 else()
   set(MERO_SMALL -Os)
+endif()
+
+# What makes code small on one processor and large on another. A call through the table of addresses itself is one
+# instruction of x86, which needs no other table then; of 64-bit ARM it is three, where a call is one. The tiny model is
+# that of a library that lies within a mebibyte: each of its addresses is one instruction there, not two. And there every
+# function would keep a frame for debuggers, as none does elsewhere.
+if(CMAKE_SYSTEM_PROCESSOR STREQUAL aarch64)
+  set(MERO_PROCESSOR_OPTIONS -mcmodel=tiny -fomit-frame-pointer)
+else()
+  set(MERO_PROCESSOR_OPTIONS -fno-plt)
 endif()
 
 set(MERO_LIBRARY_OPTIONS "" CACHE STRING "Options that the shared libraries are compiled with, after all others")
@@ -19,8 +32,8 @@ function(mero_compile_part name)
   target_include_directories(${name} PUBLIC $<BUILD_INTERFACE:${top}/include> PRIVATE ${top})
   target_compile_options(${name} PRIVATE -fno-exceptions -fno-rtti -fvisibility=hidden -fvisibility-inlines-hidden
                                          -ffunction-sections -fdata-sections
-                                         $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};-fno-plt;-fno-ident>
-                                         $<$<NOT:$<CONFIG:Debug>>:-fno-asynchronous-unwind-tables>
+                                         $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};${MERO_PROCESSOR_OPTIONS};-fno-ident>
+                                         $<$<NOT:$<CONFIG:Debug>>:-fno-asynchronous-unwind-tables;-fno-unwind-tables>
                                          ${MERO_LIBRARY_OPTIONS})
   set_target_properties(${name} PROPERTIES POSITION_INDEPENDENT_CODE ON)
   if(CMAKE_SIZEOF_VOID_P EQUAL 4)
