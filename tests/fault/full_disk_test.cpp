@@ -15,7 +15,7 @@ class AFullDisk : public PlatformTest {
   // Fills what is left of the disk, and gives the store as it is then.
   static std::string Fill() {
     const auto left = std::filesystem::space(kStoreDirectory).available;
-    WriteText("/usr/mero/etc/ballast", std::string(left, 'x'));
+    WriteText("/usr/mero/etc/ballast", std::string(static_cast<size_t>(left), 'x'));
     return ReadText(kStore);
   }
 
