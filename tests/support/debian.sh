@@ -61,9 +61,9 @@ debian_origin() { # SUITE
 
 # Its apt has the settings of this machine's.
 make_debian() { # SUITE TARGET [MMDEBSTRAP-OPTION...]
-  local options
-  mapfile -t options < <(debian_settings) && wait "$!" || return
-  debian_archives "$1" | mmdebstrap --quiet --aptopt='APT::Install-Recommends "false"' "${options[@]/#/--aptopt=}" \
+  local settings
+  mapfile -t settings < <(debian_settings) && wait "$!" || return
+  debian_archives "$1" | mmdebstrap --quiet --aptopt='APT::Install-Recommends "false"' "${settings[@]/#/--aptopt=}" \
     --dpkgopt=force-unsafe-io "${@:3}" "$1" "$2" - >&2
 }
 
