@@ -1,7 +1,7 @@
 # A machine with another processor than the host's, on the host: its files are those of a Debian system of that
 # architecture, since it can run none of the host's, and the project's come out of the packages. Part of `lab`.
 # shellcheck shell=bash
-# shellcheck disable=SC2154  # what `lab` sets
+# shellcheck disable=SC2034,SC2154  # what `lab` uses and sets
 
 readonly foreign_needs=(mmdebstrap=mmdebstrap qemu-system-aarch64=qemu-system-arm readelf=binutils)
 
