@@ -3,7 +3,7 @@
 # shellcheck shell=bash
 # shellcheck disable=SC2034,SC2154  # what `lab` uses and sets
 
-readonly foreign_needs=(mmdebstrap=mmdebstrap qemu-system-aarch64=qemu-system-arm readelf=binutils)
+readonly foreign_needs=(busybox=busybox mmdebstrap=mmdebstrap qemu-system-aarch64=qemu-system-arm readelf=binutils)
 
 # The packages were unpacked, and none of their scripts was run: what these would have made, as far as it is needed.
 complete_system() {  # DIRECTORY

@@ -3,6 +3,7 @@
 #
 # The tables of the race tell the median of the rounds, the least and the most, and what some rounds did not come to.
 set -eu
+export LC_ALL=C.UTF-8 # as the lab has it
 race=$(dirname "$(realpath "$0")")
 
 line() { # EVENT STATE CONTENDER ROUND BEACON AUTHORIZED ADDRESS PING SCAN
