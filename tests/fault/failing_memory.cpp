@@ -45,13 +45,22 @@ void* Counted(void* block) {
   return block;
 }
 
+// What a new block, or the new part of one, holds was left there by others: it is taken away while freed blocks are
+// searched.
+void* Emptied(void* block, size_t from) {
+  if (block == nullptr || g_watched == nullptr) return block;
+  const size_t size = ::malloc_usable_size(block);
+  if (size > from) std::memset(static_cast<char*>(block) + from, 0, size - from);
+  return block;
+}
+
 }  // namespace
 
 // In place of libc's, or of those that the sanitizer has put in place of libc's.
 extern "C" {
 
 void* malloc(size_t size) {
-  return Fails() ? nullptr : Counted(REAL(malloc)(size));
+  return Fails() ? nullptr : Counted(Emptied(REAL(malloc)(size), 0));
 }
 
 void* calloc(size_t count, size_t size) {
@@ -60,7 +69,8 @@ void* calloc(size_t count, size_t size) {
 
 void* realloc(void* block, size_t size) {
   if (Fails()) return nullptr;
-  void* moved = REAL(realloc)(block, size);
+  const size_t before = block != nullptr && g_watched != nullptr ? ::malloc_usable_size(block) : 0;
+  void* moved = Emptied(REAL(realloc)(block, size), before);
   return block == nullptr ? Counted(moved) : moved;
 }
 
