@@ -15,7 +15,7 @@ command_from() {
   chmod +x "$1"
 }
 
-mkdir -p bench bin build/bench docs/pictures lib tests/everywhere tests/lab/scenarios
+mkdir -p bench bin build/bench docs/pictures lib tests/{everywhere,lab/scenarios,package}
 cp "$source"/{.gitignore,run} .
 touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
 git init --quiet
@@ -32,6 +32,8 @@ git init --quiet
   command_from bin/shellcheck <<<'exit 0'
   command_from tests/everywhere/everywhere <<<'echo "everywhere $*" >>calls; tar --list --file "$1/source.tar" | sort >"$1/files"'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
+  command_from tests/package/foreign_test.sh <<<'echo "foreign_test.sh $*" >>calls; echo not ok; [[ ! -e wrong ]]'
+  command_from tests/everywhere/cross <<<'echo "cross $* with $(cd "$3/source" && echo lib/*)" >>calls'
 }
 # The packages in `exclusions`, one a line, exclude a cross compiler, which the real one removes without a question too.
 # Those in `unknown` are in no archive. With `offline`, no archive is within reach.
@@ -214,6 +216,25 @@ END
     run test unit
     grep '^skipped: ' said | diff - <(printf 'skipped: unit.%s\n' 'A: there is no air' 'B: there is no sea')
     grep -qxE 'unit +[0-9]+ s +1 passed +0 failed +2 skipped' said
+    ;;
+  cross)
+    run package --arch armhf
+    expect_calls 'cross package armhf build/packages-armhf with lib/unit.cpp' \
+      'foreign_test.sh build/packages-armhf armhf'
+    expect_packages binutils dpkg-dev git mmdebstrap
+    touch wrong
+    if run package --arch armhf >shown; then
+      echo "packages that are not right are no failure"
+      exit 1
+    fi
+    for wrong in '--arch' '--arch ../lib' '--arch amd64' '--arch arm64 armhf' '--architecture arm64'; do
+      read -ra words <<<"$wrong"
+      if run package "${words[@]}" >shown; then
+        echo "package takes $wrong"
+        exit 1
+      fi
+      [[ ! -s calls && ! -s packages && -e lib/unit.cpp ]]
+    done
     ;;
   arguments)
     for name in build demo docs format lint package; do
