@@ -144,6 +144,17 @@ TEST_F(PackageScripts, TellThatTheListingToolCannotBePutBack) {
   EXPECT_FALSE(Exists(kAdapter));
 }
 
+// This alone kept the package.
+TEST_F(PackageScripts, GoBackToTheFirstReleaseWhenTheListingToolCannotBePutBack) {
+  Install("mv", "echo 'mv: cannot move' >&2\nexit 1\n");
+  WriteText("/usr/sbin/iwlist", "");
+  WriteText("/usr/sbin/iwlist.ordinary", "");
+  const Ran ran = Script("merowireless-appliance.postrm", "upgrade 0.1.0");
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_EQ(ran.out, "mv: cannot move\nthe ordinary iwlist may still be /usr/sbin/iwlist.ordinary\n");
+  EXPECT_THAT(Told("/tmp/diverted"), HasSubstr("--remove --no-rename --divert /usr/sbin/iwlist.ordinary"));
+}
+
 TEST_F(PackageScripts, EndTheAccessPointsThatRun) {
   WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
   WriteText(std::string(kState) + "/hostapd-wlan1.pid", "rubbish; rm -rf /\n");
