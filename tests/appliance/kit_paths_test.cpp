@@ -125,9 +125,8 @@ TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
             (Paths{"/sbin/iwlist", "/sbin/iwlist.distrib", "/usr/sbin/iwlist", "/usr/sbin/iwlist.ordinary", state,
                    leaseLock.substr(0, leaseLock.find('\n')), kAdapterInfoPath}));
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.prerm"),
-            (Paths{state + "/hostapd-*.pid", state + "/hostapd-", kNetworkScriptPath}));
-  EXPECT_THAT(TextOf("../debian/merowireless-appliance.prerm"),
-              HasSubstr("*/" + std::string(kGuestInterface) + "/phy80211) ;;"));
+            (Paths{kAdapterInfoPath, Tells("printf '%s' \"$settings_reader\""), state + "/hostapd-*.pid",
+                   state + "/hostapd-", state + "/hostapd-$1.pid", kNetworkScriptPath}));
   EXPECT_EQ(Tells("printf '%s' \"$hostapd_run-if0.pid\""), state + "/hostapd-if0.pid");
 }
 

@@ -2,6 +2,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/mount.h>
+#include <sys/stat.h>
 
 #include <filesystem>
 #include <string>
@@ -58,6 +59,8 @@ class PackageScripts : public testing::Test {
     // Nobody waits two minutes here.
     Install("timeout", "shift 3\nexec /usr/bin/timeout -s KILL 1 \"$@\"\n");
     SetStartScript("echo \"$*\" >>/tmp/started\n");
+    fs::create_directories("/usr/mero/sbin");
+    fs::copy(SETTINGS_PROGRAM, "/usr/mero/sbin/mero-settings", fs::copy_options::overwrite_existing);
     for (const std::string& path : kPublic) fs::remove_all(path);
     fs::remove_all(kState);
   }
@@ -162,19 +165,49 @@ TEST_F(PackageScripts, EndTheAccessPointsThatRun) {
   EXPECT_EQ(Told("/tmp/started"), "restart wlan0 \nrestart wlan1 \n");
 }
 
-// The supplicant and the DHCP client of a network that was joined ran on, with files that were gone.
-TEST_F(PackageScripts, EndTheClientsOfAdaptersThatAreThere) {
-  for (const char* szInterface : {"gwlan", "wlan0", "wlan1"}) {
-    fs::create_directories(std::string("/tmp/adapters/") + szInterface + "/phy80211");
+// Each adapter that the kernel knew was taken for the kit's: somebody's own bridge with a second adapter was deleted,
+// and from a chroot that of the machine outside.
+TEST_F(PackageScripts, EndTheClientOfTheAdapterThatIsNotedAndLeaveOtherAdaptersAlone) {
+  for (const std::string name : {"gwlan", "wlan0", "wlan1", "wlan2"}) {
+    fs::create_directories("/tmp/adapters/" + name + "/phy80211");
+    fs::create_symlink("../of-" + name, "/tmp/adapters/" + name + "/master");
   }
-  WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
-  WriteText(
-      "/tmp/prerm",
-      RunInShell("sed s,/sys/class/net/\\*,/tmp/adapters/*, " PACKAGE_SCRIPTS "/merowireless-appliance.prerm").out);
-  fs::create_directories("/run/systemd/system");
+  ASSERT_EQ(::mount("/tmp/adapters", "/sys/class/net", nullptr, MS_BIND, nullptr), 0);
+  const std::string note = "INTERFACE=\"wlan0\"\nPRODUCT=\"RT 5370\"\n";
+  const std::string stopped = "stop mero-wireless@*.service\n";
+  const std::string accessPoint = "restart wlan1 of-wlan1\n";
+  const struct {
+    const char* szText;
+    bool systemdRuns;
+    void (*leave)(const std::string& text);
+    std::string asked;
+  } rows[] = {
+      {"noted", true, [](const std::string& text) { WriteText(kAdapter, text); },
+       stopped + "restart wlan0 \n" + accessPoint},
+      {"pulled", true, [](const std::string&) { WriteText(kAdapter, ""); }, stopped + accessPoint},
+      {"never there", true, [](const std::string&) {}, stopped + accessPoint},
+      {"a link", true,
+       [](const std::string& text) {
+         WriteText("/tmp/theirs", text);
+         fs::create_symlink("/tmp/theirs", kAdapter);
+       },
+       stopped + accessPoint},
+      {"in a chroot", false, [](const std::string& text) { WriteText(kAdapter, text); }, accessPoint},
+  };
+  ::chmod("/tmp", 01777);
+  Install("deb-systemd-invoke", "echo \"$*\" >>/tmp/asked; rm -f /tmp/wireless.info\n");
   SetStartScript("echo \"$*\" >>/tmp/asked\n");
-  EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH sh /tmp/prerm remove").out, "");
-  EXPECT_EQ(Told("/tmp/asked"), "stop mero-wireless@*.service\nrestart wlan0 \nrestart wlan1 \n");
+  for (const auto& row : rows) {
+    fs::remove("/tmp/asked");
+    fs::remove(kAdapter);
+    fs::remove_all("/run/systemd/system");
+    if (row.systemdRuns) fs::create_directories("/run/systemd/system");
+    WriteText(std::string(kState) + "/hostapd-wlan1.pid", "123\n");
+    row.leave(note);
+    EXPECT_EQ(Script("merowireless-appliance.prerm", "remove").status, 0) << row.szText;
+    EXPECT_EQ(Told("/tmp/asked"), row.asked) << row.szText;
+  }
+  ::umount("/sys/class/net");
 }
 
 TEST_F(PackageScripts, GoOnWithoutAStartScriptThatWorks) {
