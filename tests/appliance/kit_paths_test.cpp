@@ -126,7 +126,9 @@ TEST_F(KitPaths, OfThePackagesScriptsAreTheLibrarysAndTheScripts) {
                    leaseLock.substr(0, leaseLock.find('\n')), kAdapterInfoPath}));
   EXPECT_EQ(PathsIn("../debian/merowireless-appliance.prerm"),
             (Paths{kAdapterInfoPath, Tells("printf '%s' \"$settings_reader\""), state + "/hostapd-*.pid",
-                   state + "/hostapd-", state + "/hostapd-$1.pid", kNetworkScriptPath}));
+                   state + "/hostapd-", state + "/hostapd-$1.pid", state + "/dnsmasq-*.pid",
+                   "/usr/mero/lib/network/$part.sh", kNetworkScriptPath}));
+  EXPECT_EQ(Tells("printf '%s' \"$dnsmasq_run-if0.pid\""), state + "/dnsmasq-if0.pid");
   EXPECT_EQ(Tells("printf '%s' \"$hostapd_run-if0.pid\""), state + "/hostapd-if0.pid");
 }
 

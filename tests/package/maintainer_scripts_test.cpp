@@ -59,8 +59,10 @@ class PackageScripts : public testing::Test {
     // Nobody waits two minutes here.
     Install("timeout", "shift 3\nexec /usr/bin/timeout -s KILL 1 \"$@\"\n");
     SetStartScript("echo \"$*\" >>/tmp/started\n");
-    fs::create_directories("/usr/mero/sbin");
+    for (const char* szPath : {"/usr/mero/lib", "/usr/mero/sbin"}) fs::create_directories(szPath);
     fs::copy(SETTINGS_PROGRAM, "/usr/mero/sbin/mero-settings", fs::copy_options::overwrite_existing);
+    fs::copy(APPLIANCE_KIT "/lib", "/usr/mero/lib/network",
+             fs::copy_options::recursive | fs::copy_options::overwrite_existing);
     for (const std::string& path : kPublic) fs::remove_all(path);
     fs::remove_all(kState);
   }
@@ -208,6 +210,20 @@ TEST_F(PackageScripts, EndTheClientOfTheAdapterThatIsNotedAndLeaveOtherAdaptersA
     EXPECT_EQ(Told("/tmp/asked"), row.asked) << row.szText;
   }
   ::umount("/sys/class/net");
+}
+
+// A bridge that goes on is served, and nobody could end its server once the kit and its pid file were gone.
+TEST_F(PackageScripts, EndTheServersOfBridgesThatGoOn) {
+  fs::copy_file("/bin/sleep", "/tmp/bin/dnsmasq");
+  Install("timeout", "shift 3\nexec \"$@\"\n");
+  SetStartScript(
+      "serve() { $1 60 >/dev/null 2>&1 & echo $! | tee /tmp/$2 >/run/rc.network/dnsmasq-$2.pid; }\n"
+      "serve /tmp/bin/dnsmasq lbr0; serve sleep other\n"
+      "until [ \"$(cat /proc/$(cat /tmp/lbr0)/comm)\" = dnsmasq ]; do :; done\n");
+  WriteText(std::string(kState) + "/hostapd-wlan0.pid", "123\n");
+  EXPECT_EQ(Remove().out, "");
+  EXPECT_NE(RunInShell("grep -s '^State:.[^Z]' /proc/$(cat /tmp/lbr0)/status").status, 0);
+  EXPECT_EQ(RunInShell("kill $(cat /tmp/other)").status, 0);  // another program has the number
 }
 
 TEST_F(PackageScripts, GoOnWithoutAStartScriptThatWorks) {
