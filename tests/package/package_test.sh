@@ -13,7 +13,7 @@ readonly here later=$here/../support/later-package
 # shellcheck source=tests/support/debian.sh
 . "$here/../support/debian.sh"
 
-readonly settings=(
+readonly users_settings=(
   /usr/mero/etc/wireless.conf
   /usr/mero/etc/wireless_ap.conf
   /etc/hostapd/hostapd-wlan0.info
@@ -259,12 +259,12 @@ note_is_gone() { [[ ! -e $root$note ]]; }
 
 write_settings() {
   local file
-  for file in "${settings[@]}"; do echo "the user's $file" >"$root$file"; done
+  for file in "${users_settings[@]}"; do echo "the user's $file" >"$root$file"; done
 }
 
 settings_are_kept() {
   local file
-  for file in "${settings[@]}"; do
+  for file in "${users_settings[@]}"; do
     grep -qFx "the user's $file" "$root$file" || return 1
   done
 }
@@ -370,7 +370,7 @@ removal_tells() { # TEXT...
 
 # Files that there are now and were not, or the reverse, or that are others: the settings, and what a pattern names.
 only_settings_are_new() { # [PATTERN]
-  diff <(printf '%s\n' "${settings[@]#/}" | sort) \
+  diff <(printf '%s\n' "${users_settings[@]#/}" | sort) \
     <(files | diff "$root/tmp/before" - | sed -nE 's/^[<>] (\S+) .*/\1/p' | grep -vE "${1:-^$}" | sort -u) >&2
 }
 
