@@ -72,11 +72,28 @@ make_system() { # ARCHIVE DIRECTORY
   # shellcheck disable=SC2016  # the directory is mmdebstrap's to name
   make_debian "$(debian_suite)" "$1.new" --format=tar --variant=apt \
     --include="cmake,g++,make,pkgconf,$(dependencies "$2")" --customize-hook='mkdir "$1/srv/tools"' \
-    --customize-hook='chroot "$1" sh -c "cd /srv/tools && apt-get -o APT::Sandbox::User=root download wireless-tools"'
-  mv "$1.new" "$1"
+    --customize-hook='chroot "$1" sh -c "cd /srv/tools && apt-get -o APT::Sandbox::User=root download wireless-tools"' &&
+    mv "$1.new" "$1"
+}
+
+# Tells the archive of the system, which is made if it is not beside the packages; one that is made of anything else is of
+# no use any more.
+kept_system() { # DIRECTORY
+  local beside archive
+  beside=$(realpath "$(dirname "$1")")/package-test || return
+  archive=$beside-$(made_of "$1" | cksum | cut -d ' ' -f 1).tar || return
+  {
+    flock 9
+    if [[ ! -e $archive ]]; then
+      rm -f "$beside"-[0-9]*.tar{,.new}
+      make_system "$archive" "$1" || return
+    fi
+  } 9>"$beside.lock"
+  printf '%s\n' "$archive"
 }
 
 enter_system() { # ARCHIVE DIRECTORY
+  mkdir -p "$root"
   mount_debian "$1" "$root"
   mkdir "$root"/tmp/{packages,released,upgrades,failing}
   cp "$2"/*.deb "$root/tmp/packages/"
@@ -571,19 +588,19 @@ look_at_packages() { # ARCHIVE DIRECTORY
   [[ $failures -eq 0 ]]
 }
 
+# The second form is the first process of the machine that the first makes. The system stands beside its archive, since
+# that directory stays when the machine has ended: nobody else may put another system there.
 case $#,${1:-} in
 1,* | 2,*)
   outside=/dev/null
   [[ $# -eq 1 ]] || outside=/proc/self/ns/net
-  archive=$(dirname "$1")/package-test-$(made_of "$1" | cksum | cut -d ' ' -f 1).tar
-  [[ -e $archive ]] || make_system "$archive" "$1"
-  root=$(mktemp -d)
-  trap 'rmdir "$root"' EXIT
-  unshare --mount --net --pid --fork --kill-child "$0" "$archive" "$1" "$root" "${2:-}" 9<"$outside"
+  archive=$(kept_system "$1")
+  setpriv --pdeathsig KILL unshare --mount --net --pid --fork --kill-child "$0" "$archive" "$1" "${2:-}" 9<"$outside"
   ;;
-4,*)
-  root=$3
-  if [[ $4 ]]; then look_at_upgrade "$1" "$2" "$4"; else look_at_packages "$1" "$2"; fi
+3,*)
+  trap 'exit 130' INT TERM # otherwise a first process does not hear them
+  root=${1%.tar}
+  if [[ $3 ]]; then look_at_upgrade "$1" "$2" "$3"; else look_at_packages "$1" "$2"; fi
   ;;
 *)
   echo "usage: $0 DIRECTORY [SUITE]" >&2
