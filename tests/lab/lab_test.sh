@@ -15,7 +15,68 @@ esac
 # shellcheck source=tests/lab/lab
 . "$(dirname "$(realpath "$0")")/lab" list >/dev/null
 
+# Debian's archives, as far as these cases need them.
+debian_archives() { echo "deb http://archive $1 main"; }
+debian_settings() { :; }
+dependencies_of_packages() { echo busybox; }
+
+# Puts a program before those of the machine.
+program() {  # NAME, and the script on standard input
+  mkdir -p "$scratch/bin"
+  cat >"$scratch/bin/$1"
+  chmod +x "$scratch/bin/$1"
+  PATH=$scratch/bin:$PATH
+}
+
+# Makes a disk, slowly, where mmdebstrap is told to leave it.
+make_slow_disk() {  # SUITE - OPTION...
+  local place=${!#}
+  place=${place#*\'}
+  place=${place%\'}
+  echo made >>"$scratch/made"
+  echo half >"$place"
+  sleep 0.5
+  echo whole >"$place"
+}
+
 case $1 in
+  disk) # Two labs that began at once made one disk twice, and one of them took it when it was not whole.
+    make_debian() { make_slow_disk "$@"; }
+    (prepare_disk && cp "$disk" "$scratch/one") 2>/dev/null &
+    (prepare_disk && cp "$disk" "$scratch/two") 2>/dev/null
+    wait $!
+    [[ $(cat "$scratch/made" "$scratch/one" "$scratch/two" | xargs) == 'made whole whole' ]]
+    prepare_disk
+    first=$disk
+    # It was kept when it was to come from elsewhere.
+    debian_archives() { echo "deb http://elsewhere $1 main"; }
+    prepare_disk 2>/dev/null
+    second=$disk
+    debian_settings() { echo 'Acquire::http::Proxy "http://proxy:3142";'; }
+    prepare_disk 2>/dev/null
+    [[ $second != "$first" && $disk != "$second" && ! -e $first && ! -e $second && -e $disk ]]
+    ;;
+  failing-disk)
+    make_debian() { make_slow_disk "$@" && return 1; }
+    if (prepare_disk) 2>/dev/null; then exit 1; fi
+    [[ -z $(find "$work" -name '*.disk*') ]]
+    ;;
+  hook) # Made beside the system, under a name that anybody could know and make before.
+    [[ $EUID -eq 0 ]] || exit 77
+    program mke2fs <<'STUB'
+#!/bin/bash
+disk=${*: -2:1}
+echo "$disk" >"$SCRATCH/disk"
+test -d "$(dirname "$disk")/system/etc" && exit 1
+STUB
+    export SCRATCH=$scratch IDLE_UNITS=one.timer
+    mkdir -p "$scratch/system"/{etc/{apt,systemd/system},usr/sbin,sbin}
+    ln -s "$scratch/theirs" "$scratch/system.disk"
+    if sh -c "$(finishing)" hook "$scratch/system" 2>/dev/null; then exit 1; fi
+    # It left its mount and its files when the disk could not be made.
+    if grep "$scratch" /proc/mounts; then exit 1; fi
+    [[ $(<"$scratch/disk") != "$scratch/system.disk" && ! -e $(dirname "$(<"$scratch/disk")") ]]
+    ;;
   lists) # apt-get ended with 0 when it could reach nothing, and the lab said that apt does not know the kernel.
     debian_archives() { echo "deb [trusted=yes] http://127.0.0.1:9 $1 main"; }
     declare -a suite_options

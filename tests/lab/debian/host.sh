@@ -43,27 +43,47 @@ mkdir -p lib/modules var/lib/lab
 rm -f usr/sbin/policy-rc.d
 [ ! -e sbin/start-stop-daemon.REAL ] || mv sbin/start-stop-daemon.REAL sbin/start-stop-daemon
 for unit in $IDLE_UNITS; do ln -sf /dev/null "etc/systemd/system/$unit"; done
-# Without what is mounted in it now.
-mkdir "$1.system"
-mount --bind . "$1.system"
-mke2fs -q -t ext4 -d "$1.system" "$1.disk" 768M
-umount "$1.system"
-rmdir "$1.system"
-mv "$1.disk" ./disk
+# Of the system without what is mounted in it now. The mount here ends with what made it.
+work=$(mktemp -d "$1.XXXXXX")
+trap 'rm -rf "$work"' EXIT
+trap 'exit 1' HUP INT TERM
+mkdir "$work/system"
+unshare --mount sh -euc 'mount --bind . "$1/system"; mke2fs -q -t ext4 -d "$1/system" "$1/disk" 768M' disk "$work"
+mv "$work/disk" ./disk
 END
 }
 
-make_disk() {  # SUITE DISK
-  local include
+make_disk() (  # SUITE DISK
   printf 'lab: making a Debian system (%s)\n' "$1" >&2
   include=$({ printf '%s\n' "${system_packages[@]}"; dependencies_of_packages; } | paste --serial --delimiters=,)
-  rm -f "$2.new"
+  new=$2.new sparse=$2.sparse
+  trap 'rm -f "$new" "$sparse"' EXIT
+  rm -f "$work/$1"-[0-9]*.disk{,.new,.sparse}
   IDLE_UNITS=${idle_units[*]} make_debian "$1" - --format=null --variant=minbase --include="$include" "${debian_lean[@]}" \
-    --customize-hook="$(finishing)" --customize-hook="download /disk '$2.new'" ||
+    --customize-hook="$(finishing)" --customize-hook="download /disk '$new'" ||
     die "a Debian system ($1) cannot be made: its archives are those of this machine's apt, which have to be within reach"
-  cp --sparse=always "$2.new" "$2.sparse"
-  rm "$2.new"
-  mv "$2.sparse" "$2"
+  cp --sparse=always "$new" "$sparse"
+  mv "$sparse" "$2"
+)
+
+# All that the disk is made of.
+disk_origin() {  # SUITE
+  debian_origin "$1" && dependencies_of_packages &&
+    printf '%s\n' "${system_packages[@]}" "${idle_units[@]}" "${debian_lean[@]}" &&
+    declare -f make_debian make_disk finishing
+}
+
+# Leaves the machine's disk in `disk`; what is written there in a run is gone with it. Another system is made when what
+# it is made of is another, and by one lab at a time.
+prepare_disk() {
+  local made_of
+  made_of=$(disk_origin "$suite") || die "nothing tells where a Debian system ($suite) comes from"
+  disk=$work/$suite-$(cksum <<<"$made_of" | cut -d ' ' -f 1).disk
+  mkdir -p "$work"
+  (
+    flock 9
+    [[ -e $disk ]] || make_disk "$suite" "$disk"
+  ) 9>"$work/$suite-disk.lock"
 }
 
 # ---- The archive ---------------------------------------------------------------------------------------------------------
@@ -84,7 +104,6 @@ make_archive() {
   done
 }
 
-# Leaves the machine's disk in `disk`; what is written there in a run is gone with it.
 prepare_debian() {
   local need
   [[ ! $foreign ]] || die "a machine that boots a Debian system has the host's processor: MERO_LAB_ARCH cannot be $arch"
@@ -93,7 +112,5 @@ prepare_debian() {
   done
   compgen -G "$packages/merowireless-appliance_*.deb" >/dev/null || die "$packages has no packages: ./run package makes them"
   make_archive
-  # Another system is made when what it is made of is another.
-  disk=$work/$suite-$(dependencies_of_packages | cat - "$lab/debian/host.sh" | cksum | cut -d ' ' -f 1).disk
-  [[ -e $disk ]] || make_disk "$suite" "$disk"
+  prepare_disk
 }
