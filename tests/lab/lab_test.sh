@@ -77,6 +77,44 @@ STUB
     if grep "$scratch" /proc/mounts; then exit 1; fi
     [[ $(<"$scratch/disk") != "$scratch/system.disk" && ! -e $(dirname "$(<"$scratch/disk")") ]]
     ;;
+  killed) # QEMU went on until its time was over, and what it had started from stayed.
+    for qemu in qemu-system-{x86_64,aarch64}; do
+      program "$qemu" <<'STUB'
+#!/bin/bash
+while [[ $1 != -pidfile ]]; do shift; done
+echo $$ >"$2"
+echo $$ >"$MERO_BUILD/qemu"
+exec sleep 600
+STUB
+    done
+    gather_initramfs() { mkdir "$1" && touch "$1/init"; }
+    (
+      trap - EXIT
+      disk='' run_script one script 300 cat
+    ) &
+    until [[ -s $MERO_BUILD/qemu ]]; do sleep 0.1; done
+    qemu=$(<"$MERO_BUILD/qemu")
+    [[ -e $work/start/one/files.cpio ]]
+    kill -TERM $!
+    wait $! && exit 1
+    for ((tries = 0; tries < 100; tries++)); do
+      kill -0 "$qemu" 2>/dev/null || break
+      sleep 0.1
+    done
+    ((tries < 100)) || {
+      kill "$qemu"
+      exit 1
+    }
+    [[ ! -e $work/start/one ]]
+    ;;
+  archive) # A lab took the archive of packages away from under another's machine.
+    make_archive() { mkdir -p "$1/now"; }
+    gather_initramfs() { mkdir "$1" && touch "$1/init"; }
+    boot() { ls "$1" && echo PASS >"$2/result"; }
+    disk=a run_script one script 300 cat >"$scratch/seen"
+    grep -qx archive "$scratch/seen"
+    [[ $outcome == PASS && ! -e $work/start/one ]]
+    ;;
   lists) # apt-get ended with 0 when it could reach nothing, and the lab said that apt does not know the kernel.
     debian_archives() { echo "deb [trusted=yes] http://127.0.0.1:9 $1 main"; }
     declare -a suite_options

@@ -7,7 +7,6 @@
 . "$lab/../support/debian.sh"
 
 readonly packages=$build/packages${foreign:+-$foreign}
-readonly archive=$work/archive
 
 # What the lab needs of the host for such a machine, besides its other needs.
 readonly -a debian_needs=(dpkg-scanpackages=dpkg-dev mke2fs=e2fsprogs mmdebstrap=mmdebstrap)
@@ -89,9 +88,8 @@ prepare_disk() {
 # ---- The archive ---------------------------------------------------------------------------------------------------------
 
 # As anybody would make one for some packages: `now` has ours, `later` the same of a later version.
-make_archive() {
-  local package
-  rm -rf "$archive"
+make_archive() {  # DIRECTORY
+  local archive=$1 package
   mkdir -p "$archive/now" "$archive/later"
   for package in "$packages"/*.deb; do
     [[ $package == *-dbgsym_* ]] || cp "$package" "$archive/now/"
@@ -111,6 +109,5 @@ prepare_debian() {
     type -P "${need%%=*}" >/dev/null || die "Debian packages are missing: apt-get install ${debian_needs[*]#*=}"
   done
   compgen -G "$packages/merowireless-appliance_*.deb" >/dev/null || die "$packages has no packages: ./run package makes them"
-  make_archive
   prepare_disk
 }

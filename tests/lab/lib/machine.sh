@@ -63,7 +63,7 @@ expect_unit() {  # UNIT STATE
 # takes_archive NAME: the machine's apt installs from the packages of that archive from now on.
 takes_archive() {
   rm -rf /var/lib/lab/archive
-  cp -r "$HOST$LAB_BUILD/lab/archive/$1" /var/lib/lab/archive
+  cp -r "$HOST$LAB_ARCHIVE/$1" /var/lib/lab/archive
   apt update
 }
 
