@@ -20,17 +20,23 @@ complete_system() {  # DIRECTORY
   ln -sf regulatory.db.p7s-debian "$1/usr/lib/firmware/regulatory.db.p7s"
 }
 
-make_system() {
+make_system() (
   printf 'lab: unpacking a Debian system (%s, %s)\n' "$suite" "$arch" >&2
-  rm -rf "$system.new"
+  trap 'rm -rf "$system.new" "$system.tar"' EXIT
+  rm -rf "$system.new" "$system.tar"
   mkdir -p "$system.new"
   make_debian "$suite" "$system.tar" --variant=extract --architectures="$arch" --include='?essential' \
     --include="$(system_includes)" "${debian_lean[@]}" --hook-dir=/usr/share/mmdebstrap/hooks/merged-usr ||
     die "a Debian system ($suite, $arch) cannot be unpacked: the archives of this machine's apt have to be within reach"
   tar -x -C "$system.new" --exclude='./dev/*' -f "$system.tar"
-  rm "$system.tar"
   complete_system "$system.new"
   mv "$system.new" "$system"
+)
+
+# All that the system is made of.
+system_origin() {
+  debian_origin "$suite" && system_includes && printf '%s\n' "${debian_lean[@]}" &&
+    declare -f make_debian make_system complete_system
 }
 
 # What scenarios use, and what our packages depend on.
@@ -44,7 +50,7 @@ prepare_system() {
   compgen -G "$packages/merowireless-appliance_*_$arch.deb" >/dev/null ||
     die "$packages has no packages: ./run package --arch $arch makes them"
   # Another system is made when what it is made of is another.
-  made_of=$(system_includes && declare -f make_system complete_system)
+  made_of=$(system_origin) || die "nothing tells where a Debian system ($suite, $arch) comes from"
   system=$work/system-$suite-$arch-$(cksum <<<"$made_of" | cut -d ' ' -f 1)
   mkdir -p "$work"
   (

@@ -121,6 +121,21 @@ STUB
     if (find_archives) 2>"$scratch/said"; then exit 1; fi
     grep -q "^lab: the lists of Debian's archives (trixie) could not be fetched$" "$scratch/said"
     ;;
+  foreign-system) # When it could not be made, its archive stayed; it was kept when it was to come from elsewhere.
+    mkdir -p "$packages"
+    touch "$packages/merowireless-appliance_1_$arch.deb"
+    complete_system() { :; }
+    make_debian() { echo half >"$2"; }
+    prepare_system 2>/dev/null & # where a failure ends it
+    if wait $!; then exit 1; fi
+    [[ $(ls "$work") == system.lock ]]
+    make_debian() { tar -c -f "$2" --files-from /dev/null; }
+    prepare_system 2>/dev/null
+    first=$system
+    debian_archives() { echo "deb http://elsewhere $1 main"; }
+    prepare_system 2>/dev/null
+    [[ $system != "$first" && -d $system ]]
+    ;;
   *)
     echo "there is no case $1"
     exit 2
