@@ -136,6 +136,27 @@ STUB
     prepare_system 2>/dev/null
     [[ $system != "$first" && -d $system ]]
     ;;
+  peers) # When apt knew no package, an empty tree was kept for all; versions that had been replaced were kept.
+    # shellcheck source=tests/lab/peers.sh
+    . "$lab/peers.sh"
+    apt-get() {
+      case $* in
+        *' install '*) [[ $version ]] && echo "Inst one ($version Debian:12 [amd64])" ;;
+        *) echo "${!#}" >>"$scratch/fetched" && touch one.deb ;;
+      esac
+    }
+    dpkg-deb() { tar -c --files-from /dev/null; }
+    version=1
+    fetch_peers one two 2>/dev/null
+    fetch_peers one two
+    version=''
+    status=0
+    (fetch_peers one && :) 2>/dev/null || status=$?
+    [[ $status -eq 2 && $(<"$unpacked/packages") == 'one two' ]]
+    version=2
+    fetch_peers one two 2>/dev/null
+    [[ $(xargs <"$scratch/fetched") == 'one=1 one=2' ]]
+    ;;
   *)
     echo "there is no case $1"
     exit 2

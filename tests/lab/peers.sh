@@ -64,31 +64,33 @@ peer_packages() {  # PEER...
   done | sort -u
 }
 
-# The packages that are missing for these, as apt knows; what there is stays as it is.
+# The packages that are missing for these, with their versions, as apt knows; what there is stays as it is.
 missing_packages() {  # PACKAGE...
   local plan
   plan=$(apt-get -qq -s --no-install-recommends install "$@") || die "apt does not know $*: run apt-get update"
-  awk '$1 == "Inst" && $3 !~ /^\[/ { print $2 }' <<<"$plan"
+  awk '$1 == "Inst" && $3 !~ /^\[/ { print $2 "=" substr($3, 2) }' <<<"$plan"
 }
 
 # Nothing is installed: no daemon starts here, and no setting of the host's changes.
 fetch_peers() {  # PACKAGE...
-  local new=$unpacked.new package
-  local -a missing
-  [[ ! -f $unpacked/packages || $(<"$unpacked/packages") != "$*" ]] || return 0
-  mapfile -t missing < <(missing_packages "$@")
-  rm -rf "$new" "$unpacked"
+  local new=$unpacked.new package missing
+  missing=$(missing_packages "$@") || exit
+  [[ ! -f $unpacked/missing || $(<"$unpacked/packages") != "$*" || $(<"$unpacked/missing") != "$missing" ]] || return 0
+  rm -rf "$new"
   mkdir -p "$new/root" "$new/packages.d"
-  if ((${#missing[@]} > 0)); then
-    printf 'lab: fetching %s\n' "${missing[*]}" >&2
-    (cd "$new/packages.d" && apt-get -qq -o APT::Sandbox::User="$(id -un)" download "${missing[@]}" >&2) ||
-      die "these could not be downloaded: ${missing[*]}"
+  if [[ $missing ]]; then
+    printf 'lab: fetching %s\n' "${missing//$'\n'/ }" >&2
+    # shellcheck disable=SC2086  # names and versions are single words
+    (cd "$new/packages.d" && apt-get -qq -o APT::Sandbox::User="$(id -un)" download $missing >&2) ||
+      die "these could not be downloaded: ${missing//$'\n'/ }"
     for package in "$new"/packages.d/*.deb; do
       dpkg-deb --fsys-tarfile "$package" | tar -x -C "$new/root" --transform 's,^\./\(s\?bin\|lib\),./usr/\1,' ||
         die "$package could not be unpacked"
     done
   fi
   printf '%s' "$*" >"$new/packages"
+  printf '%s' "$missing" >"$new/missing"
+  rm -rf "$unpacked"
   mv "$new" "$unpacked"
 }
 
