@@ -121,6 +121,15 @@ STUB
     if (find_archives) 2>"$scratch/said"; then exit 1; fi
     grep -q "^lab: the lists of Debian's archives (trixie) could not be fetched$" "$scratch/said"
     ;;
+  iwlist) # The lab took our own listing tool for the ordinary one, which called itself without end.
+    system=$scratch/system
+    program_file() { echo /usr/sbin/iwlist; }
+    mkdir -p "$system"/{sbin,usr/sbin}
+    for file in /usr/sbin/iwlist /usr/sbin/iwlist.ordinary /sbin/iwlist.distrib; do
+      touch "$system$file"
+      [[ $(ordinary_iwlist) == "$system$file" ]]
+    done
+    ;;
   foreign-system) # When it could not be made, its archive stayed; it was kept when it was to come from elsewhere.
     mkdir -p "$packages"
     touch "$packages/merowireless-appliance_1_$arch.deb"
