@@ -16,6 +16,7 @@ cat >tests/everywhere/rows <<'END'
 old   bookworm  i386   gcc,g++        -    build,unit
 new   trixie    amd64  clang,clang++  -O3  build,unit
 mine  trixie    amd64  gcc,g++        -    readme
+safe  trixie    amd64  clang,clang++  -    asan
 END
 printf 'any cmake\nany g++\namd64 lintian\n' >work/packages
 
@@ -50,16 +51,17 @@ export PATH=$house/bin:$PATH CALLS=$house/calls SAYS=$house/says
 
 everywhere() { tests/everywhere/everywhere "$house/work" "$@" >out 2>said; }
 
-# The lines of a row, without the seconds of commands and the day.
+# The lines of a row, without its words, the seconds and the day.
 lines() { # FILE ROW
-  grep "^$2"$'\t' "$1" | sed -E 's/\t[0-9]+\t([^\t]*)\t[-0-9]+$/\t\1/'
+  grep "^$2"$'\t' "$1" | cut -f 1,6- | sed -E 's/\t[0-9]+\t([^\t]*)\t[-0-9]+$/\t\1/'
 }
 
 fails() {
   if "$@"; then return 1; fi
 }
 
-printf '%s\n' 'unit         33 s   771 passed     0 failed     2 skipped' 'skipped: unit.A.B: there is no air' >says
+printf '%s\n' 'testing (unit)' 'unit         33 s   771 passed     0 failed     2 skipped' \
+  'skipped: unit.A.B: there is no air' >says
 case $1 in
   counted)
     everywhere old
@@ -73,16 +75,22 @@ run test unit
 END
     fails grep -q lintian work/roots
     ;;
-  options)
+  options) # The build's own were lost, and what has no others was not optimized.
     everywhere new
-    grep -qxF 'cmake --preset tests -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ -DCMAKE_C_FLAGS_RELWITHDEBINFO=-O3 -DCMAKE_CXX_FLAGS_RELWITHDEBINFO=-O3 -DMERO_LIBRARY_OPTIONS=-O3' calls
+    grep -qxF 'cmake --preset tests -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ -DCMAKE_C_FLAGS_RELWITHDEBINFO=-O2 -g -DNDEBUG -O3 -DCMAKE_CXX_FLAGS_RELWITHDEBINFO=-O2 -g -DNDEBUG -O3 -DMERO_LIBRARY_OPTIONS=-O3' calls
     grep -q ' tests trixie amd64 .*cmake g++ lintian$' work/roots
     ;;
+  sanitized) # It was told of another compiler than the one that its build has, and lost what it was told of sanitizers.
+    sed -i 's/unit/asan/' says
+    everywhere safe
+    diff - calls <<<'run test asan'
+    ;;
   newcomer)
-    printf '%s\n' 'style         3 s     6 passed     0 failed     0 skipped' >>says
+    printf '%s\n' 'testing (style)' 'style         3 s     6 passed     0 failed     0 skipped' >>says
     everywhere mine
-    lines work/seen.tsv mine | cut -f 1-5 |
-      diff <(printf 'mine\tdemo\t1\t0\t0\nmine\tunit\t771\t0\t2\nmine\tstyle\t6\t0\t0\n') -
+    lines work/seen.tsv mine | # Each level was told to have skipped what one of them had.
+      diff <(printf 'mine\t%s\n' $'demo\t1\t0\t0\t' $'unit\t771\t0\t2\tskipped: unit.A.B: there is no air' \
+        $'style\t6\t0\t0\t') -
     diff - calls <<<$'run demo\nrun test'
     grep -q ' newcomer trixie amd64 ca-certificates git$' work/roots
     ;;
@@ -100,7 +108,7 @@ END
     fails grep -q ' 769 ' docs/everywhere.md
     ;;
   failed)
-    printf '%s\n' 'unit         33 s   770 passed     1 failed     0 skipped' "$(printf '\t 12 - unit.A.C (Failed)')" >says
+    printf '%s\n' 'testing (unit)' 'unit         33 s   770 passed     1 failed     0 skipped' "$(printf '\t 12 - unit.A.C (Failed)')" >says
     fails everywhere new
     lines work/seen.tsv new | tail -n 1 | diff <(printf 'new\tunit\t770\t1\t0\tfailed: unit.A.C\n') -
     grep -q '^everywhere: new, unit: 1 failed; its log is in .*/work/rows/new$' said
@@ -109,12 +117,36 @@ END
     echo 'run: the tests build failed' >says
     fails everywhere new
     lines work/seen.tsv new | tail -n 1 | diff <(printf 'new\tunit\t0\t1\t0\tfailed: it came to no end\n') -
-    echo 'exit 1' >bin/cmake
+    # Levels that were not run were not told of, and nothing had failed.
+    printf '#!/bin/sh\nexit 1\n' >bin/cmake
     fails everywhere new
-    lines work/seen.tsv new | cut -f 2-5 | diff <(printf 'build\t0\t1\t0\n') -
+    lines work/seen.tsv new |
+      diff <(printf 'new\tbuild\t0\t1\t0\t\nnew\tunit\t0\t1\t0\tfailed: it came to no end\n') -
     echo 'in_debian() { return 1; }' >>tests/support/debian.sh
+    fails everywhere new mine
+    lines work/seen.tsv new | diff <(printf 'new\t%s\t0\t1\t0\tfailed: it came to no end\n' build unit) -
+    lines work/seen.tsv mine | diff <(printf 'mine\t%s\t0\t1\t0\tfailed: it came to no end\n' demo test) -
+    ;;
+  empty) # A level whose tests were all skipped has shown nothing, and was taken for one that passed.
+    sed -i 's/771 passed/  0 passed/' says
     fails everywhere new
-    lines work/seen.tsv new | diff <(printf 'new\tbuild,unit\t0\t1\t0\tfailed: nothing was run\n') -
+    grep -q '^everywhere: new, unit: 0 failed; its log is in ' said
+    ;;
+  without) # The rows behind one whose system could not be made were not run.
+    # shellcheck disable=SC2016  # for the shell there
+    echo 'debian_root() { [[ $3 == trixie ]]; }' >>tests/support/debian.sh
+    fails everywhere old new
+    lines work/seen.tsv old | diff <(printf 'old\t%s\t0\t1\t0\tfailed: there is no system for it\n' build unit) -
+    lines work/seen.tsv new | cut -f 2-5 | diff <(printf 'build\t1\t0\t0\nunit\t771\t0\t2\n') -
+    ;;
+  interrupted) # What a row had come to until then took the place of its result.
+    everywhere -k old
+    cp tests/everywhere/seen.tsv before
+    # shellcheck disable=SC2016  # for the shells there
+    echo 'in_debian() { bash -c '\''kill -INT "$PPID"; exit 130'\''; }' >>tests/support/debian.sh
+    env --default-signal=INT tests/everywhere/everywhere "$house/work" -k old new >out 2>said || status=$?
+    [[ $status -eq 130 ]]
+    diff before tests/everywhere/seen.tsv
     ;;
   unknown)
     fails everywhere next

@@ -13,10 +13,10 @@ IFS=, read -ra levels <<<"$3"
 directory=$4
 readonly cc cxx options levels directory
 
-# Whatever the compiler is asked for comes after what the build asks for by itself.
+# Whatever the compiler is asked for comes after what the build asks for by itself, which is CMake's for its build type.
 configure() { # PRESET
-  local flags=()
-  [[ $options == - ]] || flags=(-DCMAKE_C_FLAGS_RELWITHDEBINFO="$options" -DCMAKE_CXX_FLAGS_RELWITHDEBINFO="$options"
+  local all="-O2 -g -DNDEBUG $options" flags=()
+  [[ $options == - ]] || flags=(-DCMAKE_C_FLAGS_RELWITHDEBINFO="$all" -DCMAKE_CXX_FLAGS_RELWITHDEBINFO="$all"
     -DMERO_LIBRARY_OPTIONS="$options")
   cmake --preset "$1" -DCMAKE_C_COMPILER="$cc" -DCMAKE_CXX_COMPILER="$cxx" "${flags[@]}"
 }
@@ -25,12 +25,11 @@ result() { # LEVEL PASSED FAILED SKIPPED SECONDS NOTES
   (IFS=$'\t' && echo "$*") >>"$directory/results"
 }
 
-# What is known of tests that failed or were skipped, by what ./run says.
-notes() { # LOG
-  {
-    sed -nE 's/^\s+[0-9]+ - (\S+) \((Failed|Timeout|SEGFAULT|Not Run|.*aborted.*)\)$/failed: \1/p; s/^not ok /failed: /p' "$1"
-    sed -n '/^skipped: /p' "$1"
-  } | sort -u | paste --serial --delimiters='|'
+# What is known of the tests of a level that failed or were skipped, by what ./run says while it tests that.
+notes() { # LOG LEVEL
+  sed -n "/^testing ($2)\$/,/^testing (/p" "$1" |
+    sed -nE 's/^\s+[0-9]+ - (\S+) \((Failed|Timeout|SEGFAULT|Not Run|.*aborted.*)\)$/failed: \1/p; s/^not ok /failed: /p
+      /^skipped: /p' | sort -u | paste --serial --delimiters='|'
 }
 
 # The levels that ./run has told of, by its summary; or that it has told of none.
@@ -42,7 +41,7 @@ take_summary() { # LOG LEVEL SECONDS
   fi
   sed -nE 's/^([a-z]+) +([0-9]+) s +([0-9]+) passed +([0-9]+) failed +([0-9]+) skipped$/\1 \2 \3 \4 \5/p' "$1" |
     while read -r level seconds passed failed skipped; do
-      result "$level" "$passed" "$failed" "$skipped" "$seconds" "$(notes "$1")"
+      result "$level" "$passed" "$failed" "$skipped" "$seconds" "$(notes "$1" "$level")"
     done
 }
 
@@ -74,9 +73,6 @@ for level in "${levels[@]}"; do
       take_command demo ./run demo || :
       take_tests test
       ;;
-    *)
-      [[ $level != asan ]] || configure asan >"$directory/asan.cmake.log" 2>&1
-      take_tests "$level" "$level"
-      ;;
+    *) take_tests "$level" "$level" ;;
   esac
 done

@@ -1,18 +1,21 @@
 # What was seen of the rows, as a table in Markdown: of the rows, as `rows` has them, and of lines with tabs between
 #
-#   row  level  passed  failed  skipped  seconds  notes  day
+#   row  suite  processor  compilers  options  level  passed  failed  skipped  seconds  notes  day
 #
-# in any order. Notes are what failed and what was skipped, with a bar between two; under the table, each stands once.
+# in any order, with the words that the row had when it was run. Notes are what failed and what was skipped, with a bar
+# between two; under the table, each stands once.
 
 BEGIN { FS = "\t" }
+
+function told_of(suite, processor, compilers, options) {
+	return (suite == "bookworm" ? "Debian 12" : suite == "trixie" ? "Debian 13" : suite) " | " processor " | " \
+		(compilers ~ /clang/ ? "clang" : "gcc") (options == "-" ? "" : " " options)
+}
 
 FNR == NR {
 	split($0, word, " ")
 	names[++count] = word[1]
-	system_of[word[1]] = (word[2] == "bookworm" ? "Debian 12" : word[2] == "trixie" ? "Debian 13" : word[2])
-	processor[word[1]] = word[3]
-	compiler[word[1]] = word[4] ~ /clang/ ? "clang" : "gcc"
-	if (word[5] != "-") compiler[word[1]] = compiler[word[1]] " " word[5]
+	where[word[1]] = told_of(word[2], word[3], word[4], word[5])
 	next
 }
 
@@ -39,14 +42,11 @@ END {
 	print "| --- | --- | --- | --- | --- | --- | --- | --- | --- | --- |"
 	for (r = 1; r <= count; r++) {
 		name = names[r]
-		if (!lines[name]) {
-			printf "| %s | %s | %s | %s | not run yet | - | - | - | - | - |\n", name, system_of[name], processor[name],
-				compiler[name]
-		}
+		if (!lines[name]) printf "| %s | %s | not run yet | - | - | - | - | - |\n", name, where[name]
 		for (l = 1; l <= lines[name]; l++) {
 			split(line[name, l], f, "\t")
-			printf "| %s | %s | %s | %s | %s | %d | %s | %s | %d | %s |\n", name, system_of[name], processor[name],
-				compiler[name], f[2], f[3], told(f[4], f[7], "failed"), told(f[5], f[7], "skipped"), f[6], f[8]
+			printf "| %s | %s | %s | %d | %s | %s | %d | %s |\n", name, told_of(f[2], f[3], f[4], f[5]), f[6], f[7],
+				told(f[8], f[11], "failed"), told(f[9], f[11], "skipped"), f[10], f[12]
 		}
 	}
 	if (note_count) printf "\n"
