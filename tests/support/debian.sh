@@ -16,15 +16,16 @@ debian_suite() {
   (. /etc/os-release && echo "$VERSION_CODENAME")
 }
 
-# The archives that this machine's apt uses, as they are for a suite of Debian's, whatever the architecture, and however
-# the machine's sources call its own: with what these say of how far each is trusted.
+# The archives that this machine's apt uses for the machine's own suite, as they are for a suite of Debian's, whatever the
+# architecture, and however the machine's sources call its own: with what these say of how far each is trusted.
 debian_archives() { # SUITE
-  local archives
+  local archives own
+  own=$(debian_suite)
   # shellcheck disable=SC2016  # the fields are apt's
   archives=$(apt-get indextargets --format '$(SOURCESENTRY) $(REPO_URI) $(CODENAME) $(COMPONENT)' \
-    'Created-By: Packages' 'Origin: Debian' | debian_lines | sed "s/ $(debian_suite)/ $1/" | sort -u)
+    'Created-By: Packages' 'Origin: Debian' | sed -nE "s/^([^ ]+ [^ ]+) $own([- ])/\1 $1\2/p" | debian_lines | sort -u)
   if [[ ! $archives ]]; then
-    echo "this machine's apt has no list of Debian's packages: run apt-get update" >&2
+    echo "this machine's apt has no list of the packages of Debian $own: run apt-get update" >&2
     return 1
   fi
   printf '%s\n' "$archives"
@@ -51,7 +52,7 @@ debian_trust() { # FILE NUMBER
 # How this machine's apt reaches archives, such as through a proxy, and what it asks of them: a setting in each line.
 debian_settings() {
   apt-config dump | awk '/^Acquire::[^"]* ".+";$/ &&
-    !/^Acquire::(cdrom|Changelogs|CompressionTypes|GzipIndexes|IndexTargets|Languages)[: ]/'
+    !/^Acquire::(cdrom|Changelogs|CompressionTypes|GzipIndexes|IndexTargets|Languages|Snapshots)[: ]/'
 }
 
 # All that tells where a system comes from: what is kept is of no use when that has changed.
@@ -59,19 +60,20 @@ debian_origin() { # SUITE
   echo "$1" && debian_archives "$1" && debian_settings
 }
 
-# Its apt has the settings of this machine's.
-make_debian() { # SUITE TARGET [MMDEBSTRAP-OPTION...]
+# Its apt has the settings of this machine's, in which may be the password of a proxy: its archive is the owner's alone.
+make_debian() { # SUITE ARCHIVE|- [MMDEBSTRAP-OPTION...]
   local settings
+  [[ $2 == - ]] || (rm -f "$2" && umask 077 && : >"$2") || return
   mapfile -t settings < <(debian_settings) && wait "$!" || return
   debian_archives "$1" | mmdebstrap --quiet --aptopt='APT::Install-Recommends "false"' "${settings[@]/#/--aptopt=}" \
     --dpkgopt=force-unsafe-io "${@:3}" "$1" "$2" - >&2
 }
 
 # Tells the archive of a system with some packages, which is made if it is not in the directory; another one that had the
-# same name, suite and architectures before is of no use any more. mmdebstrap takes several architectures, with commas
-# between them: the first is the system's own.
+# same name, suite and architectures before is of no use any more then. mmdebstrap takes several architectures, with
+# commas between them: the first is the system's own.
 debian_root() { # DIRECTORY NAME SUITE ARCHITECTURES PACKAGE...
-  local directory=$1 name=$2-$3-$4 suite=$3 architectures=$4 archive include origin
+  local directory=$1 name=$2-$3-$4 suite=$3 architectures=$4 archive include origin other
   shift 4
   include=$(printf '%s\n' "$@" | sort -u | paste --serial --delimiters=,)
   origin=$(debian_origin "$suite") || return
@@ -82,11 +84,11 @@ debian_root() { # DIRECTORY NAME SUITE ARCHITECTURES PACKAGE...
     flock 9
     if [[ ! -e $archive ]]; then
       echo "making a Debian system ($name)" >&2
-      rm -f "$directory/$name"-[0-9]*.tar{,.new}
       # Its apt knows what there is, and can fetch more.
       make_debian "$suite" "$archive.new" --format=tar --variant=minbase --architectures="$architectures" \
         ${include:+"--include=$include"} --skip=cleanup/apt/lists "${debian_lean[@]}" || return
       mv "$archive.new" "$archive"
+      for other in "$directory/$name"-[0-9]*.tar{,.new}; do [[ $other == "$archive" ]] || rm -f "$other"; done
     fi
   } 9>"$directory/$name.lock"
   printf '%s\n' "$archive"

@@ -65,6 +65,19 @@ case $1 in
       '/a.list:2 http://archive bookworm main' '/a.list:3 http://security bookworm-security main'
     debian_archives trixie | diff - <(printf '%s\n' 'deb http://archive trixie main' \
       'deb http://archive trixie-updates main' 'deb http://security trixie-security main')
+    # Lists of another suite that the machine has too went unchanged into the system.
+    apt_knows '/a.list:1 http://archive bookworm main' '/a.list:2 http://archive sid main' \
+      '/a.list:3 http://bookworm/archive sid main'
+    debian_archives trixie | diff - <(echo 'deb http://archive trixie main')
+    ;;
+  foreign) # and where it has no others, the system would have been one of that suite.
+    apt_knows '/a.list:1 http://archive sid main'
+    if debian_archives trixie >"$work/out" 2>"$work/said"; then
+      echo 'there are archives'
+      exit 1
+    fi
+    [[ ! -s $work/out ]]
+    grep -qx "this machine's apt has no list of the packages of Debian bookworm: run apt-get update" "$work/said"
     ;;
   sources) # A machine that called its suite oldstable got no other; what its sources said of trust was lost.
     make_archive "$work/archive" oldstable bookworm
@@ -80,13 +93,16 @@ case $1 in
       echo "deb [trusted=yes] file:$work/security/ trixie-security main"
     )
     ;;
-  settings) # A machine that reaches archives through a proxy alone made no system.
+  settings) # A machine that reaches archives through a proxy alone made no system. Those of apt 3 are its own affair.
     apt_knows '/a.list:1 http://archive bookworm main'
     apt_is_that_of "$work/apt"
     printf '%s\n' 'Acquire::http::Proxy "http://proxy:3142";' 'Acquire::Check-Valid-Until "false";' \
-      'Acquire::Languages "none";' 'APT::Get::Assume-Yes "true";' >"$work/apt/etc/apt/apt.conf.d/50ours"
+      'Acquire::Languages "none";' 'APT::Get::Assume-Yes "true";' \
+      'Acquire::Snapshots::URI::Override::Label::Debian "https://snapshots/";' >"$work/apt/etc/apt/apt.conf.d/50ours"
     mmdebstrap() { cat >/dev/null && printf '%s\n' "$@" | grep Acquire | sort >"$work/settings"; }
     make_debian trixie "$work/system"
+    # Others could read the password of a proxy in it.
+    [[ $(stat -c %a "$work/system") == 600 ]]
     diff "$work/settings" - <<'END'
 --aptopt=Acquire::AllowDowngradeToInsecureRepositories "0";
 --aptopt=Acquire::AllowInsecureRepositories "0";
@@ -120,6 +136,10 @@ END
     debian_settings() { echo 'Acquire::http::Proxy "http://proxy:3142";'; }
     fourth=$(debian_root "$work/kept" small bookworm amd64 one)
     [[ $third != "$second" && $fourth != "$third" ]]
+    # One that could not be made took the last one along.
+    make_debian() { return 1; }
+    if debian_root "$work/kept" small bookworm amd64 three; then exit 1; fi
+    [[ -e $fourth ]]
     ;;
   entered)
     needs_root
