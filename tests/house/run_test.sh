@@ -196,11 +196,17 @@ case $1 in
   everywhere)
     run everywhere -k new
     expect_calls 'everywhere build/everywhere -k new'
-    expect_packages e2fsprogs mmdebstrap
+    expect_packages e2fsprogs git mmdebstrap
     sort build/everywhere/packages | grep -qx 'any cmake'
     grep -qx 'amd64 qemu' build/everywhere/packages
     grep -qx 'lib/unit.cpp' build/everywhere/files
     [[ $(grep -c '^build/' build/everywhere/files) -eq 0 ]]
+    # Packages were installed for a text that is printed.
+    for option in -h --help -t; do
+      run everywhere "$option"
+      expect_calls "everywhere build/everywhere $option"
+      expect_packages
+    done
     ;;
   skipped) # That a test was skipped was told, and not why.
     command_from bin/ctest <<'END'
