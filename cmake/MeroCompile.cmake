@@ -1,8 +1,10 @@
 # Warnings and sanitizers, the same for every target.
-# Not -Wpedantic: messages use syslog's %m. The public headers are compiled with it by their own test.
+# Not -Wpedantic: messages use syslog's %m. The public headers are compiled with it by their own test. What is optimized as
+# a whole is warned of when it is linked.
 add_compile_options(-Wall -Wextra -Wconversion -Wshadow)
 if(MERO_WERROR)
   add_compile_options(-Werror)
+  add_link_options(-Werror)
 endif()
 
 if(MERO_SANITIZE)
