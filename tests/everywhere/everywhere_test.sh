@@ -17,6 +17,7 @@ old   bookworm  i386   gcc,g++        -    build,unit
 new   trixie    amd64  clang,clang++  -O3  build,unit
 mine  trixie    amd64  gcc,g++        -    readme
 safe  trixie    amd64  clang,clang++  -    asan
+arm   bookworm  armhf  arm-linux-gnueabihf-gcc,arm-linux-gnueabihf-g++  -  unit
 END
 printf 'any cmake\nany g++\namd64 lintian\n' >work/packages
 
@@ -46,6 +47,11 @@ echo "run $*" >>"$CALLS"
 cat "$SAYS"
 END
 chmod +x bin/* run
+cat >tests/everywhere/emulated <<'END'
+#!/bin/bash
+echo "emulated with $DEB_HOST_GNU_TYPE by ${CMAKE_TOOLCHAIN_FILE##*/merowireless/}" >>"$CALLS" && exec "$@"
+END
+chmod +x tests/everywhere/emulated
 tar --create --file work/source.tar run tests
 export PATH=$house/bin:$PATH CALLS=$house/calls SAYS=$house/says
 
@@ -93,6 +99,26 @@ END
         $'style\t6\t0\t0\t') -
     diff - calls <<<$'run demo\nrun test'
     grep -q ' newcomer trixie amd64 ca-certificates git$' work/roots
+    ;;
+  emulated)
+    printf 'any %s\n' gcc-multilib libc++-dev libcli11-dev libnl-genl-3-dev pkg-config >>work/packages
+    everywhere arm
+    head -n 1 calls | grep -qx 'emulated with arm-linux-gnueabihf by cmake/cross.cmake'
+    grep -qx 'run test unit' calls
+    # What is linked is for that processor, and what is run for this machine's.
+    for package in crossbuild-essential-armhf cmake libc++-dev libcli11-dev libnl-genl-3-dev:armhf pkg-config:armhf; do
+      sed 's/$/ /' work/roots | grep -qF " $package "
+    done
+    grep -q "^[^ ]* tests bookworm $(dpkg --print-architecture),armhf " work/roots
+    fails grep -q multilib work/roots
+    ;;
+  impossible)
+    cp "$source/tests/everywhere/possible" tests/everywhere
+    echo 'Calls.* the emulator has calls of its own' >tests/everywhere/not-emulated
+    tests/everywhere/possible echo --gtest_filter=Calls.OfASave | diff - <(
+      printf '%s\n' '[  SKIPPED ] Calls.OfASave' 'the emulator has calls of its own')
+    [[ $(tests/everywhere/possible echo --gtest_filter=Files.Are) == --gtest_filter=Files.Are ]]
+    [[ $(tests/everywhere/possible echo --gtest_list_tests) == --gtest_list_tests ]]
     ;;
   kept)
     everywhere -k old

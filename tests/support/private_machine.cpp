@@ -12,6 +12,8 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
+#include <limits>
 #include <string>
 
 namespace {
@@ -76,12 +78,24 @@ void EnterNamespaces() {
   WriteTo("/proc/self/gid_map", "0 " + std::to_string(gid) + " 1");
 }
 
+// Whether root is root of the machine, and not of a namespace of users alone.
+bool IsRootOfAll() {
+  unsigned inside = 0;
+  unsigned outside = 0;
+  unsigned users = 0;
+  std::ifstream("/proc/self/uid_map") >> inside >> outside >> users;
+  return users == std::numeric_limits<unsigned>::max();
+}
+
+// What an overlay notes of directories that are removed or renamed, it may note for a namespace of users in attributes
+// that are anyone's alone.
 void MakeWritable(const std::string& name) {
   const std::string upper = kUpper + "/" + name;
   const std::string work = upper + ".work";
   MakeDirectory(upper);
   MakeDirectory(work);
-  Mount("overlay", "/" + name, "lowerdir=/" + name + ",upperdir=" + upper + ",workdir=" + work);
+  static const std::string kNotes = IsRootOfAll() ? "" : ",userxattr";
+  Mount("overlay", "/" + name, "lowerdir=/" + name + ",upperdir=" + upper + ",workdir=" + work + kNotes);
 }
 
 // What an appliance that is installed on the machine outside keeps.
