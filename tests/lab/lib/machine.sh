@@ -42,6 +42,7 @@ reboots() {
   say 'the machine: starts again'
   journalctl --boot --output short-monotonic >"$LOGS/journal.${PART#boot_}"
   touch /run/lab/reboot
+  rm /var/lib/lab/started
   systemctl reboot --no-block
 }
 
