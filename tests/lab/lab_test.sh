@@ -177,6 +177,26 @@ STUB
     if (joins -o "$scratch/kept" open) 2>/dev/null; then exit 1; fi
     [[ $(<"$scratch/kept") == seen ]]
     ;;
+  journal) # It was quiet when it could not be read, or when a scenario knew no warnings.
+    PART=''
+    shopt -s inherit_errexit # as in the machine
+    # shellcheck source=tests/lab/lib/machine.sh
+    . "$lab/lib/machine.sh"
+    expect_same() { [[ $2 == "$3" ]] || exit 3; }
+    journalctl() { printf '%s\n' "${lines[@]}"; }
+    quiet() { # prints the status that looking at the journal ends with
+      local status=0
+      (expect_quiet_journal) & # where a failure ends it
+      wait $! || status=$?
+      echo "$status"
+    }
+    lines=('Nov 22 12:00:00 kernel: a warning' 'Nov 22 12:00:00 one[1]: two')
+    known_warnings='' && [[ $(quiet) -eq 3 ]]
+    known_warnings='one\[1\]: (two|three)$' && [[ $(quiet) -eq 0 ]]
+    lines=('') && [[ $(quiet) -eq 0 ]]
+    journalctl() { return 1; }
+    [[ $(quiet) -eq 1 ]]
+    ;;
   *)
     echo "there is no case $1"
     exit 2
