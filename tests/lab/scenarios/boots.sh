@@ -141,10 +141,14 @@ boot_3() {
   expect_quiet_journal
   apt remove merowireless merowireless-appliance libmerowireless-core1
   expect_same 'the daemons after the removal' '' "$(daemons)"
-  expect_same 'the rules after the removal' '' "$(nft list ruleset)"
-  expect_same 'the bridges after the removal' '' "$(ip -brief link show type bridge)"
-  expect_same 'the units after the removal' '' "$(systemctl list-units --plain --no-legend 'mero-*')"
-  expect_same 'the units that have failed' '' "$(systemctl --failed --no-legend)"
+  on nas nft list ruleset
+  expect_same 'the rules after the removal' '' "$OUTPUT"
+  on nas ip -brief link show type bridge
+  expect_same 'the bridges after the removal' '' "$OUTPUT"
+  on nas systemctl list-units --plain --no-legend 'mero-*'
+  expect_same 'the units after the removal' '' "$OUTPUT"
+  on nas systemctl --failed --no-legend
+  expect_same 'the units that have failed' '' "$OUTPUT"
   expect_quiet_journal
 }
 
