@@ -21,8 +21,8 @@ program apt-get 'echo "$WORK/sources.list:1 http://archive.example/ bookworm mai
 program apt-config ''
 program dpkg-deb 'echo "busybox, $(cat "$WORK/dependency")"'
 program mmdebstrap 'cat >/dev/null; for word; do [[ $word != *.new ]] || target=$word; done
-  [[ ! -e $target ]] || echo "two runs make $target" >&2
-  echo made >>"$WORK/made"; sleep 0.2; mkdir -p "${target%/*}"; : >"$target"'
+  [[ ! -s $target ]] || echo "two runs make $target" >&2
+  echo made | tee -a "$WORK/made" >"$target"; sleep 0.2'
 for name in setpriv unshare; do program "$name" 'echo "$0 $*" >>"$WORK/entered"; ls "$TMPDIR" >>"$WORK/in-tmp"'; done
 
 look() {
