@@ -92,7 +92,7 @@ boot_2() {
   apt remove merowireless merowireless-appliance libmerowireless-core1
   expect_same 'the daemons after the removal' '' "$(daemons)"
   expect_same 'the addresses after the removal' '' "$(ipv4_of nas)"
-  expect_same 'the name servers after the removal' '' "$(</etc/resolv.conf)"
+  [[ ! -s /etc/resolv.conf ]] || fail "name servers are left after the removal: $(</etc/resolv.conf)"
   takes_archive now
   apt install merowireless merowireless-appliance
   within 60 is_joined || fail 'the network is not joined after the next installation'
