@@ -137,7 +137,7 @@ END
     printf '%s\n' 'testing (unit)' 'unit         33 s   770 passed     1 failed     0 skipped' "$(printf '\t 12 - unit.A.C (Failed)')" >says
     fails everywhere new
     lines work/seen.tsv new | tail -n 1 | diff <(printf 'new\tunit\t770\t1\t0\tfailed: unit.A.C\n') -
-    grep -q '^everywhere: new, unit: 1 failed; its log is in .*/work/rows/new$' said
+    grep -q '^everywhere: new, unit: 1 failed; its log is in .*/rows/new$' said
     ;;
   ended)
     echo 'run: the tests build failed' >says
