@@ -42,6 +42,9 @@ mkdir -p lib/modules var/lib/lab
 rm -f usr/sbin/policy-rc.d
 [ ! -e sbin/start-stop-daemon.REAL ] || mv sbin/start-stop-daemon.REAL sbin/start-stop-daemon
 for unit in $IDLE_UNITS; do ln -sf /dev/null "etc/systemd/system/$unit"; done
+# A start would make etc/resolv.conf a link to a file of systemd-resolved's, which runs only where a scenario starts it.
+mkdir -p etc/tmpfiles.d
+ln -s /dev/null etc/tmpfiles.d/systemd-resolve.conf
 # Of the system without what is mounted in it now. The mount here ends with what made it.
 work=$(mktemp -d "$1.XXXXXX")
 trap 'rm -rf "$work"' EXIT
