@@ -21,18 +21,8 @@ esac
 
 work=$(mktemp -d)
 trap 'rm -r "$work"' EXIT
-failures=0
-
-check() { # TEXT COMMAND...
-  local text=$1
-  shift
-  if "$@"; then
-    echo "ok $text"
-  else
-    echo "not ok $text"
-    failures=$((failures + 1))
-  fi
-}
+# shellcheck source=tests/support/checks.sh
+. "$here/../support/checks.sh"
 
 packages() { printf '%s\n' "${names[@]/#/"$directory/"}" | sed "s/\$/_*_$architecture.deb/"; }
 
