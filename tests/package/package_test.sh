@@ -276,18 +276,10 @@ only_settings_are_new() { # [PATTERN]
     <(files | diff "$root/tmp/before" - | sed -nE 's/^[<>] (\S+) .*/\1/p' | grep -vE "${1:-^$}" | sort -u) >&2
 }
 
-# Keys that this machine has of its own for an archive.
-take_keys() { # SOURCES
-  local key
-  { grep -oE 'signed-by=/[^] ,]+' "$1" || :; } | sed 's/.*=//' | sort -u | while read -r key; do
-    [[ -e $root$key ]] || install -D --mode 644 "$key" "$root$key" || exit
-  done
-}
-
 # As whoever runs the machine does it: the answers to questions are those that come first.
 upgrade_system() { # SUITE
   rm -f "$root"/etc/apt/sources.list.d/*
-  debian_archives "$1" >"$root/etc/apt/sources.list" && take_keys "$root/etc/apt/sources.list" &&
+  debian_archives "$1" >"$root/etc/apt/sources.list" && debian_files_for_apt "$root" &&
     quietly inside_online "${apt_get[@]}" update && apt_online -o Dpkg::Options::=--force-confold full-upgrade
 }
 

@@ -94,6 +94,16 @@ debian_root() { # DIRECTORY NAME SUITE ARCHITECTURES PACKAGE...
   printf '%s\n' "$archive"
 }
 
+# Files of this machine's that apt in a system is told of, where the system has none: keys of archives, certificates.
+debian_files_for_apt() { # DIRECTORY
+  local file
+  find "$1/etc/apt" -type f -exec \
+    sed -nE 's/^deb .*[[ ]signed-by=(\/[^] ]+).*/\1/p; s/^Acquire::.*::(CAInfo|SslCert|SslKey) "(\/.*)";$/\2/p' {} + |
+    tr ',' '\n' | sort -u | while read -r file; do
+    if [[ -f $file && ! -e $1$file ]]; then mkdir -p "$1${file%/*}" && cp --preserve=mode "$file" "$1$file" || return; fi
+  done
+}
+
 # Puts a system where a directory is, with what every machine mounts. For a mount namespace of the caller's own: what is
 # written there is in memory, and gone with the namespace.
 mount_debian() { # ARCHIVE DIRECTORY
@@ -107,6 +117,7 @@ mount_debian() { # ARCHIVE DIRECTORY
   ln -sf pts/ptmx "$2/dev/ptmx"
   rm -f "$2/etc/resolv.conf"
   cat /etc/resolv.conf >"$2/etc/resolv.conf"
+  [[ ! -d $2/etc/apt ]] || debian_files_for_apt "$2"
 }
 
 # Runs a command in a system that is mounted somewhere, or that this has become, and tells it nothing of the caller.

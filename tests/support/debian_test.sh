@@ -141,6 +141,24 @@ END
     if debian_root "$work/kept" small bookworm amd64 three; then exit 1; fi
     [[ -e $fourth ]]
     ;;
+  files) # An archive with a key of its own was there when the system was made, and unknown within.
+    mkdir -p "$work"/system/etc/apt/apt.conf.d "$work/own"
+    for name in key second authority secret kept; do echo "our $name" >"$work/own/$name"; done
+    chmod 600 "$work/own/secret"
+    printf '%s\n' "deb [trusted=yes signed-by=$work/own/key,$work/own/second,$work/own/kept] http://archive trixie main" \
+      "deb [signed-by=$work/own/none] http://archive trixie main" '# signed-by=/etc/passwd' \
+      >"$work/system/etc/apt/sources.list"
+    printf '%s\n' "Acquire::https::CAInfo \"$work/own/authority\";" "Acquire::https::archive::SslKey \"$work/own/secret\";" \
+      'Acquire::http::Proxy "http://proxy:3142";' >"$work/system/etc/apt/apt.conf.d/99mmdebstrap"
+    mkdir -p "$work/system$work/own"
+    echo "the system's" >"$work/system$work/own/kept"
+    debian_files_for_apt "$work/system"
+    (cd "$work/system$work/own" && grep -H . ./* | sort && stat -c '%n %a' secret) | diff - <(
+      printf '%s\n' './authority:our authority' "./kept:the system's" './key:our key' './second:our second' \
+        './secret:our secret' 'secret 600'
+    )
+    [[ ! -e $work/system/etc/passwd ]]
+    ;;
   entered)
     needs_root
     make_small_system
