@@ -72,8 +72,11 @@ missing_packages() {  # PACKAGE...
 }
 
 # Nothing is installed: no daemon starts here, and no setting of the host's changes.
-fetch_peers() {  # PACKAGE...
-  local new=$unpacked.new package missing
+fetch_peers() (  # PACKAGE...
+  new=$unpacked.new
+  mkdir -p "$work"
+  exec 9>"$unpacked.lock"
+  flock 9
   missing=$(missing_packages "$@") || exit
   [[ ! -f $unpacked/missing || $(<"$unpacked/packages") != "$*" || $(<"$unpacked/missing") != "$missing" ]] || return 0
   rm -rf "$new"
@@ -92,7 +95,7 @@ fetch_peers() {  # PACKAGE...
   printf '%s' "$missing" >"$new/missing"
   rm -rf "$unpacked"
   mv "$new" "$unpacked"
-}
+)
 
 fetch_all_peers() {
   # shellcheck disable=SC2046  # names are single words

@@ -102,7 +102,7 @@ event_of() {  # KEY
 # ---- The race ----------------------------------------------------------------------------------------------------------
 
 race() {
-  local rounds=3 output='' events airs bands names limit outcome known
+  local rounds=3 output='' figures=$work/logs/race/figures.tsv events airs bands names limit outcome known
   local -a words=()
   known="join ap alone eight 2.4 5 $(peers | xargs)"
   while (($#)); do
@@ -131,11 +131,13 @@ race() {
   # shellcheck disable=SC2086
   limit=$((300 + 240 * rounds * $(wc -w <<<"$events") * $(wc -w <<<"$airs") * $(wc -w <<<"$bands") * $(wc -w <<<"$names")))
   run_script race "$lab/race/race.sh" $limit cat
+  # What was measured until a machine came to grief is kept, too.
+  [[ ! $output || ! -e $figures ]] || cp "$figures" "$output"
   [[ $outcome == PASS ]] || die "the race: $outcome; its logs are in $work/logs/race"
   # shellcheck disable=SC2086  # names of contenders are single words
-  sizes $names >>"$work/logs/race/figures.tsv"
-  [[ ! $output ]] || cp "$work/logs/race/figures.tsv" "$output"
-  tables "$work/logs/race/figures.tsv"
+  sizes $names >>"$figures"
+  [[ ! $output ]] || cp "$figures" "$output"
+  tables "$figures"
 }
 
 tables() {  # FIGURES
