@@ -116,6 +116,16 @@ boot_3() {
   joins_hall phone
   expect_quiet_journal
 
+  say '-- its timer has it follow its schedule, at the change of the hour'
+  off_in_the_next_hour >/var/lib/lab/hours
+  on nas merowireless ap set --wifi-sched /var/lib/lab/hours
+  nears_the_next_hour
+  within 15 is_off_the_air || fail 'the access point is on the air at an hour that its schedule has it off'
+  nears_the_next_hour
+  within 15 serves_by_itself || fail 'the access point is not on the air at an hour that its schedule has it on'
+  within 60 station nas phone || fail 'the phone does not come back'
+  expect_quiet_journal
+
   say '-- an upgrade leaves it on the air'
   local before
   before=$(daemons)
@@ -162,6 +172,21 @@ answers() {  # ADDRESS
 
 serves_by_itself() {
   [[ $(hostapd_cli -p /var/run/hostapd -i wlan0 status 2>/dev/null) == *state=ENABLED* ]]
+}
+
+is_off_the_air() {
+  [[ $(</sys/class/net/wlan0/operstate) == down ]]
+}
+
+# A schedule has a digit for each hour of the week.
+off_in_the_next_hour() {
+  local day hour
+  read -r day hour < <(date '+%w %-H')
+  printf '%0168d' 0 | tr 0 1 | sed "s/./0/$(((day * 24 + hour + 1) % 168 + 1))"
+}
+
+nears_the_next_hour() {
+  date --set "$(date '+%F %H'):59:57" | show
 }
 
 # What runs of the access point, or the client.
