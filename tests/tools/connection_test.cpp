@@ -414,17 +414,17 @@ TEST_F(Connection, ThatIsWatchedIsNoLongerWhenNobodyReadsOn) {
   int sockets[2];
   ASSERT_EQ(::pipe(pipe), 0);
   ASSERT_EQ(::socketpair(AF_UNIX, SOCK_STREAM, 0, sockets), 0);
-  for (const auto& [reader, writer] : {std::pair(pipe[0], pipe[1]), std::pair(sockets[0], sockets[1])}) {
-    const auto writeThere = [reader = reader, writer = writer] {
+  for (const auto& ends : {std::pair(pipe[0], pipe[1]), std::pair(sockets[0], sockets[1])}) {
+    const auto writeThere = [ends] {
       ::signal(SIGPIPE, SIG_IGN);
-      ::dup2(writer, STDOUT_FILENO);
-      for (int end : {reader, writer}) ::close(end);
+      ::dup2(ends.second, STDOUT_FILENO);
+      for (int end : {ends.first, ends.second}) ::close(end);
     };
     const StartedTool tool({"watch"}, {.before = writeThere});
-    ::close(writer);
+    ::close(ends.second);
     char shown[4096];
-    EXPECT_GT(::read(reader, shown, sizeof shown), 0) << "and nothing is left, which would be an error of its own";
-    ::close(reader);
+    EXPECT_GT(::read(ends.first, shown, sizeof shown), 0) << "and nothing is left, which would be an error of its own";
+    ::close(ends.first);
     EXPECT_TRUE(EndsSoon(tool));
   }
 }
