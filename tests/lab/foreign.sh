@@ -3,7 +3,9 @@
 # shellcheck shell=bash
 # shellcheck disable=SC2034,SC2154  # what `lab` uses and sets
 
-readonly foreign_needs=(busybox=busybox mmdebstrap=mmdebstrap qemu-system-aarch64=qemu-system-arm readelf=binutils)
+foreign_needs=(busybox=busybox mmdebstrap=mmdebstrap qemu-system-aarch64=qemu-system-arm readelf=binutils)
+[[ $EUID -eq 0 ]] || foreign_needs+=(newuidmap=uidmap) # for mmdebstrap
+readonly -a foreign_needs
 
 # The packages were unpacked, and none of their scripts was run: what these would have made, as far as it is needed.
 complete_system() {  # DIRECTORY
@@ -27,7 +29,7 @@ make_system() (
   mkdir -p "$system.new"
   make_debian "$suite" "$system.tar" --variant=extract --architectures="$arch" --include='?essential' \
     --include="$(system_includes)" "${debian_lean[@]}" --hook-dir=/usr/share/mmdebstrap/hooks/merged-usr ||
-    die "a Debian system ($suite, $arch) cannot be unpacked: the archives of this machine's apt have to be within reach"
+    die "a Debian system ($suite, $arch) cannot be unpacked, of the archives of this machine's apt: what mmdebstrap says is above"
   tar -x -C "$system.new" --exclude='./dev/*' -f "$system.tar"
   complete_system "$system.new"
   mv "$system.new" "$system"

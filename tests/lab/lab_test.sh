@@ -151,13 +151,14 @@ STUB
     apt-get() {
       case $* in
         *' install '*) [[ $version ]] && echo "Inst one ($version Debian:12 [amd64])" ;;
-        *) echo "${!#}" >>"$scratch/fetched" && touch one.deb ;;
+        *) echo "${!#}" >>"$scratch/fetched" && sleep 0.3 && touch one.deb ;;
       esac
     }
     dpkg-deb() { tar -c --files-from /dev/null; }
     version=1
+    fetch_peers one two 2>/dev/null & # two at once unpacked into one directory
     fetch_peers one two 2>/dev/null
-    fetch_peers one two
+    wait $!
     version=''
     status=0
     (fetch_peers one && :) 2>/dev/null || status=$?
@@ -166,15 +167,15 @@ STUB
     fetch_peers one two 2>/dev/null
     [[ $(xargs <"$scratch/fetched") == 'one=1 one=2' ]]
     ;;
-  joins) # An hour's attempts were lost with the machine.
+  joins | race) # An hour's attempts, or measurements, were lost with the machine.
     # shellcheck source=tests/lab/peers.sh
     . "$lab/peers.sh"
-    # shellcheck source=tests/lab/joins/host.sh
-    . "$lab/joins/host.sh"
+    # shellcheck source=/dev/null
+    . "$lab/$1/host.sh"
     prepare() { :; }
     fetch_all_peers() { :; }
-    run_script() { outcome=killed && mkdir -p "$work/logs/joins" && echo seen >"$work/logs/joins/cells.tsv"; }
-    if (joins -o "$scratch/kept" open) 2>/dev/null; then exit 1; fi
+    run_script() { outcome=killed && mkdir -p "$work/logs/$1" && echo seen | tee "$work/logs/$1"/{cells,figures}.tsv; }
+    if ("$1" -o "$scratch/kept" 2.4) >/dev/null 2>&1; then exit 1; fi
     [[ $(<"$scratch/kept") == seen ]]
     ;;
   journal) # It was quiet when it could not be read, or when a scenario knew no warnings.

@@ -8,8 +8,11 @@
 
 readonly packages=$build/packages${foreign:+-$foreign}
 
-# What the lab needs of the host for such a machine, besides its other needs.
-readonly -a debian_needs=(dpkg-scanpackages=dpkg-dev mke2fs=e2fsprogs mmdebstrap=mmdebstrap)
+# What the lab needs of the host for such a machine, besides its other needs. Who is not root makes a system in a
+# namespace of users.
+debian_needs=(dpkg-scanpackages=dpkg-dev mke2fs=e2fsprogs mmdebstrap=mmdebstrap)
+[[ $EUID -eq 0 ]] || debian_needs+=(newuidmap=uidmap)
+readonly -a debian_needs
 
 # Besides what our packages depend on. The lab's own programs in it need some of these.
 readonly -a system_packages=(busybox dbus kmod libnl-genl-3-200 systemd-resolved systemd-sysv udev wireless-regdb)
@@ -63,7 +66,7 @@ make_disk() (  # SUITE DISK
   rm -f "$work/$1"-[0-9]*.disk{,.new,.sparse}
   IDLE_UNITS=${idle_units[*]} make_debian "$1" - --format=null --variant=minbase --include="$include" "${debian_lean[@]}" \
     --customize-hook="$(finishing)" --customize-hook="download /disk '$new'" ||
-    die "a Debian system ($1) cannot be made: its archives are those of this machine's apt, which have to be within reach"
+    die "a Debian system ($1) cannot be made, of the archives of this machine's apt: what mmdebstrap says is above"
   cp --sparse=always "$new" "$sparse"
   mv "$sparse" "$2"
 )
