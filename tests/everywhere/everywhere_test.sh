@@ -9,7 +9,7 @@ trap 'rm -r "$house"' EXIT
 cd "$house"
 
 mkdir -p bin docs tests/everywhere tests/support work
-cp "$source"/tests/everywhere/{everywhere,row.sh,table.awk} tests/everywhere
+cp "$source"/tests/everywhere/{everywhere,row.sh,systems.sh,table.awk} tests/everywhere
 echo "The page's own words." >docs/everywhere.md
 cat >tests/everywhere/rows <<'END'
 # a comment
