@@ -9,7 +9,7 @@ Status EndDhcpClient(const char* szIfName) {
   Status status = EndDaemon(InterfacePath(kDhcpClientPidFormat, szIfName).c_str(), kDhcpClientProgram);
   if (!status.ok()) return status;
   const char* const argv[] = {kLeaseScript, "left", szIfName, nullptr};
-  Result<int> exitStatus = RunProgram(argv, Standard::kNull);
+  const Result<int> exitStatus = RunProgram(argv, Standard::kNull);
   // The script reports what it cannot take back. The next network can be joined all the same.
   return exitStatus.error() == ENOENT ? Status::Ok() : exitStatus.status();
 }

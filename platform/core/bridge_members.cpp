@@ -56,7 +56,7 @@ int PLIBNetBridgeSlaveEnum(const char* szBridge, PPLIBSZLIST* ppslList) {
   if (szBridge == nullptr || ppslList == nullptr || *ppslList == nullptr) return REFUSE_NULL(), -1;
   PLIBSZLIST& list = **ppslList;
   const int before = list.nItem;
-  if (Status status = AppendMembers(szBridge, list); !status.ok()) {
+  if (const Status status = AppendMembers(szBridge, list); !status.ok()) {
     return FAIL(status.error(), "Failed to list the members of %s", szBridge), -1;
   }
   return list.nItem - before;

@@ -45,19 +45,19 @@ int MEROWirelessNetworkDisconnect(void) {
   const char* szIfName = MEROWirelessInterfaceGet();
   int failures = 0;
   // Daemons first: they would join and address the interface again.
-  if (Status status = EndDaemon(kSupplicantPidPath, "wpa_supplicant"); !status.ok()) {
+  if (const Status status = EndDaemon(kSupplicantPidPath, "wpa_supplicant"); !status.ok()) {
     ++failures, FAIL(status.error(), "Failed to end the supplicant of %s", szIfName);
   }
-  if (Status status = EndDhcpClient(szIfName); !status.ok()) {
+  if (const Status status = EndDhcpClient(szIfName); !status.ok()) {
     ++failures, FAIL(status.error(), "Failed to end the DHCP client of %s", szIfName);
   }
-  if (Status status = adapter ? LeaveNetwork(szIfName) : Status::Ok(); !status.ok()) {
+  if (const Status status = adapter ? LeaveNetwork(szIfName) : Status::Ok(); !status.ok()) {
     ++failures, FAIL(status.error(), "Failed to leave the network of %s", szIfName);
   }
-  if (Status status = adapter ? RemoveAddresses(szIfName) : Status::Ok(); !status.ok()) {
+  if (const Status status = adapter ? RemoveAddresses(szIfName) : Status::Ok(); !status.ok()) {
     ++failures, FAIL(status.error(), "Failed to remove the addresses of %s", szIfName);
   }
-  if (Status status = ForgetRecord(); !status.ok()) {
+  if (const Status status = ForgetRecord(); !status.ok()) {
     ++failures, FAIL(status.error(), "Failed to forget the connection of %s", szIfName);
   }
   return failures == 0 ? 0 : -1;

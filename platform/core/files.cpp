@@ -18,7 +18,7 @@ Status Create(const char* szPath) {
     if (Status status = RemoveOrMoveAside(szPath); !status.ok()) return status;
   }
   constexpr int kFlags = O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK;
-  Descriptor file(::open(szPath, kFlags | O_EXCL, 0600));
+  const Descriptor file(::open(szPath, kFlags | O_EXCL, 0600));
   if (file.valid()) return Status::Of(::fchmod(file.get(), 0600));  // whatever the umask
   if (errno != EEXIST) return Status::Failed(errno);
   if (IsShared(szPath)) return IsForeign(szPath) ? Status::Failed(kForeign) : Status::Ok();
@@ -39,7 +39,9 @@ int PLIBCFileExist(const char* szPath) {
 int PLIBCFileTouch(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
   if (PLIBCFileExist(szPath) != 0) return 0;
-  if (Status status = Create(szPath); !status.ok()) return FAIL(status.error(), "Failed to create %s", szPath), -1;
+  if (const Status status = Create(szPath); !status.ok()) {
+    return FAIL(status.error(), "Failed to create %s", szPath), -1;
+  }
   return 0;
 }
 

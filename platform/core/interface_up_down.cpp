@@ -21,7 +21,7 @@ int PLIBNetIfUp(const char* szIfName) {
   if (szIfName == nullptr) return REFUSE_NULL(), 0;
   Result<Radio> radio = Radio::OfAdapter(szIfName);
   const bool scans = radio.ok() && IsIdleClient(*radio);
-  if (Status status = SetInterfaceUp(szIfName, true); !status.ok()) {
+  if (const Status status = SetInterfaceUp(szIfName, true); !status.ok()) {
     return FAIL(status.error(), "Failed to bring up %s", szIfName), 0;
   }
   if (scans && !radio->KnowsNetworks()) (void)radio->Scan();
@@ -30,7 +30,7 @@ int PLIBNetIfUp(const char* szIfName) {
 
 int PLIBNetIfDown(const char* szIfName) {
   if (szIfName == nullptr) return REFUSE_NULL(), 0;
-  if (Status status = SetInterfaceUp(szIfName, false); !status.ok()) {
+  if (const Status status = SetInterfaceUp(szIfName, false); !status.ok()) {
     return FAIL(status.error(), "Failed to take down %s", szIfName), 0;
   }
   return 1;

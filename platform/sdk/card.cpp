@@ -54,10 +54,10 @@ int SetStatic(const NETINFO& netInfo) {
   const std::optional<Subnet> subnet = SubnetOf(netInfo);
   if (!subnet) return PLIBCErrSet(ERR_BAD_PARAMETERS), -1;
   // A DHCP client that stayed would put its own address back.
-  if (Status status = EndDhcpClient(netInfo.szInterface); !status.ok()) {
+  if (const Status status = EndDhcpClient(netInfo.szInterface); !status.ok()) {
     return FAIL(status.error(), "Failed to end the DHCP client of %s", netInfo.szInterface), -1;
   }
-  if (Status status = Apply(netInfo.szInterface, *subnet); !status.ok()) {
+  if (const Status status = Apply(netInfo.szInterface, *subnet); !status.ok()) {
     return FAIL(status.error(), "Failed to address %s", netInfo.szInterface), -1;
   }
   return WriteStatic(netInfo) ? 0 : -1;
@@ -65,7 +65,7 @@ int SetStatic(const NETINFO& netInfo) {
 
 // The DHCP client has set the address, or will.
 int SetDhcp(const NETINFO& netInfo) {
-  if (Status status = SetInterfaceUp(netInfo.szInterface, true); !status.ok()) {
+  if (const Status status = SetInterfaceUp(netInfo.szInterface, true); !status.ok()) {
     return FAIL(status.error(), "Failed to bring up %s", netInfo.szInterface), -1;
   }
   return WriteDhcp(netInfo) ? 0 : -1;

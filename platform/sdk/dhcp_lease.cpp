@@ -89,7 +89,7 @@ Status LeaseAnew(NETINFO& netInfo, int seconds) {
 
 int MEROIGetDHCPTestNetInfo(PNETINFO pNetInfo, int seconds) {
   if (pNetInfo == nullptr) return REFUSE_NULL(), -1;
-  if (Status status = LeaseAnew(*pNetInfo, seconds); !status.ok()) {
+  if (const Status status = LeaseAnew(*pNetInfo, seconds); !status.ok()) {
     return FAIL(status.error(), "Failed to lease an address for %s", pNetInfo->szInterface), -1;
   }
   return 0;

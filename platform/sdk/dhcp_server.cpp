@@ -220,7 +220,7 @@ bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
 // The switch is written last, so that no server is switched on before its other settings are there.
 bool WriteFiles(const MERO_DHCPD_CONF& conf, bool enable) {
   const InterfacePath path(kDhcpConfFormat, conf.szInterface, conf.szTag);
-  if (Status status = WriteConf(path.c_str(), conf); !status.ok()) {
+  if (const Status status = WriteConf(path.c_str(), conf); !status.ok()) {
     return FAIL(status.error(), "Failed to write %s", path.c_str()), false;
   }
   return WriteAutoTime(conf) && WriteSwitch(conf, enable);

@@ -12,7 +12,7 @@ constexpr char kLineFormat[] = "%s=%s\n";
 // A stock machine has no such directories.
 bool MakeDirectories() {
   for (const char* szDirectory : kDirectories) {
-    if (Status status = MakeDirectory(szDirectory); !status.ok()) {
+    if (const Status status = MakeDirectory(szDirectory); !status.ok()) {
       return FAIL(status.error(), "Failed to make %s", szDirectory), false;
     }
   }

@@ -22,7 +22,7 @@ int Status(Exit exit) {
 // A file that is opened later must not get the number of a standard descriptor that is closed. The directions are the
 // wrong ones on purpose: using such a descriptor fails as it did.
 void FillStandardDescriptors() {
-  for (int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+  for (const int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
     if (::fcntl(fd, F_GETFD) < 0) Require(::open("/dev/null", fd == STDIN_FILENO ? O_WRONLY : O_RDONLY), "/dev/null");
   }
 }

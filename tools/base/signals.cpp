@@ -17,10 +17,10 @@ bool IsIgnored(int signal) {
 sigset_t EndingSignalsAnd(std::initializer_list<int> others) {
   sigset_t held;
   sigemptyset(&held);
-  for (int signal : {SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
+  for (const int signal : {SIGINT, SIGQUIT, SIGTERM, SIGHUP}) {
     if (!IsIgnored(signal)) sigaddset(&held, signal);
   }
-  for (int signal : others) sigaddset(&held, signal);
+  for (const int signal : others) sigaddset(&held, signal);
   return held;
 }
 

@@ -28,7 +28,7 @@ Start FirstOf(std::string_view text) {
   if (lead < 0xC2 || lead > 0xF4 || text.size() < size) return invalid;
 
   auto code = static_cast<char32_t>(lead & (0x7F >> size));
-  for (char byte : text.substr(1, size - 1)) {
+  for (const char byte : text.substr(1, size - 1)) {
     if ((byte & 0xC0) != 0x80) return invalid;
     code = code << 6 | static_cast<char32_t>(byte & 0x3F);
   }
@@ -78,7 +78,7 @@ std::string Harmless(std::string_view bytes, bool utf8) {
     if (character.bytes == "\\") return std::string("\\\\");
     if (character.shown) return std::string(character.bytes);
     std::string written;
-    for (char byte : character.bytes) written += "\\x" + Hex({&byte, 1});
+    for (const char byte : character.bytes) written += "\\x" + Hex({&byte, 1});
     return written;
   });
 }
@@ -145,7 +145,7 @@ bool IsUtf8(std::string_view bytes) {
 std::string Hex(std::string_view bytes) {
   constexpr std::string_view kDigits = "0123456789abcdef";
   std::string hex;
-  for (char byte : bytes) {
+  for (const char byte : bytes) {
     hex += kDigits[static_cast<unsigned char>(byte) >> 4];
     hex += kDigits[static_cast<unsigned char>(byte) & 0xF];
   }

@@ -69,7 +69,7 @@ std::string InLine(const Character& character) {
   if (character.bytes == "\\") return "\\\\";
   if (character.shown) return std::string(character.bytes);
   std::string octal;
-  for (char byte : character.bytes) {
+  for (const char byte : character.bytes) {
     char szByte[sizeof "\\0033"];
     std::snprintf(szByte, sizeof szByte, "\\0%03o", static_cast<unsigned int>(static_cast<unsigned char>(byte)));
     octal += szByte;

@@ -75,7 +75,7 @@ bool ProcessTree::End() {
   ::kill(-pid_, SIGKILL);  // the rest of its group has had its time
   // A daemon that ends may leave children of its own.
   for (Pids daemons = ChildrenBeside(others_); !daemons.empty(); daemons = ChildrenBeside(others_)) {
-    for (pid_t pid : daemons) EndChild(pid, pid);
+    for (const pid_t pid : daemons) EndChild(pid, pid);
   }
   pid_ = -1;
   return true;
@@ -86,7 +86,7 @@ Descriptor ProcessTree::Watch() const {
 }
 
 void ProcessTree::Reap() const {
-  for (pid_t pid : ChildrenBeside(others_)) {
+  for (const pid_t pid : ChildrenBeside(others_)) {
     if (pid != pid_) ::waitpid(pid, nullptr, WNOHANG);
   }
 }
