@@ -52,7 +52,8 @@ Result<ConnectionRecord> RecordOf(const Radio& radio) {
   if (!mode.ok()) return mode.status();
   Result<std::optional<Bssid>> accessPoint = AccessPointIn(radio, *mode);
   if (!accessPoint.ok()) return accessPoint.status();
-  return *accessPoint ? RecordOfConnectionTo(**accessPoint) : ConnectionRecord{};
+  const std::optional<Bssid>& bssid = *accessPoint;
+  return bssid ? RecordOfConnectionTo(*bssid) : ConnectionRecord{};
 }
 
 // Puts what was found into the answer, or gives the reason why there is none.

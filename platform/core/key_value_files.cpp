@@ -14,7 +14,8 @@ std::optional<std::string_view> ValueIn(std::string_view text, const char* szKey
   if (!place) return std::nullopt;
   Lines line(Slice(text, place->begin, place->end));
   line.Next();
-  return PairOfLine(line.text(), ValueForm::kShell)->value;
+  const std::optional<Pair> pair = PairOfLine(line.text(), ValueForm::kShell);
+  return pair ? std::optional(pair->value) : std::nullopt;
 }
 
 // Reads the value of a key, as a view of the file's text. 1 found, 0 no such key or file, -1 on failure.

@@ -43,8 +43,9 @@ std::string NameOfRules(const std::string& rules) {
 }
 
 Shown ShowInForce(const Country& of, bool) {
-  if (!of.isInForce()) return {"-", Tone::kFaint};
-  if (*of.isInForce()) return {"yes", Tone::kGood};
+  const std::optional<bool> isInForce = of.isInForce();
+  if (!isInForce) return {"-", Tone::kFaint};
+  if (*isInForce) return {"yes", Tone::kGood};
   return {of.rules.radio ? "no: the radio has rules of its own" : "no: the kernel keeps to other rules", Tone::kBad};
 }
 

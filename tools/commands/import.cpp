@@ -176,13 +176,13 @@ bool IsSame(const ApConf& one, const ApConf& other) {
                              [&](const Field<ApConf>& field) { return field.value(one) == field.value(other); });
 }
 
-bool Has(const SettingsDocument& document, std::string_view key) {
-  return std::ranges::any_of(*document.ap, [&](const auto& setting) {
+bool Has(const DocumentedAp& documented, std::string_view key) {
+  return std::ranges::any_of(documented, [&](const auto& setting) {
     return setting.first == key && !std::holds_alternative<std::nullptr_t>(setting.second);
   });
 }
 
-ApPlan PlanForAp(const SettingsDocument& document) {
+ApPlan PlanForAp(const DocumentedAp& documented) {
   if (AdapterModelOrNone().empty()) {
     throw Failure(MEROWirelessAdapterNum() <= 0 ? Exit::kNoAdapter : Exit::kFailed,
                   "the access point's settings are an adapter's, and none has been announced",
@@ -192,10 +192,10 @@ ApPlan PlanForAp(const SettingsDocument& document) {
   const bool wasSaved = ReadSavedAp(before);
   ApPlan plan{.conf = ReadApSettings(), .szChange = kAdded, .szSecret = "", .isChecked = true};
   SetBridgeDefault(plan.conf);
-  SetAp(plan.conf, document);
+  SetAp(plan.conf, documented);
   if (wasSaved) plan.szChange = IsSame(before, plan.conf) ? kSame : kChanged;
-  if (plan.conf.hostapConf.encryption != AP_ENCRYPT_OPEN) plan.szSecret = Has(document, "secret") ? kTaken : kKept;
-  if (Has(document, "channel") || Has(document, "band") || Has(document, "hw_mode")) {
+  if (plan.conf.hostapConf.encryption != AP_ENCRYPT_OPEN) plan.szSecret = Has(documented, "secret") ? kTaken : kKept;
+  if (Has(documented, "channel") || Has(documented, "band") || Has(documented, "hw_mode")) {
     plan.isChecked = CheckChannel(plan.conf) == ChannelCheck::kPassed;
   }
   return plan;
@@ -286,7 +286,7 @@ void Import(const Program& program, const SettingsToImport& wanted) {
   std::optional<SettingsChange> change;
   if (!wanted.dryRun && !document.networks.empty()) change.emplace(kKnownNetworksPath);
   const std::vector<NetworkPlan> plans = PlanFor(document);
-  const std::optional<ApPlan> ap = document.ap ? std::optional(PlanForAp(document)) : std::nullopt;
+  const std::optional<ApPlan> ap = document.ap ? std::optional(PlanForAp(*document.ap)) : std::nullopt;
   if (!wanted.dryRun) WriteAll(change ? &*change : nullptr, plans, ap);
   const std::vector<Imported> imported = Report(plans, ap);
   program.output.List<Imported>("imported", kFields, imported, "");

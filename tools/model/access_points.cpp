@@ -2,6 +2,7 @@
 #include "model/access_points.h"
 
 #include <algorithm>
+#include <exception>
 #include <iterator>
 #include <string_view>
 
@@ -192,14 +193,14 @@ std::vector<Network> Trusted(const SavedNetwork& saved, const std::vector<Networ
 
 void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& trusted,
                   const std::function<void(const KnownNetwork&)>& join) {
-  std::optional<NotLetIn> refusal;
+  std::exception_ptr refusal;
   const auto isJoined = [&](const KnownNetwork& way) {
     try {
       join(way);
       return true;
     } catch (const NotLetIn& failure) {
       if (!failure.IsByStranger(trusted)) throw;
-      refusal = failure;
+      refusal = std::current_exception();
       return false;
     }
   };
@@ -211,7 +212,7 @@ void JoinTrusting(const KnownNetwork& config, const std::vector<Network>& truste
     alone.noneBssid = 0;
     if (isJoined(alone)) return;
   }
-  throw NotLetIn(*refusal);
+  std::rethrow_exception(refusal);
 }
 
 KnownNetwork AsSaved(const SavedNetwork& saved) {

@@ -95,17 +95,17 @@ void FormerConnection::Try(const std::function<void()>& attempt) const {
 void FormerConnection::BringBack() const {
   if (!exists()) return LeaveNothing();
   (void)MEROWirelessNetworkDisconnect();  // what it has not ended is ended by the join, or below
-  if (network_ && Rejoin()) return SayItIsBack();
+  if (network_ && Rejoin(*network_)) return SayItIsBack(*network_);
   const std::string name = program_.output.Name(status_.name);
   Remark("merowireless: the former connection, to " + name + ", could not be brought back");
   LeaveNothing();
 }
 
-bool FormerConnection::Rejoin() const {
+bool FormerConnection::Rejoin(const KnownNetwork& network) const {
   Task task = program_.Doing("going back to " + program_.output.Name(status_.name));
   task.szMarker = kJoinMarkerPath;
   task.undo = LeaveNothing;
-  if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&*network_); }) < 0) return false;
+  if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&network); }) < 0) return false;
   const Status status = ReadStatus();
   return status.state == status_.state && status.name == status_.name;
 }
@@ -120,19 +120,19 @@ bool FormerConnection::PutNameServersBack() const {
 }
 
 // A lease brings its own routes, and those of another one may not fit.
-bool FormerConnection::Readdress() const {
-  if (network_->szIp[0] == '\0') return routes_.PutBack();
+bool FormerConnection::Readdress(const KnownNetwork& network) const {
+  if (network.szIp[0] == '\0') return routes_.PutBack();
   Task task = program_.Doing("going back to the former address");
   task.undo = LeaveNothing;
-  const bool set = Run<int>(task, [&] { return MEROWirelessIfconfigSet(status_.interface.c_str(), *network_); }) == 0;
+  const bool set = Run<int>(task, [&] { return MEROWirelessIfconfigSet(status_.interface.c_str(), network); }) == 0;
   const bool routed = routes_.PutBack();
-  const bool leased = std::string_view(network_->szIp) == "DHCP";
+  const bool leased = std::string_view(network.szIp) == "DHCP";
   return set && (leased ? status_.ip.empty() || !ReadStatus().ip.empty() : routed);
 }
 
-void FormerConnection::SayItIsBack() const {
+void FormerConnection::SayItIsBack(const KnownNetwork& network) const {
   const std::string name = program_.output.Name(status_.name);
-  const bool addressed = Readdress();
+  const bool addressed = Readdress(network);
   if (PutNameServersBack() && addressed) {
     Remark("merowireless: the former connection, to " + name + ", is back");
   } else {

@@ -25,10 +25,10 @@ class FormerConnection {
 
  private:
   void BringBack() const;
-  bool Rejoin() const;
-  bool Readdress() const;
+  bool Rejoin(const KnownNetwork& network) const;
+  bool Readdress(const KnownNetwork& network) const;
   bool PutNameServersBack() const;
-  void SayItIsBack() const;
+  void SayItIsBack(const KnownNetwork& network) const;
 
   const Program& program_;
   Status status_;

@@ -289,7 +289,7 @@ void SetOne(ApConf& conf, const ApSetting& setting, const Value& value) {
   setting.set(conf, text != nullptr ? *text : std::to_string(std::get<std::int64_t>(value)));
 }
 
-std::vector<std::pair<std::string, Value>> ApIn(const Json& record) {
+DocumentedAp ApIn(const Json& record) {
   std::map<std::string, Value> values;
   At(kAccessPoint, [&] {
     if (!record.is_object()) throw Wrong("these are no settings", "they are to be an object");
@@ -306,7 +306,7 @@ std::vector<std::pair<std::string, Value>> ApIn(const Json& record) {
       values[key] = ValueIn(value);
     });
   }
-  std::vector<std::pair<std::string, Value>> ordered;
+  DocumentedAp ordered;
   for (const ApSetting& setting : ApSettings()) {
     const auto found = values.find(std::string(setting.field.key));
     if (found != values.end()) ordered.emplace_back(*found);
@@ -395,8 +395,8 @@ SettingsDocument DocumentIn(const std::string& text) {
   return document;
 }
 
-void SetAp(ApConf& conf, const SettingsDocument& document) {
-  for (const auto& setting : *document.ap) {
+void SetAp(ApConf& conf, const DocumentedAp& documented) {
+  for (const auto& setting : documented) {
     const std::string& key = setting.first;
     const Value& value = setting.second;
     At(Below(kAccessPoint, key), [&] {

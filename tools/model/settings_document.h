@@ -26,16 +26,19 @@ struct DocumentedNetwork {
   Extras extras;
 };
 
+// Those of the access point, by key, in the order of ApSettings().
+using DocumentedAp = std::vector<std::pair<std::string, Value>>;
+
 struct SettingsDocument {
   std::vector<DocumentedNetwork> networks;
-  std::optional<std::vector<std::pair<std::string, Value>>> ap;  // by key, in the order of ApSettings()
+  std::optional<DocumentedAp> ap;
 };
 
 // What a text holds. Fails, and names the place, when it is no such document, or holds what cannot be saved.
 SettingsDocument DocumentIn(const std::string& text);
 
 // Sets what a document has of the access point; the rest stays. Fails likewise.
-void SetAp(ApConf& conf, const SettingsDocument& document);
+void SetAp(ApConf& conf, const DocumentedAp& documented);
 
 // The failure of something at a place of a document.
 Failure WrongAt(const std::string& place, const Failure& why);
