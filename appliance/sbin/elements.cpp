@@ -281,6 +281,8 @@ Description Describe(Bytes elements, unsigned capability, unsigned megahertz) {
       case kVendorSpecific:
         if (IsWpa(body) && !security.wpa) security.wpa = AnnouncedBy(body.subspan(std::size(kWpaPrefix)), kWpa);
         break;
+      default:  // tells nothing that is listed
+        break;
     }
   });
   return {name.value_or(""), ProtocolOf(standards), SecurityOf(security, capability), ObstacleOf(security)};

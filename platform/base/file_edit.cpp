@@ -119,6 +119,29 @@ Status FlushDirectory(const char* szPath) {
   return ::fsync(directory.get()) < 0 && errno != EINVAL ? Status::Failed(errno) : Status::Ok();
 }
 
+// Where a path really leads to, whether or not there is a file. In a directory that anyone may write no link is
+// followed, not even one that is put there now.
+Status Resolve(const char* szPath, char (&szReal)[PATH_MAX]) {
+  if (!IsShared(szPath)) return ::realpath(szPath, szReal) != nullptr ? Status::Ok() : Status::Failed(errno);
+  char szDirectory[PATH_MAX] = ".";
+  const char* szSlash = std::strrchr(szPath, '/');
+  if (szSlash != nullptr) CopyText(szDirectory, {szPath, static_cast<size_t>(szSlash - szPath) + 1});
+  if (::realpath(szDirectory, szReal) == nullptr) return Status::Failed(errno);
+  const size_t size = std::strlen(szReal);
+  std::snprintf(szReal + size, sizeof szReal - size, "/%s", szSlash != nullptr ? szSlash + 1 : szPath);
+  return Status::Of(::faccessat(AT_FDCWD, szReal, F_OK, AT_SYMLINK_NOFOLLOW));
+}
+
+// Makes a file that is missing. When the path is a link to a missing file, makes that one.
+Status Make(const char* szPath, mode_t mode) {
+  const Descriptor file(::open(szPath, kReading | O_CREAT | O_EXCL, mode));
+  if (file.valid()) return Status::Of(::fchmod(file.get(), mode));  // whatever the umask
+  if (errno != EEXIST) return Status::Failed(errno);
+  if (IsShared(szPath)) return Status::Ok();
+  const Descriptor target(::open(szPath, kReading | O_CREAT, mode));
+  return target.valid() ? Status::Ok() : Status::Failed(errno);
+}
+
 }  // namespace
 
 // Holds the lock of the file once this succeeds.
@@ -145,29 +168,6 @@ Status FileEdit::Read() {
   Result<Bytes> text = ReadWhole(file_.get());
   if (text.ok()) text_ = std::move(*text);
   return text.status();
-}
-
-// Where a path really leads to, whether or not there is a file. In a directory that anyone may write no link is
-// followed, not even one that is put there now.
-Status Resolve(const char* szPath, char (&szReal)[PATH_MAX]) {
-  if (!IsShared(szPath)) return ::realpath(szPath, szReal) != nullptr ? Status::Ok() : Status::Failed(errno);
-  char szDirectory[PATH_MAX] = ".";
-  const char* szSlash = std::strrchr(szPath, '/');
-  if (szSlash != nullptr) CopyText(szDirectory, {szPath, static_cast<size_t>(szSlash - szPath) + 1});
-  if (::realpath(szDirectory, szReal) == nullptr) return Status::Failed(errno);
-  const size_t size = std::strlen(szReal);
-  std::snprintf(szReal + size, sizeof szReal - size, "/%s", szSlash != nullptr ? szSlash + 1 : szPath);
-  return Status::Of(::faccessat(AT_FDCWD, szReal, F_OK, AT_SYMLINK_NOFOLLOW));
-}
-
-// Makes a file that is missing. When the path is a link to a missing file, makes that one.
-Status Make(const char* szPath, mode_t mode) {
-  const Descriptor file(::open(szPath, kReading | O_CREAT | O_EXCL, mode));
-  if (file.valid()) return Status::Of(::fchmod(file.get(), mode));  // whatever the umask
-  if (errno != EEXIST) return Status::Failed(errno);
-  if (IsShared(szPath)) return Status::Ok();
-  const Descriptor target(::open(szPath, kReading | O_CREAT, mode));
-  return target.valid() ? Status::Ok() : Status::Failed(errno);
 }
 
 Result<FileEdit> FileEdit::Open(const char* szPath, mode_t mode) {

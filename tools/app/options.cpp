@@ -58,8 +58,8 @@ class Commands {
 
   template <class Values = std::nullptr_t>
   CLI::App* Add(CLI::App& parent, const char* szName, const char* szHelp,
-                std::function<void(CLI::App&, Values&)> describe,
-                std::function<void(const Program&, const Values&)> act) {
+                const std::function<void(CLI::App&, Values&)>& describe,
+                const std::function<void(const Program&, const Values&)>& act) {
     CLI::App* command = parent.add_subcommand(szName, szHelp);
     const auto values = std::make_shared<Values>();
     if (describe && IsNamed(szName)) describe(*command, *values);
@@ -69,9 +69,9 @@ class Commands {
   }
 
   template <class Values = std::nullptr_t>
-  CLI::App* Add(const char* szName, const char* szHelp, std::function<void(CLI::App&, Values&)> describe,
-                std::function<void(const Program&, const Values&)> act) {
-    return Add<Values>(app_, szName, szHelp, std::move(describe), std::move(act));
+  CLI::App* Add(const char* szName, const char* szHelp, const std::function<void(CLI::App&, Values&)>& describe,
+                const std::function<void(const Program&, const Values&)>& act) {
+    return Add<Values>(app_, szName, szHelp, describe, act);
   }
 
   CLI::App* AddPlain(CLI::App& parent, const char* szName, const char* szHelp,
@@ -315,11 +315,10 @@ void AddConnectionCommands(Commands& commands) {
 void DescribeApChanges(CLI::App& command, ApChanges& values) {
   for (const ApSetting& setting : ApSettings()) {
     if (!setting.hasOption()) continue;
-    const auto key = setting.field.key;
     command
         .add_option_function<std::string>(
-            "--" + OptionOf(key), [&values, key](const std::string& text) { values.settings[key] = text; },
-            setting.szHelp)
+            "--" + OptionOf(setting.field.key),
+            [&values, &setting](const std::string& text) { values.settings[setting.field.key] = text; }, setting.szHelp)
         ->option_text(setting.szValue);
   }
   DescribeSecret(command, values.secret);

@@ -128,6 +128,7 @@ NetworkPlan PlanFor(DocumentedNetwork wanted, const std::vector<KnownNetwork>& k
 std::vector<NetworkPlan> PlanFor(const SettingsDocument& document) {
   const std::vector<KnownNetwork> known = Known(Order::kAsSaved);
   std::vector<NetworkPlan> plans;
+  plans.reserve(document.networks.size());
   for (const DocumentedNetwork& network : document.networks) {
     plans.push_back(PlanFor(network, known, PlaceOfNetwork(plans.size())));
   }

@@ -36,6 +36,15 @@ NotLetIn WhoRefused(const Failure& failure, const KnownNetwork& config, const Su
   return {failure, by};
 }
 
+// Whether the network was joined before that had become pointless.
+bool IsJoined(const Task& task, const KnownNetwork& config) {
+  try {
+    return Run<int>(task, [&] { return MEROWirelessNetworkConnect(&config); }) >= 0;
+  } catch (const Pointless&) {
+    return false;
+  }
+}
+
 }  // namespace
 
 void EndFormerSupplicant(const Program& program) {
@@ -59,10 +68,7 @@ void Join(const Program& program, const KnownNetwork& config) {
   task.szMarker = kJoinMarkerPath;
   task.listener = &listener;
   task.isPointless = [&] { return listener.isFinal(); };
-  try {
-    if (Run<int>(task, [&] { return MEROWirelessNetworkConnect(&config); }) >= 0) return;
-  } catch (const Pointless&) {
-  }
+  if (IsJoined(task, config)) return;
   const Failure failure = JoinFailed(name, listener.verdict());
   if (failure.exit() != Exit::kSecretRefused && failure.exit() != Exit::kTimedOut) throw Failure(failure);
   throw WhoRefused(failure, config, listener);

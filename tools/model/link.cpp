@@ -50,7 +50,7 @@ Link LinkOf(const std::string& interface, LinkTo to) {
   Link link;
   try {
     AddAir(link, interface, to);
-  } catch (const Failure&) {
+  } catch (const Failure&) {  // NOLINT(bugprone-empty-catch)
     // An adapter may be pulled while it is asked: that stays unknown, and the rest is told all the same.
   }
   if (link.accessPoint.empty()) {

@@ -177,7 +177,7 @@ WIRELESS_AUTH AuthOfSupplicant(const std::string& name) {
           known.network.encrypt == given->network.encrypt && std::strcmp(known.szKey, given->szKey) == 0;
       if (isSame) return known.network.auth;
     }
-  } catch (const Failure&) {
+  } catch (const Failure&) {  // NOLINT(bugprone-empty-catch)
     // The known networks cannot be read: the supplicant's settings tell all but the kind of WPA.
   }
   return given->network.auth;
