@@ -24,7 +24,8 @@ git init --quiet
   command_from bin/dpkg-query <<<'grep -x "${*: -1} .*" installed | cut -d " " -f 2-'
   command_from bin/sudo <<<'exec "$@"'
   command_from bin/cmake <<<'echo "cmake $*" >>calls'
-  command_from bin/clang-tidy <<<'echo "clang-tidy ${*: -1}" >>calls'
+  command_from bin/clang-tidy <<<'echo "clang-tidy of this machine ${*: -1}" >>calls'
+  command_from bin/clang-tidy-19 <<<'echo "clang-tidy-19 ${*: -1}" >>calls'
   command_from bench/pictures <<<'echo "pictures $* $(cat "$1"/scanning.tsv)" >>calls'
   command_from bench/tables <<<'echo "tables $* with $PEERS" >>calls'
   command_from bin/clang-format <<<'echo "clang-format of this machine $*" >>calls'
@@ -115,10 +116,10 @@ case $1 in
     expect_calls 'pictures docs/pictures Scan/10 300'
     expect_packages gnuplot-nox
     ;;
-  lint)
+  lint) # Which version it was, the machine decided.
     run test lint
-    expect_calls 'cmake --preset release' 'clang-tidy lib/unit.cpp'
-    expect_packages "${building[@]}" clang-tidy git
+    expect_calls 'cmake --preset release' 'clang-tidy-19 lib/unit.cpp'
+    expect_packages "${building[@]}" clang-tidy-19 git
     ;;
   format) # Which version it was, the machine decided.
     run format
