@@ -17,7 +17,7 @@ program() { # NAME SCRIPT
   chmod 755 "$work/bin/$1"
 }
 
-program apt-get 'echo "$WORK/sources.list:1 http://archive.example/ bookworm main"'
+program apt-get '. /etc/os-release && echo "$WORK/sources.list:1 http://archive.example/ $VERSION_CODENAME main"'
 program apt-config ''
 program dpkg-deb 'echo "busybox, $(cat "$WORK/dependency")"'
 program mmdebstrap 'cat >/dev/null; for word; do [[ $word != *.new ]] || target=$word; done
