@@ -70,6 +70,7 @@ boot_2() {
   ip link set wlan0 up
   within 60 answers 10.2.0.1 || fail 'the network does not come back'
   tell_time 'an answer'
+  within 60 is_addressed_anew || fail 'the network is joined again, and no address asked for'
 
   say '-- an upgrade keeps the connection, and has the new program keep it'
   local before
@@ -164,6 +165,12 @@ boot_3() {
 
 is_joined() {
   station cafe nas && [[ $(ipv4_of nas) == 10.2.0.* ]]
+}
+
+# The former address answers until the one of a new connection has been asked for, by a client that is younger than the
+# supplicant.
+is_addressed_anew() {
+  (($(</var/run/udhcpc-wlan0.pid) > $(</var/run/wpa_supplicant.pid)))
 }
 
 answers() {  # ADDRESS
