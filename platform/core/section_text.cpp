@@ -21,6 +21,8 @@ std::optional<Pair> PairOfLine(std::string_view line, ValueForm form) {
   if (equals == std::string_view::npos) return std::nullopt;
   const std::string_view key = Trim(Slice(line, 0, equals));
   if (key.empty() || key.front() == '#' || key.front() == ';') return std::nullopt;
+  // No caller could name such a key, and up to the NUL it would be another one.
+  if (key.find('\0') != std::string_view::npos) return std::nullopt;
   if (key.front() == '[' && SectionOfLine(line)) return std::nullopt;
   const std::string_view value = Slice(line, equals + 1);
   return Pair{key, form == ValueForm::kShell ? Unquoted(Trim(value)) : value};

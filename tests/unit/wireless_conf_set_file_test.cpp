@@ -60,6 +60,18 @@ TEST_F(SavedFile, KeepsTheKeysThatOtherProgramsAddedToASection) {
   EXPECT_THAT(text, testing::Not(testing::HasSubstr("old")));
 }
 
+// A key was cut at its NUL when it was written again. Then it was another one, and stood behind that one's own line.
+TEST_F(SavedFile, IsNotOverruledByALineWhoseKeyHasANulInIt) {
+  using std::string_literals::operator""s;
+  const std::string odd = "\tESSID\0x=Elsewhere\n"s;
+  WriteText(kStore, "[" + kHomeSection + "]\n\tESSID=old\n" + odd);
+  ExpectSaved(config_);
+  WIRELESS_NETWORK_CONFIG saved;
+  EXPECT_EQ(MEROWirelessConfGet(kHomeSection.c_str(), &saved), 0);
+  EXPECT_STREQ(saved.network.szEssid, config_.network.szEssid);
+  EXPECT_THAT(ReadText(kStore), testing::HasSubstr(odd));
+}
+
 TEST_F(SavedFile, KeepsEveryOtherByte) {
   const std::string before = "# known networks\r\n\n" + NthSection(1, "5") + "garbage\n; more\n";
   const std::string behind = "[last]\n\tKEY=\xff\x80 \"'\n\n\tno newline at the end";
