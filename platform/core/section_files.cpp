@@ -136,8 +136,9 @@ int PLIBCFileEnumSection(const char* szPath, PPLIBSZLIST* ppslList) {
   const int before = list.nItem;
   const bool keep = CanKeepFile(list) && std::strcmp(szPath, kKnownNetworksPath) == 0;
   for (Sections sections(text.view()); sections.Next();) {
-    const bool known = keep && sections.name().find('\0') == std::string_view::npos;  // else no name leads to it
-    if (!AppendToList(list, sections.name(), known ? sections.whole() : std::string_view())) {
+    // No name leads to such a section, and up to the NUL its name may be another one's.
+    if (sections.name().find('\0') != std::string_view::npos) continue;
+    if (!AppendToList(list, sections.name(), keep ? sections.whole() : std::string_view())) {
       TruncateList(list, before);
       return FAIL(ENOMEM, "Failed to read %s", szPath), -1;
     }
