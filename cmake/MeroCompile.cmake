@@ -13,4 +13,8 @@ if(MERO_SANITIZE)
   add_compile_options(${sanitizers})
   add_compile_definitions(MERO_SANITIZE)
   add_link_options(${sanitizers})
+  # Clang's code tells fuzz targets which way it goes. That is asked of what is shipped, and not of tests.
+  if(CMAKE_CXX_COMPILER_ID STREQUAL Clang)
+    set(MERO_WATCH_BRANCHES -fsanitize=fuzzer-no-link)
+  endif()
 endif()

@@ -34,7 +34,7 @@ function(mero_compile_part name)
                                          -ffunction-sections -fdata-sections
                                          $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};${MERO_PROCESSOR_OPTIONS};-fno-ident>
                                          $<$<NOT:$<CONFIG:Debug>>:-fno-asynchronous-unwind-tables;-fno-unwind-tables>
-                                         ${MERO_LIBRARY_OPTIONS})
+                                         ${MERO_WATCH_BRANCHES} ${MERO_LIBRARY_OPTIONS})
   set_target_properties(${name} PROPERTIES POSITION_INDEPENDENT_CODE ON)
   if(CMAKE_SIZEOF_VOID_P EQUAL 4)
     # Files beyond 2 GiB and times beyond 2038. Machines with 64-bit longs have them anyway.
