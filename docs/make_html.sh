@@ -15,7 +15,7 @@ work=$(mktemp -d)
 trap 'rm -r "$work"' EXIT
 docs/man/make_pages.sh . "$work/manual"
 cp docs/man/*.[158] "$work/manual"
-documents=$(echo README.md SECURITY.md CONTRIBUTING.md CHANGELOG.md docs/*.md tests/lab/README.md examples/*/README.md)
+documents=$(echo README.md SECURITY.md CONTRIBUTING.md CHANGELOG.md docs/*.md tests/*/README.md examples/*/README.md)
 # Without pages that only lead to another one.
 manual=$(cd "$work/manual" && grep -L '^\.so ' ./*.1 ./*.3 ./*.5 ./*.8 | sed 's,^\./,,')
 

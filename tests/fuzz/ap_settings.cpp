@@ -1,5 +1,6 @@
 // The access point's settings: those that are saved are loaded as they were, whatever the file held before; those that
 // are refused change nothing; and what any file holds is loaded into a record whose texts end.
+//
 // Runs: 6000
 // Covers: lib/obsolete/wireless_ap_conf_get.cpp lib/obsolete/wireless_ap_conf_set.cpp
 #include <cstdio>

@@ -1,6 +1,8 @@
 // The network-script file of a bridge: one that is written reads back the same, field by field, and keys of others
-// stay; what a shell would not read back is refused, and nothing is written. Runs: 2500 Covers:
-// platform/sdk/bridge_settings.cpp platform/sdk/network_script.cpp
+// stay; what a shell would not read back is refused, and nothing is written.
+//
+// Runs: 4000
+// Covers: platform/sdk/bridge_settings.cpp platform/sdk/network_script.cpp
 #include <algorithm>
 #include <cstring>
 #include <vector>

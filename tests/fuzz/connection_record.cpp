@@ -1,6 +1,7 @@
 // The record of a connection: what a join writes is what is read of that connection, whatever the network's name holds,
 // and nothing is read of another one; no name or secret adds a line to the supplicant's settings; of any bytes in the
 // record's place, numbers within their enumerations are read.
+//
 // Runs: 5000
 // Covers: platform/core/connection_record.cpp platform/core/current_info.cpp lib/obsolete/wireless_network_connect.cpp
 #include <net/if.h>  // first: the kernel's own headers make room for it

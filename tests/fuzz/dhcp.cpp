@@ -1,6 +1,8 @@
 // A DHCP server's files: a record that is read can be given back, and changes nothing but the switch; one that is
-// written reads back the same, field by field; what the files cannot hold is refused, and nothing is written. Runs:
-// 2500 Covers: platform/sdk/dhcp_server.cpp platform/base/number.cpp platform/base/directory.cpp
+// written reads back the same, field by field; what the files cannot hold is refused, and nothing is written.
+//
+// Runs: 2500
+// Covers: platform/sdk/dhcp_server.cpp platform/base/number.cpp platform/base/directory.cpp
 #include <cstring>
 #include <memory>
 

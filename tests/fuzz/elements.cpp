@@ -1,5 +1,6 @@
 // The beacons of strangers, as the listing tool reads them: any bytes give one row that can be read back, and steers no
 // terminal; a network that announces WPA is never shown as one without protection or with WEP.
+//
 // Runs: 60000
 // Covers: appliance/sbin/elements.cpp appliance/sbin/listing.cpp
 #include "appliance/sbin/elements.h"

@@ -1,9 +1,10 @@
 // Key/value files: a value that is set is read back, a key that is removed is gone, and no line of another key changes;
 // what is refused leaves the file as it is; a value is cut to the caller's buffer and no further.
+//
 // Runs: 12000
 // Covers: platform/core/key_value_files.cpp platform/core/section_lines.cpp platform/core/section_text.cpp
 // Covers: platform/core/settings_file.cpp platform/base/file_edit.cpp platform/base/file_read.cpp
-// platform/base/bytes.cpp
+// Covers: platform/base/bytes.cpp
 #include <array>
 #include <iterator>
 #include <vector>

@@ -1,8 +1,10 @@
 // The known networks: whatever the file holds, each section is a network whose texts end and whose times are in order;
-// a network that is saved is read back and takes nothing from the others, or is refused and nothing is written. Runs:
-// 6000 Covers: platform/core/known_network.cpp platform/core/radio_texts.cpp lib/obsolete/known_networks.cpp Covers:
-// lib/obsolete/wireless_conf_set.cpp lib/obsolete/wireless_conf_enum.cpp Covers:
-// lib/obsolete/wireless_conf_enum_by_atime.cpp
+// a network that is saved is read back and takes nothing from the others, or is refused and nothing is written.
+//
+// Runs: 6000
+// Covers: platform/core/known_network.cpp platform/core/radio_texts.cpp lib/obsolete/known_networks.cpp
+// Covers: lib/obsolete/wireless_conf_set.cpp lib/obsolete/wireless_conf_enum.cpp
+// Covers: lib/obsolete/wireless_conf_enum_by_atime.cpp
 #include <strings.h>
 
 #include <algorithm>

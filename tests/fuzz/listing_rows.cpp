@@ -1,5 +1,8 @@
 // Rows of the listing tool: of any output at all, the library's scan makes the networks that scanf() would make of it,
-// in order, with texts that end. Runs: 20000 Covers: lib/obsolete/wireless_network_scan.cpp lib/obsolete/ring.h
+// in order, with texts that end.
+//
+// Runs: 20000
+// Covers: lib/obsolete/wireless_network_scan.cpp lib/obsolete/ring.h
 #include <strings.h>
 
 #include <algorithm>

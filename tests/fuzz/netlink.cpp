@@ -1,6 +1,8 @@
 // Messages of a radio's driver, as the listing tool reads them: none is read beyond its end; a network comes out as a
-// row that can be read back, or not at all; and so does news of a scan. Runs: 60000 Covers: appliance/sbin/radio.cpp
-// appliance/sbin/elements.cpp appliance/sbin/listing.cpp common/scan_end.h
+// row that can be read back, or not at all; and so does news of a scan.
+//
+// Runs: 60000
+// Covers: appliance/sbin/radio.cpp appliance/sbin/elements.cpp appliance/sbin/listing.cpp common/scan_end.h
 #include <cstring>
 #include <memory>
 

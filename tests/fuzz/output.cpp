@@ -1,6 +1,8 @@
 // The program's output: whatever a record or a failure holds, nothing in it steers a terminal or hides; JSON parses,
-// and gives the texts back; the %b of printf gives a porcelain line's back. Runs: 3000 Covers: tools/show/output.cpp
-// tools/base/text.cpp
+// and gives the texts back; the %b of printf gives a porcelain line's back.
+//
+// Runs: 3000
+// Covers: tools/show/output.cpp tools/base/text.cpp
 #include "show/output.h"
 
 #include <algorithm>

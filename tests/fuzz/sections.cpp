@@ -1,5 +1,6 @@
-// Section files: what a plain reader makes of a file, the library makes of it; a change changes what it is about and
-// no other line, and can be read back; what is refused leaves the file as it is.
+// Section files: what a plain reader makes of a file, the library makes of it; a change changes what it is about and no
+// other line, and can be read back; what is refused leaves the file as it is.
+//
 // Runs: 12000
 // Covers: platform/core/section_files.cpp platform/core/section_lines.cpp platform/core/section_text.cpp
 // Covers: platform/core/settings_file.cpp platform/core/text_hash.cpp platform/core/text_list.cpp

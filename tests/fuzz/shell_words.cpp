@@ -1,5 +1,6 @@
 // Words of commands: whatever a value holds, a real shell hands a program exactly its bytes, as a word by itself and
 // between double quotes; a value that is longer than any command makes a word that is, too.
+//
 // Runs: 30000
 // Covers: lib/obsolete/shell_words.cpp
 #include "lib/obsolete/shell_words.h"

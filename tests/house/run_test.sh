@@ -15,7 +15,7 @@ command_from() {
   chmod +x "$1"
 }
 
-mkdir -p bench bin build/bench docs/pictures lib tests/{everywhere,lab/scenarios,package}
+mkdir -p bench bin build/bench docs/pictures lib tests/{everywhere,fuzz,lab/scenarios,package}
 cp "$source"/{.gitignore,run} .
 touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
 git init --quiet
@@ -32,6 +32,7 @@ git init --quiet
   command_from bin/clang-format-19 <<<'echo "clang-format-19 $*" >>calls'
   command_from bin/shellcheck <<<'exit 0'
   command_from tests/everywhere/everywhere <<<'echo "everywhere $*" >>calls; tar --list --file "$1/source.tar" | sort >"$1/files"'
+  command_from tests/fuzz/fuzz <<<'echo "fuzz $*" >>calls; printf "rows\t7\t1 of 1\t2 of 2\t%s\n" 0 1 >"$2/table"; exit 1'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
   command_from tests/package/foreign_test.sh <<<'echo "foreign_test.sh $*" >>calls; echo not ok; [[ ! -e wrong ]]'
   command_from tests/everywhere/cross <<<'echo "cross $* with $(cd "$3/source" && echo lib/*)" >>calls'
@@ -219,6 +220,19 @@ case $1 in
       expect_packages
     done
     ;;
+  fuzz)
+    mkdir -p build/sanitized build/fuzz
+    echo 'MERO_SANITIZE:BOOL=ON' >build/sanitized/CMakeCache.txt
+    { run test fuzz || :; } >shown # something was found
+    expect_calls 'cmake --preset asan' 'cmake --build --preset fuzz' 'fuzz build/sanitized build/fuzz'
+    grep -qxE 'fuzz +[0-9]+ s +1 passed +1 failed +0 skipped' said
+    grep -qx clang packages
+    { run fuzz rows 5 || :; } >shown
+    expect_calls 'cmake --preset asan' 'cmake --build --preset fuzz' 'fuzz build/sanitized build/fuzz rows 5'
+    { run fuzz --help || :; } >shown
+    expect_calls 'fuzz build/sanitized build/fuzz --help'
+    expect_packages
+    ;;
   skipped) # That a test was skipped was told, and not why.
     command_from bin/ctest <<'END'
 mkdir -p build/Testing/Temporary
@@ -237,11 +251,11 @@ END
   foreign) # The tests ended where the lab cannot be, without a summary.
     command_from bin/dpkg <<<'echo arm64'
     command_from bin/ctest <<<'echo "100% tests passed, 0 tests failed out of 3"'
-    mkdir -p build/{sanitized,Testing/Temporary} build/sanitized/Testing/Temporary
+    mkdir -p build/{fuzz,sanitized,Testing/Temporary} build/sanitized/Testing/Temporary
     touch build/{,sanitized/}Testing/Temporary/LastTest.log
     echo 'MERO_SANITIZE:BOOL=ON' >build/sanitized/CMakeCache.txt
     { run test || :; } >shown # there is nothing for the style to look at
-    sed -nE 's/^([a-z]+) +[0-9]+ s .*/\1/p' said | diff <(printf '%s\n' style lint unit platform asan) -
+    sed -nE 's/^([a-z]+) +[0-9]+ s .*/\1/p' said | diff <(printf '%s\n' style lint unit platform asan fuzz) -
     grep -qx 'leaving out the lab, whose machines are those of amd64' said
     ;;
   cross)
