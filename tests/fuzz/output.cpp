@@ -79,6 +79,10 @@ std::pair<unsigned long, std::size_t> First(std::string_view text) {
 void RequireHarmless(std::string_view text, const Terminal& terminal, std::string_view allowed) {
   const std::string_view whole = text;
   while (!text.empty()) {
+    if (text.front() >= ' ' && text.front() <= '~') {  // as nearly all are
+      text.remove_prefix(1);
+      continue;
+    }
     constexpr std::string_view kColours[] = {"\x1b[0m", "\x1b[2m", "\x1b[31m", "\x1b[32m", "\x1b[33m"};
     const auto* colour = std::ranges::find_if(kColours, [&](std::string_view one) { return text.starts_with(one); });
     if (terminal.colour && colour != std::end(kColours)) {
