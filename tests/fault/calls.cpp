@@ -107,60 +107,88 @@ void ANetworkIsJoined(SimulatedDriver& driver) {
 
 // ---- Calls ----
 
-template <class Record>
-int64_t CountOf(int (*enumerate)(WIRELESS_LIST*)) {
-  Ring<Record> ring;
-  int64_t count = 0;
-  if (enumerate(ring.head()) != 0) return -1;
-  ring.ForEach([&](const Record&) { ++count; });
-  return count;
+Answer OfInt(int result) {
+  return result == 0 ? Answer::kDone : result == -1 ? Answer::kFailed : Answer::kWrong;
 }
 
-bool SaveOtherSecret() {
+Answer OfBool(BOOL result) {
+  return result == TRUE ? Answer::kDone : result == FALSE ? Answer::kFailed : Answer::kWrong;
+}
+
+// Whatever the function gives, the ring is walked, and must be one.
+template <class Record>
+Answer OfList(int (*enumerate)(WIRELESS_LIST*)) {
+  Ring<Record> ring;
+  int count = 0;
+  const int result = enumerate(ring.head());
+  ring.ForEach([&](const Record&) { ++count; });
+  if (result != 0 || count == kNetworks) return OfInt(result);
+  return count < kNetworks ? Answer::kLess : Answer::kWrong;
+}
+
+Answer SaveOtherSecret() {
   WIRELESS_NETWORK_CONFIG config = KnownNetwork(3);
   CopyText(config.szKey, "correct horse stapler");
-  return MEROWirelessConfSet(&config) == 0;
+  return OfInt(MEROWirelessConfSet(&config));
 }
 
-bool Scan() {
+Answer Scan() {
   const auto scan = [](WIRELESS_LIST* pHead) { return MEROWirelessNetworkScan(WIRELESS_SCAN_LAST, pHead); };
-  return CountOf<WIRELESS_NETWORK>(scan) == kNetworks;
+  return OfList<WIRELESS_NETWORK>(scan);
 }
 
-bool LookUp() {
+Answer LookUp() {
   WIRELESS_NETWORK network;
-  return MEROWirelessNetworkGet("Network 3", WIRELESS_FILTER_ESSID, &network) == 1;
+  const int result = MEROWirelessNetworkGet("Network 3", WIRELESS_FILTER_ESSID, &network);
+  if (result == 1) return std::string_view(network.szEssid) == "Network 3" ? Answer::kDone : Answer::kWrong;
+  return result == 0 ? Answer::kLess : result == -1 ? Answer::kFailed : Answer::kWrong;
 }
 
-bool MakeCell() {
+Answer MakeCell() {
   const WIRELESS_NETWORK_CONFIG config = OpenCell();
-  return MEROWirelessAdhocCreate(&config) == 0;
+  return OfInt(MEROWirelessAdhocCreate(&config));
 }
 
-bool Join() {
+Answer Join() {
   const WIRELESS_NETWORK_CONFIG config = KnownNetwork(3);
-  return MEROWirelessNetworkConnect(&config) == 0;
+  return OfInt(MEROWirelessNetworkConnect(&config));
 }
 
-bool ReadApSettings() {
+Answer AskStatus() {
+  const WIRELESS_STATUS status = MEROWirelessConnStatusGet();
+  if (status == WIRELESS_STATUS_CONNECTED_MANAGED) return Answer::kDone;
+  return status == WIRELESS_STATUS_UNKNOWN || status == WIRELESS_STATUS_NO_ADAPTER ? Answer::kFailed : Answer::kWrong;
+}
+
+// Without the file or the section, the record has the defaults.
+Answer ReadApSettings() {
   MERO_AP_CONF conf;
-  return MEROWirelessGetAPConfig(kModel, &conf) > 0;
+  const int result = MEROWirelessGetAPConfig(kModel, &conf);
+  const bool saved = std::string_view(conf.hostapConf.szSSID) == "Home";
+  if (result > 0) return saved ? Answer::kDone : Answer::kWrong;
+  return saved ? Answer::kWrong : Answer::kFailed;
 }
 
-bool NameSection() {
+Answer NameSection() {
   char szSection[32];
-  return MEROWirelessApConfigSecNameGet(szSection, sizeof szSection) == TRUE;
+  const BOOL named = MEROWirelessApConfigSecNameGet(szSection, sizeof szSection);
+  return named == TRUE && std::string_view(szSection) != kModel ? Answer::kWrong : OfBool(named);
 }
 
-bool SaveOtherChannel() {
+Answer SaveOtherChannel() {
   MERO_AP_CONF conf = ApSettings();
   conf.hostapConf.channel = 1;
-  return MEROWirelessSetAPConfig(&conf) == TRUE;
+  return OfBool(MEROWirelessSetAPConfig(&conf));
 }
 
-bool WriteDaemonsFiles() {
+Answer CheckBlock() {
+  const int result = MEROWirelessCheckBlock();
+  return result == 1 ? Answer::kDone : result == -1 ? Answer::kFailed : Answer::kWrong;
+}
+
+Answer WriteDaemonsFiles() {
   MERO_AP_CONF conf = ApSettings();
-  return MEROWirelessSetHostAPConf("wlan0", &conf.hostapConf) == TRUE;
+  return OfBool(MEROWirelessSetHostAPConf("wlan0", &conf.hostapConf));
 }
 
 // ---- The functions ----
@@ -172,7 +200,7 @@ constexpr int kFlags = 2;
 constexpr int kAddress = 5;
 
 Exported Row(const char* szName, Today today, const char* szState, std::function<void(SimulatedDriver&)> prepare,
-             std::function<bool()> call, Least least) {
+             std::function<Answer()> call, Least least) {
   return {szName, today, szState, std::move(prepare), std::move(call), std::move(least)};
 }
 
@@ -187,16 +215,14 @@ std::vector<Exported> AllFunctions() {
       Row("MEROWirelessConfSet", {0, 5}, "one of 10, another secret", SomeNetworksAreKnown, SaveOtherSecret,
           {.reads = {kKnownNetworksPath}, .replaced = {kKnownNetworksPath}}),
       Row("MEROWirelessConfEnum", {0, 1}, "10 networks", SomeNetworksAreKnown,
-          [] { return CountOf<WIRELESS_NETWORK_CONFIG>(MEROWirelessConfEnum) == kNetworks; },
-          {.reads = {kKnownNetworksPath}}),
+          [] { return OfList<WIRELESS_NETWORK_CONFIG>(MEROWirelessConfEnum); }, {.reads = {kKnownNetworksPath}}),
       Row("MEROWirelessConfEnumByAtime", {0, 1}, "10 networks", SomeNetworksAreKnown,
-          [] { return CountOf<WIRELESS_NETWORK_CONFIG>(MEROWirelessConfEnumByAtime) == kNetworks; },
-          {.reads = {kKnownNetworksPath}}),
+          [] { return OfList<WIRELESS_NETWORK_CONFIG>(MEROWirelessConfEnumByAtime); }, {.reads = {kKnownNetworksPath}}),
 
       Row("MEROWirelessNetworkScan", {4, 3}, "10 networks, interface up", NothingMore, Scan, scanning),
       Row("MEROWirelessNetworkGet", {4, 3}, "10 networks, interface up", NothingMore, LookUp, scanning),
       Row("MEROWirelessProtocolStringGet", {0, 0}, "", NothingMore,
-          [] { return MEROWirelessProtocolStringGet(WIRELESS_PROTO_11AGN) != nullptr; }, {}),
+          [] { return OfBool(MEROWirelessProtocolStringGet(WIRELESS_PROTO_11AGN) != nullptr ? TRUE : FALSE); }, {}),
 
       // Down, the mode, two commands, up.
       Row("MEROWirelessAdhocCreate", {4, 5}, "an open cell", NothingMore, MakeCell,
@@ -216,7 +242,7 @@ std::vector<Exported> AllFunctions() {
            .written = ofJoin}),
       // The state of the connection, a list of the known networks, a scan, a join, and an address.
       Row("MEROWirelessAutoConnect", {12, 32}, "10 known, the latest in range; static address", SomeNetworksAreKnown,
-          [] { return MEROWirelessAutoConnect() == 0; },
+          [] { return OfInt(MEROWirelessAutoConnect()); },
           {.programs = 1,
            .commands = 2,
            .pipes = 3,
@@ -233,13 +259,12 @@ std::vector<Exported> AllFunctions() {
            .written = ofJoin}),
       // A client of DHCP is looked for, and what it has left is taken back by a program.
       Row("MEROWirelessIfconfigSet", {1, 18}, "a static address", NothingMore,
-          [] { return MEROWirelessIfconfigSet("wlan0", KnownNetwork(3)) == 0; },
+          [] { return OfInt(MEROWirelessIfconfigSet("wlan0", KnownNetwork(3))); },
           {.programs = 1, .sockets = 2, .asks = kFlags + kAddress, .looks = 1, .replaced = {kInterfaceScript}}),
       Row("MEROWirelessDefaultGatewaySet", {2, 1}, "", NothingMore,
-          [] { return MEROWirelessDefaultGatewaySet("192.168.1.1") == 0; }, {.commands = 1, .listings = 1}),
+          [] { return OfInt(MEROWirelessDefaultGatewaySet("192.168.1.1")); }, {.commands = 1, .listings = 1}),
       // Whether it is up, its mode, its access point.
-      Row("MEROWirelessConnStatusGet", {0, 3}, "connected", ANetworkIsJoined,
-          [] { return MEROWirelessConnStatusGet() == WIRELESS_STATUS_CONNECTED_MANAGED; },
+      Row("MEROWirelessConnStatusGet", {0, 3}, "connected", ANetworkIsJoined, AskStatus,
           {.listings = 1, .sockets = 1, .asks = 3}),
 
       Row("MEROWirelessGetAPConfig", {0, 1}, "", ThereAreApSettings, ReadApSettings, {.reads = {kApSettingsPath}}),
@@ -247,7 +272,7 @@ std::vector<Exported> AllFunctions() {
       // The section is looked for by a command.
       Row("MEROWirelessSetAPConfig", {2, 4}, "another channel", ThereAreApSettings, SaveOtherChannel,
           {.pipes = 1, .piped = header, .reads = {kApSettingsPath}, .replaced = {kApSettingsPath}}),
-      Row("MEROWirelessCheckBlock", {0, 2}, "", ThereAreApSettings, [] { return MEROWirelessCheckBlock() == 1; },
+      Row("MEROWirelessCheckBlock", {0, 2}, "", ThereAreApSettings, CheckBlock,
           {.reads = {kApSettingsPath, kAdapterInfoPath}}),
       // A pipeline of four looks for a daemon, mkdir makes the directory.
       Row("MEROWirelessSetHostAPConf", {6, 2}, "no daemon, no guests", NothingMore, WriteDaemonsFiles,
@@ -261,7 +286,7 @@ std::vector<Exported> AllFunctions() {
            .written = {kHostFile}}),
       // As above, the bridge, its DHCP server and the interface, and the start script.
       Row("MEROWirelessAPEnable", {7, 87}, "a new bridge with a DHCP server", ThereAreApSettings,
-          [] { return MEROWirelessAPEnable() == TRUE; },
+          [] { return OfBool(MEROWirelessAPEnable()); },
           {.programs = 2,
            .pipes = 1,
            .besides = 3,
@@ -273,7 +298,7 @@ std::vector<Exported> AllFunctions() {
            .replaced = {kInfoFile, kBridgeScript, kServerConf, kServerInfo, kInterfaceScript},
            .written = {kApMarkerPath, kHostFile}}),
       Row("MEROWirelessAPDisable", {1, 22}, "as the one before has left it", AnAccessPointIsEnabled,
-          [] { return MEROWirelessAPDisable() == TRUE; },
+          [] { return OfBool(MEROWirelessAPDisable()); },
           {.programs = 1,
            .listings = 1,
            .removals = 1,
@@ -281,13 +306,13 @@ std::vector<Exported> AllFunctions() {
            .replaced = {kInterfaceScript, kServerInfo, kBridgeScript}}),
 
       Row("MEROWirelessModeChange", {1, 0}, "", NothingMore,
-          [] { return MEROWirelessModeChange(WIRELESS_CLIENT_MODE) == TRUE; }, {.programs = 1}),
-      Row("MEROWirelessAPInterfaceGet", {0, 0}, "", NothingMore, [] { return MEROWirelessAPInterfaceGet() != nullptr; },
-          {}),
-      Row("MEROWirelessAPIsSupported", {0, 0}, "", NothingMore, [] { return MEROWirelessAPIsSupported() == FALSE; },
-          {}),
-      Row("MEROWirelessTestAPMode", {0, 0}, "", NothingMore, [] { return MEROWirelessTestAPMode() == FALSE; },
-          {.looks = 1}),
+          [] { return OfBool(MEROWirelessModeChange(WIRELESS_CLIENT_MODE)); }, {.programs = 1}),
+      Row("MEROWirelessAPInterfaceGet", {0, 0}, "", NothingMore,
+          [] { return OfBool(MEROWirelessAPInterfaceGet() != nullptr ? TRUE : FALSE); }, {}),
+      Row("MEROWirelessAPIsSupported", {0, 0}, "", NothingMore,
+          [] { return OfBool(MEROWirelessAPIsSupported() == FALSE ? TRUE : FALSE); }, {}),
+      Row("MEROWirelessTestAPMode", {0, 0}, "", NothingMore,
+          [] { return OfBool(MEROWirelessTestAPMode() == FALSE ? TRUE : FALSE); }, {.looks = 1}),
   };
 }
 
@@ -297,10 +322,11 @@ void InstallCommands() {
   WriteText("/tmp/listing", Listing(), 0644);
   WriteScript("/sbin/iwlist", "exec cat /tmp/listing\n");
   WriteScript("/usr/sbin/wpa_cli", std::string("echo ") + kConnected);
-  for (const char* szCommand : {"/sbin/iwconfig", "/sbin/route", "/usr/sbin/wpa_supplicant", "/bin/ps", kLeaseScript,
-                                kNetworkScriptPath, kHotPlugScriptPath}) {
+  for (const char* szCommand :
+       {"/sbin/iwconfig", "/sbin/route", "/usr/sbin/wpa_supplicant", "/bin/ps", kLeaseScript, kHotPlugScriptPath}) {
     WriteScript(szCommand, ":\n");
   }
+  WriteScript(kNetworkScriptPath, "echo \"$*\" >/tmp/network-script\n");
   WriteText("/etc/meroinfo.conf", "runmediaservice=no\n", 0644);
   WriteText(kResolverPath, "nameserver 192.0.2.1\n", 0644);
 }
@@ -310,7 +336,9 @@ void ForgetEverything() {
     fs::remove_all(szDirectory);
     fs::create_directories(szDirectory);
   }
-  for (const char* szFile : {kAdapterInfoPath, kConnectionRecordPath, kSupplicantPidPath}) fs::remove(szFile);
+  for (const char* szFile : {kAdapterInfoPath, kConnectionRecordPath, kSupplicantPidPath, "/tmp/network-script"}) {
+    fs::remove(szFile);
+  }
 }
 
 int64_t SizesOf(const std::vector<std::string>& paths) {
@@ -340,21 +368,23 @@ const std::vector<Exported>& ExportedFunctions() {
   return all;
 }
 
-Measured Measure(const Exported& function) {
-  const NetworkInterface interface("wlan0");
-  const ShownInterfaces shown({{"lo", ""}, {"wlan0", "phy80211"}});
-  SimulatedDriver driver("wlan0");
-  driver.hasResults = true;
+Scene::Scene(const Exported& function)
+    : interface_("wlan0"), shown_({{"lo", ""}, {"wlan0", "phy80211"}}), driver_("wlan0") {
+  driver_.hasResults = true;
+  driver_.told.reserve(100);  // so that a call without memory can be noted, too
   ForgetEverything();
   InstallCommands();
-  function.prepare(driver);
+  function.prepare(driver_);
   Shell("ip link set wlan0 up");
   TakeLog();
+}
 
+Measured Measure(const Exported& function) {
+  const Scene scene(function);
   Measured measured;
   const int64_t before = SizesOf(function.least.reads);
   const Plan plan = {.withoutSleeps = true};
-  const Outcome outcome = RunSupervised(plan, [&] { return function.call() ? 0 : -1; });
+  const Outcome outcome = RunSupervised(plan, [&] { return function.call() == Answer::kDone ? 0 : -1; });
   measured.done = outcome.result == 0;
   measured.cost = outcome.cost;
   measured.calls = outcome.before;

@@ -25,7 +25,9 @@ void REAL(free)(void* block);
 namespace {
 
 int g_untilFailure = 0;  // allocations until the one that fails; 0 when none is to
+bool g_onwards = false;  // those behind it fail too
 bool g_failed = false;
+int g_made = 0;
 int g_blocks = 0;
 // The text that freed blocks are searched for; none when it is null. No class: free() is called before the sanitizer
 // has made ready, and the functions of a class may be the checked ones of another source.
@@ -34,7 +36,9 @@ size_t g_watchedSize = 0;
 int g_freedWithIt = 0;
 
 bool Fails() {
+  ++g_made;
   if (g_untilFailure == 0 || --g_untilFailure > 0) return false;
+  if (g_onwards) g_untilFailure = 1;
   g_failed = true;
   errno = ENOMEM;
   return true;
@@ -94,13 +98,15 @@ char* strndup(const char* szText, size_t limit) {
 
 }  // extern "C"
 
-MemoryOutcome RunWithoutMemory(int n, const std::function<int()>& operation) {
+MemoryOutcome RunWithoutMemory(int n, const std::function<int()>& operation, bool onwards) {
   g_failed = false;
+  g_onwards = onwards;
   const int before = g_blocks;
+  g_made = 0;
   g_untilFailure = n;
   const int result = operation();
   g_untilFailure = 0;
-  return {g_failed, result, g_blocks - before};
+  return {g_failed, result, g_blocks - before, g_made};
 }
 
 int CountFreedWith(std::string_view text, const std::function<void()>& operation) {

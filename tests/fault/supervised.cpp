@@ -16,6 +16,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <bit>
 #include <cerrno>
 #include <csignal>
 #include <cstddef>
@@ -25,6 +26,9 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <map>
+#include <set>
+#include <utility>
 
 #include "platform.h"
 #include "tests/platform/system_log.h"
@@ -74,23 +78,70 @@ const SystemCall kNames[] = {
     {SYS_fchown, "fchown"},
 };
 
+// Those that have nothing to do with the content of files.
+const SystemCall kOtherNames[] = {
+#ifdef SYS_pipe
+    {SYS_pipe, "pipe"},
+#endif
+#ifdef SYS_fork
+    {SYS_fork, "clone"},
+#endif
+#ifdef SYS_vfork
+    {SYS_vfork, "clone"},
+#endif
+#ifdef SYS_mkdir
+    {SYS_mkdir, "mkdir"},
+#endif
+#ifdef SYS_poll
+    {SYS_poll, "poll"},
+#endif
+#ifdef SYS_waitpid
+    {SYS_waitpid, "wait"},
+#endif
+#ifdef SYS_send
+    {SYS_send, "send"},
+#endif
+#ifdef SYS_recv
+    {SYS_recv, "recv"},
+#endif
+#ifdef SYS_dup2
+    {SYS_dup2, "dup"},
+#endif
+    {SYS_pipe2, "pipe"},
+    {SYS_clone, "clone"},
+    {SYS_clone3, "clone"},
+    {SYS_wait4, "wait"},
+    {SYS_mkdirat, "mkdir"},
+    {SYS_getdents64, "getdents"},
+    {SYS_socket, "socket"},
+    {SYS_ioctl, "ioctl"},
+    {SYS_sendto, "send"},
+    {SYS_recvfrom, "recv"},
+    {SYS_ppoll, "poll"},
+    {SYS_getrandom, "getrandom"},
+    {SYS_kill, "kill"},
+    {SYS_pidfd_open, "pidfd_open"},
+    {SYS_pidfd_send_signal, "pidfd_send_signal"},
+    {SYS_lseek, "lseek"},
+    {SYS_fcntl, "fcntl"},
+    {SYS_umask, "umask"},
+    {SYS_dup3, "dup"},
+    {SYS_prlimit64, "prlimit"},
+    {SYS_rt_sigaction, "sigaction"},
+    {SYS_rt_sigprocmask, "sigprocmask"},
+};
+
 // Null for a call that no operation on files makes: for memory, the time and the like.
-const SystemCall* CallOf(int number) {
+const SystemCall* CallOnFiles(int number) {
   const SystemCall* call = std::ranges::find(kNames, number, &SystemCall::number);
   return call != std::end(kNames) ? call : nullptr;
 }
 
-// Those by which processes come into being.
-constexpr int kForks[] = {
-#ifdef SYS_fork
-    SYS_fork,
-#endif
-#ifdef SYS_vfork
-    SYS_vfork,
-#endif
-    SYS_clone,
-    SYS_clone3,
-};
+SystemCall AnyCall(int number) {
+  if (const SystemCall* call = CallOnFiles(number); call != nullptr) return *call;
+  const SystemCall* call = std::ranges::find(kOtherNames, number, &SystemCall::number);
+  return call != std::end(kOtherNames) ? *call : SystemCall{number, "call " + std::to_string(number)};
+}
 
 constexpr int kSleeps[] = {
     SYS_clock_nanosleep,
@@ -124,10 +175,27 @@ void WriteAll(int fd, const void* data, size_t size) {
   Require(::write(fd, data, size) == static_cast<ssize_t>(size), "write to the supervisor");
 }
 
-// Has the kernel ask about every call, except those that end the process and writes to `report`. Gives the descriptor
-// that it asks through.
+// Where this process's libraries lie, and not those of a program that it becomes: the upper half of their addresses. A
+// machine of 32 bits has no such half.
+uint32_t UpperHalfOfLibraries() {
+  const auto address = reinterpret_cast<uintptr_t>(&::syscall);
+  return static_cast<uint32_t>(static_cast<uint64_t>(address) >> 32);
+}
+
+// Has the kernel ask about every call of this process, except those that end it and writes to `report`; of the programs
+// that it starts, about those with which they begin and end, since to ask about all of theirs takes long. Gives the
+// descriptor that it asks through.
 int HaveCallsAsked(int report) {
+  constexpr size_t kUpperHalf = std::endian::native == std::endian::little ? 4 : 0;
   sock_filter filter[] = {
+      BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, instruction_pointer) + kUpperHalf),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, UpperHalfOfLibraries(), 4, 0),
+      // A program's.
+      BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, nr)),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_execve, 8, 0),
+      BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_exit_group, 7, 0),
+      BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW),
+      // This process's.
       BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, nr)),
       BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_exit_group, 3, 0),
       BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_write, 0, 3),
@@ -138,7 +206,11 @@ int HaveCallsAsked(int report) {
   };
   const sock_fprog program = {std::size(filter), filter};
   Require(::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0, "no new privileges");
-  const long asked = ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, SECCOMP_FILTER_FLAG_NEW_LISTENER, &program);
+  // A signal does not have a call asked about twice. Kernels before 5.19 know no such flag.
+  constexpr unsigned long kUninterrupted = 1UL << 5;
+  constexpr unsigned long kFlags = SECCOMP_FILTER_FLAG_NEW_LISTENER;
+  long asked = ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, kFlags | kUninterrupted, &program);
+  if (asked < 0) asked = ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, kFlags, &program);
   Require(asked >= 0, "have system calls asked about");
   return static_cast<int>(asked);
 }
@@ -166,33 +238,86 @@ class Supervisor {
   Supervisor(pid_t child, int report, const Plan& plan) : child_(child), report_(report), plan_(plan) {
     int there = -1;
     Require(::read(report_, &there, sizeof there) == sizeof there, "read where the child is asked");
-    const int process = static_cast<int>(::syscall(SYS_pidfd_open, child_, 0));
-    asked_ = static_cast<int>(::syscall(SYS_pidfd_getfd, process, there, 0));
+    process_ = static_cast<int>(::syscall(SYS_pidfd_open, child_, 0));
+    asked_ = static_cast<int>(::syscall(SYS_pidfd_getfd, process_, there, 0));
     Require(asked_ >= 0, "get what the child is asked through");
-    ::close(process);
   }
-  ~Supervisor() { ::close(asked_); }
+  Supervisor(const Supervisor&) = delete;
+  Supervisor& operator=(const Supervisor&) = delete;
+  ~Supervisor() {
+    ::close(asked_);
+    ::close(process_);
+  }
 
   Outcome Supervise() {
     while (NextCall()) Answer();
-    int state = 0;
-    Require(::waitpid(child_, &state, 0) == child_, "wait for the child");
-    outcome_.killed = WIFSIGNALED(state);
+    outcome_.cost.processes = static_cast<int>(others_.size());
     if (!outcome_.killed) ReadReport();
+    for (const pid_t other : others_) EndOther(other);
     return std::move(outcome_);
   }
 
  private:
-  // Waits for the child's next call; false when it has ended.
+  static constexpr int kPatience = 20'000;      // milliseconds without a call of the child
+  static constexpr int kPatienceBehind = 5000;  // the same of what the child has led to, when it has ended
+  static constexpr int kLook = 10;
+
+  // Waits for the next call of the child or of those that it has led to; false when there will be none.
   bool NextCall() {
-    pollfd ready = {asked_, POLLIN, 0};
-    while (::poll(&ready, 1, -1) < 0) Require(errno == EINTR, "wait for a system call");
-    if ((ready.revents & POLLIN) == 0) return false;
+    while (true) {
+      pollfd ready[] = {{asked_, POLLIN, 0}, {ended_ ? -1 : process_, POLLIN, 0}};
+      const int count = ::poll(ready, std::size(ready), ended_ ? kLook : kPatience);
+      Require(count >= 0 || errno == EINTR, "wait for a system call");
+      if (count < 0) continue;
+      const bool asks = (ready[0].revents & POLLIN) != 0;
+      if (asks && Receive()) return true;
+      if (asks) continue;
+      if (ready[1].revents != 0) NoteEnd();
+      if (count == 0 && !ended_) EndHungChild();
+      if (ended_ && (ready[0].revents != 0 || (patience_ -= kLook) < 0 || !IsAnyOtherThere())) return false;
+    }
+  }
+
+  bool Receive() {
     call_ = {};
-    // ENOENT: the child was killed in between.
     if (::ioctl(asked_, SECCOMP_IOCTL_NOTIF_RECV, &call_) == 0) return true;
-    Require(errno == ENOENT, "receive a system call");
-    return NextCall();
+    Require(errno == ENOENT, "receive a system call");  // who made it was killed in between
+    return false;
+  }
+
+  void NoteEnd() {
+    int state = 0;
+    Require(::waitpid(child_, &state, 0) == child_, "wait for the child");
+    outcome_.killed = WIFSIGNALED(state);
+    ended_ = true;
+  }
+
+  void EndHungChild() {
+    outcome_.hung = true;
+    Require(::kill(child_, SIGKILL) == 0, "kill the child");
+  }
+
+  bool IsAnyOtherThere() {
+    return std::ranges::any_of(others_, [](pid_t other) { return ::waitpid(other, nullptr, WNOHANG) == 0; });
+  }
+
+  // What the child has led to is this process's by now. A process asks about no more calls a moment before its end.
+  void EndOther(pid_t other) {
+    for (int looks = 0; looks < kPatienceBehind / kLook; ++looks) {
+      if (::waitpid(other, nullptr, WNOHANG) != 0) return;
+      ::poll(nullptr, 0, looks == 0 ? 1 : kLook);
+    }
+    ++outcome_.processesLeft;
+    ::kill(other, SIGKILL);
+    ::waitpid(other, nullptr, 0);
+  }
+
+  // 0 when there is no such process.
+  static pid_t ParentOf(pid_t pid) {
+    std::ifstream file("/proc/" + std::to_string(pid) + "/stat");
+    std::string text((std::istreambuf_iterator<char>(file)), {});
+    const size_t name = text.rfind(") ");
+    return name != std::string::npos ? static_cast<pid_t>(std::atoi(text.c_str() + name + 4)) : 0;
   }
 
   // Only the calls of the operation itself count, but for the processes that those which it started start.
@@ -200,22 +325,51 @@ class Supervisor {
     const int number = call_.data.nr;
     const bool own = call_.pid == static_cast<__u32>(child_);
     if (own && number == kMark) return PassMark();
+    if (!own) others_.insert(static_cast<pid_t>(call_.pid));
     if (!inOperation_) return LetThrough();
-    if (IsAmong(kForks, number)) ++outcome_.cost.processes;
-    if (!own) return LetThrough();
-    if (!IsAmong(kMemory, number)) ++outcome_.cost.calls;
+    if (!own || IsAmong(kMemory, number)) return LetThrough();
+    ++outcome_.cost.calls;
     if (plan_.withoutSleeps && IsAmong(kSleeps, number)) return SkipSleep();
-
-    const SystemCall* call = CallOf(number);
-    if (call == nullptr) return LetThrough();
-    if (IsPlanned(*call)) {
-      outcome_.reached = true;
-      outcome_.call = *call;
-      return Interfere();
-    }
-    if (!outcome_.reached) outcome_.before.push_back(*call);
+    if (plan_.all) return AnswerCounted(CallByObject());
+    if (const SystemCall* call = CallOnFiles(number); call != nullptr) return AnswerCounted(*call);
     LetThrough();
   }
+
+  // A call on a pipe or a socket cannot fail as one on a file can.
+  SystemCall CallByObject() const {
+    SystemCall call = AnyCall(call_.data.nr);
+    constexpr int kOnDescriptors[] = {
+        SYS_read,       SYS_write, SYS_close,
+#ifdef SYS_fstat
+        SYS_fstat,
+#endif
+#ifdef SYS_newfstatat
+        SYS_newfstatat,
+#endif
+    };
+    if (!IsAmong(kOnDescriptors, call.number)) return call;
+    char szObject[8] = {};
+    const std::string link =
+        "/proc/" + std::to_string(child_) + "/fd/" + std::to_string(static_cast<int>(call_.data.args[0]));
+    (void)::readlink(link.c_str(), szObject, sizeof szObject - 1);
+    const std::string_view object = szObject;
+    if (object.starts_with("pipe:") || object.starts_with("socket:")) call.name += " of a stream";
+    return call;
+  }
+
+  void AnswerCounted(const SystemCall& call) {
+    if (plan_.interference == Interference::kWatch) plan_.meanwhile();
+    if (IsPlanned(call)) {
+      outcome_.reached = true;
+      outcome_.call = call;
+      return Interfere();
+    }
+    if (outcome_.reached && plan_.onwards && CanGive(call, plan_.error)) return Fail();
+    if (!outcome_.reached) outcome_.before.push_back(call);
+    LetThrough();
+  }
+
+  static bool CanGive(const SystemCall& call, int error) { return std::ranges::count(ErrorsOf(call.name), error) > 0; }
 
   // The time that is asked for begins with its seconds.
   void SkipSleep() {
@@ -239,6 +393,8 @@ class Supervisor {
       descriptorsBefore_ = CountDescriptors();
     } else {
       outcome_.descriptorsLeft = CountDescriptors() - descriptorsBefore_;
+      outcome_.childrenLeft =
+          static_cast<int>(std::ranges::count_if(others_, [&](pid_t other) { return ParentOf(other) == child_; }));
     }
     CountBytes(inOperation_ ? -1 : 1);
     LetThrough();
@@ -257,7 +413,7 @@ class Supervisor {
   }
 
   void Interfere() {
-    const bool writes = outcome_.call.name == "write";
+    const bool writes = outcome_.call.number == SYS_write;
     switch (plan_.interference) {
       case Interference::kNone:
         return LetThrough();
@@ -268,13 +424,58 @@ class Supervisor {
         Require(::kill(child_, SIGKILL) == 0, "kill the child");
         return;
       case Interference::kFail:
-        return Reply(0, -plan_.error, 0);
+        return Fail();
       case Interference::kShorten:
+        if (outcome_.call.number == SYS_read) return ReadHalf();
         return writes ? Reply(WriteHalf(), 0, 0) : LetThrough();
       case Interference::kMeanwhile:
         plan_.meanwhile();
         return LetThrough();
+      case Interference::kWatch:
+        return LetThrough();
     }
+  }
+
+  void Fail() {
+    if (call_.data.nr == SYS_close) Close();
+    Reply(0, -plan_.error, 0);
+  }
+
+  // A close that fails has closed the descriptor all the same. Here it leads nowhere from then on.
+  void Close() {
+    const int nowhere = ::open("/dev/null", O_RDWR | O_CLOEXEC);
+    seccomp_notif_addfd put = {};
+    put.id = call_.id;
+    put.flags = SECCOMP_ADDFD_FLAG_SETFD;
+    put.srcfd = static_cast<__u32>(nowhere);
+    put.newfd = static_cast<__u32>(call_.data.args[0]);
+    put.newfd_flags = O_CLOEXEC;
+    Require(::ioctl(asked_, SECCOMP_IOCTL_NOTIF_ADDFD, &put) >= 0, "close a descriptor");
+    ::close(nowhere);
+    ++outcome_.closesFailed;
+  }
+
+  // The child's descriptor of the call, in this process.
+  int FileOfCall() const {
+    const int file = static_cast<int>(::syscall(SYS_pidfd_getfd, process_, static_cast<int>(call_.data.args[0]), 0));
+    Require(file >= 0, "get a descriptor of the child's");
+    return file;
+  }
+
+  // Does half of the child's read in its place. Where nothing can be read yet, it is let through.
+  void ReadHalf() {
+    const int file = FileOfCall();
+    int left = 0;
+    const bool known = ::ioctl(file, FIONREAD, &left) == 0 && left > 1;
+    std::string half(std::min<size_t>(known ? static_cast<size_t>(left) : 0, call_.data.args[2]) / 2, '\0');
+    const ssize_t size = half.empty() ? 0 : ::read(file, half.data(), half.size());
+    ::close(file);
+    if (size <= 0) return LetThrough();
+    const iovec here = {half.data(), static_cast<size_t>(size)};
+    const iovec there = {reinterpret_cast<void*>(static_cast<uintptr_t>(call_.data.args[1])),
+                         static_cast<size_t>(size)};
+    Require(::process_vm_writev(child_, &here, 1, &there, 1, 0) == size, "give what was read");
+    Reply(size, 0, 0);
   }
 
   // Does half of the child's write in its place.
@@ -284,11 +485,9 @@ class Supervisor {
     const iovec there = {reinterpret_cast<void*>(static_cast<uintptr_t>(call_.data.args[1])), half.size()};
     Require(::process_vm_readv(child_, &here, 1, &there, 1, 0) == static_cast<ssize_t>(half.size()),
             "read what it writes");
-    const int process = static_cast<int>(::syscall(SYS_pidfd_open, child_, 0));
-    const int file = static_cast<int>(::syscall(SYS_pidfd_getfd, process, static_cast<int>(call_.data.args[0]), 0));
+    const int file = FileOfCall();
     Require(::write(file, half.data(), half.size()) == static_cast<ssize_t>(half.size()), "write a half");
     ::close(file);
-    ::close(process);
     return static_cast<ssize_t>(half.size());
   }
 
@@ -322,9 +521,13 @@ class Supervisor {
   pid_t child_;
   int report_;
   Plan plan_;
+  int process_ = -1;
   int asked_ = -1;
   seccomp_notif call_ = {};
   bool inOperation_ = false;
+  bool ended_ = false;
+  int patience_ = kPatienceBehind;
+  std::set<pid_t> others_;
   int calls_ = 0;
   int descriptorsBefore_ = 0;
   Outcome outcome_;
@@ -332,7 +535,44 @@ class Supervisor {
 
 }  // namespace
 
+const std::vector<int>& ErrorsOf(const std::string& name) {
+  static const std::map<std::string, std::vector<int>> all = {
+      {"open", {ENOSPC, EIO, EACCES, EROFS, EMFILE, EINTR, ENOMEM}},
+      {"access", {EIO, EACCES, ENOMEM}},
+      {"readlink", {EIO, EACCES, ENOMEM}},
+      {"stat", {EIO, EACCES, ENOMEM}},
+      {"unlink", {EIO, EACCES, EROFS, ENOMEM}},
+      {"rename", {ENOSPC, EIO, EACCES, EROFS, ENOMEM}},
+      {"read", {EIO, EINTR, ENOMEM}},
+      {"write", {ENOSPC, EIO, EINTR}},
+      {"fsync", {ENOSPC, EIO, EROFS}},
+      {"close", {ENOSPC, EIO, EINTR}},
+      {"read of a stream", {EINTR}},
+      {"flock", {EINTR, ENOMEM}},
+      {"fchmod", {EIO, EACCES, EROFS}},
+      {"fchown", {EIO, EACCES, EROFS}},
+      {"mkdir", {ENOSPC, EACCES, EROFS, ENOMEM}},
+      {"getdents", {EIO, ENOMEM}},
+      {"socket", {EACCES, EMFILE, ENOMEM}},
+      {"ioctl", {EIO, EACCES, EINTR, ENOMEM}},
+      {"send", {EACCES, EINTR, ENOMEM}},
+      {"recv", {EINTR, ENOMEM}},
+      {"pipe", {EMFILE, ENOMEM}},
+      {"clone", {EAGAIN, ENOMEM}},
+      {"wait", {EINTR}},
+      {"poll", {EINTR, ENOMEM}},
+      {"getrandom", {EINTR}},
+      {"kill", {EACCES}},
+      {"pidfd_open", {EMFILE, ENOMEM}},
+      {"pidfd_send_signal", {EACCES}},
+  };
+  static const std::vector<int> none;
+  const auto errors = all.find(name);
+  return errors != all.end() ? errors->second : none;
+}
+
 Outcome RunSupervised(const Plan& plan, const std::function<int()>& operation) {
+  Require(::prctl(PR_SET_CHILD_SUBREAPER, 1, 0, 0, 0) == 0, "take over what the child leaves");
   int report[2];
   Require(::pipe2(report, O_CLOEXEC) == 0, "pipe");
   const pid_t child = ::fork();

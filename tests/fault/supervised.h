@@ -11,7 +11,7 @@
 
 struct SystemCall {
   int number = -1;
-  std::string name;  // by which the C library knows it
+  std::string name;  // by which the C library knows it; where all calls count, " of a stream" for a pipe or a socket
 };
 
 // What happens in place of a system call.
@@ -20,8 +20,9 @@ enum class Interference {
   kKill,       // the process is killed
   kTearWrite,  // as kKill, but of a write one half is done first
   kFail,       // the call fails, without effect
-  kShorten,    // of a write only one half is done; other calls are let through
+  kShorten,    // of a read or a write only one half is done; other calls are let through
   kMeanwhile,  // something happens elsewhere, and the call is let through
+  kWatch,      // as kMeanwhile, at each call, whichever the plan says
 };
 
 struct Plan {
@@ -31,6 +32,8 @@ struct Plan {
   std::string name = {};                 // counts only calls of that name; empty for all
   std::function<void()> meanwhile = {};  // what happens, in this process
   bool withoutSleeps = false;            // a sleep of the operation is over at once
+  bool all = false;                      // counts all of the operation's calls, but for an allocator's and its sleeps
+  bool onwards = false;                  // with kFail: so do all calls behind it that can give the error
 };
 
 // The costs of an operation.
@@ -52,9 +55,17 @@ struct Outcome {
   std::vector<std::string> reports;
   Cost cost;
   int descriptorsLeft = 0;  // how many more are open behind the operation than before it
+  int closesFailed = 0;     // each of them leaves a descriptor, of /dev/null, which no operation can get rid of
+  int childrenLeft = 0;     // processes that the operation has started, and not waited for
+  int processesLeft = 0;    // those that it has led to, and that did not end by themselves soon behind it
+  bool hung = false;        // it made no call for so long that it was killed
 };
 
-// Runs an operation in a child of this process.
+// The errors that a system call of that name is made to give: those of a disk, of memory, of rights, and of signals.
+const std::vector<int>& ErrorsOf(const std::string& name);
+
+// Runs an operation in a child of this process. What becomes of the child's children is watched too, whereupon this
+// process is the one that they are left to.
 Outcome RunSupervised(const Plan& plan, const std::function<int()>& operation);
 
 #endif  // MERO_TESTS_FAULT_SUPERVISED_H

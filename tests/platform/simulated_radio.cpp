@@ -27,6 +27,11 @@ bool IsOfWirelessExtensions(unsigned long request) {
   return request >= SIOCIWFIRST && request <= SIOCIWLAST;
 }
 
+// Any other error is one that a supervisor has put in place of the answer.
+bool IsOfAKernelWithoutDriver(int error) {
+  return error == ENODEV || error == EOPNOTSUPP || error == ENOTTY || error == EINVAL || error == EPERM;
+}
+
 int Fail(int error) {
   errno = error;
   return -1;
@@ -45,7 +50,8 @@ extern "C" int ioctl(int fd, unsigned long request, ...) {
   }
   static const auto next = reinterpret_cast<int (*)(int, unsigned long, ...)>(::dlsym(RTLD_NEXT, "ioctl"));
   const int result = next(fd, request, argument);  // also where the kernel has no answer: a supervisor sees the call
-  return g_driver != nullptr && IsOfWirelessExtensions(request) ? g_driver->Answer(request, argument) : result;
+  if (g_driver == nullptr || !IsOfWirelessExtensions(request)) return result;
+  return result < 0 && !IsOfAKernelWithoutDriver(errno) ? result : g_driver->Answer(request, argument);
 }
 
 // The name by which 32-bit programs with 64-bit times call it.

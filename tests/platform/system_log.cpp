@@ -18,7 +18,7 @@ struct Record {
   int line;
   char szText[1024];  // all of it
 };
-std::array<Record, 64> g_records;
+std::array<Record, 600> g_records;
 size_t g_count = 0;
 
 constexpr std::string_view kPrefix = "%s:%d ";
