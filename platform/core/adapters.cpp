@@ -4,36 +4,53 @@
 
 #include <cstdio>
 #include <cstring>
+#include <utility>
 
 #include "common/paths.h"
 #include "common/text.h"
 #include "platform/base/directory.h"
 #include "platform/base/failure.h"
+#include "platform/base/result.h"
 
 namespace {
 
 constexpr char kInterfaces[] = "/sys/class/net";
 
-bool HasEntry(const char* szIfName, const char* szEntry) {
+// An interface may have gone since it was listed, and a file that is no interface stands among them where there is
+// bonding.
+Result<bool> HasEntry(const char* szIfName, const char* szEntry) {
   char szPath[sizeof kInterfaces + NAME_MAX + 16];
   std::snprintf(szPath, sizeof szPath, "%s/%s/%s", kInterfaces, szIfName, szEntry);
-  return ::access(szPath, F_OK) == 0;
+  if (::access(szPath, F_OK) == 0) return true;
+  return errno == ENOENT || errno == ENOTDIR ? Result<bool>(false) : Status::Failed(errno);
 }
 
 // The guest network's interface is not an adapter: it is a second interface on an adapter's radio.
-bool IsAdapter(const char* szIfName) {
+Result<bool> IsAdapter(const char* szIfName) {
   if (szIfName[0] == '.' || std::strcmp(szIfName, kGuestInterface) == 0) return false;
-  return HasEntry(szIfName, "phy80211") || HasEntry(szIfName, "wireless");
+  Result<bool> modern = HasEntry(szIfName, "phy80211");
+  return modern.ok() && !*modern ? HasEntry(szIfName, "wireless") : std::move(modern);
 }
 
-// Calls `visit(name)` for each adapter, in no order.
+// Calls `visit(name)` for each adapter, in no order, until one cannot be looked at.
+template <class Visit>
+Status VisitAdapters(Visit visit) {
+  const Directory directory(::opendir(kInterfaces));
+  if (!directory) return Status::Failed(errno);
+  while (true) {
+    errno = 0;
+    const dirent* entry = ::readdir(directory.get());
+    if (entry == nullptr) return errno == 0 ? Status::Ok() : Status::Failed(errno);
+    Result<bool> adapter = IsAdapter(entry->d_name);
+    if (!adapter.ok()) return adapter.status();
+    if (*adapter) visit(entry->d_name);
+  }
+}
+
 template <class Visit>
 void ForEachAdapter(Visit visit) {
-  const Directory directory(::opendir(kInterfaces));
-  if (!directory) return FAIL(errno, "Failed to list %s", kInterfaces);
-  while (const dirent* entry = ::readdir(directory.get())) {
-    if (IsAdapter(entry->d_name)) visit(entry->d_name);
-  }
+  const Status status = VisitAdapters(visit);
+  if (!status.ok()) FAIL(status.error(), "Failed to list %s", kInterfaces);
 }
 
 }  // namespace

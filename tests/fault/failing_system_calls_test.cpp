@@ -7,6 +7,7 @@
 #include "tests/fault/saving.h"
 #include "tests/fault/supervised.h"
 #include "tests/platform/platform_test.h"
+#include "tests/platform/simulated_radio.h"
 
 namespace {
 
@@ -173,6 +174,20 @@ TEST_F(AFailure, HasACodeThatTellsItsReason) {
     EXPECT_EQ(outcome.result, -1);
     EXPECT_EQ(outcome.code, row.code) << std::strerror(row.error);
     EXPECT_THAT(outcome.reports, ElementsAre(HasSubstr(std::string("/tmp/file: ") + std::strerror(row.error))));
+  }
+}
+
+// Adapters that could not be listed were taken to be absent, without a word.
+TEST_F(AFailure, ToListTheAdaptersIsReported) {
+  const ShownInterfaces shown({{"lo", ""}, {"wlan5", "phy80211"}});
+  for (const char* szCall : {"getdents", "access"}) {
+    Plan plan = {Interference::kFail, 1, EIO, szCall};
+    plan.all = true;
+    const Outcome outcome = RunSupervised(plan, [] { return MEROWirelessAdapterNum(); });
+    EXPECT_TRUE(outcome.reached) << szCall;
+    EXPECT_EQ(outcome.result, 0) << szCall;
+    EXPECT_EQ(outcome.code, ERR_IO) << szCall;
+    EXPECT_THAT(outcome.reports, ElementsAre(HasSubstr("Failed to list /sys/class/net: Input/output error"))) << szCall;
   }
 }
 
