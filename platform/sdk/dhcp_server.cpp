@@ -197,7 +197,6 @@ void AppendLine(Bytes& content, const ConfLine& line, const MERO_DHCPD_CONF& con
 }
 
 Status WriteConf(const char* szPath, const MERO_DHCPD_CONF& conf) {
-  if (Status status = MakeDirectory(kDhcpDirectory); !status.ok()) return status;
   return EditFile(szPath, 0644, [&](std::string_view, Revision& revision) {
     revision.content.Append(kHeading);
     for (const ConfLine& line : kLines) AppendLine(revision.content, line, conf);
@@ -217,13 +216,16 @@ bool WriteAutoTime(const MERO_DHCPD_CONF& conf) {
   return PLIBCFileSetKeyValue(path.c_str(), kAutoTimeKey, szAutoTime, kLineFormat) > 0;
 }
 
+// The configuration is written behind the time, since by it the server counts as known, and is only switched on then.
 // The switch is written last, so that no server is switched on before its other settings are there.
 bool WriteFiles(const MERO_DHCPD_CONF& conf, bool enable) {
   const InterfacePath path(kDhcpConfFormat, conf.szInterface, conf.szTag);
-  if (const Status status = WriteConf(path.c_str(), conf); !status.ok()) {
+  const Status made = MakeDirectory(kDhcpDirectory);
+  if (made.ok() && !WriteAutoTime(conf)) return false;
+  if (const Status status = made.ok() ? WriteConf(path.c_str(), conf) : made; !status.ok()) {
     return FAIL(status.error(), "Failed to write %s", path.c_str()), false;
   }
-  return WriteAutoTime(conf) && WriteSwitch(conf, enable);
+  return WriteSwitch(conf, enable);
 }
 
 // ---- Reading ----

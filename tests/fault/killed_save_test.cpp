@@ -1,4 +1,7 @@
 // A save that is killed, at every instant: whether by a signal, a crash or a power cut.
+#include <cstring>
+#include <filesystem>
+
 #include "tests/fault/saving.h"
 #include "tests/fault/supervised.h"
 #include "tests/platform/platform_test.h"
@@ -57,6 +60,26 @@ TEST_F(AKilledSave, FlushesTheFileBeforeItIsInPlaceAndItsDirectoryBehind) {
   }
   // The sections before the network's own, its own, and those behind it.
   EXPECT_THAT(order, ElementsAre("write", "write", "write", "fsync", "rename", "fsync"));
+}
+
+// A DHCP server whose setting up had been broken off was known without its time, and was switched on like that.
+TEST_F(AKilledSave, MakesNoDhcpServerKnownThatLacksASetting) {
+  MERO_DHCPD_CONF conf{};
+  conf.autoTime = 30;
+  for (char* szName : {conf.szInterface, conf.szTag}) std::strcpy(szName, "lbr0");
+  std::strcpy(conf.szRangeStart, "10.1.14.2");
+  int known = 0;
+  for (int call = 1;; ++call) {
+    std::filesystem::remove_all("/etc/dhcpd");
+    const Outcome outcome =
+        RunSupervised({Interference::kKill, call, 0, ""}, [&] { return MERONetSetDhcpServerConfigFiles(&conf, 1); });
+    if (!outcome.reached) break;
+    MERO_DHCPD_CONF read{};
+    if (MERONetGetDhcpServerConf("lbr0", "lbr0", &read) == 0) continue;
+    EXPECT_EQ(read.autoTime, 30) << "killed before call " << call << ", " << outcome.call.name;
+    ++known;
+  }
+  EXPECT_GT(known, 3);
 }
 
 }  // namespace

@@ -525,13 +525,16 @@ TEST_F(DhcpServerFiles, AreReportedWhenTheyCannotBeWritten) {
   const MERO_DHCPD_CONF conf = Server();
   WriteText("/etc/dhcpd", "");
   EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 0);
-  ExpectFailure(ERR_FILE_NOT_FOUND, std::string("Failed to write ") + kConf + ": Not a directory");
+  ExpectFailure(ERR_FILE_NOT_FOUND, std::string("Failed to write ") + kInfo + ": Not a directory");
   fs::remove("/etc/dhcpd");
 
-  fs::create_directories(kInfo);
-  EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 0);
-  EXPECT_THAT(TakeLog(), ElementsAre(testing::Field(&LogLine::text,
-                                                    testing::StartsWith("Failed to write " + std::string(kInfo)))));
+  for (const char* szPath : {kInfo, kConf}) {
+    fs::create_directories(szPath);
+    EXPECT_EQ(MERONetSetDhcpServerConfigFiles(&conf, 1), 0);
+    EXPECT_THAT(TakeLog(), ElementsAre(testing::Field(&LogLine::text,
+                                                      testing::StartsWith("Failed to write " + std::string(szPath)))));
+    fs::remove_all(szPath);
+  }
 }
 
 TEST_F(DhcpServerFiles, AreReportedWhenTheyCannotBeRead) {
