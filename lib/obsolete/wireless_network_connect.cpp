@@ -2,6 +2,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdio>
 #include <cstring>
 
@@ -159,11 +160,13 @@ BOOL CheckConnComplete() {
   return FALSE;
 }
 
-// Puts a new record into its place, and removes what others have put there meanwhile: anyone may, in this directory.
+// Puts a new record into its place, and removes a directory that others have put there meanwhile: anyone may, in this
+// directory. A file it replaces.
 bool PutRecord(const char* szNew) {
   constexpr int kTries = 100;
   for (int i = 0; i < kTries; ++i) {
     if (std::rename(szNew, kConnectionRecordPath) == 0) return true;
+    if (errno != EISDIR) return false;
     (void)PLIBCSysUnlink(kConnectionRecordPath);
   }
   return false;

@@ -4,6 +4,7 @@
 #include <cstring>
 #include <set>
 
+#include "tests/fault/calls.h"
 #include "tests/fault/saving.h"
 #include "tests/fault/supervised.h"
 #include "tests/platform/platform_test.h"
@@ -16,6 +17,7 @@ using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::Not;
 
 bool Lists(const std::vector<SystemCall>& calls, const std::string& name) {
   return std::ranges::find(calls, name, &SystemCall::name) != calls.end();
@@ -189,6 +191,19 @@ TEST_F(AFailure, ToListTheAdaptersIsReported) {
     EXPECT_EQ(outcome.code, ERR_IO) << szCall;
     EXPECT_THAT(outcome.reports, ElementsAre(HasSubstr("Failed to list /sys/class/net: Input/output error"))) << szCall;
   }
+}
+
+// It was tried a hundred times, with a report of each, whatever the reason was.
+TEST_F(AFailure, ToPutARecordIntoItsPlaceIsReportedOnce) {
+  const auto join =
+      std::ranges::find(ExportedFunctions(), std::string("MEROWirelessNetworkConnect"), &Exported::szName);
+  const Scene scene(*join);
+  Plan plan = {Interference::kFail, 1, EACCES, "rename"};
+  plan.all = plan.onwards = plan.withoutSleeps = true;
+  const Outcome outcome = RunSupervised(plan, [&] { return static_cast<int>(join->call()); });
+  EXPECT_EQ(outcome.result, static_cast<int>(Answer::kFailed));
+  EXPECT_THAT(outcome.reports, Contains(HasSubstr("Failed to record this connection.")));
+  EXPECT_THAT(outcome.reports, Not(Contains(HasSubstr("Failed to remove /var/tmp/.wireless_current_connection"))));
 }
 
 }  // namespace
