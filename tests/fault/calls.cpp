@@ -336,7 +336,8 @@ void ForgetEverything() {
     fs::remove_all(szDirectory);
     fs::create_directories(szDirectory);
   }
-  for (const char* szFile : {kAdapterInfoPath, kConnectionRecordPath, kSupplicantPidPath, "/tmp/network-script"}) {
+  for (const char* szFile : {kAdapterInfoPath, kConnectionRecordPath, kSupplicantPidPath, kJoinMarkerPath,
+                             kApMarkerPath, "/tmp/network-script"}) {
     fs::remove(szFile);
   }
 }

@@ -4,6 +4,7 @@
 // way on every architecture. Only its calls to Mark() and what it reports afterwards go through unasked.
 #include "tests/fault/supervised.h"
 
+#include <dlfcn.h>
 #include <fcntl.h>
 #include <linux/filter.h>
 #include <linux/seccomp.h>
@@ -178,7 +179,7 @@ void WriteAll(int fd, const void* data, size_t size) {
 // Where this process's libraries lie, and not those of a program that it becomes: the upper half of their addresses. A
 // machine of 32 bits has no such half.
 uint32_t UpperHalfOfLibraries() {
-  const auto address = reinterpret_cast<uintptr_t>(&::syscall);
+  const auto address = reinterpret_cast<uintptr_t>(::dlsym(RTLD_NEXT, "syscall"));
   return static_cast<uint32_t>(static_cast<uint64_t>(address) >> 32);
 }
 
@@ -383,7 +384,7 @@ class Supervisor {
 
   bool IsPlanned(const SystemCall& call) {
     const bool counts = plan_.name.empty() || plan_.name == call.name;
-    return counts && ++calls_ == plan_.call;
+    return counts && ++calls_ == plan_.call && (plan_.expected.empty() || plan_.expected == call.name);
   }
 
   // The operation begins, or has ended.

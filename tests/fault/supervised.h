@@ -33,6 +33,7 @@ struct Plan {
   std::function<void()> meanwhile = {};  // what happens, in this process
   bool withoutSleeps = false;            // a sleep of the operation is over at once
   bool all = false;                      // counts all of the operation's calls, but for an allocator's and its sleeps
+  std::string expected = {};             // the name of the call; when it is another, nothing is done
   bool onwards = false;                  // with kFail: so do all calls behind it that can give the error
 };
 
