@@ -11,21 +11,22 @@
 
 #include "common/text.h"
 #include "reports.h"
+#include "tests/support/early.h"
 #include "unit_test.h"
 
 // Apart from those of other machines, which bear the same names.
 namespace enabling {
 
-inline const std::string kMarker = "/var/tmp/.wireless_ap_connecting";
-inline const std::string kAdapterInfo = "/tmp/wireless.info";
-inline const std::string kSettings = "/usr/mero/etc/wireless_ap.conf";
-inline const std::string kHostFile = "/etc/hostapd/hostapd-wlan0-host.conf";
-inline const std::string kInfoFile = "/etc/hostapd/hostapd-wlan0.info";
-inline const std::string kScripts = "/etc/sysconfig/network-scripts";
-inline const std::string kInterfaceScript = kScripts + "/ifcfg-wlan0";
+EARLY inline const std::string kMarker = "/var/tmp/.wireless_ap_connecting";
+EARLY inline const std::string kAdapterInfo = "/tmp/wireless.info";
+EARLY inline const std::string kSettings = "/usr/mero/etc/wireless_ap.conf";
+EARLY inline const std::string kHostFile = "/etc/hostapd/hostapd-wlan0-host.conf";
+EARLY inline const std::string kInfoFile = "/etc/hostapd/hostapd-wlan0.info";
+EARLY inline const std::string kScripts = "/etc/sysconfig/network-scripts";
+EARLY inline const std::string kInterfaceScript = kScripts + "/ifcfg-wlan0";
 
-inline const std::string kPlain = "%s=%s\n";
-inline const std::string kQuoted = "%s=\"%s\"\n";
+EARLY inline const std::string kPlain = "%s=%s\n";
+EARLY inline const std::string kQuoted = "%s=\"%s\"\n";
 
 // ---- What is done, step by step ----
 
@@ -38,25 +39,25 @@ inline std::string EnableReport(const std::string& message) {
   return fake::Report("wireless_ap_enable:# " + message);
 }
 
-inline const Effects kBegins = {"PLIBCFileExist(" + kMarker + ")", "PLIBCFileTouch(" + kMarker + ")"};
-inline const Effects kNamesSection = {"PLIBCFileExist(" + kAdapterInfo + ")",
-                                      "PLIBCFileGetKeyValue(" + kAdapterInfo + ", PRODUCT, &, 1024, 0)"};
-inline const Effects kReadsSection = {"PLIBCFileExist(" + kSettings + ")",
-                                      "PLIBCFileGetSection(" + kSettings + ", RT-5370, &)"};
-inline const Effects kWritesDaemonsFiles = {
+EARLY inline const Effects kBegins = {"PLIBCFileExist(" + kMarker + ")", "PLIBCFileTouch(" + kMarker + ")"};
+EARLY inline const Effects kNamesSection = {"PLIBCFileExist(" + kAdapterInfo + ")",
+                                            "PLIBCFileGetKeyValue(" + kAdapterInfo + ", PRODUCT, &, 1024, 0)"};
+EARLY inline const Effects kReadsSection = {"PLIBCFileExist(" + kSettings + ")",
+                                            "PLIBCFileGetSection(" + kSettings + ", RT-5370, &)"};
+EARLY inline const Effects kWritesDaemonsFiles = {
     "PLIBNetIfDown(wlan0)", "PLIBCSysUnlink(" + kHostFile + ")", "PLIBCExec(/bin/mkdir, -p, /etc/hostapd, null, null)",
     "PLIBCFileCheckKeyValue(/etc.defaults/meroinfo.conf, support_pci_wifi, yes, 0)"};
-inline const Effects kSwitchesOn = {SetOf(kInfoFile, "enable", "yes", kQuoted)};
-inline const Effects kFails = {EnableReport("Failed to enable AP.")};
-inline const Effects kEnds = {"PLIBCSysUnlink(" + kMarker + ")"};
+EARLY inline const Effects kSwitchesOn = {SetOf(kInfoFile, "enable", "yes", kQuoted)};
+EARLY inline const Effects kFails = {EnableReport("Failed to enable AP.")};
+EARLY inline const Effects kEnds = {"PLIBCSysUnlink(" + kMarker + ")"};
 
-inline const Effects kReadsSettings = kNamesSection + kReadsSection;
-inline const Effects kPrepares = kReadsSettings + kWritesDaemonsFiles + kSwitchesOn;
+EARLY inline const Effects kReadsSettings = kNamesSection + kReadsSection;
+EARLY inline const Effects kPrepares = kReadsSettings + kWritesDaemonsFiles + kSwitchesOn;
 
 inline Effects AsksForBridge(const std::string& bridge) {
   return {"MERONetGetBridgeConfig(" + bridge + ", &, &)"};
 }
-inline const Effects kMakesBridge = {"MERONetSetBridgeConfig(&, &)"};
+EARLY inline const Effects kMakesBridge = {"MERONetSetBridgeConfig(&, &)"};
 
 inline std::string BridgeScript(const std::string& bridge) {
   return kScripts + "/ifcfg-" + bridge;
@@ -75,12 +76,12 @@ inline Effects ChecksAddress(const std::string& address, const std::string& ip, 
 inline Effects MakesEnd(const std::string& address, const std::string& ip, const std::string& mask) {
   return Effects{"MERONetNtoa({})"} + ChecksAddress(address, ip, mask);
 }
-inline const Effects kWritesServer = {"MERONetSetDhcpServerConfigFiles(&, 1)"};
+EARLY inline const Effects kWritesServer = {"MERONetSetDhcpServerConfigFiles(&, 1)"};
 
 // What a new bridge "lbr0" brings.
-inline const Effects kMakesServer = AsksForServer("lbr0") + MakesEnd("10.1.14.2", "10.1.14.1", "255.255.255.0") +
-                                    MakesEnd("10.1.14.254", "10.1.14.1", "255.255.255.0") + kWritesServer;
-inline const Effects kMakesNatBridge = AsksForBridge("lbr0") + kMakesBridge + kMakesServer;
+EARLY inline const Effects kMakesServer = AsksForServer("lbr0") + MakesEnd("10.1.14.2", "10.1.14.1", "255.255.255.0") +
+                                          MakesEnd("10.1.14.254", "10.1.14.1", "255.255.255.0") + kWritesServer;
+EARLY inline const Effects kMakesNatBridge = AsksForBridge("lbr0") + kMakesBridge + kMakesServer;
 
 inline Effects WritesScript(const std::string& bridge) {
   return {SetOf(kInterfaceScript, "ONBOOT", "yes", kPlain),

@@ -7,11 +7,12 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/early.h"
 #include "wireless.h"
 
-inline const std::string kSettings = "/usr/mero/etc/wireless_ap.conf";
-inline const std::string kModel = "RT-5370";
-inline const std::string kEveryHour(168, '1');
+EARLY inline const std::string kSettings = "/usr/mero/etc/wireless_ap.conf";
+EARLY inline const std::string kModel = "RT-5370";
+EARLY inline const std::string kEveryHour(168, '1');
 
 // ---- The keys, apart from the library's own table of them, so that a slip there shows ----
 
@@ -168,8 +169,8 @@ inline std::vector<std::string> Differences(const MERO_AP_CONF& a, const MERO_AP
 
 // ---- A record in which no two numbers are the same, nor any of them what a missing key stands for ----
 
-inline const std::string kOfficeHours = std::string(84, '0') + std::string(84, '1');
-inline const std::string kVisitingHours = std::string(100, '0') + std::string(68, '1');
+EARLY inline const std::string kOfficeHours = std::string(84, '0') + std::string(84, '1');
+EARLY inline const std::string kVisitingHours = std::string(100, '0') + std::string(68, '1');
 
 inline MERO_AP_CONF OfficeSettings(MERO_AP_ENCRYPT encryption, MERO_AP_ENCRYPT guestEncryption) {
   MERO_AP_CONF conf{};

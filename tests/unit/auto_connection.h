@@ -8,11 +8,12 @@
 #include "connection.h"
 #include "known_networks.h"
 #include "listing.h"
+#include "tests/support/early.h"
 
-inline const std::string kAsksForStatus = "MEROWirelessCurInfoGet(4, &)";
-inline const std::string kLooks = "PLIBNetIfUp(wlan0)";  // once for each look at what is in range
-inline const std::string kAddresses = "MERONetSetCard1(&, 0)";
-inline const std::string kDisconnects = "MEROWirelessNetworkDisconnect()";
+EARLY inline const std::string kAsksForStatus = "MEROWirelessCurInfoGet(4, &)";
+EARLY inline const std::string kLooks = "PLIBNetIfUp(wlan0)";  // once for each look at what is in range
+EARLY inline const std::string kAddresses = "MERONetSetCard1(&, 0)";
+EARLY inline const std::string kDisconnects = "MEROWirelessNetworkDisconnect()";
 
 inline std::string JoinOf(const std::string& name) {
   return "join(" + name + ")";
@@ -22,7 +23,7 @@ inline std::string AutoConnectReport(const std::string& message) {
   return fake::Report("wireless_auto_connect:# " + message);
 }
 
-inline const std::string kFailsToConnect = AutoConnectReport("Failed to connect any access point");
+EARLY inline const std::string kFailsToConnect = AutoConnectReport("Failed to connect any access point");
 
 // A saved network, with the last octet of its access point's address.
 struct Saved {
@@ -51,7 +52,7 @@ inline std::string InRange(const std::string& name, int octet, const std::string
 }
 
 // There is always somebody else's network in range, so that one look is one scan.
-inline const std::string kNeighbour = InRange("Neighbour", 0xff);
+EARLY inline const std::string kNeighbour = InRange("Neighbour", 0xff);
 
 class AutoConnectTest : public ConnectionTest {
  protected:

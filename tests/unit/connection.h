@@ -7,24 +7,25 @@
 #include <vector>
 
 #include "reports.h"
+#include "tests/support/early.h"
 #include "unit_test.h"
 
-inline const std::string kMarker = "/var/tmp/.wireless_connecting";
-inline const std::string kRecord = "/var/tmp/.wireless_current_connection";
-inline const std::string kSupplicantConfig = "/usr/mero/etc/wpa_supplicant.conf";
-inline const std::string kSupplicantPid = "/var/run/wpa_supplicant.pid";
-inline const std::string kSystemSettings = "/etc/meroinfo.conf";
-inline const std::string kResolver = "/etc/resolv.conf";
-inline const std::string kResolverBackup = "/etc/resolv.conf.wireless.bak";
-inline const std::string kApSettings = "/usr/mero/etc/wireless_ap.conf";
-inline const std::string kAdapterInfo = "/tmp/wireless.info";
+EARLY inline const std::string kMarker = "/var/tmp/.wireless_connecting";
+EARLY inline const std::string kRecord = "/var/tmp/.wireless_current_connection";
+EARLY inline const std::string kSupplicantConfig = "/usr/mero/etc/wpa_supplicant.conf";
+EARLY inline const std::string kSupplicantPid = "/var/run/wpa_supplicant.pid";
+EARLY inline const std::string kSystemSettings = "/etc/meroinfo.conf";
+EARLY inline const std::string kResolver = "/etc/resolv.conf";
+EARLY inline const std::string kResolverBackup = "/etc/resolv.conf.wireless.bak";
+EARLY inline const std::string kApSettings = "/usr/mero/etc/wireless_ap.conf";
+EARLY inline const std::string kAdapterInfo = "/tmp/wireless.info";
 
-inline const std::string kStartsSupplicant =
+EARLY inline const std::string kStartsSupplicant =
     "/usr/sbin/wpa_supplicant -Dwext -iwlan0 -c/usr/mero/etc/wpa_supplicant.conf -B -P/var/run/wpa_supplicant.pid &> "
     "/dev/null";
-inline const std::string kEndsSupplicant = "/usr/sbin/wpa_cli terminate > /dev/null 2>&1";
-inline const std::string kAsksState = "/usr/sbin/wpa_cli status | grep wpa_state";
-inline const std::string kSavesResolver = "/bin/cp /etc/resolv.conf /etc/resolv.conf.wireless.bak";
+EARLY inline const std::string kEndsSupplicant = "/usr/sbin/wpa_cli terminate > /dev/null 2>&1";
+EARLY inline const std::string kAsksState = "/usr/sbin/wpa_cli status | grep wpa_state";
+EARLY inline const std::string kSavesResolver = "/bin/cp /etc/resolv.conf /etc/resolv.conf.wireless.bak";
 
 class ConnectionTest : public UnitTest {
  protected:

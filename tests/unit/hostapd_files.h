@@ -6,11 +6,12 @@
 #include <filesystem>
 #include <string>
 
+#include "tests/support/early.h"
 #include "unit_test.h"
 
-inline const std::string kHostFile = "/etc/hostapd/hostapd-wlan0-host.conf";
-inline const std::string kGuestFile = "/etc/hostapd/hostapd-wlan0-guest.conf";
-inline const std::string kGuestInfoFile = "/etc/hostapd/hostapd-wlan0-guest.info";
+EARLY inline const std::string kHostFile = "/etc/hostapd/hostapd-wlan0-host.conf";
+EARLY inline const std::string kGuestFile = "/etc/hostapd/hostapd-wlan0-guest.conf";
+EARLY inline const std::string kGuestInfoFile = "/etc/hostapd/hostapd-wlan0-guest.info";
 
 // An open network on channel 6, and an open guest network that is switched off.
 inline MERO_HOSTAP_CONF HomeAccessPoint() {

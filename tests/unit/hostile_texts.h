@@ -6,10 +6,11 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/early.h"
 #include "unit_test.h"
 
 // What the texts below would create, if a shell ran any part of them.
-inline const std::string kIntruder = "/tmp/x";
+EARLY inline const std::string kIntruder = "/tmp/x";
 
 inline std::string BytesFromTo(int first, int last) {
   std::string bytes;

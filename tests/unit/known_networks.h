@@ -5,12 +5,13 @@
 #include <cstring>
 #include <string>
 
+#include "tests/support/early.h"
 #include "wireless.h"
 
-inline const std::string kStore = "/usr/mero/etc/wireless.conf";
+EARLY inline const std::string kStore = "/usr/mero/etc/wireless.conf";
 
 // A network with a value in every field, and the name of its section.
-inline const std::string kHomeSection = "00:11:22:AA:BB:CC";
+EARLY inline const std::string kHomeSection = "00:11:22:AA:BB:CC";
 
 inline WIRELESS_NETWORK_CONFIG HomeNetwork() {
   WIRELESS_NETWORK_CONFIG config{};

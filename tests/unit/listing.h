@@ -7,13 +7,14 @@
 #include <string_view>
 
 #include "fakes.h"
+#include "tests/support/early.h"
 
-inline const std::string kHeadings =
+EARLY inline const std::string kHeadings =
     "CHAN NAME                             ADDRESS           SIGNAL PROTOCOL  SECURITY\n"
     "---- -------------------------------- ----------------- ------ --------- --------\n";
 
 // The information of a row, from column 37 on.
-inline const std::string kInfo = " 00:11:22:AA:BB:CC    -40 11b/g/n   WPA2PSK/AES";
+EARLY inline const std::string kInfo = " 00:11:22:AA:BB:CC    -40 11b/g/n   WPA2PSK/AES";
 
 // A row, without its end: the channel from column 0, the name from column 5, and what comes behind the name's column.
 inline std::string RowOf(std::string_view channel, std::string_view name, std::string_view info = kInfo) {
