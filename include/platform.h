@@ -193,7 +193,7 @@ int PLIBCFileRemoveKey(const char* szPath, const char* szKey);
  */
 
 /**
- * Lists the sections, in file order.
+ * Lists the sections, in file order, but those with a NUL in their name.
  *
  * @param ppslList  the address of the caller's list pointer; names are appended.
  * @return how many were appended, 0 also for a missing file; -1 on failure.

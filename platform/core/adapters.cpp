@@ -32,18 +32,22 @@ Result<bool> IsAdapter(const char* szIfName) {
   return modern.ok() && !*modern ? HasEntry(szIfName, "wireless") : std::move(modern);
 }
 
-// Calls `visit(name)` for each adapter, in no order, until one cannot be looked at.
+// Calls `visit(name)` for each adapter, in no order. One that cannot be looked at hides no other.
 template <class Visit>
 Status VisitAdapters(Visit visit) {
   const Directory directory(::opendir(kInterfaces));
   if (!directory) return Status::Failed(errno);
+  Status seen = Status::Ok();
   while (true) {
     errno = 0;
     const dirent* entry = ::readdir(directory.get());
-    if (entry == nullptr) return errno == 0 ? Status::Ok() : Status::Failed(errno);
+    if (entry == nullptr) return errno == 0 ? seen : Status::Failed(errno);
     Result<bool> adapter = IsAdapter(entry->d_name);
-    if (!adapter.ok()) return adapter.status();
-    if (*adapter) visit(entry->d_name);
+    if (!adapter.ok()) {
+      seen = adapter.status();
+    } else if (*adapter) {
+      visit(entry->d_name);
+    }
   }
 }
 

@@ -1,6 +1,6 @@
-# Debian systems that the tests are run in, with all that they need. Sourced by scripts of bash, with `set -euo pipefail`
-# and, in `work`, the directory in which ./run leaves the sources, as `source.tar`, and which packages of Debian's it
-# needs for what, as `packages`.
+# Debian systems that the tests are run in, with all that they need. Sourced by scripts of bash, with `set -euo pipefail`;
+# in `here` their directory, beside tests/support; and in `work` the directory in which ./run leaves the sources, as
+# `source.tar`, and which packages of Debian's it needs for what, as `packages`.
 # shellcheck shell=bash
 # shellcheck disable=SC2154  # what the scripts set
 
@@ -15,8 +15,9 @@ tests_root() { # SUITE PROCESSOR
 }
 
 # How builds there keep what they have compiled, for `env`.
+# shellcheck disable=SC2034  # for the scripts
 readonly -a kept_compilations=(CCACHE_DIR=/srv/ccache CMAKE_C_COMPILER_LAUNCHER=ccache CMAKE_CXX_COMPILER_LAUNCHER=ccache
-  CCACHE_SLOPPINESS=pch_defines,time_macros,include_file_mtime,include_file_ctime)
+  "CCACHE_SLOPPINESS=pch_defines,time_macros,include_file_mtime,include_file_ctime")
 
 # Runs a command in a system, among the sources. What is written to /srv/row there is in the directory.
 among_sources() { # ROOT DIRECTORY COMMAND...

@@ -2,6 +2,7 @@
 // written reads back the same, field by field; what the files cannot hold is refused, and nothing is written.
 //
 // Runs: 2500
+// MaxLen: 16384
 // Covers: platform/sdk/dhcp_server.cpp platform/base/number.cpp platform/base/directory.cpp
 #include <cstring>
 #include <memory>

@@ -65,6 +65,18 @@ grep -qx 'broken promise: a word is one' said
 tr -s ' ' <said | grep -qx 'words 700 0 of 0 0 of 0 1'
 cut -f 1,5 work/table | diff - <(printf 'rows\t0\nwords\t1\n')
 
+# Of a target that does not run, or comes to no end, nothing was told.
+for said_by_words in '' 'exit 0' 'Runs are unknown'; do
+  rm -f broken
+  printf '#!/bin/bash\n%s\n' "${said_by_words%Runs*}" >build/tests/fuzz/fuzz-words
+  [[ $said_by_words != Runs* ]] || sed -i '/Runs:/d' tests/fuzz/words.cpp
+  if fuzz; then
+    echo "a target that does not run is no failure ($said_by_words)"
+    exit 1
+  fi
+  cut -f 1,5 work/table | diff - <(printf 'rows\t0\nwords\t1\n')
+done
+
 : >calls
 refused sentences
 refused support

@@ -107,8 +107,9 @@ std::string Unescaped(std::string_view text) {
       plain += text[i];
       continue;
     }
-    const char kind = text[++i];
-    Require(std::strchr("tn\\0", kind) != nullptr, "printf knows an escape", {text});
+    Require(++i < text.size(), "an escape is whole", {text});
+    const char kind = text[i];
+    Require(std::string_view("tn\\0").find(kind) != std::string_view::npos, "printf knows an escape", {text});
     if (kind != '0') {
       plain += kind == 't' ? '\t' : kind == 'n' ? '\n' : kind;
       continue;

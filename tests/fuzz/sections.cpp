@@ -70,7 +70,8 @@ bool IsText(const std::string& text) {
 }
 
 Line LineOf(std::string text, bool cutsCr) {
-  Line line{.text = text};
+  Line line;
+  line.text = text;
   if (cutsCr && text.ends_with('\r')) text.pop_back();
   const std::size_t equals = text.find('=');
   if (equals == text.npos) return line;

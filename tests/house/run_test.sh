@@ -277,6 +277,14 @@ END
       [[ ! -s calls && ! -s packages && -e lib/unit.cpp ]]
     done
     ;;
+  package) # dpkg-buildpackage wants of Debian's own compilers what a newcomer's system has not.
+    # shellcheck disable=SC2016  # for the shell of the command
+    command_from bin/dpkg-buildpackage <<<'echo "dpkg-buildpackage in ${PWD##*/}" >>../../../calls'
+    command_from bin/lintian <<<'exit 0'
+    run package
+    expect_calls 'dpkg-buildpackage in source'
+    expect_packages "${building[@]}" build-essential debhelper dpkg-dev git lintian
+    ;;
   arguments)
     for name in build demo docs format lint package; do
       if run "$name" tests >shown; then

@@ -34,7 +34,7 @@ in_debian() {
   local row=$3
   shift 7
   set -- "${@//\/srv\/row/"$row"}"
-  "${@//\/root/"$(mktemp -d -p "$work")"}"
+  (cd "$(mktemp -d -p "$work")" && "${@//\/root/.}")
 }
 END
   PATH=$house/bin:$PATH

@@ -1,5 +1,5 @@
 # The Debian system that packages are tested in: how it is made and kept, what there is in it, and commands there. Part of
-# package_test.sh, which says where it stands, in `root`.
+# package_test.sh, which says in `root` where it stands, and in `here` where itself does.
 # shellcheck shell=bash
 # shellcheck disable=SC2154  # what package_test.sh sets
 

@@ -175,6 +175,13 @@ TEST_F(KeyValueFile, IsNotMadeForAPairThatIsRefused) {
   EXPECT_THAT(NamesIn(kDirectory), ElementsAre());
 }
 
+// Up to the NUL it was another key.
+TEST_F(KeyValueFile, HasNoPairWithANulInItsKey) {
+  const std::string line("KEY\0S=other\n", 12);
+  EXPECT_EQ(ValueIn(line, "KEY"), "(none)");
+  EXPECT_EQ(Set(line, "KEY", "value"), line + "KEY=value\n");
+}
+
 TEST_F(KeyValueFile, IsMadeForEverybodyToRead) {
   EXPECT_EQ(PLIBCFileSetKeyValue(kFile, "KEY", "value", kPlain), 1);
   EXPECT_EQ(ReadText(kFile), "KEY=value\n");

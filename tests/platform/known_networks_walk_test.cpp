@@ -14,6 +14,8 @@
 
 namespace {
 
+using namespace std::string_literals;
+
 std::string NameOf(int i) {
   return "network " + std::to_string(i);
 }
@@ -228,7 +230,7 @@ TEST_F(Walk, FindsTheFirstSectionOfANameWhateverItsCase) {
 // Such a name was listed up to its NUL, and then found the section that really bears that name: a network was there
 // twice.
 TEST_F(Walk, LeavesOutANameThatNoneCanAskFor) {
-  WriteText(kKnownNetworksPath, std::string("[c\0b]\n\tESSID=other\n[c]\n\tESSID=old\n", 35));
+  WriteText(kKnownNetworksPath, "[c\0b]\n\tESSID=other\n[c]\n\tESSID=old\n"s);
   TextList names;
   ASSERT_EQ(PLIBCFileEnumSection(kKnownNetworksPath, names.address()), 1);
   EXPECT_EQ(ListedNetworks::EssidOfName(PLIBCSzListGet(names.get(), 0)), "old");

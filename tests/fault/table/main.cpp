@@ -1,5 +1,6 @@
 // fault-table [FUNCTION...]: tries every fault of the exported functions, or of those that are named, and prints a
 // table of what came of it. Exits with 1 when something was lost.
+#include <gtest/gtest.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -114,5 +115,6 @@ int main(int argc, char** argv) {
   EnterPrivateMachine();
   Tally sum;
   PrintTable(names, sum);
-  return sum.losses.empty() ? 0 : 1;
+  // What the tests' own parts expect is told where the table is, and by this alone.
+  return sum.losses.empty() && testing::UnitTest::GetInstance()->Passed() ? 0 : 1;
 }
