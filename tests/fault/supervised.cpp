@@ -176,8 +176,9 @@ void WriteAll(int fd, const void* data, size_t size) {
   Require(::write(fd, data, size) == static_cast<ssize_t>(size), "write to the supervisor");
 }
 
-// Where this process's libraries lie, and not those of a program that it becomes: the upper half of their addresses. A
-// machine of 32 bits has no such half.
+// Where this process's libraries lie, and hardly ever those of a program that it becomes: the upper half of their
+// addresses. A program that has the same half is asked about throughout, which takes longer, and is otherwise the same;
+// on a machine of 32 bits, and where addresses are hardly random, that is every one.
 uint32_t UpperHalfOfLibraries() {
   const auto address = reinterpret_cast<uintptr_t>(::dlsym(RTLD_NEXT, "syscall"));
   return static_cast<uint32_t>(static_cast<uint64_t>(address) >> 32);

@@ -29,7 +29,8 @@ make_system() (
   mkdir -p "$system.new"
   make_debian "$suite" "$system.tar" --variant=extract --architectures="$arch" --include='?essential' \
     --include="$(system_includes)" "${debian_lean[@]}" --hook-dir=/usr/share/mmdebstrap/hooks/merged-usr ||
-    die "a Debian system ($suite, $arch) cannot be unpacked, of the archives of this machine's apt: what mmdebstrap says is above"
+    die "a Debian system ($suite, $arch) cannot be unpacked, of the archives of this machine's apt:" \
+      'what mmdebstrap says is above'
   tar -x -C "$system.new" --exclude='./dev/*' -f "$system.tar"
   complete_system "$system.new"
   mv "$system.new" "$system"

@@ -98,7 +98,7 @@ debian_root() { # DIRECTORY NAME SUITE ARCHITECTURES PACKAGE...
 debian_files_for_apt() { # DIRECTORY
   local file
   find "$1/etc/apt" -type f -exec \
-    sed -nE 's/^deb .*[[ ]signed-by=(\/[^] ]+).*/\1/p; s/^Acquire::.*::(CAInfo|SslCert|SslKey) "(\/.*)";$/\2/p' {} + |
+    sed -nE 's/^deb .*[[ ]signed-by=(\/[^] ]+).*/\1/p; s/^Acquire::.*::(CAInfo|IssuerCert|CRLFile|SslCert|SslKey) "(\/.*)";$/\2/Ip' {} + |
     tr ',' '\n' | sort -u | while read -r file; do
     if [[ -f $file && ! -e $1$file ]]; then mkdir -p "$1${file%/*}" && cp --preserve=mode "$file" "$1$file" || return; fi
   done

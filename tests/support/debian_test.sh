@@ -148,7 +148,7 @@ END
     printf '%s\n' "deb [trusted=yes signed-by=$work/own/key,$work/own/second,$work/own/kept] http://archive trixie main" \
       "deb [signed-by=$work/own/none] http://archive trixie main" '# signed-by=/etc/passwd' \
       >"$work/system/etc/apt/sources.list"
-    printf '%s\n' "Acquire::https::CAInfo \"$work/own/authority\";" "Acquire::https::archive::SslKey \"$work/own/secret\";" \
+    printf '%s\n' "Acquire::https::CaInfo \"$work/own/authority\";" "Acquire::https::archive::SslKey \"$work/own/secret\";" \
       'Acquire::http::Proxy "http://proxy:3142";' >"$work/system/etc/apt/apt.conf.d/99mmdebstrap"
     mkdir -p "$work/system$work/own"
     echo "the system's" >"$work/system$work/own/kept"

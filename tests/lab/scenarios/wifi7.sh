@@ -27,7 +27,8 @@ says $'Error for wireless request "Set Mode" (8B06) :\n    SET failed on device 
 say '-- nor does the supplicant that joins by them'
 inside nas timeout 15 wpa_supplicant -Dwext -i wlan0 -c /var/lib/cafe.conf >"$LOGS/wext.supplicant" 2>&1 || :
 grep -q '^Successfully initialized wpa_supplicant' "$LOGS/wext.supplicant" || fail 'the supplicant does not start'
-grep -qF 'ioctl[SIOCSIWMODE]: Operation not supported' "$LOGS/wext.supplicant" || fail 'the supplicant does not say what it misses'
+grep -qF 'ioctl[SIOCSIWMODE]: Operation not supported' "$LOGS/wext.supplicant" ||
+  fail 'the supplicant does not say what it misses'
 ! grep -q CTRL-EVENT-CONNECTED "$LOGS/wext.supplicant" || fail 'the supplicant joins by wireless extensions'
 inside nas ip link set wlan0 down
 
