@@ -4,7 +4,6 @@
 
 #include <cstdio>
 #include <cstring>
-#include <utility>
 
 #include "common/paths.h"
 #include "common/text.h"
@@ -29,7 +28,7 @@ Result<bool> HasEntry(const char* szIfName, const char* szEntry) {
 Result<bool> IsAdapter(const char* szIfName) {
   if (szIfName[0] == '.' || std::strcmp(szIfName, kGuestInterface) == 0) return false;
   Result<bool> modern = HasEntry(szIfName, "phy80211");
-  return modern.ok() && !*modern ? HasEntry(szIfName, "wireless") : std::move(modern);
+  return modern.ok() && !*modern ? HasEntry(szIfName, "wireless") : modern;
 }
 
 // Calls `visit(name)` for each adapter, in no order. One that cannot be looked at hides no other.

@@ -435,8 +435,9 @@ class Trial {
 
   // A lock that was not taken is left too.
   bool MayLeave(const Fault& fault) const {
-    if (fault.plan.interference == Interference::kNone) return false;
-    if (fault.plan.interference != Interference::kFail || fault.plan.onwards) return true;
+    const Interference interference = fault.plan.interference;
+    if (interference == Interference::kNone || interference == Interference::kShorten) return false;
+    if (interference != Interference::kFail || fault.plan.onwards) return true;
     const std::string& name = calls_[static_cast<size_t>(fault.plan.call) - 1].name;
     return name == "unlink" || name == "flock" || name == "stat";
   }
