@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <string_view>
 
 #include "common/paths.h"
 
@@ -196,9 +197,10 @@ const Excuse* Contract::Find(Exception exception, const std::string& path) const
   return found != excuses.end() ? &*found : nullptr;
 }
 
-const Contract& ContractOf(const std::string& function) {
+const Contract& ContractOf(const char* function) {
   static const std::vector<Contract> all = AllContracts();
-  const auto found = std::ranges::find(all, function, [](const Contract& contract) { return contract.szName; });
+  const auto found =
+      std::ranges::find(all, function, [](const Contract& contract) { return std::string_view(contract.szName); });
   if (found == all.end()) ADD_FAILURE() << "there is no contract of " << function;
   return found != all.end() ? *found : all.front();
 }

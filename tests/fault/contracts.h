@@ -44,6 +44,6 @@ struct Contract {
   const Excuse* Find(Exception exception, const std::string& path = {}) const;
 };
 
-const Contract& ContractOf(const std::string& function);
+const Contract& ContractOf(const char* function);
 
 #endif  // MERO_TESTS_FAULT_CONTRACTS_H
