@@ -1,0 +1,70 @@
+#!/bin/bash
+# security_test.sh CASE: what SECURITY.md says is held by tests.
+#
+#   statements   each statement has tests, or the reason why there is none, and each of these tests exists
+#   noticed      a statement without them, one that is no more, and a test that there is not are noticed
+#   rights       nothing of the system changes whose rights it has
+set -euo pipefail
+here=$(dirname "$(realpath "$0")")
+top=$(realpath "$here/../..")
+readonly here top
+
+# What is said, and what is held.
+said() { awk -f "$here/statements.awk" "$1" | LC_ALL=C sort -u; } # DOCUMENT
+held() { grep -v '^#' "$1" | grep -vE $'^(\t|$)' | LC_ALL=C sort -u; } # LIST
+
+# Statements without a test or a reason, and those that are held twice.
+without() { # LIST
+  awk '/^#/ || /^$/ { next }
+    /^\t/ { tests[statement]++; next }
+    { statement = $0; if (seen[statement]++) print "twice: " statement }
+    END { for (statement in seen) if (!tests[statement]) print "nothing holds: " statement }' "$1"
+}
+
+tests_of() { grep -E $'^\t[^-]' "$1" | tr -s '\t ' '\n' | grep . | sort -u; } # LIST
+
+all_tests() {
+  grep -rhoE '^TEST(_F|_P)?\(\w+, *\w+' "$top/tests" | sed -E 's/^TEST\w*\((\w+), *(\w+)/\1.\2/'
+  # A fixture may have another name where its tests are.
+  grep -rhoE '\b[A-Z]\w+\.[A-Z]\w+' "$top"/tests/*/CMakeLists.txt
+  basename -a -s .sh "$top"/tests/lab/scenarios/*.sh | sed 's/^/lab./'
+  basename -a "$top"/tests/fuzz/seeds/* | sed 's/^/fuzz./'
+  grep -hoE "^  check .* \w+" "$top/tests/package/package_test.sh" | sed 's/.* /package./'
+}
+
+unheld() { # DOCUMENT LIST
+  diff <(said "$1") <(held "$2") | sed -n 's/^</not held:/p; s/^>/not said:/p'
+  without "$2"
+  comm -23 <(tests_of "$2") <(all_tests | sort -u) | sed 's/^/no such test: /'
+}
+
+expect() { # WHAT-IS-FOUND CHANGE
+  local document=$work/document list=$work/list found
+  cp "$top/SECURITY.md" "$document"
+  cp "$here/security" "$list"
+  sed -i "$2" "$document" "$list"
+  found=$(unheld "$document" "$list")
+  [[ $found == "$1"* ]] || { printf 'not noticed: %s\nfound: %s\n' "$2" "$found" && return 1; }
+}
+
+case ${1-} in
+  statements) unheld "$top/SECURITY.md" "$here/security" | diff /dev/null - ;;
+  noticed)
+    work=$(mktemp -d)
+    trap 'rm -r "$work"' EXIT
+    expect 'not held: Guests may do what they like.' 's/^# Security$/&\n\nGuests may do what they like./'
+    expect 'not said: Guests may not.' 's/^Not believed\.$/Guests may not.\n\t- nobody\n&/'
+    expect 'nothing holds: Their rules' '/HasItsRulesBeforeItIsOnTheAir/d'
+    expect 'no such test: KitAccessPoint.HasNoRules' 's/HasItsRulesBeforeItIsOnTheAir/HasNoRules/'
+    expect 'no such test: lab.nowhere' 's/lab\.wrong-passphrase/lab.nowhere/'
+    ;;
+  rights)
+    cd "$top"
+    change='set(re|res|fs|e)?[ug]id|(init|set)groups|capset|cap_set_proc|setcap|sudo|su|runuser|setpriv|[ug]\+s'
+    ! grep -rnwE "$change|chmod [0-7]?[2-7][0-7]{3}" lib platform common tools appliance debian --exclude=changelog
+    ;;
+  *)
+    sed -n '2,/^set/s/^# \?//p' "$0" >&2
+    exit 2
+    ;;
+esac
