@@ -23,6 +23,9 @@ else()
   set(MERO_PROCESSOR_OPTIONS -fno-plt)
 endif()
 
+# What gcc does to loops and values for speed makes code larger, even where it is asked for the smallest.
+set(MERO_SMALLER $<$<CXX_COMPILER_ID:GNU>:-fno-move-loop-invariants$<SEMICOLON>-fno-expensive-optimizations>)
+
 set(MERO_LIBRARY_OPTIONS "" CACHE STRING "Options that the shared libraries are compiled with, after all others")
 
 # How the parts of the shared libraries are compiled: to be small, except in debug builds. Nothing unwinds through them
@@ -32,7 +35,8 @@ function(mero_compile_part name)
   target_include_directories(${name} PUBLIC $<BUILD_INTERFACE:${top}/include> PRIVATE ${top})
   target_compile_options(${name} PRIVATE -fno-exceptions -fno-rtti -fvisibility=hidden -fvisibility-inlines-hidden
                                          -ffunction-sections -fdata-sections
-                                         $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};${MERO_PROCESSOR_OPTIONS};-fno-ident>
+                                         $<$<NOT:$<CONFIG:Debug>>:${MERO_SMALL};${MERO_SMALLER};-fno-ident>
+                                         $<$<NOT:$<CONFIG:Debug>>:${MERO_PROCESSOR_OPTIONS}>
                                          $<$<NOT:$<CONFIG:Debug>>:-fno-asynchronous-unwind-tables;-fno-unwind-tables>
                                          ${MERO_WATCH_BRANCHES} ${MERO_LIBRARY_OPTIONS})
   set_target_properties(${name} PROPERTIES POSITION_INDEPENDENT_CODE ON)
