@@ -1,4 +1,6 @@
 // Saves the access-point settings.
+#include <sys/stat.h>
+
 #include <cstdio>
 #include <optional>
 
@@ -19,11 +21,18 @@ char* ConvertIntegerToString(const int value, char* szValue, const size_t cbSize
   return szValue;
 }
 
+// Whether a command that reads the settings might come to no end: it would wait for a pipe's other end.
+bool MayHaveNoEnd() {
+  struct stat info;
+  return ::stat(kApSettingsPath, &info) == 0 && !S_ISREG(info.st_mode) && !S_ISDIR(info.st_mode);
+}
+
 // Whether the file holds the section's header. The search ignores case, takes the name as a part of a regular
 // expression, and finds it anywhere in a line, as it always has. Gives 1 or 0; -1 after a report.
 int IsSectionExist(const char* szSecName) {
   if (szSecName == nullptr) return LOG("Wrong Parameter."), -1;
   const Command<1024> command("grep -i \"\\[%s\\]\" %s", ShellQuoted(szSecName).c_str(), kApSettingsPath);
+  if (MayHaveNoEnd()) return LOG("Failed to execute command"), -1;
   const Pipe found(command);
   if (!found) return LOG("Failed to execute command"), -1;
   char szLine[1024] = {};
