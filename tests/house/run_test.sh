@@ -128,7 +128,7 @@ case $1 in
     expect_packages clang-format-19 git
     { run test style || :; } >shown # the checks of the house are not here
     grep -qx 'clang-format-19 --dry-run --Werror lib/unit.cpp' calls
-    expect_packages clang-format-19 git shellcheck
+    expect_packages clang-format-19 cppcheck git shellcheck
     ;;
   exclusion) # A compiler of the developer's was removed.
     echo cmake >exclusions

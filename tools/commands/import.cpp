@@ -241,7 +241,9 @@ std::string ReadDocument(const Program& program, const std::string& path) {
 
 // The settings of the access point are saved by the library, and the networks after them in one step.
 void WriteAll(SettingsChange* change, const std::vector<NetworkPlan>& plans, const std::optional<ApPlan>& ap) {
-  for (const NetworkPlan& plan : plans) Write(*change, plan);
+  if (change != nullptr) {
+    for (const NetworkPlan& plan : plans) Write(*change, plan);
+  }
   if (!ap || ap->szChange == kSame) {
     if (change != nullptr) change->Commit();
     return;
