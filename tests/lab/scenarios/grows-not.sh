@@ -4,7 +4,7 @@
 # Plain only
 # shellcheck shell=bash
 
-readonly rounds=${ROUNDS:-8}
+readonly rounds=${ROUNDS:-3}
 
 access_point cafe ssid=cafe channel=6 wpa=2 wpa_passphrase='deux croissants' rsn_pairwise=CCMP
 serve cafe 10.2.0
