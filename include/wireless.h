@@ -8,7 +8,8 @@
  *     bytes, and are compared and stored as bytes. A text that does not fit a field is cut and still terminated.
  *  2. Every function works synchronously in the caller's process, tells what it blocks on (the disk, another writer's
  *     lock, the adapter, a DHCP server, a script of the appliance) and for how long at most where that is bounded, and
- *     keeps nothing in memory between calls. All state is in files, and in the system's own network configuration.
+ *     keeps nothing in memory between calls. All state is in files, and in the system's own network configuration. A
+ *     time that a function tells is that of commands that work: one that never ends is waited for without end.
  *  3. A function that returns `int` gives 0 on success and -1 on failure unless it says otherwise; one that returns
  *     BOOL gives exactly TRUE or FALSE. A null pointer where a value is required is a failure, never a crash, unless
  *     a function says otherwise.
@@ -433,8 +434,9 @@ const char* MEROWirelessProtocolStringGet(const WIRELESS_PROTOCOL proto);
  * @param pNetCfg  the cell; borrowed. `network.opmode` must be WIRELESS_OPMODE_ADHOC, `network.encrypt`
  *                 WIRELESS_ENCRYPT_NONE or WIRELESS_ENCRYPT_WEP, and for WEP szKey 5 or 13 characters, or 10 or 26
  *                 hexadecimal digits.
- * @return 0; -1 when pNetCfg is null or asks for something else, there is no adapter, or a step failed. After a
- *         failure part way the interface stays down.
+ * @return 0; -1 when pNetCfg is null or asks for something else, there is no adapter, the interface cannot be set, or
+ *         no shell could be started. After a failure part way the interface stays down. Whether a command was run, and
+ *         whether it succeeded, is not noticed.
  *
  * Runs /sbin/iwconfig; blocks for as long as that takes, well below a second. Touches no file.
  */
@@ -568,7 +570,8 @@ int MEROWirelessCheckBlock(void);
  *
  * @param szIfName  the wireless interface.
  * @param pConf     the settings; must not be null. No name or secret that is written may hold a line feed.
- * @return TRUE; FALSE when szIfName is null, a text cannot be written, or a file could not be.
+ * @return TRUE; FALSE when szIfName is null, a text cannot be written, or a file could not be. A daemon that could not
+ *         be looked for or ended, and an interface that stays up, do not make it fail.
  *
  * Writes /etc/hostapd/hostapd-IF-host.conf and, on a model with a built-in card, hostapd-IF-guest.conf and
  * hostapd-IF-guest.info. Does not block on the network.

@@ -206,4 +206,19 @@ TEST_F(AFailure, ToPutARecordIntoItsPlaceIsReportedOnce) {
   EXPECT_THAT(outcome.reports, Not(Contains(HasSubstr("Failed to remove /var/tmp/.wireless_current_connection"))));
 }
 
+// glibc's system() says of a shell that could not be started what it says of one that ended with 127: it was taken for
+// a command that had run.
+TEST_F(AFailure, ToStartAShellIsReported) {
+  for (const char* szName : {"MEROWirelessAdhocCreate", "MEROWirelessDefaultGatewaySet"}) {
+    const auto function = std::ranges::find(ExportedFunctions(), std::string(szName), &Exported::szName);
+    const Scene scene(*function);
+    Plan plan = {Interference::kFail, 1, EAGAIN, "clone"};
+    plan.all = plan.withoutSleeps = true;
+    const Outcome outcome = RunSupervised(plan, [&] { return static_cast<int>(function->call()); });
+    EXPECT_TRUE(outcome.reached) << szName;
+    EXPECT_EQ(outcome.result, static_cast<int>(Answer::kFailed)) << szName;
+    EXPECT_THAT(outcome.reports, Contains(HasSubstr("Failed to execute"))) << szName;
+  }
+}
+
 }  // namespace
