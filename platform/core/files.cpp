@@ -26,19 +26,29 @@ Status Create(const char* szPath) {
   return target.valid() ? Status::Ok() : Status::Failed(errno);
 }
 
-}  // namespace
+enum class Looked { kThere, kMissing, kUnknown };
 
-int PLIBCFileExist(const char* szPath) {
-  if (szPath == nullptr) return REFUSE_NULL(), 0;
-  if (IsForeign(szPath)) return LOG("%s is taken for missing: somebody else has put it there", szPath), 0;
-  if (::access(szPath, F_OK) == 0) return 1;
-  // A file that cannot be looked at may exist. A caller that took it for missing would write over it.
-  return errno == ENOENT || errno == ENOTDIR || errno == ELOOP || errno == ENAMETOOLONG ? 0 : 1;
+Looked Look(const char* szPath) {
+  if (IsForeign(szPath)) {
+    return LOG("%s is taken for missing: somebody else has put it there", szPath), Looked::kMissing;
+  }
+  if (::access(szPath, F_OK) == 0) return Looked::kThere;
+  const bool missing = errno == ENOENT || errno == ENOTDIR || errno == ELOOP || errno == ENAMETOOLONG;
+  return missing ? Looked::kMissing : Looked::kUnknown;
 }
 
+}  // namespace
+
+// A file that cannot be looked at may exist. A caller that took it for missing would write over it.
+int PLIBCFileExist(const char* szPath) {
+  if (szPath == nullptr) return REFUSE_NULL(), 0;
+  return Look(szPath) != Looked::kMissing ? 1 : 0;
+}
+
+// Nor is a file that cannot be looked at taken to be there: making it tells.
 int PLIBCFileTouch(const char* szPath) {
   if (szPath == nullptr) return REFUSE_NULL(), -1;
-  if (PLIBCFileExist(szPath) != 0) return 0;
+  if (Look(szPath) == Looked::kThere) return 0;
   if (const Status status = Create(szPath); !status.ok()) {
     return FAIL(status.error(), "Failed to create %s", szPath), -1;
   }

@@ -221,4 +221,13 @@ TEST_F(AFailure, ToStartAShellIsReported) {
   }
 }
 
+// It was taken to be there, and was not made.
+TEST_F(AFailure, ToLookAtAFileDoesNotKeepItFromBeingMade) {
+  const Outcome outcome =
+      RunSupervised({Interference::kFail, 1, EIO, "access"}, [] { return PLIBCFileTouch("/tmp/platform/file"); });
+  EXPECT_TRUE(outcome.reached);
+  EXPECT_EQ(outcome.result, 0);
+  EXPECT_EQ(ReadText("/tmp/platform/file"), "");
+}
+
 }  // namespace
