@@ -16,8 +16,8 @@
  *     followed, not replaced. From reading to renaming the file is locked against other writers. An operation
  *     leaves every byte alone that it is not about: comments, blank lines, other keys and sections, their order. The
  *     caller's umask has no say in the mode of what is created.
- *  5. Operations block for the disk, for another writer's lock (20 s at most, a failure then) and for commands that
- *     they run, and for the network only where it says so.
+ *  5. Operations block for the disk, for another writer's lock (20 s at most, a failure then), for commands that they
+ *     run, however long these take, and for the network only where it says so.
  *  6. In a directory that anyone may write, such as /tmp, no link is followed, and a file is root's or the caller's
  *     own, a plain one, with one name. What somebody else has put there does not exist (PLIBCFileExist), and is neither
  *     read nor changed (ERR_PERMISSION). PLIBCFileTouch and PLIBCSysUnlink remove it; a directory they move aside, to
@@ -60,7 +60,7 @@ enum MERO_ERROR MERO_INT32 {
   ERR_KEY_NOT_FOUND = 0x0900,
   ERR_TOO_LARGE = 0x0A00, /**< a file beyond what is read, or a result beyond its buffer */
   ERR_NO_DEVICE = 0x0B00,
-  ERR_COMMAND_FAILED = 0x0C00, /**< a program could not be run */
+  ERR_COMMAND_FAILED = 0x0C00, /**< a program could not be run, or has failed */
 };
 
 /**
@@ -313,7 +313,8 @@ int MEROWirelessOpmodeSet(WIRELESS_OPMODE opmode);
  *
  * @return 0, also when there was none; -1 when something could not be ended.
  *
- * Blocks up to 2 s for each daemon to end; one that does not is killed.
+ * Blocks up to 2 s for each daemon to end, and kills one that does not; and for as long as /usr/mero/sbin/udhcpc.lease
+ * takes to give back what was leased. Where there is no such script, nothing was leased.
  */
 int MEROWirelessNetworkDisconnect(void);
 

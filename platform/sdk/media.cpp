@@ -16,6 +16,7 @@ int MEROMediaService(int action) {
   }
   if (PLIBCFileExist(kScript) == 0) return FAIL(ENOENT, "Failed to find the media service %s", kScript), -1;
   const int exitStatus = PLIBCExec(kScript, kVerbs[action], nullptr, nullptr, nullptr);
-  if (exitStatus > 0) LOG("%s %s ended with status %d", kScript, kVerbs[action], exitStatus);
-  return exitStatus == 0 ? 0 : -1;
+  if (exitStatus <= 0) return exitStatus;
+  LOG("%s %s ended with status %d", kScript, kVerbs[action], exitStatus);
+  return PLIBCErrSet(ERR_COMMAND_FAILED), -1;
 }

@@ -35,10 +35,11 @@ TEST_F(MediaService, IsReportedWhenItIsMissing) {
   ExpectFailure(ERR_FILE_NOT_FOUND, "Failed to find the media service /etc/rc.mediaservice: No such file or directory");
 }
 
+// It failed without an error code.
 TEST_F(MediaService, IsReportedWhenItFails) {
   WriteText(kScript, "#!/bin/sh\nexit 3\n", 0755);
   EXPECT_EQ(MEROMediaService(2), -1);
-  ExpectFailure(ERR_NONE, "/etc/rc.mediaservice restart ended with status 3");
+  ExpectFailure(ERR_COMMAND_FAILED, "/etc/rc.mediaservice restart ended with status 3");
 }
 
 }  // namespace
