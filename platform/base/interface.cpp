@@ -67,6 +67,7 @@ class Addresses {
   // Reads those that the interface has. An interface that is not there has none.
   Status List(const char* szIfName) {
     index_ = ::if_nametoindex(szIfName);
+    if (index_ == 0 && errno != ENODEV && errno != ENXIO) return Status::Failed(errno);
     kernel_ = Descriptor(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_ROUTE));
     if (!kernel_.valid()) return Status::Failed(errno);
     if (::send(kernel_.get(), &kListAll, sizeof kListAll, 0) < 0) return Status::Failed(errno);

@@ -1,4 +1,6 @@
 // The wireless adapters that the kernel has.
+#include "platform/core/adapters.h"
+
 #include <net/if.h>
 #include <unistd.h>
 
@@ -9,7 +11,6 @@
 #include "common/text.h"
 #include "platform/base/directory.h"
 #include "platform/base/failure.h"
-#include "platform/base/result.h"
 
 namespace {
 
@@ -57,6 +58,12 @@ void ForEachAdapter(Visit visit) {
 }
 
 }  // namespace
+
+Result<int> CountAdapters() {
+  int count = 0;
+  const Status status = VisitAdapters([&](const char*) { ++count; });
+  return count > 0 || status.ok() ? Result<int>(count) : status;
+}
 
 int MEROWirelessAdapterNum(void) {
   int count = 0;

@@ -7,6 +7,7 @@
 #include "platform/base/failure.h"
 #include "platform/base/interface.h"
 #include "platform/base/shared_directory.h"
+#include "platform/core/adapters.h"
 #include "platform/core/radio.h"
 
 namespace {
@@ -41,9 +42,11 @@ Status ForgetRecord() {
 
 // A step that fails is reported, and the others are taken all the same.
 int MEROWirelessNetworkDisconnect(void) {
-  const bool adapter = MEROWirelessAdapterNum() > 0;
-  const char* szIfName = MEROWirelessInterfaceGet();
   int failures = 0;
+  Result<int> adapters = CountAdapters();
+  if (!adapters.ok()) ++failures, FAIL(adapters.error(), "Failed to look for the adapter to disconnect");
+  const bool adapter = !adapters.ok() || *adapters > 0;
+  const char* szIfName = MEROWirelessInterfaceGet();
   // Daemons first: they would join and address the interface again.
   if (const Status status = EndDaemon(kSupplicantPidPath, "wpa_supplicant"); !status.ok()) {
     ++failures, FAIL(status.error(), "Failed to end the supplicant of %s", szIfName);

@@ -230,4 +230,17 @@ TEST_F(AFailure, ToLookAtAFileDoesNotKeepItFromBeingMade) {
   EXPECT_EQ(ReadText("/tmp/platform/file"), "");
 }
 
+// There was taken to be no adapter, and so nothing to end.
+TEST_F(AFailure, ToListTheAdaptersIsAFailureToDisconnect) {
+  const ShownInterfaces shown({{"lo", ""}, {"wlan0", "phy80211"}});
+  for (const char* szCall : {"open", "getdents", "access"}) {
+    Plan plan = {Interference::kFail, 1, EIO, szCall};
+    plan.all = plan.onwards = true;
+    const Outcome outcome = RunSupervised(plan, [] { return MEROWirelessNetworkDisconnect(); });
+    EXPECT_TRUE(outcome.reached) << szCall;
+    EXPECT_EQ(outcome.result, -1) << szCall;
+    EXPECT_THAT(outcome.reports, Contains(HasSubstr("Failed to look for the adapter to disconnect"))) << szCall;
+  }
+}
+
 }  // namespace
