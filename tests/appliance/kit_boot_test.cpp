@@ -23,6 +23,21 @@ class KitBoot : public Kit {
   }
 };
 
+// Each was there for good.
+TEST_F(KitBoot, RemovesNewFilesThatAKillHasLeftAndNoOthers) {
+  const std::string left =
+      "/tmp/wireless.info.abcdefghij /var/tmp/.wireless_current_connection.abcdef /etc/resolv.conf.new.abcdef "
+      "/etc/hostapd/hostapd-wlan0.info.abcdefghij";
+  const std::string kept =
+      "/etc/hostapd/hostapd-wlan0.info /etc/resolv.conf /tmp/wireless.info.foreign-abcdef "
+      "/var/tmp/.wireless_current_connection";
+  RunInShell("mkdir -p /etc/hostapd; touch " + left + " " + kept);
+  ASSERT_EQ(RunInShell("systemd-tmpfiles --create --remove --boot " APPLIANCE_KIT "/systemd/mero-wireless.conf").out,
+            "");
+  EXPECT_EQ(RunInShell("ls -d " + left + " 2>/dev/null").out, "");
+  EXPECT_EQ(RunInShell("ls -d " + kept + " >/dev/null").out, "");
+}
+
 TEST_F(KitBoot, HasUnitsThatSystemdUnderstandsWhole) {
   WriteScript("/usr/bin/merowireless", "");
   const std::string units = APPLIANCE_KIT "/systemd/";

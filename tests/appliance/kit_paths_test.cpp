@@ -79,7 +79,11 @@ Paths PathsIn(const std::string& path) {
 }
 
 TEST_F(KitPaths, OfTheUnitsAreTheLibrarysAndTheScripts) {
-  EXPECT_EQ(PathsIn("systemd/mero-wireless.conf"), Paths{kAdapterInfoPath});
+  const std::string note = kAdapterInfoPath;
+  const Paths made = {note, note + ".??????????", std::string(kConnectionRecordPath) + ".??????",
+                      std::string(kResolverPath) + ".new.??????",
+                      InterfacePath(kHostapdInfoFormat, "*").c_str() + std::string(".??????????")};
+  EXPECT_EQ(PathsIn("systemd/mero-wireless.conf"), made);
   EXPECT_EQ(PathsIn("systemd/mero-network.service"), Paths{kNetworkScriptPath});
   EXPECT_EQ(PathsIn("systemd/mero-wireless@.service"), Paths{kHotPlugScriptPath});
   EXPECT_EQ(PathsIn("systemd/mero-wireless-schedule.service"), Paths{kNetworkScriptPath});
