@@ -203,11 +203,18 @@ has_no_lease() ( # INTERFACE
 # ---- The bridge of an access point --------------------------------------------------------------------------------
 
 # A note says which bridge an access point was put into: when the access point ends, its interface's file may already
-# name another bridge, or none.
+# name another bridge, or none. And whether its start has come to its end, since a start may be killed.
 bridge_note=$state/bridge # with -INTERFACE behind it
 
-note_bridge() { # INTERFACE BRIDGE
-	note "$bridge_note-$1" "$2"
+note_bridge() { # INTERFACE BRIDGE [begun]
+	note "$bridge_note-$1" "$2${3:+ $3}"
+}
+
+# is_finished INTERFACE: whether the start of its access point has come to its end.
+is_finished() {
+	noted='' condition=''
+	[ ! -e "$bridge_note-$1" ] || read -r noted condition <"$bridge_note-$1" || return 1
+	[ -z "$condition" ]
 }
 
 # was_started INTERFACE: whether an access point was started there, and not ended.
@@ -224,7 +231,7 @@ forget_bridge() { # INTERFACE
 bridge_of() {
 	noted=''
 	if was_started "$1"; then
-		read -r noted <"$bridge_note-$1" || cannot_read "$bridge_note-$1"
+		read -r noted _ <"$bridge_note-$1" || cannot_read "$bridge_note-$1"
 		return
 	fi
 	for master in /sys/class/net/*/brif/"$1"; do

@@ -8,10 +8,10 @@
 #include "kit.h"
 
 // The programs that the scripts may run. `logger` runs where something has failed already; the shell has the rest.
-inline constexpr const char* kTools[] = {"awk",      "basename", "busybox", "cat",   "chmod",   "chown",       "cut",
-                                         "date",     "dnsmasq",  "find",    "flock", "hostapd", "hostapd_cli", "id",
-                                         "ip",       "iw",       "ls",      "mkdir", "mktemp",  "mv",          "nft",
-                                         "readlink", "rm",       "sed",     "sleep", "stat",    "tr",          "wc"};
+inline constexpr const char* kTools[] = {
+    "awk",  "basename", "busybox",  "cat",         "chmod", "chown", "cut",  "cp", "date",  "dnsmasq",
+    "find", "flock",    "hostapd",  "hostapd_cli", "id",    "ip",    "iw",   "ls", "mkdir", "mktemp",
+    "mv",   "nft",      "readlink", "rm",          "sed",   "sleep", "stat", "tr", "wc"};
 
 class KitRadio : public Kit {
  protected:
@@ -78,8 +78,10 @@ printf '%s' "$done" | /usr/sbin/ip "$@"
 )");
   }
 
+  // A daemon has a session of its own, and is noted when it bears its name.
   static std::string Launch(const std::string& name) {
-    return "(/tmp/daemons/" + name + " 60 & echo $! >$file; wait) >/dev/null 2>&1 &\nuntil [ -s $file ]; do :; done\n";
+    return "setsid sh -c '/tmp/daemons/" + name + " 60 & until read -r name </proc/$!/comm && [ \"$name\" = " + name +
+           " ]; do :; done; echo $! >\"$0\"; wait' \"$file\" >/dev/null 2>&1 &\nuntil [ -s $file ]; do :; done\n";
   }
 
   static std::string Daemon(const std::string& name, const std::string& option) {

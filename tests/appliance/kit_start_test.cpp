@@ -292,6 +292,17 @@ TEST_F(KitAccessPoint, NotesWhatItsGuestsMayReachAsLongAsThereAreAny) {
   EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
 }
 
+// It was taken for one that works, since its daemon runs: nobody got an address, also after further calls.
+TEST_F(KitAccessPoint, IsStartedAgainWhenItsStartWasKilled) {
+  StandIn("dnsmasq", "kill -s KILL 0\n");
+  EXPECT_NE(RunInShell("PATH=/tmp/bin:$PATH setsid -w /etc/rc.network start wlan0 lbr0").status, 0);
+  EXPECT_EQ(Daemons(), "hostapd\n");
+  StandIn("dnsmasq", "for word; do case $word in --pid-file=*) file=${word#*=} ;; esac; done\n" + Launch("dnsmasq"));
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(Daemons(), OnAir());
+  EXPECT_EQ(ReadText("/run/rc.network/bridge-wlan0"), "lbr0\n");
+}
+
 // The access point was off from the hour on in which its start for the guests had failed.
 TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
