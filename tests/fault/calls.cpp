@@ -9,17 +9,13 @@
 #include "common/paths.h"
 #include "common/text.h"
 #include "platform.h"
-#include "tests/platform/network_interfaces.h"
-#include "tests/platform/simulated_radio.h"
-#include "tests/platform/system_log.h"
+#include "tests/fault/scene.h"
 #include "tests/support/files.h"
 #include "tests/support/ring.h"
 
 namespace fs = std::filesystem;
 
 namespace {
-
-constexpr int kNetworks = 10;
 
 const std::string kHostFile = InterfacePath(kHostapdHostFormat, "wlan0").c_str();
 const std::string kInfoFile = InterfacePath(kHostapdInfoFormat, "wlan0").c_str();
@@ -28,7 +24,6 @@ const std::string kBridgeScript = InterfacePath(kInterfaceScriptFormat, "lbr0").
 const std::string kServerConf = InterfacePath(kDhcpConfFormat, "lbr0", "lbr0").c_str();
 const std::string kServerInfo = InterfacePath(kDhcpInfoFormat, "lbr0", "lbr0").c_str();
 constexpr char kModel[] = "RT-5370";
-constexpr char kConnected[] = "wpa_state=COMPLETED\n";
 constexpr char kHeader[] = "[RT-5370]\n";
 
 WIRELESS_NETWORK_CONFIG KnownNetwork(int number) {
@@ -66,17 +61,6 @@ MERO_AP_CONF ApSettings() {
   conf.hostapConf.encryptInfo.wpaPskInfo.wpaType = TYPE_WPA2;
   conf.hostapConf.encryptInfo.wpaPskInfo.encryptType = TYPE_CCMP;
   return conf;
-}
-
-std::string Listing() {
-  std::string listing = "CH   ESSID                            BSSID             SIGNAL PROTOCOL SECURITY\n----\n";
-  for (int i = 0; i < kNetworks; ++i) {
-    char row[128];
-    std::snprintf(row, sizeof row, "%-4d %-32s 00:00:00:00:00:%02X %6d %-9s %s\n", 1 + i,
-                  ("Network " + std::to_string(i)).c_str(), i, -30 - i, "11b/g/n", "WPA2PSK/AES");
-    listing += row;
-  }
-  return listing;
 }
 
 // ---- States ----
@@ -206,7 +190,7 @@ Exported Row(const char* szName, Today today, const char* szState, std::function
 
 std::vector<Exported> AllFunctions() {
   const auto listing = static_cast<int64_t>(Listing().size());
-  const int64_t connected = sizeof kConnected - 1;
+  const auto connected = static_cast<int64_t>(kConnected.size());
   const int64_t header = sizeof kHeader - 1;
   // One adapter, up, and two readings that agree.
   const Least scanning = {.pipes = 2, .listings = 1, .sockets = 1, .asks = kFlags, .sleeps = 1, .piped = 2 * listing};
@@ -316,31 +300,7 @@ std::vector<Exported> AllFunctions() {
   };
 }
 
-// ---- The machine ----
-
-void InstallCommands() {
-  WriteText("/tmp/listing", Listing(), 0644);
-  WriteScript("/sbin/iwlist", "exec cat /tmp/listing\n");
-  WriteScript("/usr/sbin/wpa_cli", std::string("echo ") + kConnected);
-  for (const char* szCommand :
-       {"/sbin/iwconfig", "/sbin/route", "/usr/sbin/wpa_supplicant", "/bin/ps", kLeaseScript, kHotPlugScriptPath}) {
-    WriteScript(szCommand, ":\n");
-  }
-  WriteScript(kNetworkScriptPath, "echo \"$*\" >/tmp/network-script\n");
-  WriteText("/etc/meroinfo.conf", "runmediaservice=no\n", 0644);
-  WriteText(kResolverPath, "nameserver 192.0.2.1\n", 0644);
-}
-
-void ForgetEverything() {
-  for (const char* szDirectory : {"/usr/mero/etc", kInterfaceScriptDirectory, kHostapdDirectory, kDhcpDirectory}) {
-    fs::remove_all(szDirectory);
-    fs::create_directories(szDirectory);
-  }
-  for (const char* szFile : {kAdapterInfoPath, kConnectionRecordPath, kSupplicantPidPath, kJoinMarkerPath,
-                             kApMarkerPath, "/tmp/network-script"}) {
-    fs::remove(szFile);
-  }
-}
+// ---- What it comes to ----
 
 int64_t SizesOf(const std::vector<std::string>& paths) {
   int64_t sum = 0;
@@ -369,19 +329,8 @@ const std::vector<Exported>& ExportedFunctions() {
   return all;
 }
 
-Scene::Scene(const Exported& function)
-    : interface_("wlan0"), shown_({{"lo", ""}, {"wlan0", "phy80211"}}), driver_("wlan0") {
-  driver_.hasResults = true;
-  driver_.told.reserve(100);  // so that a call without memory can be noted, too
-  ForgetEverything();
-  InstallCommands();
-  function.prepare(driver_);
-  Shell("ip link set wlan0 up");
-  TakeLog();
-}
-
 Measured Measure(const Exported& function) {
-  const Scene scene(function);
+  const Scene scene(function.prepare);
   Measured measured;
   const int64_t before = SizesOf(function.least.reads);
   const Plan plan = {.withoutSleeps = true};

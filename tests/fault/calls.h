@@ -7,9 +7,8 @@
 #include <string>
 #include <vector>
 
+#include "tests/fault/subjects.h"
 #include "tests/fault/supervised.h"
-#include "tests/platform/network_interfaces.h"
-#include "tests/platform/simulated_radio.h"
 
 // What a function cannot do without, by its contract: the commands that it runs, one reading of each file that it goes
 // by, and one writing of each file that it leaves.
@@ -41,20 +40,12 @@ struct Today {
   int opens;
 };
 
-// What a call has come to, as its caller sees it.
-enum class Answer {
-  kDone,    // success, with all its work done
-  kLess,    // what its contract gives for success, or for an answer, when it found less than there is
-  kFailed,  // what its contract gives for a failure
-  kWrong,   // anything else
-};
-
 struct Exported {
   const char* szName;
   Today today;
   const char* szState;
   std::function<void(SimulatedDriver&)> prepare;
-  std::function<Answer()> call;  // takes no memory of its own
+  std::function<Answer()> call;
   Least least;
 };
 
@@ -71,18 +62,6 @@ struct Measured {
 
 // Every exported function, in a state in which it does its work. The machine must be a private one.
 const std::vector<Exported>& ExportedFunctions();
-
-// The machine in the function's state, for as long as the holder lives: its adapter is a simulated one, the commands
-// are stand-ins.
-class Scene {
- public:
-  explicit Scene(const Exported& function);
-
- private:
-  NetworkInterface interface_;
-  ShownInterfaces shown_;
-  SimulatedDriver driver_;
-};
 
 // Puts the machine into the function's state, and calls it.
 Measured Measure(const Exported& function);

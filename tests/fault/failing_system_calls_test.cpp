@@ -6,6 +6,7 @@
 
 #include "tests/fault/calls.h"
 #include "tests/fault/saving.h"
+#include "tests/fault/scene.h"
 #include "tests/fault/supervised.h"
 #include "tests/platform/platform_test.h"
 #include "tests/platform/simulated_radio.h"
@@ -197,7 +198,7 @@ TEST_F(AFailure, ToListTheAdaptersIsReportedAndHidesNoOther) {
 TEST_F(AFailure, ToPutARecordIntoItsPlaceIsReportedOnce) {
   const auto join =
       std::ranges::find(ExportedFunctions(), std::string("MEROWirelessNetworkConnect"), &Exported::szName);
-  const Scene scene(*join);
+  const Scene scene(join->prepare);
   Plan plan = {Interference::kFail, 1, EACCES, "rename"};
   plan.all = plan.onwards = plan.withoutSleeps = true;
   const Outcome outcome = RunSupervised(plan, [&] { return static_cast<int>(join->call()); });
@@ -211,7 +212,7 @@ TEST_F(AFailure, ToPutARecordIntoItsPlaceIsReportedOnce) {
 TEST_F(AFailure, ToStartAShellIsReported) {
   for (const char* szName : {"MEROWirelessAdhocCreate", "MEROWirelessDefaultGatewaySet"}) {
     const auto function = std::ranges::find(ExportedFunctions(), std::string(szName), &Exported::szName);
-    const Scene scene(*function);
+    const Scene scene(function->prepare);
     Plan plan = {Interference::kFail, 1, EAGAIN, "clone"};
     plan.all = plan.withoutSleeps = true;
     const Outcome outcome = RunSupervised(plan, [&] { return static_cast<int>(function->call()); });

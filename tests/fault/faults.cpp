@@ -1,4 +1,4 @@
-// Every fault that an exported function can meet, and what becomes of it.
+// Every fault that a call can meet.
 #include "tests/fault/faults.h"
 
 #include <fcntl.h>
@@ -8,61 +8,26 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
-#include <filesystem>
-#include <regex>
 
-#include "tests/fault/contracts.h"
-#include "tests/fault/failing_memory.h"
-#include "tests/fault/machine_state.h"
+#include "tests/fault/commands.h"
+#include "tests/fault/judge.h"
+#include "tests/fault/scene.h"
 #include "tests/support/files.h"
-
-namespace fs = std::filesystem;
 
 namespace {
 
-enum class CommandFault { kNone, kFails, kHangs, kIsMissing };
-
-// One fault, by what brings it about.
-struct Fault {
-  std::string text;
-  Plan plan = {};
-  int allocation = 0;
-  bool allocationsBehind = false;
-  std::string command = {};
-  CommandFault commandFault = CommandFault::kNone;
-};
-
-// What has become of a call.
-struct Seen {
-  Outcome outcome;
-  Answer answer = Answer::kWrong;
-  MemoryOutcome memory;
-  MachineState state;
-};
-
 // In memory that a child has in common with this process.
-MemoryOutcome* SharedMemoryOutcome() {
+struct Shared {
+  MemoryOutcome memory;
+  char szTold[4096];  // what the driver was told, a line each
+};
+
+Shared* SharedMemory() {
   static void* const shared =
-      ::mmap(nullptr, sizeof(MemoryOutcome), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
-  return static_cast<MemoryOutcome*>(shared);
-}
-
-bool IsLock(const std::string& path) {
-  const std::string name = fs::path(path).filename();
-  return name.starts_with('.') && name.ends_with(".lock");
-}
-
-bool IsUnfinished(const std::string& path) {
-  const std::string name = fs::path(path).filename();
-  return name.starts_with('.') && name.ends_with(".new");
-}
-
-// A text in which all numbers are the same. The first network has no address to be pinned.
-std::string WithoutNumbers(const std::string& text) {
-  static const std::regex pinned("\tbssid=[0-9:]+\n");
-  static const std::regex number("[0-9]+");
-  return std::regex_replace(std::regex_replace(text, pinned, ""), number, "#");
+      ::mmap(nullptr, sizeof(Shared), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+  return static_cast<Shared*>(shared);
 }
 
 // Nothing is said on standard error for as long as the holder lives, by shells without their commands above all.
@@ -84,25 +49,12 @@ class Silence {
   int stderr_;
 };
 
-// The files of which one has what the other has not, or otherwise.
-std::vector<std::string> Differences(const MachineState& a, const MachineState& b) {
-  std::vector<std::string> paths;
-  for (const auto& [path, described] : a) {
-    const auto other = b.find(path);
-    if (other == b.end() || other->second != described) paths.push_back(path);
-  }
-  for (const auto& [path, described] : b) {
-    if (!a.contains(path)) paths.push_back(path);
-  }
-  return paths;
-}
-
-// A function's machine, and the faults that the function meets on it.
+// A call's machine, and the faults that the call meets on it.
 class Trial {
  public:
-  Trial(const Exported& function, const Share& share)
-      : function_(function), contract_(ContractOf(function.szName)), share_(share), scene_(function) {
-    for (const std::string& command : contract_.commands) {
+  Trial(const Subject& subject, const Share& share)
+      : subject_(subject), share_(share), scene_(subject.prepare), judge_(subject.contract, tally_) {
+    for (const std::string& command : subject_.contract.commands) {
       EXPECT_TRUE(KeepProgram(command)) << command << " is not there";
     }
     base_ = StateOfMachine();
@@ -114,7 +66,7 @@ class Trial {
     FailCalls();
     FailCommands();
     Kill();
-    Restore(base_);
+    if (share_.most == 0) judge_.LoseUnneeded();
     return std::move(tally_);
   }
 
@@ -122,17 +74,38 @@ class Trial {
   // ---- One call ----
 
   Seen Call(const Fault& fault) {
+    if (subject_.renew) subject_.renew();
+    TakeCommands();
     Seen seen;
-    MemoryOutcome* const shared = SharedMemoryOutcome();
+    Shared* const shared = SharedMemory();
     *shared = {};
     seen.outcome = RunSupervised(fault.plan, [&] {
-      *shared = RunWithoutMemory(
-          fault.allocation, [&] { return static_cast<int>(function_.call()); }, fault.allocationsBehind);
-      return shared->result;
+      shared->memory = RunWithoutMemory(
+          fault.allocation, [&] { return static_cast<int>(subject_.call()); }, fault.allocationsBehind);
+      NoteTold(*shared);
+      return shared->memory.result;
     });
     seen.answer = static_cast<Answer>(seen.outcome.result);
-    seen.memory = *shared;
+    seen.memory = shared->memory;
+    seen.commands = TakeCommands();
+    AddTold(*shared, seen.commands);
     return seen;
+  }
+
+  // In the child, in which the driver is.
+  void NoteTold(Shared& shared) const {
+    size_t size = 0;
+    for (const std::string& told : scene_.told()) {
+      const int more = std::snprintf(shared.szTold + size, sizeof shared.szTold - size, "driver %s\n", told.c_str());
+      size = std::min(size + static_cast<size_t>(more), sizeof shared.szTold - 1);
+    }
+  }
+
+  static void AddTold(const Shared& shared, std::vector<std::string>& commands) {
+    std::string_view rest = shared.szTold;
+    for (size_t feed; (feed = rest.find('\n')) != std::string_view::npos; rest.remove_prefix(feed + 1)) {
+      commands.emplace_back(rest.substr(0, feed));
+    }
   }
 
   Seen CallUndisturbed() {
@@ -140,58 +113,25 @@ class Trial {
     none.plan.withoutSleeps = true;
     none.plan.all = true;
     Seen seen = Call(none);
-    seen.state = WithoutTimes(StateOfMachine());
+    seen.state = Comparable(StateOfMachine());
     return seen;
   }
 
   // Looks at the files before each system call of a call without a fault, and behind it.
   void Watch() {
+    judge_.Begin(base_);
     Fault watched;
     watched.plan = {.interference = Interference::kWatch,
-                    .meanwhile = [this] { NoteContents(); },
+                    .meanwhile = [this] { judge_.Note(Comparable(StateOfMachine())); },
                     .withoutSleeps = true,
                     .all = true};
-    const Seen seen = Call(watched);
-    NoteContents();
-    good_ = WithoutTimes(StateOfMachine());
+    Seen seen = Call(watched);
+    seen.state = Comparable(StateOfMachine());
+    judge_.Note(seen.state);
+    judge_.Learn(seen);
     calls_ = seen.outcome.before;
     allocations_ = seen.memory.made;
     for (const SystemCall& call : calls_) tally_.names.insert(call.name);
-    if (seen.answer != Answer::kDone) Lose("without a fault", "it has not done its work" + ReportsOf(seen));
-    CheckNothingHeld("without a fault", seen);
-    if (CountUnflushed() > (Excused(Exception::kUnflushed) ? 1 : 0)) {
-      Lose("without a fault", "a file was put into its place, and it or its directory was not flushed");
-    }
-  }
-
-  // How many files are renamed before what was written to them was flushed, or without a flush behind it.
-  int CountUnflushed() const {
-    int unflushed = 0;
-    bool written = false;
-    bool renamed = false;
-    for (const SystemCall& call : calls_) {
-      if (call.name == "write") written = true;
-      if (call.name == "fsync") written = renamed = false;
-      if (call.name != "rename") continue;
-      if (written || renamed) ++unflushed;
-      renamed = !written;
-      written = false;
-    }
-    return unflushed + (renamed ? 1 : 0);
-  }
-
-  void NoteContents() {
-    const MachineState now = WithoutTimes(StateOfMachine());
-    for (const auto& [path, described] : now) contents_[path].insert(described);
-    // Those that were not there yet, or are not any more.
-    for (auto& [path, all] : contents_) {
-      if (!now.contains(path)) all.insert("");
-    }
-    for (const auto& [path, described] : now) {
-      if (looked_ && !before_.contains(path)) contents_[path].insert("");
-    }
-    before_ = now;
-    looked_ = true;
   }
 
   // ---- All faults ----
@@ -247,22 +187,28 @@ class Trial {
   }
 
   void FailCommands() {
-    const struct {
-      CommandFault fault;
-      const char* szText;
-    } kinds[] = {{CommandFault::kFails, " fails"},
-                 {CommandFault::kHangs, " hangs for a while"},
-                 {CommandFault::kIsMissing, " is missing"}};
+    constexpr CommandFault kKinds[] = {CommandFault::kFails, CommandFault::kTakesLong, CommandFault::kIsMissing,
+                                       CommandFault::kNeverEnds};
     size_t number = 0;
-    for (const std::string& command : contract_.commands) {
-      for (const auto& kind : kinds) {
-        if (number++ % StepOf(contract_.commands.size() * 3) != 0) continue;
-        Fault fault{command + kind.szText};
-        fault.command = command;
-        fault.commandFault = kind.fault;
-        Try(fault, tally_.commands);
+    for (const std::string& command : subject_.contract.commands) {
+      for (size_t i = 0; i < std::size(kKinds); ++i) {
+        if (share_.most == 0 || i == number % std::size(kKinds)) FailCommand(command, kKinds[i]);
       }
+      ++number;
     }
+  }
+
+  void FailCommand(const std::string& command, CommandFault kind) {
+    constexpr const char* kTexts[] = {"", " fails", " takes long", " never ends", " is missing"};
+    const bool waits = subject_.contract.Find(Exception::kWaits, command) != nullptr;
+    if (kind == CommandFault::kNeverEnds && !waits && share_.most != 0) return;  // it takes as long as its limit
+    Fault fault{command + kTexts[static_cast<int>(kind)]};
+    fault.command = command;
+    fault.commandFault = kind;
+    // Without a call for so long, a call is taken to wait for ever where its contract says that it may. Elsewhere it
+    // has all the time that its own limits may take.
+    if (kind == CommandFault::kNeverEnds && waits) fault.plan.patience = 2000;
+    Try(fault, tally_.commands);
   }
 
   void Kill() {
@@ -284,228 +230,45 @@ class Trial {
     fault.plan.all = true;
     if (fault.plan.call != 0) fault.plan.expected = calls_[static_cast<size_t>(fault.plan.call) - 1].name;
     // A call that a signal interrupts is made once more, so that those behind it have other numbers.
-    for (int tries = 3; tries > 0 && !TryOnce(fault, count); --tries) Mend(fault);
+    for (int tries = 3; tries > 0 && !TryOnce(fault, count); --tries) continue;
   }
 
-  // False when the function took a way on which there is no such call.
+  // False when the call took a way on which there is no such system call.
   bool TryOnce(const Fault& fault, int& count) {
     Restore(base_);
-    Break(fault);
-    Seen seen = Call(fault);
+    Seen seen = CallBroken(fault);
     const bool met = fault.plan.call != 0 ? seen.outcome.reached : fault.allocation == 0 || seen.memory.failed;
     if (!met) return false;
-    Mend(fault);
-    seen.state = WithoutTimes(StateOfMachine());
+    seen.state = Comparable(StateOfMachine());
     ++count;
-    Judge(fault, seen);
+    judge_.JudgeCall(fault, seen);
     CheckNextCalls(fault, seen);
     return true;
   }
 
-  void Break(const Fault& fault) {
-    // Not for the shell by its common name, which may be the program that is broken.
-    if (fault.commandFault == CommandFault::kFails) WriteText(fault.command, "#!/bin/dash\nexit 1\n", 0755);
-    if (fault.commandFault == CommandFault::kHangs) {
-      fs::copy_file(fault.command, kSlowCommand);
-      WriteText(fault.command, std::string("#!/bin/dash\nsleep 0.3\nexec ") + kSlowCommand + " \"$@\"\n", 0755);
-    }
-    if (fault.commandFault == CommandFault::kIsMissing) fs::remove(fault.command);
-  }
-
-  void Mend(const Fault& fault) {
-    if (fault.commandFault == CommandFault::kNone) return;
-    fs::remove(kSlowCommand);
-    const std::string& described = base_.at(fault.command);
-    WriteText(fault.command, ContentIn(base_, fault.command), static_cast<mode_t>(std::stoul(described, nullptr, 8)));
-  }
-
-  // ---- Judging ----
-
-  void Judge(const Fault& fault, const Seen& seen) {
-    CheckFiles(fault, seen);
-    if (seen.outcome.hung) return Lose(fault.text, "it came to no end");
-    if (seen.outcome.killed) {
-      if (fault.plan.interference != Interference::kKill && fault.plan.interference != Interference::kTearWrite) {
-        Lose(fault.text, "it crashed");
-      }
-      ++tally_.cutShort;
-      return;
-    }
-    CheckNothingHeld(fault.text, seen);
-    switch (seen.answer) {
-      case Answer::kDone:
-        return JudgeSuccess(fault, seen);
-      case Answer::kLess:
-        ++tally_.less;
-        if (!Excused(Exception::kLess)) Lose(fault.text, "it succeeded with less" + ReportsOf(seen));
-        return;
-      case Answer::kFailed:
-        ++tally_.failed;
-        return CheckReported(fault, seen);
-      case Answer::kWrong:
-        return Lose(fault.text, "a wrong result" + ReportsOf(seen));
-    }
-  }
-
-  void JudgeSuccess(const Fault& fault, const Seen& seen) {
-    const std::vector<std::string> different = Changed(seen.state, good_);
-    if (different.empty()) {
-      ++tally_.done;
-      return;
-    }
-    ++tally_.less;
-    if (Changed(seen.state, WithoutTimes(base_)).empty() && Excused(Exception::kNothingTried)) return;
-    for (const std::string& path : different) {
-      if (IsOfAnother(path, seen.state) || IsNarrower(path, seen.state) || IsLeft(fault, path)) continue;
-      if (Excused(Exception::kUnnoticed, path)) continue;
-      if (!seen.outcome.reports.empty() && Excused(Exception::kTolerates, path)) continue;
-      Lose(fault.text, "it succeeded, and " + path + " is " + TextOf(seen.state, path) + ReportsOf(seen));
-    }
-  }
-
-  // The differences between two states, less what may be left over until the next call.
-  static std::vector<std::string> Changed(const MachineState& state, const MachineState& than) {
-    std::vector<std::string> paths = Differences(state, than);
-    std::erase_if(paths, [](const std::string& path) { return IsLock(path) || IsUnfinished(path); });
-    return paths;
-  }
-
-  void CheckReported(const Fault& fault, const Seen& seen) {
-    if (seen.outcome.reports.empty()) {
-      if (!Excused(Exception::kSilent)) Lose(fault.text, "it failed without a report");
-      return;
-    }
-    const std::string unit = std::string(contract_.szUnit) + ":";
-    const auto own = std::find_if(seen.outcome.reports.rbegin(), seen.outcome.reports.rend(),
-                                  [&](const std::string& report) { return report.starts_with(unit); });
-    if (own == seen.outcome.reports.rend()) {
-      if (!Excused(Exception::kBelow) && !Excused(Exception::kSilent)) {
-        Lose(fault.text, "nobody has reported that it failed" + ReportsOf(seen));
-      }
-      return;
-    }
-    const std::string text = own->substr(own->find(' ') + 1);
-    const auto begins = [&](const std::string& beginning) { return text.starts_with(beginning); };
-    if (!std::ranges::any_of(contract_.failures, begins) && !Excused(Exception::kSilent)) {
-      Lose(fault.text, "a failure that is not documented" + ReportsOf(seen));
-    }
-  }
-
-  void CheckNothingHeld(const std::string& fault, const Seen& seen) {
-    const Outcome& outcome = seen.outcome;
-    if (seen.memory.blocksLeft != 0) Lose(fault, std::to_string(seen.memory.blocksLeft) + " blocks of memory leaked");
-    if (outcome.descriptorsLeft > outcome.closesFailed || outcome.descriptorsLeft < 0) {
-      Lose(fault, std::to_string(outcome.descriptorsLeft) + " descriptors leaked");
-    }
-    if (outcome.childrenLeft != 0) Lose(fault, "a process was not waited for");
-    if (outcome.processesLeft != 0) Lose(fault, "a process stayed");
-  }
-
-  // Every file is as it is at some time without a fault, and nothing is left over.
-  void CheckFiles(const Fault& fault, const Seen& seen) {
-    for (const auto& [path, described] : seen.state) CheckFile(fault, seen, path, described);
-    for (const auto& [path, described] : base_) {
-      if (seen.state.contains(path) || contents_[path].contains("")) continue;
-      if (!Excused(Exception::kInPlace, path)) Lose(fault.text, path + " is gone");
-    }
-  }
-
-  void CheckFile(const Fault& fault, const Seen& seen, const std::string& path, const std::string& described) {
-    const auto known = contents_.find(path);
-    const bool stays = base_.contains(path) || good_.contains(path);
-    if (known != contents_.end() && known->second.contains(described) && stays) return;
-    if (IsLeft(fault, path) || IsOfAnother(path, seen.state) || IsNarrower(path, seen.state)) return;
-    if (Excused(Exception::kOtherwise, path)) return;
-    const std::string is = ContentIn(seen.state, path);
-    if (contract_.Find(Exception::kInPlace, path) != nullptr && IsBeginningOfKnown(path, is)) {
-      Excused(Exception::kInPlace, path);
-      return;
-    }
-    if (known == contents_.end() || !stays) return Lose(fault.text, path + " was left over");
-    Lose(fault.text, path + " is neither old nor new: " + TextOf(seen.state, path));
-  }
-
-  // Whether the file is what a call that was killed leaves to the next one, or a call that could not remove it: the
-  // next one has no use of it, or it is excused.
-  bool IsLeft(const Fault& fault, const std::string& path) {
-    if (!MayLeave(fault)) return false;
-    if (IsLock(path) || IsUnfinished(path) || Excused(Exception::kStays, path)) return true;
-    return Excused(Exception::kRefused, path) || Excused(Exception::kPassedOver, path);
-  }
-
-  // A lock that was not taken is left too.
-  bool MayLeave(const Fault& fault) const {
-    const Interference interference = fault.plan.interference;
-    if (interference == Interference::kNone || interference == Interference::kShorten) return false;
-    if (interference != Interference::kFail || fault.plan.onwards) return true;
-    const std::string& name = calls_[static_cast<size_t>(fault.plan.call) - 1].name;
-    return name == "unlink" || name == "flock" || name == "stat";
-  }
-
-  bool IsBeginningOfKnown(const std::string& path, const std::string& content) {
-    return std::ranges::any_of(contents_[path], [&](const std::string& known) {
-      return known.size() > 5 && known.substr(5).starts_with(content);
-    });
-  }
-
-  // Whether the file has what it has without a fault, but for numbers.
-  bool IsOfAnother(const std::string& path, const MachineState& state) {
-    if (contract_.Find(Exception::kAnother, path) == nullptr || !state.contains(path)) return false;
-    const std::string is = WithoutNumbers(ContentIn(state, path));
-    const bool same = std::ranges::any_of(contents_[path], [&](const std::string& known) {
-      return known.size() > 5 && WithoutNumbers(known.substr(5)) == is;
-    });
-    return same && Excused(Exception::kAnother, path);
-  }
-
-  // Whether only the rights to the file are others than without a fault.
-  bool IsNarrower(const std::string& path, const MachineState& state) {
-    if (contract_.Find(Exception::kNarrower, path) == nullptr || !state.contains(path)) return false;
-    const bool same = ContentIn(state, path) == ContentIn(good_, path) && state.at(path).starts_with("0600");
-    return same && Excused(Exception::kNarrower, path);
+  Seen CallBroken(const Fault& fault) {
+    const BrokenCommand broken(fault);
+    return Call(fault);
   }
 
   // ---- The next call ----
-
-  struct Next {
-    std::vector<std::string> losses;
-    bool refused = false;
-    bool missed = false;
-  };
 
   // What the next call comes to follows from the state that it finds: it is made once for each.
   void CheckNextCalls(const Fault& fault, const Seen& seen) {
     const auto [known, isNew] = next_.try_emplace(HashOf(seen.state));
     if (isNew) known->second = MakeNextCalls(seen.state);
-    for (const std::string& loss : known->second.losses) Lose(fault.text, loss);
-    tally_.refused += known->second.refused ? 1 : 0;
-    tally_.missed += known->second.missed ? 1 : 0;
+    judge_.Count(fault.text, known->second);
   }
 
-  Next MakeNextCalls(const MachineState& state) {
-    Next next;
+  Judge::Next MakeNextCalls(const MachineState& state) {
+    Judge::Next next;
     const std::pair<Exception, Answer> markers[] = {{Exception::kRefused, Answer::kFailed},
                                                     {Exception::kPassedOver, Answer::kDone}};
     for (const auto& [exception, answer] : markers) {
-      if (!IsMarkerThere(exception, state)) continue;
-      next.refused = true;
-      const Seen because = CallUndisturbed();
-      if (because.answer != answer) next.losses.emplace_back("the marker had another effect on the next call");
-      if (IsMarkerThere(exception, because.state)) next.losses.emplace_back("the next call left the marker");
+      if (!judge_.IsMarkerThere(state, exception)) continue;
+      judge_.JudgeMarked(CallUndisturbed(), exception, answer, next);
     }
-    const Seen good = CallUndisturbed();
-    if (good.answer != Answer::kDone) {
-      next.losses.push_back("the next call did not do its work" + ReportsOf(good));
-      return next;
-    }
-    for (const std::string& path : Differences(good.state, good_)) {
-      if (Excused(Exception::kStays, path) || Excused(Exception::kOtherwise, path)) continue;
-      if (Excused(Exception::kMissed, path)) {
-        next.missed = true;
-        continue;
-      }
-      next.losses.push_back("behind the next call " + path + " is " + TextOf(good.state, path));
-    }
+    judge_.JudgeNext(CallUndisturbed(), next);
     return next;
   }
 
@@ -515,54 +278,20 @@ class Trial {
     return std::hash<std::string>()(all);
   }
 
-  bool IsMarkerThere(Exception exception, const MachineState& state) {
-    return std::ranges::any_of(contract_.excuses, [&](const Excuse& excuse) {
-      const bool there = excuse.exception == exception && state.contains(excuse.path);
-      return there && Excused(exception, excuse.path);
-    });
-  }
-
-  // ---- Words ----
-
-  bool Excused(Exception exception, const std::string& path = {}) {
-    const Excuse* excuse = contract_.Find(exception, path);
-    if (excuse != nullptr) ++tally_.reasons[excuse->szReason];
-    return excuse != nullptr;
-  }
-
-  static std::string TextOf(const MachineState& state, const std::string& path) {
-    const auto found = state.find(path);
-    return found != state.end() ? "'" + found->second.substr(0, 300) + "'" : "gone";
-  }
-
-  static std::string ReportsOf(const Seen& seen) {
-    std::string text;
-    for (const std::string& report : seen.outcome.reports) text += "\n    " + report;
-    return text;
-  }
-
-  void Lose(const std::string& fault, const std::string& what) { tally_.losses.push_back(fault + ": " + what); }
-
-  static constexpr char kSlowCommand[] = "/tmp/slow-command";
-
-  const Exported& function_;
-  const Contract& contract_;
+  const Subject& subject_;
   const Share share_;
   const Scene scene_;
   const Silence silence_;
+  Tally tally_;
+  Judge judge_;
   MachineState base_;
-  MachineState good_;
-  std::map<std::string, std::set<std::string>> contents_;  // of each file, at any time; "" for none
-  MachineState before_;
-  bool looked_ = false;
-  std::map<size_t, Next> next_;  // behind each state
+  std::map<size_t, Judge::Next> next_;  // behind each state
   std::vector<SystemCall> calls_;
   int allocations_ = 0;
-  Tally tally_;
 };
 
 }  // namespace
 
-Tally TryFaults(const Exported& function, const Share& share) {
-  return Trial(function, share).Run();
+Tally TryFaults(const Subject& subject, const Share& share) {
+  return Trial(subject, share).Run();
 }

@@ -1,26 +1,34 @@
-// A part of the faults of every exported function; `./run faults` tries all of them.
+// A part of the faults of every function and operation; `./run faults` tries all of them.
 #include "tests/fault/faults.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
 
+#include "tests/fault/subjects.h"
+
 namespace {
 
 std::vector<std::string> Names() {
   std::vector<std::string> names;
-  for (const Exported& function : ExportedFunctions()) names.emplace_back(function.szName);
+  for (const Subject& subject : AllSubjects()) names.push_back(subject.name);
   return names;
 }
 
 class AFaultIn : public testing::TestWithParam<std::string> {};
 
 TEST_P(AFaultIn, HasTheResultAndLeavesTheFilesThatTheContractSays) {
-  const auto function = std::ranges::find(ExportedFunctions(), GetParam(), &Exported::szName);
-  const Tally tally = TryFaults(*function, {.most = 10});
+  const auto subject = std::ranges::find(AllSubjects(), GetParam(), &Subject::name);
+  const Tally tally = TryFaults(*subject, {.most = 10});
   for (const std::string& loss : tally.losses) ADD_FAILURE() << loss;
 }
 
-INSTANTIATE_TEST_SUITE_P(, AFaultIn, testing::ValuesIn(Names()), [](const auto& of) { return of.param; });
+std::string NameOf(const testing::TestParamInfo<std::string>& of) {
+  std::string name = of.param;
+  std::ranges::replace_if(name, [](char c) { return c == ' ' || c == ','; }, '_');
+  return name;
+}
+
+INSTANTIATE_TEST_SUITE_P(, AFaultIn, testing::ValuesIn(Names()), NameOf);
 
 }  // namespace

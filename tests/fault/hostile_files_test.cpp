@@ -14,6 +14,7 @@
 #include <span>
 
 #include "tests/fault/calls.h"
+#include "tests/fault/scene.h"
 #include "tests/support/files.h"
 #include "tests/support/processes.h"
 
@@ -145,7 +146,7 @@ class AHostileFile : public testing::TestWithParam<const Exported*> {
     for (const std::string& path : FilesOf(*GetParam())) {
       for (const Hostile& hostile : all) {
         SCOPED_TRACE(path + ": " + hostile.szName);
-        const Scene scene(*GetParam());
+        const Scene scene(GetParam()->prepare);
         const std::string before = TextOrNothing(path);
         fs::remove_all(path);
         fs::create_directories(fs::path(path).parent_path());
@@ -188,7 +189,7 @@ TEST_P(AHostileFile, MayChangeAndShrinkWhileItIsRead) {
   const Exported& function = *GetParam();
   for (const std::string& path : FilesOf(function)) {
     SCOPED_TRACE(path);
-    const Scene scene(function);
+    const Scene scene(function.prepare);
     const std::string text = TextOrNothing(path) + Numbered("[s", "]\n\tessid=\"x\"\n", 2'000);
     const StartedChild rival([&] { return KeepChanging(path, text); });
     for (int round = 0; round < 10; ++round) EXPECT_NE(CallWithinBounds(function), -1);

@@ -50,7 +50,7 @@ void AddFiles(const std::string& directory, MachineState& state) {
     const fs::path path = fs::path("/" + directory) / entry->path().lexically_relative(layer);
     const fs::file_status status = entry->symlink_status();
     if (path == "/tmp/interfaces") entry.disable_recursion_pending();  // the kernel's interfaces are mounted on it
-    if (IsThere(status)) state[path] = Describe(entry->path(), status);
+    if (IsThere(status) && path != kCommandRecord) state[path] = Describe(entry->path(), status);
   }
 }
 
@@ -71,8 +71,14 @@ std::string DescribeInterface() {
   return state + addresses;
 }
 
+// The addresses have no mask in a state, and get a usual one.
 void RestoreInterface(const std::string& state) {
-  Shell("ip address flush dev wlan0; ip link set wlan0 " + state.substr(0, state.find(' ')));
+  const size_t space = state.find(' ');
+  std::string command = "ip address flush dev wlan0; ip link set wlan0 " + state.substr(0, space);
+  for (size_t at = space; at != std::string::npos; at = state.find(' ', at + 1)) {
+    command += "; ip address add " + state.substr(at + 1, state.find(' ', at + 1) - at - 1) + "/24 dev wlan0";
+  }
+  Shell(command);
 }
 
 void RestoreFile(const std::string& path, const std::string& described) {
@@ -106,10 +112,13 @@ void Restore(const MachineState& state) {
   }
 }
 
-MachineState WithoutTimes(MachineState state) {
+MachineState Comparable(MachineState state) {
   static const std::regex time("ACCESS_TIME=[0-9]+");
   const auto store = state.find(kKnownNetworksPath);
   if (store != state.end()) store->second = std::regex_replace(store->second, time, "ACCESS_TIME=");
+  for (auto& [path, described] : state) {
+    if (path.ends_with(".pid")) described = described.substr(0, kModeSize) + "(a process)";
+  }
   return state;
 }
 

@@ -5,6 +5,9 @@
 #include <map>
 #include <string>
 
+// What commands note that they have run in. It is no part of the state.
+inline constexpr char kCommandRecord[] = "/tmp/commands";
+
 // Each file that the private machine has and the one outside has not, or has otherwise: its path, and its mode and
 // content. And "wlan0": whether that interface is up, and its addresses.
 using MachineState = std::map<std::string, std::string>;
@@ -14,8 +17,8 @@ MachineState StateOfMachine();
 // Makes the machine what it was.
 void Restore(const MachineState& state);
 
-// A state in which times are all the same.
-MachineState WithoutTimes(MachineState state);
+// A state in which times and processes are all the same.
+MachineState Comparable(MachineState state);
 
 // The content of a file of a state; empty for none.
 std::string ContentIn(const MachineState& state, const std::string& path);

@@ -19,6 +19,7 @@
 #include <algorithm>
 #include <bit>
 #include <cerrno>
+#include <climits>
 #include <csignal>
 #include <cstddef>
 #include <cstdio>
@@ -27,7 +28,6 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
-#include <map>
 #include <set>
 #include <utility>
 
@@ -39,137 +39,16 @@ namespace {
 // No operation makes this call; the child does to say that the operation begins and that it has ended.
 constexpr int kMark = SYS_getppid;
 
-const SystemCall kNames[] = {
-#ifdef SYS_open
-    {SYS_open, "open"},
-#endif
-#ifdef SYS_access
-    {SYS_access, "access"},
-#endif
-#ifdef SYS_readlink
-    {SYS_readlink, "readlink"},
-#endif
-#ifdef SYS_unlink
-    {SYS_unlink, "unlink"},
-#endif
-#ifdef SYS_rename
-    {SYS_rename, "rename"},
-#endif
-#ifdef SYS_stat
-    {SYS_stat, "stat"},
-#endif
-#ifdef SYS_fstat
-    {SYS_fstat, "stat"},
-#endif
-#ifdef SYS_newfstatat
-    {SYS_newfstatat, "stat"},
-#endif
-#ifdef SYS_fstatat64
-    {SYS_fstatat64, "stat"},
-#endif
-#ifdef SYS_renameat
-    {SYS_renameat, "rename"},
-#endif
-#ifdef SYS_fchown32
-    {SYS_fchown32, "fchown"},
-#endif
-    {SYS_statx, "stat"},        {SYS_openat, "open"},      {SYS_faccessat, "access"}, {SYS_readlinkat, "readlink"},
-    {SYS_unlinkat, "unlink"},   {SYS_renameat2, "rename"}, {SYS_read, "read"},        {SYS_write, "write"},
-    {SYS_fsync, "fsync"},       {SYS_close, "close"},      {SYS_flock, "flock"},      {SYS_fchmod, "fchmod"},
-    {SYS_fchown, "fchown"},
-};
-
-// Those that have nothing to do with the content of files.
-const SystemCall kOtherNames[] = {
-#ifdef SYS_pipe
-    {SYS_pipe, "pipe"},
-#endif
-#ifdef SYS_fork
-    {SYS_fork, "clone"},
-#endif
-#ifdef SYS_vfork
-    {SYS_vfork, "clone"},
-#endif
-#ifdef SYS_mkdir
-    {SYS_mkdir, "mkdir"},
-#endif
-#ifdef SYS_poll
-    {SYS_poll, "poll"},
-#endif
-#ifdef SYS_waitpid
-    {SYS_waitpid, "wait"},
-#endif
-#ifdef SYS_send
-    {SYS_send, "send"},
-#endif
-#ifdef SYS_recv
-    {SYS_recv, "recv"},
-#endif
-#ifdef SYS_dup2
-    {SYS_dup2, "dup"},
-#endif
-    {SYS_pipe2, "pipe"},
-    {SYS_clone, "clone"},
-    {SYS_clone3, "clone"},
-    {SYS_wait4, "wait"},
-    {SYS_mkdirat, "mkdir"},
-    {SYS_getdents64, "getdents"},
-    {SYS_socket, "socket"},
-    {SYS_ioctl, "ioctl"},
-    {SYS_sendto, "send"},
-    {SYS_recvfrom, "recv"},
-    {SYS_ppoll, "poll"},
-    {SYS_getrandom, "getrandom"},
-    {SYS_kill, "kill"},
-    {SYS_pidfd_open, "pidfd_open"},
-    {SYS_pidfd_send_signal, "pidfd_send_signal"},
-    {SYS_lseek, "lseek"},
-    {SYS_fcntl, "fcntl"},
-    {SYS_umask, "umask"},
-    {SYS_dup3, "dup"},
-    {SYS_prlimit64, "prlimit"},
-    {SYS_rt_sigaction, "sigaction"},
-    {SYS_rt_sigprocmask, "sigprocmask"},
-};
-
-// Null for a call that no operation on files makes: for memory, the time and the like.
-const SystemCall* CallOnFiles(int number) {
-  const SystemCall* call = std::ranges::find(kNames, number, &SystemCall::number);
-  return call != std::end(kNames) ? call : nullptr;
-}
-
-SystemCall AnyCall(int number) {
-  if (const SystemCall* call = CallOnFiles(number); call != nullptr) return *call;
-  const SystemCall* call = std::ranges::find(kOtherNames, number, &SystemCall::number);
-  return call != std::end(kOtherNames) ? *call : SystemCall{number, "call " + std::to_string(number)};
-}
-
-constexpr int kSleeps[] = {
-    SYS_clock_nanosleep,
-#ifdef SYS_clock_nanosleep_time64
-    SYS_clock_nanosleep_time64,
-#endif
-};
-
-// Those of an allocator, which calls the kernel whenever it happens to need memory.
-constexpr int kMemory[] = {
-#ifdef SYS_mmap
-    SYS_mmap,
-#endif
-#ifdef SYS_mmap2
-    SYS_mmap2,
-#endif
-    SYS_brk,   SYS_madvise, SYS_mprotect, SYS_mremap, SYS_munmap,
-};
-
-bool IsAmong(const auto& numbers, int number) {
-  return std::ranges::find(numbers, number) != std::end(numbers);
-}
-
 void Require(bool done, const char* szWhat) {
   if (done) return;
   std::perror(szWhat);
   std::abort();
+}
+
+std::set<pid_t> ChildrenOfThis() {
+  const std::string pid = std::to_string(::getpid());
+  std::ifstream file("/proc/" + pid + "/task/" + pid + "/children");
+  return {std::istream_iterator<pid_t>(file), std::istream_iterator<pid_t>()};
 }
 
 void WriteAll(int fd, const void* data, size_t size) {
@@ -240,6 +119,7 @@ class Supervisor {
   Supervisor(pid_t child, int report, const Plan& plan) : child_(child), report_(report), plan_(plan) {
     int there = -1;
     Require(::read(report_, &there, sizeof there) == sizeof there, "read where the child is asked");
+    before_ = ChildrenOfThis();
     process_ = static_cast<int>(::syscall(SYS_pidfd_open, child_, 0));
     asked_ = static_cast<int>(::syscall(SYS_pidfd_getfd, process_, there, 0));
     Require(asked_ >= 0, "get what the child is asked through");
@@ -260,15 +140,14 @@ class Supervisor {
   }
 
  private:
-  static constexpr int kPatience = 20'000;      // milliseconds without a call of the child
-  static constexpr int kPatienceBehind = 5000;  // the same of what the child has led to, when it has ended
+  static constexpr int kPatienceBehind = 5000;  // milliseconds for what the child has led to, when it has ended
   static constexpr int kLook = 10;
 
   // Waits for the next call of the child or of those that it has led to; false when there will be none.
   bool NextCall() {
     while (true) {
       pollfd ready[] = {{asked_, POLLIN, 0}, {ended_ ? -1 : process_, POLLIN, 0}};
-      const int count = ::poll(ready, std::size(ready), ended_ ? kLook : kPatience);
+      const int count = ::poll(ready, std::size(ready), ended_ ? kLook : plan_.patience);
       Require(count >= 0 || errno == EINTR, "wait for a system call");
       if (count < 0) continue;
       const bool asks = (ready[0].revents & POLLIN) != 0;
@@ -296,16 +175,22 @@ class Supervisor {
 
   void EndHungChild() {
     outcome_.hung = true;
+    patience_ = 0;
     Require(::kill(child_, SIGKILL) == 0, "kill the child");
   }
 
+  // What the child has led to is this process's by now, also what has not made a call yet.
   bool IsAnyOtherThere() {
+    for (const pid_t other : ChildrenOfThis()) {
+      if (!before_.contains(other)) others_.insert(other);
+    }
     return std::ranges::any_of(others_, [](pid_t other) { return ::waitpid(other, nullptr, WNOHANG) == 0; });
   }
 
-  // What the child has led to is this process's by now. A process asks about no more calls a moment before its end.
+  // A process asks about no more calls a moment before its end.
   void EndOther(pid_t other) {
-    for (int looks = 0; looks < kPatienceBehind / kLook; ++looks) {
+    const int most = outcome_.hung ? 1 : kPatienceBehind / kLook;
+    for (int looks = 0; looks < most; ++looks) {
       if (::waitpid(other, nullptr, WNOHANG) != 0) return;
       ::poll(nullptr, 0, looks == 0 ? 1 : kLook);
     }
@@ -329,9 +214,9 @@ class Supervisor {
     if (own && number == kMark) return PassMark();
     if (!own) others_.insert(static_cast<pid_t>(call_.pid));
     if (!inOperation_) return LetThrough();
-    if (!own || IsAmong(kMemory, number)) return LetThrough();
+    if (!own || IsAllocators(number)) return LetThrough();
     ++outcome_.cost.calls;
-    if (plan_.withoutSleeps && IsAmong(kSleeps, number)) return SkipSleep();
+    if (plan_.withoutSleeps && IsSleep(number)) return SkipSleep();
     if (plan_.all) return AnswerCounted(CallByObject());
     if (const SystemCall* call = CallOnFiles(number); call != nullptr) return AnswerCounted(*call);
     LetThrough();
@@ -349,14 +234,34 @@ class Supervisor {
         SYS_newfstatat,
 #endif
     };
-    if (!IsAmong(kOnDescriptors, call.number)) return call;
-    char szObject[8] = {};
+    if (std::ranges::find(kOnDescriptors, call.number) == std::end(kOnDescriptors)) return call;
+    const std::string object = OpenObject();
+    if (object.starts_with("pipe:") || object.starts_with("socket:")) call.name += " of a stream";
+    return call;
+  }
+
+  // What the descriptor that is the call's first argument leads to.
+  std::string OpenObject() const {
+    char szObject[PATH_MAX] = {};
     const std::string link =
         "/proc/" + std::to_string(child_) + "/fd/" + std::to_string(static_cast<int>(call_.data.args[0]));
     (void)::readlink(link.c_str(), szObject, sizeof szObject - 1);
-    const std::string_view object = szObject;
-    if (object.starts_with("pipe:") || object.starts_with("socket:")) call.name += " of a stream";
-    return call;
+    return szObject;
+  }
+
+  // The path of what the call is about. A path may lie at the end of what can be read.
+  std::string PathOfCall() const {
+    const int argument = PathArgumentOf(call_.data.nr);
+    if (argument < 0) return OpenObject();
+    const auto address = static_cast<uintptr_t>(call_.data.args[argument]);
+    char szPath[PATH_MAX] = {};
+    constexpr size_t kPart = 256;
+    for (size_t at = 0; at + kPart < sizeof szPath && ::strnlen(szPath, at) == at; at += kPart) {
+      const iovec here = {szPath + at, kPart};
+      const iovec there = {reinterpret_cast<void*>(address + at), kPart};
+      if (::process_vm_readv(child_, &here, 1, &there, 1, 0) <= 0) break;
+    }
+    return *szPath != '\0' ? szPath : OpenObject();
   }
 
   void AnswerCounted(const SystemCall& call) {
@@ -439,6 +344,7 @@ class Supervisor {
   }
 
   void Fail() {
+    outcome_.failed.push_back({CallByObject().name, PathOfCall()});
     if (call_.data.nr == SYS_close) Close();
     Reply(0, -plan_.error, 0);
   }
@@ -529,6 +435,7 @@ class Supervisor {
   bool inOperation_ = false;
   bool ended_ = false;
   int patience_ = kPatienceBehind;
+  std::set<pid_t> before_;  // this process's children, the one that is watched among them
   std::set<pid_t> others_;
   int calls_ = 0;
   int descriptorsBefore_ = 0;
@@ -536,42 +443,6 @@ class Supervisor {
 };
 
 }  // namespace
-
-const std::vector<int>& ErrorsOf(const std::string& name) {
-  static const std::map<std::string, std::vector<int>> all = {
-      {"open", {ENOSPC, EIO, EACCES, EROFS, EMFILE, EINTR, ENOMEM}},
-      {"access", {EIO, EACCES, ENOMEM}},
-      {"readlink", {EIO, EACCES, ENOMEM}},
-      {"stat", {EIO, EACCES, ENOMEM}},
-      {"unlink", {EIO, EACCES, EROFS, ENOMEM}},
-      {"rename", {ENOSPC, EIO, EACCES, EROFS, ENOMEM}},
-      {"read", {EIO, EINTR, ENOMEM}},
-      {"write", {ENOSPC, EIO, EINTR}},
-      {"fsync", {ENOSPC, EIO, EROFS}},
-      {"close", {ENOSPC, EIO, EINTR}},
-      {"read of a stream", {EINTR}},
-      {"flock", {EINTR, ENOMEM}},
-      {"fchmod", {EIO, EACCES, EROFS}},
-      {"fchown", {EIO, EACCES, EROFS}},
-      {"mkdir", {ENOSPC, EACCES, EROFS, ENOMEM}},
-      {"getdents", {EIO, ENOMEM}},
-      {"socket", {EACCES, EMFILE, ENOMEM}},
-      {"ioctl", {EIO, EACCES, EINTR, ENOMEM}},
-      {"send", {EACCES, EINTR, ENOMEM}},
-      {"recv", {EINTR, ENOMEM}},
-      {"pipe", {EMFILE, ENOMEM}},
-      {"clone", {EAGAIN, ENOMEM}},
-      {"wait", {EINTR}},
-      {"poll", {EINTR, ENOMEM}},
-      {"getrandom", {EINTR}},
-      {"kill", {EACCES}},
-      {"pidfd_open", {EMFILE, ENOMEM}},
-      {"pidfd_send_signal", {EACCES}},
-  };
-  static const std::vector<int> none;
-  const auto errors = all.find(name);
-  return errors != all.end() ? errors->second : none;
-}
 
 Outcome RunSupervised(const Plan& plan, const std::function<int()>& operation) {
   Require(::prctl(PR_SET_CHILD_SUBREAPER, 1, 0, 0, 0) == 0, "take over what the child leaves");

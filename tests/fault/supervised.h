@@ -9,10 +9,7 @@
 #include <string>
 #include <vector>
 
-struct SystemCall {
-  int number = -1;
-  std::string name;  // by which the C library knows it; where all calls count, " of a stream" for a pipe or a socket
-};
+#include "tests/fault/system_calls.h"
 
 // What happens in place of a system call.
 enum class Interference {
@@ -35,6 +32,13 @@ struct Plan {
   bool all = false;                      // counts all of the operation's calls, but for an allocator's and its sleeps
   std::string expected = {};             // the name of the call; when it is another, nothing is done
   bool onwards = false;                  // with kFail: so do all calls behind it that can give the error
+  int patience = 20'000;                 // milliseconds without a call of the operation until it counts as hung
+};
+
+// A call that was made to fail, and the path of what it was about; empty when that has none.
+struct FailedCall {
+  std::string name;
+  std::string path;
 };
 
 // The costs of an operation.
@@ -50,6 +54,7 @@ struct Outcome {
   bool reached = false;            // the operation made as many calls as the plan says
   SystemCall call;                 // the one interfered with
   std::vector<SystemCall> before;  // those that were let through until then
+  std::vector<FailedCall> failed;
   bool killed = false;
   int result = -1;  // what follows is of an operation that was not killed
   int code = 0;
@@ -59,11 +64,8 @@ struct Outcome {
   int closesFailed = 0;     // each of them leaves a descriptor, of /dev/null, which no operation can get rid of
   int childrenLeft = 0;     // processes that the operation has started, and not waited for
   int processesLeft = 0;    // those that it has led to, and that did not end by themselves soon behind it
-  bool hung = false;        // it made no call for so long that it was killed
+  bool hung = false;        // it made no call for so long that it was killed, with all that it has led to
 };
-
-// The errors that a system call of that name is made to give: those of a disk, of memory, of rights, and of signals.
-const std::vector<int>& ErrorsOf(const std::string& name);
 
 // Runs an operation in a child of this process. What becomes of the child's children is watched too, whereupon this
 // process is the one that they are left to.
