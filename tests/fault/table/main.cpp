@@ -1,4 +1,4 @@
-// fault-table [NAME...]: tries every fault of the functions and the operations, or of those that are
+// fault-table [NAME...]: tries every fault of the functions, the operations and the scripts, or of those that are
 // named, and prints a table of what came of it. Exits with 1 when something was lost.
 #include <algorithm>
 #include <cstdio>
@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "tests/fault/faults.h"
+#include "tests/fault/scripts.h"
 #include "tests/fault/subjects.h"
 #include "tests/fault/table/apart.h"
 
@@ -83,6 +84,7 @@ struct Row {
 std::vector<Row> AllRows() {
   std::vector<Row> rows;
   for (const Subject& subject : AllSubjects()) rows.push_back({subject.name, [&] { return TryFaults(subject, {}); }});
+  for (const std::string& name : ScriptNames()) rows.push_back({name, [name] { return TryScript(name, {}); }});
   return rows;
 }
 
