@@ -73,9 +73,14 @@ std::vector<Excuse> OfAutoConnect() {
   excuses.push_back({kPassedOver, kJoinMarkerPath, kFirstRefused});
   excuses.push_back({kRepeats, "/usr/sbin/iwlist", kReadAgain});
   excuses.push_back({kRepeats, "driver", kOtherNetwork});
+  excuses.push_back({kIgnores, kLeaseScript, kNothingLeased});
+  excuses.push_back({kRepeats, kSupplicant, kOtherNetwork});
+  excuses.push_back({kIgnores, "/usr/sbin/iwlist", kNobodyThere});
+  for (const char* szPath : {kSupplicantConfigPath, kConnectionRecordPath, kSupplicant, kClient}) {
+    excuses.push_back({kLeftOut, szPath, kRadioUnknown});
+  }
   for (const char* szPath : {kSupplicantConfigPath, kConnectionRecordPath}) {
     excuses.push_back({kAnother, szPath, kOtherNetwork});
-    excuses.push_back({kUnnoticed, szPath, kRadioUnknown});
   }
   return excuses;
 }
@@ -201,10 +206,10 @@ std::map<std::string, Contract> AllContracts() {
 }  // namespace
 
 const char* NameOf(Exception exception) {
-  constexpr const char* kNames[] = {"kSilent",    "kBelow",      "kLess",     "kNothingTried", "kTolerates",
-                                    "kUnnoticed", "kAnother",    "kNarrower", "kInPlace",      "kUnflushed",
-                                    "kRefused",   "kPassedOver", "kStays",    "kMissed",       "kIgnores",
-                                    "kRepeats",   "kOtherWords", "kWaits",    "kRunsOn"};
+  constexpr const char* kNames[] = {"kSilent",    "kBelow",     "kLess",       "kNothingTried", "kLeftOut",
+                                    "kTolerates", "kUnnoticed", "kAnother",    "kNarrower",     "kInPlace",
+                                    "kUnflushed", "kRefused",   "kPassedOver", "kStays",        "kMissed",
+                                    "kIgnores",   "kRepeats",   "kOtherWords", "kWaits",        "kRunsOn"};
   static_assert(std::size(kNames) == static_cast<size_t>(kRunsOn) + 1, "name every exception");
   return kNames[static_cast<size_t>(exception)];
 }

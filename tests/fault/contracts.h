@@ -15,6 +15,7 @@ enum class Exception {
   kBelow,         // a failure is reported by those alone whom the function calls
   kLess,          // it succeeds with less
   kNothingTried,  // it succeeds without doing anything, and says nothing, because the file could not be read
+  kLeftOut,       // for the same cause, it succeeds without the change of the file, or without the command
   kTolerates,     // it succeeds without the change of the file, and reports that
   kUnnoticed,     // it succeeds without the change of the file, and does not notice
   kAnother,       // the file may be about another network

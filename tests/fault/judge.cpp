@@ -122,6 +122,13 @@ void Judge::Learn(const Seen& good) {
 void Judge::JudgeUndisturbed(const Seen& good) {
   const Fault none{"without a fault"};
   if (good.answer != Answer::kDone) Lose(none.text, "it has not done its work" + ReportsOf(good));
+  for (const auto& [path, described] : good.state) {
+    if (IsLeftOver(path)) Lose(none.text, path + " was left over");
+  }
+  for (const std::string& command : contract_.commands) {
+    const bool notes = ContentIn(base_, command).find(kCommandRecord) != std::string::npos;
+    if (notes && std::ranges::count(good.commands, command, CommandIn) == 0) Lose(none.text, command + " was not run");
+  }
   CheckNothingHeld(none, good);
   const int unflushed = CountUnflushed(good.outcome.before);
   if (unflushed > 1 || (unflushed == 1 && !Excused(Exception::kUnflushed))) {
@@ -175,14 +182,22 @@ void Judge::JudgeSuccess(const Fault& fault, const Seen& seen) {
   for (const std::string& wrong : WrongCommands(seen)) Lose(fault.text, "it succeeded, and " + wrong + ReportsOf(seen));
 }
 
-// A file that could not be looked into is the cause.
 bool Judge::IsNothingTried(const Seen& seen) {
-  if (!Changed(seen.state, Comparable(base_)).empty() || !seen.commands.empty()) return false;
+  return Changed(seen.state, Comparable(base_)).empty() && seen.commands.empty() && HasCause(seen);
+}
+
+// Whether a file could not be looked into because of which nothing is tried.
+bool Judge::HasCause(const Seen& seen) {
   return std::ranges::any_of(seen.outcome.failed,
                              [&](const FailedCall& call) { return Excused(Exception::kNothingTried, call.path); });
 }
 
+bool Judge::IsLeftOut(const Seen& seen, const std::string& path) {
+  return contract_.Find(Exception::kLeftOut, path) != nullptr && HasCause(seen) && Excused(Exception::kLeftOut, path);
+}
+
 bool Judge::IsExcusedFile(const Fault& fault, const Seen& seen, const std::string& path) {
+  if (IsLeftOut(seen, path)) return true;
   if (IsOfAnother(path, seen.state) || IsNarrower(path, seen.state) || IsLeft(fault, seen, path)) return true;
   if (Excused(Exception::kUnnoticed, path)) return true;
   return !seen.outcome.reports.empty() && Excused(Exception::kTolerates, path);
@@ -198,7 +213,8 @@ std::vector<std::string> Judge::WrongCommands(const Seen& seen) {
   for (const std::string& line : missing) {
     const std::string command = CommandIn(line);
     if (isOf(surplus, command) && Excused(Exception::kOtherWords, command)) continue;
-    if (!Excused(Exception::kIgnores, command)) wrong.push_back("'" + line + "' was not run");
+    if (!IsLeftOut(seen, command) && !Excused(Exception::kIgnores, command))
+      wrong.push_back("'" + line + "' was not run");
   }
   for (const std::string& line : surplus) {
     const std::string command = CommandIn(line);
@@ -274,6 +290,7 @@ void Judge::CheckFile(const Fault& fault, const Seen& seen, const std::string& p
 
 // Whether a call leaves no such file by itself: a lock, a new file that is not in its place yet, a marker.
 bool Judge::IsLeftOver(const std::string& path) const {
+  if (IsLock(path) || IsUnfinished(path)) return !base_.contains(path);
   return !base_.contains(path) && !good_.state.contains(path);
 }
 
@@ -310,6 +327,7 @@ bool Judge::IsBeginningOfKnown(const std::string& path, const std::string& conte
 // Whether the file has what it has without a fault, but for numbers.
 bool Judge::IsOfAnother(const std::string& path, const MachineState& state) {
   if (contract_.Find(Exception::kAnother, path) == nullptr || !state.contains(path)) return false;
+  if (ContentIn(state, path) == ContentIn(good_.state, path)) return false;
   const std::string is = WithoutNumbers(ContentIn(state, path));
   const bool same = std::ranges::any_of(contents_[path], [&](const std::string& known) {
     return known.size() > 5 && WithoutNumbers(known.substr(5)) == is;

@@ -51,6 +51,8 @@ class Judge {
   void CheckFile(const Fault& fault, const Seen& seen, const std::string& path, const std::string& described);
 
   bool IsNothingTried(const Seen& seen);
+  bool HasCause(const Seen& seen);
+  bool IsLeftOut(const Seen& seen, const std::string& path);
   bool IsExcusedFile(const Fault& fault, const Seen& seen, const std::string& path);
   // The commands that were not run as without a fault, and are not excused.
   std::vector<std::string> WrongCommands(const Seen& seen);
