@@ -3,6 +3,7 @@
 
 #include <gtest/gtest.h>
 #include <sys/mman.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -72,6 +73,11 @@ Apart::Apart(const std::function<Tally()>& make) : memory_(::memfd_create("tally
   if (child_ != 0) return;
   TallyInChild(make, "/proc/self/fd/" + std::to_string(memory_));
   ::_exit(0);
+}
+
+bool Apart::IsDone() const {
+  siginfo_t ended{};
+  return ::waitid(P_PID, static_cast<id_t>(child_), &ended, WEXITED | WNOHANG | WNOWAIT) == 0 && ended.si_pid != 0;
 }
 
 Tally Apart::Take() {

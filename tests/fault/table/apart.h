@@ -15,6 +15,8 @@ class Apart {
   Apart(const Apart&) = delete;
   Apart& operator=(const Apart&) = delete;
 
+  bool IsDone() const;
+
   // To be called once: waits for the tally. What the tests' own parts expect in vain is among the losses.
   Tally Take();
 

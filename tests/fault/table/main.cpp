@@ -1,11 +1,13 @@
 // fault-table [NAME...]: tries every fault of the functions, the operations and the scripts, or of those that are
 // named, and prints a table of what came of it. Exits with 1 when something was lost.
 #include <algorithm>
+#include <chrono>
 #include <cstdio>
 #include <deque>
 #include <functional>
 #include <map>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "tests/fault/faults.h"
@@ -15,8 +17,8 @@
 
 namespace {
 
-constexpr int kShown = 40;     // losses of a row
-constexpr size_t kAtOnce = 3;  // rows, which wait for commands for some of their time
+constexpr int kShown = 40;  // losses of a row
+constexpr int kAtOnce = 3;  // rows, which wait for commands for some of their time
 
 // The reasons that the table's rows lead to, each with the number that it has there.
 class Notes {
@@ -100,9 +102,16 @@ void PrintTable(const std::vector<std::string>& names, Tally& sum) {
   Notes notes;
   std::vector<Row> rows = AllRows();
   std::erase_if(rows, [&](const Row& row) { return !IsNamed(row, names); });
-  std::deque<Apart> ahead;  // the rows that are made at the same time, the first of which is waited for
+  std::deque<Apart> ahead;  // the rows that have been begun, and not printed yet
   for (size_t next = 0; const Row& row : rows) {
-    while (next < rows.size() && ahead.size() < kAtOnce) ahead.emplace_back(rows[next++].make);
+    while (ahead.empty() || !ahead.front().IsDone()) {
+      const bool hasRoom = std::ranges::count_if(ahead, [](const Apart& one) { return !one.IsDone(); }) < kAtOnce;
+      if (hasRoom && next < rows.size()) {
+        ahead.emplace_back(rows[next++].make);
+      } else {
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+      }
+    }
     const Tally tally = ahead.front().Take();
     ahead.pop_front();
     PrintRow(row.name, tally, notes.NumbersOf(tally));
