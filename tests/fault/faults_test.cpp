@@ -19,7 +19,7 @@ class AFaultIn : public testing::TestWithParam<std::string> {};
 
 TEST_P(AFaultIn, HasTheResultAndLeavesTheFilesThatTheContractSays) {
   const auto subject = std::ranges::find(AllSubjects(), GetParam(), &Subject::name);
-  const Tally tally = TryFaults(*subject, {.most = 10});
+  const Tally tally = TryFaults(*subject, {.most = 6});
   for (const std::string& loss : tally.losses) ADD_FAILURE() << loss;
 }
 
