@@ -35,7 +35,8 @@ constexpr char kNextRefused[] =
 constexpr char kFirstRefused[] =
     "the marker of a call that was killed has the next one pass over its first network, which removes it";
 constexpr char kNotForeseen[] =
-    "the new record has a name that nobody can foresee, since anyone may write there: nobody finds it again";
+    "the new record has a name that nobody can foresee, since anyone may write there: the machine's next start removes "
+    "it";
 constexpr char kRadioUnknown[] = "where it is not known whether the radio may be used, nothing is tried";
 constexpr char kRecordIsLess[] = "a connection that is up is worth more than its record";
 constexpr char kOutlastsNothing[] = "the record is not flushed: a connection does not outlast a power cut";
