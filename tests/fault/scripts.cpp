@@ -161,7 +161,8 @@ class ScriptTrial : public CountedKit {
     }
     const std::set<std::string> left = Leftovers();
     if (!left.empty()) ++tally_.left;
-    CheckLeftovers(fault, CheckAgain(fault, state));
+    const bool wasRunAgain = CheckAgain(fault, state);
+    CheckLeftovers(fault, what == Turn::kKills, wasRunAgain);
   }
 
   // One more run makes everything good: it is made once for each state that it meets. False where it was made before.
@@ -174,18 +175,19 @@ class ScriptTrial : public CountedKit {
     return true;
   }
 
-  void CheckLeftovers(const std::string& fault, bool wasRunAgain) {
+  // What a kill leaves may be excused; a run that fails leaves nothing, and no run leaves anything behind the next one.
+  void CheckLeftovers(const std::string& fault, bool killed, bool wasRunAgain) {
     bool stays = false;
     for (const std::string& path : Leftovers()) {
-      if (!IsExcused(path)) {
-        if (wasRunAgain) Lose(fault, path + " was left over");
-        continue;
-      }
+      const bool excused = IsExcused(path);
+      if (!(excused ? killed : !wasRunAgain)) Lose(fault, path + " was left over");
+      if (!excused) continue;
       stays = true;
-      ++tally_.reasons[kNextBoot];
       fs::remove(path);
     }
-    tally_.staying += stays ? 1 : 0;
+    if (!stays || !killed) return;
+    ++tally_.staying;
+    ++tally_.reasons[kNextBoot];
   }
 
   bool IsExcused(const std::string& path) const { return !script_.left.empty() && path.starts_with(script_.left); }
