@@ -13,16 +13,12 @@
 #include "base/failure.h"
 #include "common/descriptor.h"
 
-namespace {
-
 // A file system that cannot flush directories says EINVAL; there is nothing more to do on it.
 bool FlushDirectoryOf(const std::string& path) {
   const std::string directory = path.substr(0, path.rfind('/') + 1);
   const Descriptor file(::open(directory.empty() ? "." : directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   return file.valid() && (::fsync(file.get()) == 0 || errno == EINVAL);
 }
-
-}  // namespace
 
 bool WriteAll(int fd, std::string_view text) {
   while (!text.empty()) {

@@ -25,6 +25,10 @@ bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode);
 // other than a plain file is there; `shown` is the path for a sentence.
 void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes);
 
+// Flushes the directory of a path, so that what was made, renamed or removed in it outlasts a power cut. False when
+// that fails; then errno tells why.
+bool FlushDirectoryOf(const std::string& path);
+
 // Writes all of a text to an open file. False when it cannot; then errno tells why.
 bool WriteAll(int fd, std::string_view text);
 

@@ -12,13 +12,10 @@
 #include "base/whole_file.h"
 #include "common/paths.h"
 #include "model/failed.h"
+#include "model/settings_change.h"
 #include "platform.h"
 
 namespace {
-
-bool Remove(const std::string& path) {
-  return PLIBCSysUnlink(path.c_str()) == 0;
-}
 
 std::string BridgeOf(const std::string& script) {
   char szBridge[IFNAMSIZ];
@@ -56,7 +53,7 @@ void FormerAp::Keep(const std::string& path) {
 bool FormerAp::PutBack() const {
   const bool back = std::ranges::all_of(files_, [](const File& file) {
     if (TextOfFile(file.path) == file.text) return true;
-    return file.text ? ReplaceFile(file.path, *file.text, file.mode) : Remove(file.path);
+    return file.text ? ReplaceFile(file.path, *file.text, file.mode) : RemoveSettings(file.path.c_str());
   });
   return back && PLIBCExec(kNetworkScriptPath, "start", interface_.c_str(), bridge_.c_str(), nullptr) == 0;
 }

@@ -11,6 +11,7 @@
 #include "common/paths.h"
 #include "model/attributes.h"
 #include "model/library.h"
+#include "model/settings_change.h"
 #include "model/wireless_stack.h"
 
 namespace {
@@ -78,7 +79,7 @@ void RequireSavedCountry() {
 }
 
 void SaveCountry(const std::string& country) {
-  const bool saved = country.empty() ? PLIBCSysUnlink(kCountryPath) == 0
+  const bool saved = country.empty() ? RemoveSettings(kCountryPath)
                                      : PLIBCFileSetKeyValue(kCountryPath, kKey, country.c_str(), kFormat) > 0;
   if (!saved) throw Failed("the country could not be saved", "is there room on the disk? -v shows more");
 }

@@ -6,6 +6,7 @@
 #include "base/text.h"
 #include "common/paths.h"
 #include "model/library.h"
+#include "model/settings_change.h"
 #include "model/situation.h"
 #include "model/status.h"
 
@@ -42,5 +43,5 @@ void NoteRadioUse(const RadioUse& use) {
 }
 
 void ForgetRadioUse() {
-  (void)PLIBCSysUnlink(kRadioUsePath);  // reported by itself; a note that stays is replaced when the next one is taken
+  (void)RemoveSettings(kRadioUsePath);  // reported by itself; a note that stays is replaced when the next one is taken
 }

@@ -103,9 +103,14 @@ void SettingsChange::Set(const std::string& section, const char* szKey, const st
   throw Failed(path_ + " could not be changed, and is as it was", "is there room on the disk? -v shows more");
 }
 
-// What the platform has written is flushed already, but for a copy in which nothing was changed.
+// What the platform has written is flushed already, and a copy in which nothing was changed is not.
 void SettingsChange::Commit() {
-  const Descriptor directory(::open(path_.substr(0, path_.rfind('/') + 1).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (!directory.valid() || std::rename(copy_.c_str(), path_.c_str()) < 0) throw NotChanged(path_);
-  if (::fsync(directory.get()) < 0 && errno != EINVAL) throw NotChanged(path_);
+  const Descriptor copy(::open(copy_.c_str(), O_RDONLY | O_CLOEXEC));
+  if (!copy.valid() || ::fsync(copy.get()) < 0) throw NotChanged(path_);
+  if (std::rename(copy_.c_str(), path_.c_str()) < 0 || !FlushDirectoryOf(path_)) throw NotChanged(path_);
+}
+
+bool RemoveSettings(const char* szPath) {
+  if (PLIBCSysUnlink(szPath) != 0) return false;
+  return FlushDirectoryOf(szPath) || errno == ENOENT;  // there is no directory either
 }
