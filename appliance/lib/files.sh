@@ -89,13 +89,17 @@ remove_files() {
 
 # put FILE TEXT [MODE]: replaces a file by the text and a line feed, or by nothing, in one step. The mode is 600 by
 # default. In a directory like /tmp anybody may have put a link or a file in the way: that is neither followed nor
-# written to, and the new file is made under a name that nobody can foresee.
+# written to, and the new file is made under a name that nobody can foresee. It is flushed, but
+# for /tmp, which a boot empties.
 put() {
 	new=$(mktemp "$1.XXXXXXXXXX" 2>&1) || fail "cannot write $1: $new"
 	printf '%s' "${2:+$2$newline}" >"$new" || give_up "$new" "cannot write $1"
 	[ -z "${3-}" ] || chmod "$3" "$new" || give_up "$new" "cannot write $1"
 	if [ -d "$1" ] && [ ! -L "$1" ]; then set_aside "$1"; fi
+	case $1 in /tmp/*) flush=true ;; *) flush=sync ;; esac
+	said=$($flush "$new" 2>&1) || give_up "$new" "cannot write $1: $said"
 	said=$(mv -fT "$new" "$1" 2>&1) || give_up "$new" "cannot replace $1: $said"
+	said=$($flush "${1%/*}" 2>&1) || warn "$1 may be the old one again after a power cut: $said"
 }
 
 give_up() { # NEW-FILE TEXT

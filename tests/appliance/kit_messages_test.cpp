@@ -16,7 +16,8 @@ struct Step {
 class KitMessage : public KitRadio {
  protected:
   KitMessage() {
-    for (const char* szName : {"busybox", "chmod", "date", "find", "flock", "mktemp", "mv", "readlink", "rm", "stat"}) {
+    for (const char* szName :
+         {"busybox", "chmod", "date", "find", "flock", "mktemp", "mv", "readlink", "rm", "stat", "sync"}) {
       StandIn(szName, "exec /usr/bin/" + std::string(szName) + " \"$@\"\n");
     }
   }
@@ -86,6 +87,9 @@ TEST_F(KitMessage, OfAFileSaysWhichItIs) {
       {"note /dev/full text", "", "", "cannot write /dev/full: I/O error"},
       {"put /tmp/file ''", "mktemp", "", "cannot write /tmp/file: mktemp is broken"},
       {"put /tmp/file ''", "mv", "", "cannot replace /tmp/file: mv is broken"},
+      {"put /etc/file ''", "sync", "/etc/file", "cannot write /etc/file: sync is broken"},
+      {"sync() { [ ! -d $1 ] || { echo it is broken; false; }; }; put /etc/file ''", "", "",
+       "/etc/file may be the old one again after a power cut: it is broken"},
       {"set_aside /tmp/file", "mktemp", "", "cannot move /tmp/file aside"},
       {"set_aside /tmp/file", "mv", "", "cannot move /tmp/file aside: mv is broken"},
       {"mktemp() { echo /tmp/other; }; >/tmp/file; set_aside /tmp/file", "", "",

@@ -9,9 +9,9 @@
 
 // The programs that the scripts may run. `logger` runs where something has failed already; the shell has the rest.
 inline constexpr const char* kTools[] = {
-    "awk",  "basename", "busybox",  "cat",         "chmod", "chown", "cut",  "cp", "date",  "dnsmasq",
-    "find", "flock",    "hostapd",  "hostapd_cli", "id",    "ip",    "iw",   "ls", "mkdir", "mktemp",
-    "mv",   "nft",      "readlink", "rm",          "sed",   "sleep", "stat", "tr", "wc"};
+    "awk",  "basename", "busybox",  "cat",         "chmod", "chown", "cut",  "cp",   "date",  "dnsmasq",
+    "find", "flock",    "hostapd",  "hostapd_cli", "id",    "ip",    "iw",   "ls",   "mkdir", "mktemp",
+    "mv",   "nft",      "readlink", "rm",          "sed",   "sleep", "stat", "sync", "tr",    "wc"};
 
 class KitRadio : public Kit {
  protected:
