@@ -122,6 +122,22 @@ STUB
     if (find_archives) 2>"$scratch/said"; then exit 1; fi
     grep -q "^lab: the lists of Debian's archives (trixie) could not be fetched$" "$scratch/said"
     ;;
+  kernel) # One that had been unpacked before a scenario needed a module was kept, without it.
+    find_archives() { :; }
+    kernel_package() { echo linux-image; }
+    apt-get() { echo fetched >>"$scratch/fetched" && touch one.deb; }
+    unpack_package() { :; }
+    mkdir -p "$work"/kernel-{trixie,trixie-1/lib,trixie-arm64-1,bookworm-1}
+    for list in one one two; do
+      kernel_files() { echo "$list"; }
+      take_suite trixie
+      prepare_kernel 2>/dev/null
+      [[ -e $kernel/one.deb ]]
+      kept=(kernel-bookworm-1 "${kernel##*/}" kernel-trixie-arm64-1 kernel-trixie.lock)
+      [[ $(find "$work" -mindepth 1 -maxdepth 1 -printf '%f\n' | LC_ALL=C sort) == "$(printf '%s\n' "${kept[@]}")" ]]
+    done
+    [[ $(wc -l <"$scratch/fetched") -eq 2 ]]
+    ;;
   iwlist) # The lab took our own listing tool for the ordinary one, which called itself without end.
     system=$scratch/system
     program_file() { echo /usr/sbin/iwlist; }
