@@ -24,7 +24,6 @@ constexpr char kAsLongAsItRuns[] = "a command that never ends is waited for with
 constexpr char kReadAgain[] = "a listing that could not be read is read again";
 constexpr char kNotNoticed[] = "whether a command was run, and whether it succeeded, is not noticed";
 constexpr char kBehind[] = "the supplicant is started in the background, and whether it joins is asked for later";
-constexpr char kMayBeThere[] = "a supplicant that may be there is ended";
 constexpr char kAskedAgain[] = "the supplicant is asked again";
 constexpr char kNothingLeased[] = "a lease script that is missing or fails keeps nobody from another network";
 constexpr char kNotLookedFor[] = "a daemon that cannot be looked for, and an interface that stays up, are no failure";

@@ -22,13 +22,13 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr rlim_t kSeconds = 20;         // of the processor
-constexpr rlim_t kMemory = 768U << 20;  // a file of the largest size that is read, and what is made of it
+constexpr rlim_t kSeconds = 20;  // of the processor
 // How many sections, keys, and tens of bytes of a line a function gets in all of its files together.
 #ifdef MERO_SANITIZE
 constexpr int kMost = 100'000;
 #else
 constexpr int kMost = 1'000'000;
+constexpr rlim_t kMemory = 768U << 20;  // a file of the largest size that is read, and what is made of it
 #endif
 constexpr int kWrong = static_cast<int>(Answer::kWrong);
 

@@ -183,7 +183,7 @@ case $1 in
     { run test lint && exit 1; } >shown
     grep -q '^run: there are no sources' said
     { run test style && exit 1; } >shown
-    grep -q ' 0 passed  *6 failed' said
+    grep -q ' 0 passed  *7 failed' said
     ;;
   scenario) # The list was piped into a search that ended at the first name, which failed the list.
     run lab a-scan
