@@ -89,8 +89,8 @@ remove_files() {
 
 # put FILE TEXT [MODE]: replaces a file by the text and a line feed, or by nothing, in one step. The mode is 600 by
 # default. In a directory like /tmp anybody may have put a link or a file in the way: that is neither followed nor
-# written to, and the new file is made under a name that nobody can foresee. It is flushed, but
-# for /tmp, which a boot empties.
+# written to, and the new file is made under a name that nobody can foresee. It is flushed, but for one in /tmp, which
+# does not outlast a boot.
 put() {
 	new=$(mktemp "$1.XXXXXXXXXX" 2>&1) || fail "cannot write $1: $new"
 	printf '%s' "${2:+$2$newline}" >"$new" || give_up "$new" "cannot write $1"
