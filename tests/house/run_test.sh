@@ -23,7 +23,8 @@ git init --quiet
 {
   command_from bin/dpkg-query <<<'grep -x "${*: -1} .*" installed | cut -d " " -f 2-'
   command_from bin/sudo <<<'exec "$@"'
-  command_from bin/cmake <<<'echo "cmake $*" >>calls'
+  command_from bin/cmake <<<'echo "cmake $*" >>calls
+    mkdir -p build && echo c++ -fno-move-loop-invariants -O2 >build/compile_commands.json'
   command_from bin/clang-tidy <<<'echo "clang-tidy of this machine ${*: -1}" >>calls'
   command_from bin/clang-tidy-19 <<<'echo "clang-tidy-19 ${*: -1}" >>calls'
   command_from bench/pictures <<<'echo "pictures $* $(cat "$1"/scanning.tsv)" >>calls'
@@ -120,6 +121,7 @@ case $1 in
   lint) # Which version it was, the machine decided.
     run test lint
     expect_calls 'cmake --preset release' 'clang-tidy-19 lib/unit.cpp'
+    grep -qx 'c++ -O2' build/lint/compile_commands.json # clang does not know the options of gcc
     expect_packages "${building[@]}" clang-tidy-19 git
     ;;
   format) # Which version it was, the machine decided.
