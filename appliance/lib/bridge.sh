@@ -213,8 +213,8 @@ note_bridge() { # INTERFACE BRIDGE [begun]
 # is_finished INTERFACE: whether the start of its access point has come to its end.
 is_finished() {
 	noted='' condition=''
-	[ ! -e "$bridge_note-$1" ] || read -r noted condition <"$bridge_note-$1" || return 1
-	[ -z "$condition" ]
+	[ -e "$bridge_note-$1" ] || return 0
+	read -r noted condition <"$bridge_note-$1" && [ -z "$condition" ]
 }
 
 # was_started INTERFACE: whether an access point was started there, and not ended.

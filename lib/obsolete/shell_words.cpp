@@ -42,13 +42,14 @@ ShellQuoted::ShellQuoted(std::string_view value) {
   *to = '\0';
 }
 
-// Where no shell can be started, glibc's system() gives what a shell would that ends with 127, and sets errno.
+// Where no shell can be started, glibc's system() gives what a shell would that ends with 127, and sets errno; a signal
+// during the wait sets it, too.
 int RunShell(const char* szCommand) {
   constexpr int kNoShell = 127 << 8;
   const Umask umask(kOrdinaryUmask);
   errno = 0;
   const int status = std::system(szCommand);
-  return status == kNoShell && errno != 0 ? -1 : status;
+  return status == kNoShell && errno != 0 && errno != EINTR ? -1 : status;
 }
 
 FILE* OpenShell(const char* szCommand) {

@@ -80,9 +80,20 @@ Paths PathsIn(const std::string& path) {
 
 TEST_F(KitPaths, OfTheUnitsAreTheLibrarysAndTheScripts) {
   const std::string note = kAdapterInfoPath;
-  const Paths made = {note, note + ".??????????", std::string(kConnectionRecordPath) + ".??????",
-                      std::string(kResolverPath) + ".new.??????",
-                      InterfacePath(kHostapdInfoFormat, "*").c_str() + std::string(".??????????")};
+  const auto letters = [](size_t count) {
+    std::string pattern = ".";
+    while (count-- > 0) pattern += "[0-9A-Za-z]";
+    return pattern;
+  };
+  const std::string record = kConnectionRecordPath;
+  const Paths made = {note,
+                      note + letters(10),
+                      record,
+                      record + letters(6),
+                      kJoinMarkerPath,
+                      kApMarkerPath,
+                      std::string(kResolverPath) + ".new" + letters(6),
+                      InterfacePath(kHostapdInfoFormat, "*").c_str() + letters(10)};
   EXPECT_EQ(PathsIn("systemd/mero-wireless.conf"), made);
   EXPECT_EQ(PathsIn("systemd/mero-network.service"), Paths{kNetworkScriptPath});
   EXPECT_EQ(PathsIn("systemd/mero-wireless@.service"), Paths{kHotPlugScriptPath});

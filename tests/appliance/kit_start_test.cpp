@@ -419,14 +419,14 @@ TEST_F(KitAccessPoint, RunsNothingThatItsSettingsHold) {
   } rows[] = {
       {"/etc/sysconfig/network-scripts/ifcfg-lbr0", "DEVICE TYPE BOOTPROTO IPADDR NETMASK ONBOOT HWADDR", "boot"},
       {"/etc/sysconfig/network-scripts/ifcfg-lbr0", "IPADDR NETMASK PRIMARY NAT", "start wlan0 lbr0"},
-      {"/etc/sysconfig/network-scripts/ifcfg-wlan0", "DEVICE BRIDGE", "restart wlan0"},
+      {"/etc/sysconfig/network-scripts/ifcfg-wlan0", "BRIDGE", "schedule wlan0"},
       {"/etc/dhcpd/dhcpd-lbr0-lbr0.info", "enable", "start wlan0 lbr0"},
       {"/etc/dhcpd/dhcpd-lbr0-lbr0.conf", "interface dhcp-leasefile", "start wlan0 lbr0"},
       {"/etc/hostapd/hostapd-wlan0-host.conf", "interface ssid wpa hw_mode ht_capab accept_mac_file",
        "start wlan0 lbr0"},
       {"/etc/hostapd/hostapd-wlan0-guest.info", "enable", "start wlan0 lbr0"},
       {"/usr/mero/etc/wireless_country.conf", "country", "start wlan0 lbr0"},
-      {"/tmp/wireless.info", "INTERFACE PRODUCT", "schedule"},
+      {"/tmp/wireless.info", "INTERFACE PRODUCT", "start wlan0 lbr0"},
   };
   for (const auto& [szFile, szKeys, szWords] : rows) {
     const std::string before = TextOrNothing(szFile);
@@ -435,6 +435,7 @@ TEST_F(KitAccessPoint, RunsNothingThatItsSettingsHold) {
       for (const char* szValue :
            {"$(touch /tmp/ran)", "\"`touch /tmp/ran`\"", "';touch /tmp/ran;'", ";touch /tmp/ran"}) {
         WriteText(szFile, before + key + "=" + szValue + "\n");
+        WriteText("/run/rc.network/late-wlan0", "");  // so that the hour has something to start
         Script(szWords);
         EXPECT_FALSE(fs::exists("/tmp/ran")) << szFile << " " << key << " " << szValue;
       }
@@ -516,6 +517,19 @@ TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhenItsDaemonHasEnded) {
   EXPECT_EQ(Script("restart wlan0 lbr0").status, 0);
   EXPECT_EQ(Script("schedule wlan0").status, 0);
   EXPECT_EQ(Left(), "");
+}
+
+// A kill in the middle of the note left it empty, and each hour took the access point for one that nobody had started.
+TEST_F(KitAccessPoint, IsStartedAnewInTheNextHourWhenAKillHasLeftItsNoteEmpty) {
+  const std::string note = "/run/rc.network/bridge-wlan0";
+  for (const char* szMore : {":", "kill -KILL $(cat /run/rc.network/hostapd-wlan0.pid); sleep 0.1"}) {
+    ASSERT_EQ(Script("start wlan0 lbr0").status, 0);
+    WriteText(note, "");
+    RunInShell(szMore);
+    EXPECT_EQ(Script("schedule wlan0").status, 0) << szMore;
+    EXPECT_EQ(Daemons(), OnAir()) << szMore;
+    EXPECT_EQ(ReadText(note), "lbr0\n") << szMore;
+  }
 }
 
 // A start at the hour that failed at its very last step was not tried again: the access point stayed off.

@@ -29,6 +29,7 @@ counted() {  # FILE...
 expect_nothing_grown() {
   local what before may now grown=''
   while IFS=$'\t' read -r what before may now; do
+    [[ $before && $now ]] || fail "of this there is no number: $what"
     say "$(printf '%-24s %7d %7d' "$what" "$before" "$now")"
     ((now <= before + may)) || grown+="$what "
   done < <(paste <(printf '%s\n' "$2") <(amounts_of "$1" | cut -f 2))

@@ -115,6 +115,7 @@ boot_3() {
   show_boot_times
   make_radio phone
   joins_hall phone
+  expect_confined
   expect_quiet_journal
 
   say '-- its timer has it follow its schedule, at the change of the hour'
@@ -175,6 +176,21 @@ is_addressed_anew() {
 
 answers() {  # ADDRESS
   busybox ping -c 1 -W 1 "$1" >/dev/null 2>&1
+}
+
+# The access point's daemons, which a unit has started, have few rights (of dnsmasq, which becomes a user of its own, that
+# is the bounding set: chown, dac_override, fowner, fsetid, kill, setgid, setuid, net_bind_service, net_admin, net_raw,
+# sys_ptrace), see nothing of /home, and cannot write below /usr.
+expect_confined() {
+  local name pid
+  touch /home/seen
+  for name in hostapd dnsmasq; do
+    pid=$(pgrep -x "$name") || fail "$name does not run"
+    expect_same "the rights of $name" 'CapBnd: 00000000000834fb NoNewPrivs: 1 Seccomp: 2' \
+      "$(grep -E '^(CapBnd|NoNewPrivs|Seccomp):' "/proc/$pid/status" | xargs)"
+    [[ ! -e /proc/$pid/root/home/seen ]] || fail "$name sees what is in /home"
+    ! nsenter --target "$pid" --mount touch /usr/seen 2>/dev/null || fail "$name can write below /usr"
+  done
 }
 
 serves_by_itself() {

@@ -36,15 +36,6 @@ within 40 inside nas grep -qs '^connected to cafe as 10\.2\.0\.' /run/told || fa
 before=$(daemons)
 expect_same 'the number of daemons' 2 "$(wc -l <<<"$before")"
 
-say '-- what it has started has the rights that networks take, and no more'
-rights() {  # PID
-  inside nas sed -n 's/^\(CapBnd\|NoNewPrivs\|Seccomp\):\t/\1 /p' "/proc/$1/status" | xargs
-}
-# chown, dac_override, fowner, fsetid, kill, setgid, setuid, net_bind_service, net_admin, net_raw, sys_ptrace
-for daemon in $(daemons | awk '{ print $1 }'); do
-  expect_same 'the rights of a daemon' 'CapBnd 00000000000834fb NoNewPrivs 1 Seccomp 2' "$(rights "$daemon")"
-done
-
 say '-- the unit is restarted, killed and stopped'
 unit nas restart "$KEEPER"
 expect_connection_untouched 'the restart'
