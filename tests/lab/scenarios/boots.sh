@@ -184,8 +184,8 @@ answers() {  # ADDRESS
 expect_confined() {
   local name pid
   touch /home/seen
-  for name in hostapd dnsmasq; do
-    pid=$(pgrep -x "$name") || fail "$name does not run"
+  for name in hostapd-wlan0 dnsmasq-lbr0; do
+    pid=$(</run/rc.network/$name.pid)
     expect_same "the rights of $name" 'CapBnd: 00000000000834fb NoNewPrivs: 1 Seccomp: 2' \
       "$(grep -E '^(CapBnd|NoNewPrivs|Seccomp):' "/proc/$pid/status" | xargs)"
     [[ ! -e /proc/$pid/root/home/seen ]] || fail "$name sees what is in /home"
