@@ -7,6 +7,7 @@
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/un.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <filesystem>
@@ -190,9 +191,13 @@ TEST_P(AHostileFile, MayChangeAndShrinkWhileItIsRead) {
   for (const std::string& path : FilesOf(function)) {
     SCOPED_TRACE(path);
     const Scene scene(function.prepare);
-    const std::string text = TextOrNothing(path) + Numbered("[s", "]\n\tessid=\"x\"\n", 2'000);
+    const std::string before = TextOrNothing(path);
+    const std::string text = before + Numbered("[s", "]\n\tessid=\"x\"\n", 2'000);
+    fs::create_directories(fs::path(path).parent_path());
     const StartedChild rival([&] { return KeepChanging(path, text); });
+    ASSERT_TRUE(Soon([&] { return TextOrNothing(path) != before; }));
     for (int round = 0; round < 10; ++round) EXPECT_NE(CallWithinBounds(function), -1);
+    EXPECT_EQ(::waitpid(rival.pid(), nullptr, WNOHANG), 0);  // it has been there all the time
   }
 }
 

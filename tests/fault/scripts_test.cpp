@@ -11,6 +11,8 @@ class AFaultInScript : public testing::TestWithParam<std::string> {};
 
 TEST_P(AFaultInScript, IsMendedByTheNextRun) {
   const Tally tally = TryScript(GetParam(), {.most = 2});
+  EXPECT_GT(tally.commands, 0);
+  EXPECT_GT(tally.kills, 0);
   for (const std::string& loss : tally.losses) ADD_FAILURE() << loss;
 }
 

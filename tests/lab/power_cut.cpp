@@ -2,17 +2,15 @@
 // the kernel's dm-log-writes, which tells in which order they were done, and what was flushed; marks say which call had
 // returned.
 //
-//   power-cut list LOG                             the places at which the power may go, one a line: how many entries
-//   of
-//                                                  the log come before it, the last mark among these, and how many
-//                                                  writes follow until the next flush or mark
-//   power-cut make LOG FIRST DISK PLACE WAY SEED   writes the disk, which began as FIRST: all that comes before the
-//   place,
-//                                                  and of the writes that follow `none`, `some` of them, or some and of
-//                                                  these some blocks alone (`torn`), by chance
-//   power-cut judge SEEN BEFORE AFTER              compares the settings files below three directories: as they were
-//   seen,
-//                                                  as they were before the call that was under way, and as it left them
+//   power-cut list LOG
+//       the places at which the power may go, one a line: how many entries of the log come before it, the last mark
+//       among these, and how many writes follow until the next flush or mark
+//   power-cut make LOG FIRST DISK PLACE WAY SEED
+//       writes the disk, which began as FIRST: all that comes before the place, and of the writes that follow `none`,
+//       `some` of them, or some and of these some blocks alone (`torn`), by chance
+//   power-cut judge SEEN BEFORE AFTER
+//       compares the settings files below three directories: as they were seen, as they were before the call that was
+//       under way, and as it left them
 //
 // `judge` prints what else it saw: "old", "new" or "between", then "left" when temporary files lie about, and "damaged"
 // when a file is that is written in place, and last a number that tells apart what was seen. It exits with 1, and names
@@ -141,7 +139,8 @@ class Log {
 };
 
 // The writes that were done and not flushed when the power went: those up to the next flush or mark. One that is on the
-// disk itself once it is done (FUA) is the last of them, since whoever asks for that waits for it.
+// disk itself once it is done (FUA) is the last of them, since whoever asks for that waits for it; what was done before
+// it and is logged behind it is not tried without it.
 std::span<const Entry> WritesBehind(std::span<const Entry> entries, std::size_t place) {
   const auto behind = entries.subspan(place);
   const auto end = std::ranges::find_if(behind, [](const Entry& entry) { return entry.is(kFlush | kFua | kMark); });
@@ -343,6 +342,7 @@ class Judgement {
     }
     old_ = old_ && seen == before;
     new_ = new_ && seen == after;
+    // A file that was not there is touched first, and empty until it is replaced.
     const bool isJustMade = !before && seen && seen->empty();
     if (seen == before || seen == after || isJustMade) return;
     kind == Kind::kByKeys ? LookAtLines(name, seen, before, after)

@@ -43,5 +43,5 @@ void NoteRadioUse(const RadioUse& use) {
 }
 
 void ForgetRadioUse() {
-  (void)RemoveSettings(kRadioUsePath);  // reported by itself; a note that stays is replaced when the next one is taken
+  (void)RemoveSettings(kRadioUsePath);  // a note that stays is replaced when the next one is taken
 }

@@ -32,7 +32,7 @@ class SettingsChange {
   Descriptor lock_;
 };
 
-// Removes a settings file, if there is one, and it is not back after a power cut. False after a report.
+// Removes a settings file, if there is one, and it is not back after a power cut. False when it is not sure to be gone.
 bool RemoveSettings(const char* szPath);
 
 #endif  // MERO_TOOLS_SETTINGS_CHANGE_H
