@@ -319,6 +319,15 @@ TEST_F(ALease, SaysThatTheResolversFileCannotBeChanged) {
   EXPECT_THAT(DefaultRoutes(), HasSubstr("10.1.0.1"));
 }
 
+// The file was in its place, and was said to be none that could be changed.
+TEST_F(ALease, SaysThatTheResolversFileMayNotOutlastAPowerCut) {
+  WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
+  WriteScript("/tmp/platform/sync", "case $1 in /etc) echo broken >&2; exit 1 ;; esac\n");
+  (void)Bound({"dns=10.1.0.2"});
+  ExpectLogged("/etc/resolv.conf may be the old one again after a power cut: broken\n");
+  EXPECT_THAT(ReadText(kResolver), HasSubstr("10.1.0.2"));
+}
+
 // A lease is a stranger's text.
 TEST_F(ALease, CannotDoAnythingButSetAddresses) {
   const std::string hostile[] = {
