@@ -78,7 +78,7 @@ printf '%s' "$done" | /usr/sbin/ip "$@"
 )");
   }
 
-  // A daemon has a session of its own, and is noted when it bears its name.
+  // A daemon is started apart from the script, and is noted when it bears its name.
   static std::string Launch(const std::string& name) {
     return "setsid sh -c '/tmp/daemons/" + name + " 60 & until read -r name </proc/$!/comm && [ \"$name\" = " + name +
            " ]; do :; done; echo $! >\"$0\"; wait' \"$file\" >/dev/null 2>&1 &\nuntil [ -s $file ]; do :; done\n";

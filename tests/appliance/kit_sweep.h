@@ -103,7 +103,7 @@ printf '%s' "$done" | ip "$@"
                .out;
   }
 
-  // The script has a session of its own, so that all of it can be killed.
+  // The script is started by setsid(1), so that all of it can be killed.
   static Ran RunWithTurn(int turn, const std::string& words, Turn what = Turn::kFails) {
     constexpr const char* kModes[] = {"fails", "takes-long", "kills"};
     return RunInMode(turn, kModes[static_cast<int>(what)], words);

@@ -199,7 +199,7 @@ class ScriptTrial : public CountedKit {
     if (onAir && !rules) Lose(fault, "an access point is on the air without its rules");
   }
 
-  // Daemons have sessions of their own.
+  // Daemons are not among these: setsid(1) starts them.
   void CheckNothingRuns(const std::string& fault) {
     const int session = std::atoi(TextOrNothing("/tmp/session").c_str());
     if (!Soon([&] { return !IsAnyIn(session); }, 2)) Lose(fault, "a process stayed");
