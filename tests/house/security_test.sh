@@ -21,7 +21,18 @@ without() { # LIST
     END { for (statement in seen) if (!tests[statement]) print "nothing holds: " statement }' "$1"
 }
 
-tests_of() { grep -E $'^\t[^-]' "$1" | tr -s '\t ' '\n' | grep . | sort -u; } # LIST
+readonly request='on request: '
+
+tests_of() { grep -E $'^\t[^-]' "$1" | sed "s/^\t$request/\t/" | tr -s '\t ' '\n' | grep . | sort -u; } # LIST
+
+# Those that `./run test` does not run unless it is asked to, where it does not say so.
+not_by_default() { # LIST
+  local scenario names=package
+  while read -r scenario; do
+    names+="|lab\\.$(basename -s .sh "$scenario")"
+  done < <(grep -lE '^# (Debian|On request)$' "$top"/tests/lab/scenarios/*.sh)
+  grep -E $'^\t' "$1" | grep -v "$request" | grep -oE "(^|[[:space:]])($names)(\.\w+)?( |\$)" || :
+}
 
 all_tests() {
   grep -rhoE '^TEST(_F|_P)?\(\w+, *\w+' "$top/tests" | sed -E 's/^TEST\w*\((\w+), *(\w+)/\1.\2/'
@@ -36,6 +47,7 @@ unheld() { # DOCUMENT LIST
   diff <(said "$1") <(held "$2") | sed -n 's/^</not held:/p; s/^>/not said:/p'
   without "$2"
   comm -23 <(tests_of "$2") <(all_tests | sort -u) | sed 's/^/no such test: /'
+  not_by_default "$2" | sed -E 's/^\s*/on request alone: /'
 }
 
 expect() { # WHAT-IS-FOUND CHANGE
@@ -53,9 +65,11 @@ case ${1-} in
     work=$(mktemp -d)
     trap 'rm -r "$work"' EXIT
     expect 'not held: Guests may do what they like.' 's/^# Security$/&\n\nGuests may do what they like./'
-    expect 'not said: Guests may not.' 's/^Not believed\.$/Guests may not.\n\t- nobody\n&/'
-    expect 'nothing holds: Their rules' '/HasItsRulesBeforeItIsOnTheAir/d'
+    expect 'not said: Guests may not.' 's/^settings: Believed\.$/Guests may not.\n\t- nobody\n&/'
+    expect 'nothing holds: guests of the access point: Their rules' '/HasItsRulesBeforeItIsOnTheAir/d'
     expect 'no such test: KitAccessPoint.HasNoRules' 's/HasItsRulesBeforeItIsOnTheAir/HasNoRules/'
+    expect 'on request alone: lab.power-cuts-all' 's/on request: \(lab.power\)/\1/'
+    expect 'on request alone: package.' 's/on request: \(package\)/\1/'
     expect 'no such test: lab.nowhere' 's/lab\.wrong-passphrase/lab.nowhere/'
     ;;
   rights)

@@ -1,13 +1,13 @@
-# The statements of a document: each sentence on a line of its own. Cells of tables are paragraphs; headings, lines that a
-# table is drawn with, and code that stands by itself are none.
+# The statements of a document: each sentence on a line of its own. Cells of tables are paragraphs, whose sentences begin
+# with what their row is about; headings, lines that a table is drawn with, and code that stands by itself are none.
 function tell() {
 	gsub(/[ \t]+/, " ", paragraph)
 	gsub(/^ | $/, "", paragraph)
 	while (match(paragraph, /[.!?] ("|`|\(|[A-Z0-9])/)) {
-		print substr(paragraph, 1, RSTART)
+		print about substr(paragraph, 1, RSTART)
 		paragraph = substr(paragraph, RSTART + 2)
 	}
-	if (paragraph != "") print paragraph
+	if (paragraph != "") print about paragraph
 	paragraph = ""
 }
 /^```/ { tell(); code = !code; next }
@@ -16,10 +16,13 @@ code || /^    / { next }
 /^\|/ {
 	tell()
 	for (cells = split($0, cell, "|"); cells > 0; cells--) row[cells] = cell[cells]
+	gsub(/^ +| +$/, "", row[2])
+	if (row[2] != "") about = row[2] ": "
 	for (c = 3; c in row; c++) {
 		paragraph = row[c]
 		tell()
 	}
+	about = ""
 	delete row
 	next
 }

@@ -65,6 +65,12 @@ are_for_their_processor() {
   done
 }
 
+are_hardened() {
+  local files
+  mapfile -t files < <(machine_files | grep -v /debug/)
+  "$here/hardening" "${files[@]}" >&2
+}
+
 # What the linker would have taken of the machine itself is no library of that processor's: the loader is one.
 load_with_their_loader() {
   local program
@@ -99,6 +105,7 @@ check "all packages for $architecture are there" are_complete
 unpack
 check "they say that they are for $architecture" say_their_architecture
 check "their programs and libraries are for $machine" are_for_their_processor
+check 'their programs and libraries are hardened' are_hardened
 check "their programs are loaded by the loader of $architecture" load_with_their_loader
 check "they name no architecture but $triplet" name_no_other
 check 'their libraries export what is promised, and nothing else' export_what_is_promised

@@ -61,6 +61,15 @@ libraries_are_small() {
   [[ ${#libraries[@]} -eq 3 ]] && "$here/../abi/size_test.sh" strip readelf 102400 "${libraries[@]}" >/dev/null
 }
 
+# What Debian's own compiler options ask for of its release. The libraries go without some of it, to be small.
+is_hardened() {
+  local marks=() flags
+  flags=$(inside env DEB_BUILD_MAINT_OPTIONS=hardening=+all dpkg-buildflags --get CXXFLAGS)
+  [[ $flags != *-fcf-protection* ]] || marks=(--control-flow)
+  "$here/hardening" "${marks[@]}" "$root"/usr/lib/*/libmero*.so.*.* "$root"/usr/bin/merowireless \
+    "$root"/usr/sbin/iwlist "$root"/usr/mero/sbin/mero-settings >&2
+}
+
 has_no_network() {
   [[ $(inside ls /sys/class/net) == lo && $(inside ip -brief link) == lo\ * ]]
 }
@@ -341,6 +350,7 @@ look_at_installation() {
   check 'no network is joined by itself unless that is asked for' autoconnect_is_not_enabled
   check 'the changelog is there' has_changelogs
   check 'the libraries load less than 100 KiB together' libraries_are_small
+  check 'what is built is hardened as the release wants it' is_hardened
   check 'nothing here can touch the network of this machine' has_no_network
   check 'a scan without an adapter says so in one sentence, and exits with 3' scan_says_that_there_is_no_adapter
   check 'the listing tool has its own form' iwlist_lists
