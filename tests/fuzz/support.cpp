@@ -118,7 +118,8 @@ extern "C" int LLVMFuzzerInitialize(int*, char***) {
   return 0;
 }
 
-extern "C" void syslog(int, const char* szFormat, ...) {
+// Weak, since the program has its own.
+extern "C" [[gnu::weak]] void syslog(int, const char* szFormat, ...) {
   va_list values;
   va_start(values, szFormat);
   Report(szFormat, values);
@@ -127,7 +128,7 @@ extern "C" void syslog(int, const char* szFormat, ...) {
 
 // The name of syslog() in a library that is built with _FORTIFY_SOURCE.
 // NOLINTNEXTLINE(bugprone-reserved-identifier)
-extern "C" void __syslog_chk(int, int, const char* szFormat, ...) {
+extern "C" [[gnu::weak]] void __syslog_chk(int, int, const char* szFormat, ...) {
   va_list values;
   va_start(values, szFormat);
   Report(szFormat, values);
