@@ -18,3 +18,9 @@ if(MERO_SANITIZE)
     set(MERO_WATCH_BRANCHES -fsanitize=fuzzer-no-link)
   endif()
 endif()
+
+# Several processes add to the counts of one file, and threads too.
+if(MERO_COVERAGE)
+  add_compile_options(--coverage -fprofile-update=atomic -fprofile-abs-path)
+  add_link_options(--coverage)
+endif()

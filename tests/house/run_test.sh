@@ -15,7 +15,7 @@ command_from() {
   chmod +x "$1"
 }
 
-mkdir -p bench bin build/bench docs/pictures lib tests/{everywhere,fuzz,lab/scenarios,package}
+mkdir -p bench bin build/bench docs/pictures lib tests/{coverage,everywhere,fuzz,lab/scenarios,package}
 cp "$source"/{.gitignore,run} .
 touch lib/unit.cpp tests/lab/scenarios/{a-scan,b-join}.sh
 git init --quiet
@@ -33,6 +33,7 @@ git init --quiet
   command_from bin/clang-format-19 <<<'echo "clang-format-19 $*" >>calls'
   command_from bin/shellcheck <<<'exit 0'
   command_from tests/everywhere/everywhere <<<'echo "everywhere $*" >>calls; tar --list --file "$1/source.tar" | sort >"$1/files"'
+  command_from tests/coverage/coverage <<<'echo "coverage $*" >>calls'
   command_from tests/fuzz/fuzz <<<'echo "fuzz $*" >>calls; printf "rows\t7\t1 of 1\t2 of 2\t%s\n" 0 1 >"$2/table"; exit 1'
   command_from docs/make_html.sh <<<'echo "make_html.sh $*" >>calls'
   command_from tests/package/foreign_test.sh <<<'echo "foreign_test.sh $*" >>calls; echo not ok; [[ ! -e wrong ]]'
@@ -221,6 +222,13 @@ case $1 in
       expect_calls "everywhere build/everywhere $option"
       expect_packages
     done
+    ;;
+  coverage)
+    run coverage
+    expect_calls 'cmake --preset coverage' 'cmake --build --preset coverage' 'coverage build/coverage'
+    grep -qx gcovr packages
+    run coverage --help
+    expect_calls 'coverage build/coverage --help'
     ;;
   fuzz)
     mkdir -p build/sanitized build/fuzz
