@@ -27,7 +27,7 @@ expect_country() {
 # The channel's state, as iw tells it: nothing, "(disabled)", "(no IR)" ...
 state_of() {  # MEGAHERTZ
   ip netns exec nas iw phy "${RADIO_OF[nas]}" info |
-    sed -n "s/.* $1 MHz [^(]*([^)]* dBm) *//p; s/.* $1 MHz .*\((disabled)\)/\1/p"
+    sed -nE "s/.* $1(\.0)? MHz [^(]*\([^)]* dBm\) *//p; s/.* $1(\.0)? MHz .*(\(disabled\))/\2/p"
 }
 
 # use_of MEGAHERTZ: the same in the program's words.

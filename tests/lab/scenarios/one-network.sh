@@ -24,6 +24,11 @@ settings() {
   inside nas cat /usr/mero/etc/wpa_supplicant.conf
 }
 
+# is_forgotten NAME: the kernel has dropped what it had heard of an access point.
+is_forgotten() {
+  [[ $(ip netns exec nas iw dev wlan0 scan dump) != *"BSS $(address_of "$1")"* ]]
+}
+
 say '-- saved once, it is joined by its name through the strongest, and then through the one that is left'
 on nas merowireless save home --key-file /var/lib/home.key --ip none
 on nas merowireless connect home
@@ -81,12 +86,13 @@ access_point old ssid=home channel=6 wpa=1 wpa_passphrase='the old printer' wpa_
 on nas merowireless connect home
 expect_joined near
 switch_off near
-sleep 12
+sleep 16 # enough for the supplicant to look around more than once
 for pretender in open old; do
   no_station $pretender nas || fail 'the supplicant has changed to who only bears the name'
 done
 on nas merowireless disconnect
 expect_nothing_left nas
+within 40 is_forgotten near || fail 'the kernel still has heard of near'
 for command in 'connect home' autoconnect; do
   # shellcheck disable=SC2086  # words of their own
   ends_with nas 4 $command
