@@ -39,6 +39,14 @@ TEST_F(KitBoot, RemovesAtItsStartWhatIsOfNothingThatRunsAndNoOtherFile) {
   EXPECT_EQ(RunInShell("ls -d " + kept + " >/dev/null").out, "");
 }
 
+// Debian 13 cleans up what has been there for 30 days.
+TEST_F(KitBoot, KeepsTheRecordOfAConnectionThatStandsHoweverOldItIs) {
+  WriteText("/tmp/age.conf", "d /var/tmp 1777 root root m:30d\n");
+  RunInShell("touch -d 2001-01-01 /var/tmp/.wireless_current_connection /var/tmp/other");
+  ASSERT_EQ(RunInShell("systemd-tmpfiles --clean /tmp/age.conf " APPLIANCE_KIT "/systemd/mero-wireless.conf").out, "");
+  EXPECT_EQ(RunInShell("ls -A /var/tmp").out, ".wireless_current_connection\n");
+}
+
 TEST_F(KitBoot, HasUnitsThatSystemdUnderstandsWhole) {
   WriteScript("/usr/bin/merowireless", "");
   const std::string units = APPLIANCE_KIT "/systemd/";
