@@ -143,14 +143,17 @@ forget_wire() { # BRIDGE [FILE]
 	remove_files "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes" "${2-}"
 }
 
-# give_wire_back BRIDGE: removes the bridge, and gives its first member back what note_wire has noted.
+# give_wire_back BRIDGE: removes the bridge, and gives its first member back what note_wire has noted, unless that one is
+# gone.
 give_wire_back() {
 	read -r wire leased <"$state/wire-$1" || cannot_read "$state/wire-$1"
 	end_dnsmasq "$1"
 	remove_bridge "$1"
-	said=$(ip address restore <"$state/wire-$1.addresses" 2>&1) || fail "cannot give $wire its addresses back: $said"
-	said=$(ip route restore <"$state/wire-$1.routes" 2>&1) || fail "cannot give $wire its routes back: $said"
-	[ -z "$leased" ] || lease_address "$wire"
+	if is_there "$wire"; then
+		said=$(ip address restore <"$state/wire-$1.addresses" 2>&1) || fail "cannot give $wire its addresses back: $said"
+		said=$(ip route restore <"$state/wire-$1.routes" 2>&1) || fail "cannot give $wire its routes back: $said"
+		[ -z "$leased" ] || lease_address "$wire"
+	fi
 	forget_wire "$1"
 }
 
@@ -217,6 +220,21 @@ is_finished() {
 	read -r noted condition <"$bridge_note-$1" && [ -z "$condition" ]
 }
 
+# is_running INTERFACE: whether its access point is on the air, with all that belongs to it.
+is_running() {
+	daemon_of hostapd "$hostapd_run-$1.pid" && is_finished "$1"
+}
+
+# undo_killed_start INTERFACE BRIDGE: gives the wire back what it had before a start that was killed, since the next one
+# would take what is left for what it was. Of a start that was killed at its very end the note alone is left.
+undo_killed_start() {
+	if is_finished "$1"; then
+		forget_wire "$2"
+	elif [ -s "$state/wire-$2" ]; then
+		give_wire_back "$2"
+	fi
+}
+
 # was_started INTERFACE: whether an access point was started there, and not ended.
 was_started() {
 	[ -s "$bridge_note-$1" ]
@@ -250,12 +268,15 @@ leave_bridge() { # INTERFACE BRIDGE
 give_up_bridge() {
 	if [ -n "${2-}" ] && [ -s "$state/wire-$1" ]; then
 		give_wire_back "$1"
-	elif comes_up_at_boot "$1" && has_members "$1"; then
+		return
+	fi
+	if comes_up_at_boot "$1" && has_members "$1"; then
 		serve_addresses "$1"
 	else
 		end_dnsmasq "$1"
 		remove_bridge "$1"
 	fi
+	forget_wire "$1"
 }
 
 has_members() { # BRIDGE

@@ -108,6 +108,12 @@ printf '%s' "$done" | /usr/sbin/ip "$@"
 
   static Ran Script(const std::string& words) { return Run("/etc/rc.network " + words); }
 
+  // The same, where it gets a signal while it removes a file.
+  static Ran ScriptWithSignal(const std::string& words, const std::string& file) {
+    Install("rm", "/bin/rm \"$@\"\ncase $* in *" + file + "*) kill $(cat /tmp/script); sleep 0.1 ;; esac\n");
+    return Run("sh -c 'echo $$ >/tmp/script; exec /etc/rc.network " + words + "'");
+  }
+
   // The processes of the stand-ins that run: of this test alone, since it has its own network.
   static std::string Daemons() {
     return RunInShell(

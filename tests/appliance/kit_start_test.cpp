@@ -301,6 +301,30 @@ TEST_F(KitAccessPoint, IsStartedAgainWhenItsStartWasKilled) {
   EXPECT_EQ(ReadText("/run/rc.network/bridge-wlan0"), "lbr0\n");
 }
 
+TEST_F(KitAccessPoint, IsStartedUnlessItRunsWithAllThatBelongsToIt) {
+  EXPECT_EQ(Script("ensure wlan0 lbr0").out, "");
+  EXPECT_EQ(Daemons(), OnAir());
+  const std::string daemon = ReadText("/run/rc.network/hostapd-wlan0.pid");
+  EXPECT_EQ(Script("ensure wlan0 lbr0").out, "");
+  EXPECT_EQ(ReadText("/run/rc.network/hostapd-wlan0.pid"), daemon);
+  WriteText("/run/rc.network/bridge-wlan0", "lbr0 begun\n");
+  EXPECT_EQ(Script("ensure wlan0 lbr0").out, "");
+  EXPECT_NE(ReadText("/run/rc.network/hostapd-wlan0.pid"), daemon);
+  EXPECT_EQ(Daemons(), OnAir());
+}
+
+// Who asked while a start was under way made another one, which took the access point off the air at once.
+TEST_F(KitAccessPoint, IsStartedOnceByTwoWhoWantIt) {
+  WriteText("/tmp/calls", "");
+  Install("hostapd_cli", "until [ -e /tmp/go ]; do sleep 0.02; done\necho state=ENABLED\n");
+  const std::string both =
+      "/etc/rc.network start wlan0 lbr0 & until grep -q ^hostapd /tmp/calls; do sleep 0.02; done; "
+      "/etc/rc.network ensure wlan0 lbr0 & sleep 0.2; touch /tmp/go; wait";
+  EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH; " + both).out, "");
+  EXPECT_EQ(RunInShell("grep -c '^hostapd ' /tmp/calls").out, "1\n");
+  EXPECT_EQ(Daemons(), OnAir());
+}
+
 // The access point was off from the hour on in which its start for the guests had failed.
 TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
@@ -517,60 +541,6 @@ TEST_F(KitAccessPoint, KnowsItsStateInEveryLanguage) {
   EXPECT_EQ(RunInShell(german + "start wlan0 lbr0").out, "");
   EXPECT_EQ(RunInShell(german + "restart wlan0 lbr0").out, "");
   EXPECT_EQ(Left(), "");
-}
-
-// Gives the wire an address and a way out, and the file of a bridge that it is the first member of.
-void SetWire(const std::string& atBoot) {
-  ASSERT_EQ(RunInShell("ip address add 192.0.2.9/24 dev eth0; ip link set eth0 up; ip link set wire up; "
-                       "until grep -qx up /sys/class/net/eth0/operstate; do sleep 0.05; done; "
-                       "ip route add default via 192.0.2.1 metric 7; ip route add 198.51.100.0/24 via 192.0.2.2")
-                .out,
-            "");
-  WriteText("/etc/sysconfig/network-scripts/ifcfg-br0",
-            "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.9\nNETMASK=255.255.255.0\n"
-            "ONBOOT=" +
-                atBoot + "\n");
-}
-
-// A wired appliance that had an access point put into its network lost its address and its way out, also when that
-// failed.
-TEST_F(KitAccessPoint, LeavesTheWireAsItWasWhenItFailsAndTakesItsRoutesAlongWhenItDoesNot) {
-  SetWire("yes");
-  const std::string ways = "ip -4 -brief address show up | grep -v ^lo; ip -4 route";
-  const std::string before = RunInShell(ways).out;
-  Break("hostapd");
-  const Ran failed = Script("start wlan0 br0");
-  EXPECT_EQ(failed.status, 1);
-  EXPECT_THAT(failed.out, StartsWith("rc.network: cannot start the access point on wlan0"));
-  EXPECT_EQ(RunInShell(ways).out, before);
-  EXPECT_FALSE(fs::exists("/sys/class/net/br0"));
-  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").out, "");
-
-  Mend();
-  EXPECT_EQ(Script("start wlan0 br0").out, "");
-  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").out, "192.0.2.9/24\n");
-  EXPECT_THAT(RunInShell("ip -4 route").out, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
-  EXPECT_EQ(RunInShell("ls /run/rc.network | grep wire").out, "");
-  Break("hostapd");
-  EXPECT_EQ(Script("start wlan0 br0").status, 1);
-  EXPECT_THAT(RunInShell("ip -4 route").out, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
-}
-
-// Runs the script, which gets a signal while it removes a file.
-Ran ScriptWithSignal(const std::string& words, const std::string& file) {
-  Install("rm", "/bin/rm \"$@\"\ncase $* in *" + file + "*) kill $(cat /tmp/script); sleep 0.1 ;; esac\n");
-  return RunInShell("PATH=/tmp/bin:$PATH sh -c 'echo $$ >/tmp/script; exec /etc/rc.network " + words + "'");
-}
-
-// A signal that came while the notes were removed failed the start, and nobody knew any more what the wire had had: it
-// was left without an address.
-TEST_F(KitAccessPoint, IsOnTheAirWhenASignalComesWithTheLastStep) {
-  SetWire("no");
-  const Ran ran = ScriptWithSignal("start wlan0 br0", "wire-br0");
-  EXPECT_EQ(ran.out, "");
-  EXPECT_EQ(ran.status, 0);
-  EXPECT_EQ(Daemons(), "hostapd\n");
-  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").out, "192.0.2.9/24\n");
 }
 
 // A signal that came before the second step ended the script, and left the access point on the air.

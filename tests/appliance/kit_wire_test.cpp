@@ -1,0 +1,133 @@
+// The wired member of an access point's bridge: what it had before, and what becomes of that.
+#include "kit_radio.h"
+
+namespace {
+
+using testing::HasSubstr;
+using testing::StartsWith;
+
+class KitWire : public KitRadio {
+ protected:
+  // Gives the wire an address and a way out, and the file of a bridge that it is the first member of.
+  static void SetWire(const std::string& atBoot) {
+    ASSERT_EQ(RunInShell("ip address add 192.0.2.9/24 dev eth0; ip link set eth0 up; ip link set wire up; "
+                         "until grep -qx up /sys/class/net/eth0/operstate; do sleep 0.05; done; "
+                         "ip route add default via 192.0.2.1 metric 7; ip route add 198.51.100.0/24 via 192.0.2.2")
+                  .out,
+              "");
+    WriteText("/etc/sysconfig/network-scripts/ifcfg-br0",
+              "DEVICE=br0\nTYPE=Bridge\nPRIMARY=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.9\nNETMASK=255.255.255.0\n"
+              "ONBOOT=" +
+                  atBoot + "\n");
+  }
+
+  // What the wire, and the bridge that it is in, are reached by.
+  static std::string Ways() { return RunInShell("ip -4 -brief address show up | grep -v ^lo; ip -4 route").out; }
+
+  static std::string Notes() { return RunInShell("ls /run/rc.network | grep wire").out; }
+
+  // Has the script killed where it runs a command of ip.
+  static void KillStart(const std::string& where) {
+    Install("ip", "case $* in *'" + where + "'*) kill -s KILL 0 ;; esac\nexec /usr/sbin/ip \"$@\"\n");
+    EXPECT_NE(RunInShell("PATH=/tmp/bin:$PATH setsid -w /etc/rc.network start wlan0 br0").status, 0);
+    StandInForIp();
+  }
+};
+
+// A wired appliance that had an access point put into its network lost its address and its way out, also when that
+// failed.
+TEST_F(KitWire, IsAsItWasWhenAStartFailsAndGivesItsRoutesWhenItDoesNot) {
+  SetWire("yes");
+  const std::string before = Ways();
+  Break("hostapd");
+  const Ran failed = Script("start wlan0 br0");
+  EXPECT_EQ(failed.status, 1);
+  EXPECT_THAT(failed.out, StartsWith("rc.network: cannot start the access point on wlan0"));
+  EXPECT_EQ(Ways(), before);
+  EXPECT_FALSE(fs::exists("/sys/class/net/br0"));
+  EXPECT_EQ(Notes(), "");
+
+  Mend();
+  EXPECT_EQ(Script("start wlan0 br0").out, "");
+  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").out, "192.0.2.9/24\n");
+  EXPECT_THAT(RunInShell("ip -4 route").out, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(Notes(), "");
+  Break("hostapd");
+  EXPECT_EQ(Script("start wlan0 br0").status, 1);
+  EXPECT_THAT(RunInShell("ip -4 route").out, HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+}
+
+// The next start took what was left of the wire for what it had had: the way out was gone for good.
+TEST_F(KitWire, IsAsItWasBehindAStartThatWasKilled) {
+  SetWire("yes");
+  const std::string before = Ways();
+  for (const char* szWhere : {"-batch", "route add"}) {
+    KillStart(szWhere);
+    EXPECT_EQ(Script("start wlan0 br0").out, "") << szWhere;
+    EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7")) << szWhere;
+    EXPECT_EQ(Notes(), "") << szWhere;
+    EXPECT_EQ(Script("restart wlan0 br0").out, "");
+    RunInShell("ip link delete br0");
+    SetWire("yes");
+
+    KillStart(szWhere);
+    BreakOnce("hostapd");
+    EXPECT_EQ(Script("start wlan0 br0").status, 1) << szWhere;
+    EXPECT_EQ(Ways(), before) << szWhere;
+
+    KillStart(szWhere);
+    EXPECT_EQ(Script("restart wlan0 br0").out, "") << szWhere;
+    EXPECT_EQ(Ways(), before) << szWhere;
+    EXPECT_EQ(Notes(), "") << szWhere;
+  }
+}
+
+TEST_F(KitWire, MayBeGoneBehindAStartThatWasKilled) {
+  SetWire("yes");
+  KillStart("route add");
+  RunInShell("ip link delete eth0");
+  EXPECT_EQ(Script("start wlan0 br0").out, "rc.network: there is no interface 'eth0' for the bridge br0\n");
+  EXPECT_EQ(Notes(), "");
+}
+
+TEST_F(KitWire, IsAsItWasInTheFormerBridgeBehindAStartThatWasKilled) {
+  SetWire("yes");
+  const std::string before = Ways();
+  KillStart("route add");
+  EXPECT_EQ(Script("start wlan0 lbr0").out, "");
+  EXPECT_EQ(RunInShell("ip -4 -brief address show eth0; ip -4 route show default").out,
+            "eth0@wire        UP             192.0.2.9/24 \ndefault via 192.0.2.1 dev eth0 metric 7 \n");
+  EXPECT_FALSE(fs::exists("/sys/class/net/br0"));
+}
+
+// With the note of a start that had come to its end, the next one that failed removed a bridge that it had not made.
+TEST_F(KitWire, StaysInItsBridgeWhateverAStartThatWasKilledAtItsEndHasLeft) {
+  SetWire("yes");
+  const std::string leave = "cd /run/rc.network && echo eth0 >wire-br0 && : >wire-br0.addresses && : >wire-br0.routes";
+  ASSERT_EQ(Script("start wlan0 br0").out, "");
+  ASSERT_EQ(RunInShell(leave).status, 0);
+  Break("hostapd");
+  EXPECT_EQ(Script("start wlan0 br0").status, 1);
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(Notes(), "");
+
+  Mend();
+  ASSERT_EQ(Script("start wlan0 br0").out, "");
+  ASSERT_EQ(RunInShell(leave).status, 0);
+  EXPECT_EQ(Script("restart wlan0 br0").out, "");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(Notes(), "");
+}
+
+// A signal that came while the notes were removed failed the start, and nobody knew any more what the wire had had: it
+// was left without an address.
+TEST_F(KitWire, HasGivenItsAddressWhenASignalComesWithTheLastStep) {
+  SetWire("no");
+  const Ran ran = ScriptWithSignal("start wlan0 br0", "wire-br0");
+  EXPECT_EQ(ran.out, "");
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_EQ(Daemons(), "hostapd\n");
+  EXPECT_EQ(RunInShell("ip -4 -brief address show br0 | awk '{ print $3 }'").out, "192.0.2.9/24\n");
+}
+
+}  // namespace
