@@ -17,7 +17,7 @@ endif()
 # instruction of x86, which needs no other table then; of 64-bit ARM it is three, where a call is one. The tiny model is
 # that of a library that lies within a mebibyte: each of its addresses is one instruction there, not two. And there every
 # function would keep a frame for debuggers, as none does elsewhere.
-if(CMAKE_SYSTEM_PROCESSOR STREQUAL aarch64)
+if(CMAKE_SYSTEM_PROCESSOR STREQUAL aarch64 AND CMAKE_SIZEOF_VOID_P EQUAL 8)
   set(MERO_PROCESSOR_OPTIONS -mcmodel=tiny -fomit-frame-pointer)
 else()
   set(MERO_PROCESSOR_OPTIONS -fno-plt)

@@ -7,6 +7,7 @@ scratch=$(mktemp -d)
 trap 'rm -r "$scratch"' EXIT
 export MERO_BUILD=$scratch/build MERO_LAB_DEBIAN=trixie
 case $1 in
+  killed) export MERO_LAB_ARCH=amd64 ;;
   foreign-*)
     MERO_LAB_ARCH=$(dpkg --print-architecture | sed 's/arm64/amd64/; t; s/.*/arm64/')
     export MERO_LAB_ARCH

@@ -3,6 +3,7 @@
 # architecture, are for that one throughout. Says `ok` or `not ok` and what it is about, in a line each; fails if
 # anything did. Nothing of them is run.
 set -euo pipefail
+export LC_ALL=C # what readelf says is looked at
 
 here=$(dirname "$(realpath "$0")")
 readonly here directory=$1 architecture=$2
