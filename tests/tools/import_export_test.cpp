@@ -1,8 +1,12 @@
 // What one appliance knows goes to another one, as a document.
 #include <sys/resource.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 
+#include <cerrno>
 #include <csignal>
 #include <filesystem>
+#include <functional>
 #include <nlohmann/json.hpp>
 
 #include "real_store.h"
@@ -46,6 +50,8 @@ constexpr char kStore[] =
     "\tENCRYPT=NONE\n"
     "\tDNS=1.1.1.1 8.8.8.8\n"
     "\tAUTOJOIN=no\n";
+
+std::function<bool(int)> g_flushFails;
 
 class Export : public ToolTest {
  protected:
@@ -379,6 +385,30 @@ TEST_F(Import, ThatCannotSaveTheAccessPointLeavesAllAsItWas) {
   std::filesystem::remove("/usr/mero/etc/wireless_ap.conf");
 }
 
+// The networks were the new ones, and the access point was put back.
+TEST_F(Import, ThatMayNotOutlastAPowerCutIsWholeAllTheSame) {
+  library::SavedAp(library::Office());
+  WriteText("/usr/mero/etc/wireless_ap.conf", "former\n");
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF) {
+    WriteText("/usr/mero/etc/wireless_ap.conf", "new\n");
+    return TRUE;
+  };
+  json document = json::parse(kOfficeNow);
+  document["networks"] = json::array({json::parse(Network(""))});
+  g_flushFails = [](int fd) {
+    return std::filesystem::is_directory("/proc/self/fd/" + std::to_string(fd)) &&
+           !std::filesystem::exists("/usr/mero/etc/.wireless.conf.edit");
+  };
+  const auto ran = Imported(document.dump());
+  g_flushFails = nullptr;
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("/usr/mero/etc/wireless.conf is changed, but may be the old one again after a power "
+                                 "cut: Input/output error: "));
+  EXPECT_EQ(ReadText("/usr/mero/etc/wireless_ap.conf"), "new\n");
+  EXPECT_THAT(ReadText(kPath), HasSubstr("\tESSID=Attic\n"));
+  std::filesystem::remove("/usr/mero/etc/wireless_ap.conf");
+}
+
 TEST_F(Import, OfTheAccessPointNeedsItsFormerSettingsAndSaysWhenTheyAreLost) {
   static constexpr char kApPath[] = "/usr/mero/etc/wireless_ap.conf";
   library::SavedAp(library::Office());
@@ -408,3 +438,10 @@ TEST_F(Import, WithoutAnAdapterTakesTheNetworksAloneWhenToldTo) {
 }
 
 }  // namespace
+
+// The program's calls, and the platform's, go through this one.
+extern "C" int fsync(int fd) {
+  if (!g_flushFails || !g_flushFails(fd)) return static_cast<int>(::syscall(SYS_fsync, fd));
+  errno = EIO;
+  return -1;
+}

@@ -251,6 +251,8 @@ void WriteAll(SettingsChange* change, const std::vector<NetworkPlan>& plans, con
   try {
     SaveApKeepingSwitch(ap->conf);
     if (change != nullptr) change->Commit();
+  } catch (const MayBeLost&) {
+    throw;  // the networks are imported, and what goes with them stays
   } catch (const Failure&) {
     former.PutBack();
     throw;

@@ -107,7 +107,11 @@ void SettingsChange::Set(const std::string& section, const char* szKey, const st
 void SettingsChange::Commit() {
   const Descriptor copy(::open(copy_.c_str(), O_RDONLY | O_CLOEXEC));
   if (!copy.valid() || ::fsync(copy.get()) < 0) throw NotChanged(path_);
-  if (std::rename(copy_.c_str(), path_.c_str()) < 0 || !FlushDirectoryOf(path_)) throw NotChanged(path_);
+  if (std::rename(copy_.c_str(), path_.c_str()) < 0) throw NotChanged(path_);
+  if (FlushDirectoryOf(path_)) return;
+  throw MayBeLost(Exit::kFailed,
+                  path_ + " is changed, but may be the old one again after a power cut: " + std::strerror(errno),
+                  "does the disk fail?");
 }
 
 bool RemoveSettings(const char* szPath) {

@@ -4,7 +4,13 @@
 
 #include <string>
 
+#include "base/failure.h"
 #include "common/descriptor.h"
+
+// Thrown when a file is changed, and may be the old one again after a power cut.
+struct MayBeLost : Failure {
+  using Failure::Failure;
+};
 
 // The platform's operations make the changes, in a copy beside the file. Until this ends it has the file's lock, as
 // mero-wireless.conf(5) tells of it, so that nobody else's change is lost.
@@ -20,7 +26,7 @@ class SettingsChange {
   // Sets one key of a section in the copy.
   void Set(const std::string& section, const char* szKey, const std::string& value) const;
 
-  // Puts the copy in the file's place.
+  // Puts the copy in the file's place. When that fails the file is as it was, unless MayBeLost says otherwise.
   void Commit();
 
  private:
