@@ -28,11 +28,13 @@ TEST_F(KitBoot, RemovesAtItsStartWhatIsOfNothingThatRunsAndNoOtherFile) {
   const std::string left =
       "/tmp/wireless.info.abcdefghij /var/tmp/.wireless_current_connection.abcdef /etc/resolv.conf.new.abcdef "
       "/etc/hostapd/hostapd-wlan0.info.abcdefghij /var/tmp/.wireless_current_connection /var/tmp/.wireless_connecting "
-      "/var/tmp/.wireless_ap_connecting";
+      "/var/tmp/.wireless_ap_connecting /usr/mero/etc/.wireless.conf.edit /usr/mero/etc/.wireless_ap.conf.edit "
+      "/etc/hostapd/.hostapd-wlan0-host.conf.edit /etc/sysconfig/network-scripts/.ifcfg-lbr0.edit "
+      "/etc/dhcpd/.dhcpd-lbr0-lbr0.info.edit";
   const std::string kept =
       "/etc/hostapd/hostapd-wlan0.info /etc/resolv.conf /tmp/wireless.info.foreign-abcdef "
       "/etc/hostapd/hostapd-wlan0.info.2026-11-22 /etc/resolv.conf.new.my-own";
-  RunInShell("mkdir -p /etc/hostapd; touch " + left + " " + kept);
+  RunInShell("mkdir -p /etc/hostapd /etc/dhcpd /etc/sysconfig/network-scripts; touch " + left + " " + kept);
   ASSERT_EQ(RunInShell("systemd-tmpfiles --create --remove --boot " APPLIANCE_KIT "/systemd/mero-wireless.conf").out,
             "");
   EXPECT_EQ(RunInShell("ls -d " + left + " 2>/dev/null").out, "");

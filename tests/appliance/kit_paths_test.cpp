@@ -85,6 +85,13 @@ TEST_F(KitPaths, OfTheUnitsAreTheLibrarysAndTheScripts) {
     while (count-- > 0) pattern += "[0-9A-Za-z]";
     return pattern;
   };
+  const auto copy = [](const std::string& path) {
+    const auto name = path.rfind('/') + 1;
+    return path.substr(0, name) + "." + path.substr(name) + ".edit";
+  };
+  const std::string script = InterfacePath(kInterfaceScriptFormat, "*").c_str();
+  const std::string host = InterfacePath(kHostapdHostFormat, "*").c_str();
+  const std::string server = InterfacePath(kDhcpConfFormat, "*", "").c_str();
   const std::string record = kConnectionRecordPath;
   const Paths made = {note,
                       note + letters(10),
@@ -92,6 +99,11 @@ TEST_F(KitPaths, OfTheUnitsAreTheLibrarysAndTheScripts) {
                       record + letters(6),
                       kJoinMarkerPath,
                       kApMarkerPath,
+                      copy(kKnownNetworksPath),
+                      copy(kApSettingsPath),
+                      copy(script),
+                      copy(host.substr(0, host.rfind('*') + 1)),
+                      copy(server.substr(0, server.rfind('*') + 1)),
                       std::string(kResolverPath) + ".new" + letters(6),
                       InterfacePath(kHostapdInfoFormat, "*").c_str() + letters(10)};
   EXPECT_EQ(PathsIn("systemd/mero-wireless.conf"), made);

@@ -378,7 +378,13 @@ TEST_F(Import, ThatCannotSaveTheAccessPointLeavesAllAsItWas) {
   };
   json document = json::parse(kOfficeNow);
   document["networks"] = json::array({json::parse(Network(""))});
+  g_flushFails = [](int) {
+    Shell("ls -A /usr/mero/etc >>/tmp/beside");
+    return false;
+  };
   EXPECT_THAT(Imported(document.dump()).err, HasSubstr("the settings could not be saved: "));
+  g_flushFails = nullptr;
+  EXPECT_THAT(ReadText("/tmp/beside"), HasSubstr(".wireless_ap.conf.edit\n")) << "what a kill leaves is to have a name";
   EXPECT_EQ(ReadText("/usr/mero/etc/wireless_ap.conf"), "former\n");
   EXPECT_EQ(Shell("stat -c %a /usr/mero/etc/wireless_ap.conf"), "640\n");
   EXPECT_EQ(ReadText(kPath), kStore);

@@ -49,6 +49,9 @@ std::optional<std::string> TextOfFile(const std::string& path) {
   return TextOf(file.get(), std::string::npos - 1);
 }
 
+namespace {
+
+// False when that fails; then errno tells why, and what there was is there still.
 bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode) {
   std::string beside = path + ".XXXXXX";
   const Descriptor file(::mkostemp(beside.data(), O_CLOEXEC));
@@ -60,6 +63,8 @@ bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode) {
   errno = error;
   return false;
 }
+
+}  // namespace
 
 // Links are not followed: in a directory that others may write, they could lead anywhere.
 void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes) {

@@ -16,12 +16,8 @@ std::optional<std::string> TextOfFile(const std::string& path);
 // and errno tells why.
 std::optional<std::string> TextOf(int fd, std::size_t most);
 
-// Puts a file of these bytes and this mode at a path, in one step: whoever reads it, and whoever switches the machine
-// off, finds what there was or all of this. False when that fails; then errno tells why, and what there was is there
-// still.
-bool ReplaceFile(const std::string& path, std::string_view text, mode_t mode);
-
-// Puts a file at a path that its owner alone may read. Fails with advice when it cannot be written, or when something
+// Puts a file at a path that its owner alone may read, in one step: whoever reads it, and whoever switches the machine
+// off, finds what there was or all of this. Fails with advice when it cannot be written, or when something
 // other than a plain file is there; `shown` is the path for a sentence.
 void WriteForOwner(const std::string& path, const std::string& shown, std::string_view bytes);
 

@@ -215,7 +215,7 @@ class FormerSettings {
   }
 
   void PutBack() const {
-    const bool back = text_ ? ReplaceFile(kApSettingsPath, *text_, mode_) : RemoveSettings(kApSettingsPath);
+    const bool back = text_ ? ReplaceSettings(kApSettingsPath, *text_, mode_) : RemoveSettings(kApSettingsPath);
     if (back) return;
     throw Failed("the networks could not be imported, and the access point's settings not be put back",
                  "`merowireless ap show` shows those that there are now");

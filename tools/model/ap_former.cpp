@@ -53,7 +53,7 @@ void FormerAp::Keep(const std::string& path) {
 bool FormerAp::PutBack() const {
   const bool back = std::ranges::all_of(files_, [](const File& file) {
     if (TextOfFile(file.path) == file.text) return true;
-    return file.text ? ReplaceFile(file.path, *file.text, file.mode) : RemoveSettings(file.path.c_str());
+    return file.text ? ReplaceSettings(file.path, *file.text, file.mode) : RemoveSettings(file.path.c_str());
   });
   return back && PLIBCExec(kNetworkScriptPath, "start", interface_.c_str(), bridge_.c_str(), nullptr) == 0;
 }

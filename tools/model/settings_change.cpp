@@ -103,6 +103,11 @@ void SettingsChange::Set(const std::string& section, const char* szKey, const st
   throw Failed(path_ + " could not be changed, and is as it was", "is there room on the disk? -v shows more");
 }
 
+void SettingsChange::Write(std::string_view text, mode_t mode) const {
+  const Descriptor copy(::open(copy_.c_str(), O_WRONLY | O_TRUNC | O_NOFOLLOW | O_CLOEXEC));
+  if (!copy.valid() || !WriteAll(copy.get(), text) || ::fchmod(copy.get(), mode) < 0) throw NotChanged(path_);
+}
+
 // What the platform has written is flushed already, and a copy in which nothing was changed is not.
 void SettingsChange::Commit() {
   const Descriptor copy(::open(copy_.c_str(), O_RDONLY | O_CLOEXEC));
@@ -112,6 +117,15 @@ void SettingsChange::Commit() {
   throw MayBeLost(Exit::kFailed,
                   path_ + " is changed, but may be the old one again after a power cut: " + std::strerror(errno),
                   "does the disk fail?");
+}
+
+bool ReplaceSettings(const std::string& path, std::string_view text, mode_t mode) try {
+  SettingsChange change(path);
+  change.Write(text, mode);
+  change.Commit();
+  return true;
+} catch (const Failure&) {
+  return false;
 }
 
 bool RemoveSettings(const char* szPath) {

@@ -2,7 +2,10 @@
 #ifndef MERO_TOOLS_SETTINGS_CHANGE_H
 #define MERO_TOOLS_SETTINGS_CHANGE_H
 
+#include <sys/types.h>
+
 #include <string>
+#include <string_view>
 
 #include "base/failure.h"
 #include "common/descriptor.h"
@@ -26,6 +29,9 @@ class SettingsChange {
   // Sets one key of a section in the copy.
   void Set(const std::string& section, const char* szKey, const std::string& value) const;
 
+  // Has the copy hold this alone, with this mode.
+  void Write(std::string_view text, mode_t mode) const;
+
   // Puts the copy in the file's place. When that fails the file is as it was, unless MayBeLost says otherwise.
   void Commit();
 
@@ -37,6 +43,9 @@ class SettingsChange {
   std::string lockPath_;
   Descriptor lock_;
 };
+
+// Has a settings file hold this, with this mode. False when it does not, or may not outlast a power cut.
+bool ReplaceSettings(const std::string& path, std::string_view text, mode_t mode);
 
 // Removes a settings file, if there is one, and it is not back after a power cut. False when it is not sure to be gone.
 bool RemoveSettings(const char* szPath);
