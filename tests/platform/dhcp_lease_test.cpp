@@ -31,6 +31,7 @@ using testing::Not;
 constexpr char kScript[] = "/usr/mero/sbin/udhcpc.lease";
 constexpr char kResolver[] = "/etc/resolv.conf";
 constexpr char kLogged[] = "/tmp/platform/logged";
+constexpr char kSaid[] = "/tmp/platform/said";
 
 using Lease = std::vector<std::string>;  // NAME=VALUE, each
 
@@ -56,7 +57,7 @@ class ALease : public PlatformTest {
       std::vector<char*> argv = {const_cast<char*>(kScript)};
       for (const char* szWord : words) argv.push_back(const_cast<char*>(szWord));
       argv.push_back(nullptr);
-      (void)!::freopen("/dev/null", "w", stderr);
+      (void)!::freopen(kSaid, "w", stderr);
       ::execv(kScript, argv.data());
       return 127;
     });
@@ -323,8 +324,10 @@ TEST_F(ALease, SaysThatTheResolversFileCannotBeChanged) {
 TEST_F(ALease, SaysThatTheResolversFileMayNotOutlastAPowerCut) {
   WriteText(kResolver, "nameserver 192.0.2.1\n", 0644);
   WriteScript("/tmp/platform/sync", "case $1 in /etc) echo broken >&2; exit 1 ;; esac\n");
-  (void)Bound({"dns=10.1.0.2"});
-  ExpectLogged("/etc/resolv.conf may be the old one again after a power cut: broken\n");
+  EXPECT_EQ(Bound({"dns=10.1.0.2"}), 0);
+  const std::string text = "/etc/resolv.conf may be the old one again after a power cut: broken\n";
+  ExpectLogged(text);
+  EXPECT_EQ(ReadText(kSaid), "udhcpc.lease: " + text);
   EXPECT_THAT(ReadText(kResolver), HasSubstr("10.1.0.2"));
 }
 
