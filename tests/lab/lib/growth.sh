@@ -11,9 +11,9 @@ amounts_of() {
     'open descriptors' "$(counted "$root"/proc/[0-9]*/fd/*)" 0 \
     'memory of processes' "$(cat "${pids[@]/%//status}" /dev/null | awk '/^VmRSS:/ { sum += $2 } END { print sum + 0 }')" 64 \
     'memory of the kernel' "$(awk '/^SUnreclaim:|^KernelStack:/ { sum += $2 } END { print sum }' /proc/meminfo)" 2048 \
-    files "$(cd "$root" && find etc run tmp usr/mero var/lib var/tmp -xdev -type f | wc -l)" 0 \
+    files "$(cd "$root" && find etc run tmp usr/mero var/lib var/tmp -xdev | wc -l)" 0 \
     mounts "$(wc -l <"/proc/${INIT_OF[$1]}/mounts")" 0 \
-    sockets "$(inside "$1" cat /proc/net/{unix,packet,netlink,udp,tcp,raw} | wc -l)" 0 \
+    sockets "$(inside "$1" cat /proc/net/{unix,packet,netlink,udp,udp6,tcp,tcp6,raw,raw6} | wc -l)" 0 \
     interfaces "$(ip -n "$1" -oneline link | wc -l)" 0 \
     addresses "$(ip -n "$1" -oneline address | wc -l)" 0 \
     routes "$(ip -n "$1" route show table all | wc -l)" 0 \

@@ -184,11 +184,14 @@ answers() {  # ADDRESS
 expect_confined() {
   local name pid
   touch /home/seen
+  { touch /usr/seen && rm /usr/seen; } || fail 'nobody can write below /usr'
   for name in hostapd-wlan0 dnsmasq-lbr0; do
     pid=$(</run/rc.network/$name.pid)
     expect_same "the rights of $name" 'CapBnd: 00000000000834fb NoNewPrivs: 1 Seccomp: 2' \
       "$(grep -E '^(CapBnd|NoNewPrivs|Seccomp):' "/proc/$pid/status" | xargs)"
+    [[ -d /proc/$pid/root/usr ]] || fail "what $name sees cannot be told"
     [[ ! -e /proc/$pid/root/home/seen ]] || fail "$name sees what is in /home"
+    nsenter --target "$pid" --mount true || fail "what $name may write cannot be told"
     ! nsenter --target "$pid" --mount touch /usr/seen 2>/dev/null || fail "$name can write below /usr"
   done
 }
