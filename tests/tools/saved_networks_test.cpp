@@ -105,6 +105,18 @@ TEST_F(SavedNetworks, AreJoinedByAddressThroughThatAccessPointAlone) {
   EXPECT_EQ(Tried({"connect", "0A:0A:0A:0A:0A:01", "--any-ap"}, {home}, {Heard(1, -40)}), "Home|1|open sesame|any");
 }
 
+// Who called a network like somebody else's access point was joined, and was given a handshake with the secret.
+TEST_F(SavedNetworks, AreNotTakenForAnAccessPointWhoseAddressTheyBearAsTheirName) {
+  constexpr char kAddress[] = "0A:0A:0A:0A:0A:01";
+  const auto evil = Saved(Heard(9, -20, kAddress), 9);
+  const auto home = Saved(Heard(1, -50), 7);
+  EXPECT_EQ(Tried({"connect", kAddress}, {evil, home}, {Heard(9, -20, kAddress), Heard(1, -90)}),
+            "Home|1|open sesame|this one");
+  EXPECT_EQ(Tried({"connect", kAddress, "--no-save"}, {}, {Open(9, -20, kAddress), Open(1, -90)}), "Home|1||this one");
+  const Ran ran = Tool({"connect", "0A:0A:0A:0A:0A:02"});
+  EXPECT_EQ(ran.status, 4);
+}
+
 TEST_F(SavedNetworks, AreJoinedAsTheyWereSavedWhenNoScanShowsThem) {
   const auto home = Saved(Heard(1, -50), 7);
   EXPECT_EQ(Tried({"connect", "Home"}, {home}, {}), "Home|1|open sesame|any");

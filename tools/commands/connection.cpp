@@ -92,7 +92,7 @@ void ConnectTo(const Program& program, const NetworkToJoin& wanted, const Target
   former.Try([&] {
     Join(program, target);
     LeaveAloneNoMore();
-    if (!wanted.noSave) saving = SaveWhatWorked(target.config, wanted.name == target.config.network.szEssid);
+    if (!wanted.noSave) saving = SaveWhatWorked(target.config, !ParseAddress(wanted.name));
     if (!wanted.noAddress) ApplyAddressing(program, target.config);
   });
   if (saving == Saving::kFailed) throw JoinedAndNotSaved(program.output.Name(target.config.network.szEssid));

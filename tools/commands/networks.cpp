@@ -218,7 +218,7 @@ void Save(const Program& program, const NetworkToSave& wanted) {
   RequireJoinable(program, config.network);
   if (config.network.opmode == WIRELESS_OPMODE_AUTO) config.network.opmode = WIRELESS_OPMODE_MANAGED;
   SetSecret(program, config, wanted.secret);
-  const SavedNetwork saved = SaveNetwork(config, wanted.name == config.network.szEssid);
+  const SavedNetwork saved = SaveNetwork(config, !ParseAddress(wanted.name));
   const std::string name = program.output.Name(config.network.szEssid);
   const std::string which = saved.addresses.size() == 1 ? AddressText(config.network.bssid)
                                                         : std::to_string(saved.addresses.size()) + " access points";

@@ -134,7 +134,7 @@ std::vector<Network> LookFor(const Program& program, const std::string& name,
 
 bool IsNamed(const Network& network, const std::string& name) {
   const std::optional<Address> address = ParseAddress(name);
-  return name == network.szEssid || (address && std::ranges::equal(*address, network.bssid));
+  return address ? std::ranges::equal(*address, network.bssid) : name == network.szEssid;
 }
 
 Network FindInRange(const Program& program, const std::string& name) {
@@ -149,10 +149,7 @@ Network FindInRange(const Program& program, const std::string& name) {
 
 std::vector<KnownNetwork> AllKnown(const std::string& name) {
   std::vector<KnownNetwork> known = Known(Order::kByTime);
-  const auto hasName = [&](const KnownNetwork& other) { return name == other.network.szEssid; };
-  const bool isName = std::ranges::any_of(known, hasName);
-  std::erase_if(known,
-                [&](const KnownNetwork& other) { return isName ? !hasName(other) : !IsNamed(other.network, name); });
+  std::erase_if(known, [&](const KnownNetwork& other) { return !IsNamed(other.network, name); });
   return known;
 }
 

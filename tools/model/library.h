@@ -38,7 +38,8 @@ std::optional<std::vector<Network>> InRangeOnCall(const Program& program, const 
 std::vector<Network> LookFor(const Program& program, const std::string& name,
                              const std::function<bool(const Network&)>& isWanted);
 
-// Whether a network has this name, or its access point this address.
+// Whether a network has this name, or its access point this address. A text that is an address is no name: anybody may
+// call a network like somebody else's access point.
 bool IsNamed(const Network& network, const std::string& name);
 
 // The strongest access point in range of this name, or the one of this address; fails when there is none.
@@ -47,7 +48,7 @@ Network FindInRange(const Program& program, const std::string& name);
 // The first of AllKnown().
 std::optional<KnownNetwork> FindKnown(const std::string& name);
 
-// All sections that were saved under a name, or else the one of this address, the one saved last first.
+// All sections that were saved under a name, or the one of an address, the one saved last first.
 std::vector<KnownNetwork> AllKnown(const std::string& name);
 
 // Fails when there is no adapter.

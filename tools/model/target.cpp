@@ -45,7 +45,7 @@ Target FromTheAir(const Program& program, const std::string& name, bool isChange
   auto known = SavedAs(accessPoint.szEssid);
   for (SavedNetwork& saved : known) saved.LeaveOnly(accessPoint);
   if (!known.empty()) return TargetAmong(program, known, {accessPoint}, isChanged);
-  return {.config = AsHeard(accessPoint, name == accessPoint.szEssid), .isInRange = true};
+  return {.config = AsHeard(accessPoint, !ParseAddress(name)), .isInRange = true};
 }
 
 }  // namespace
