@@ -258,6 +258,12 @@ TEST_F(AccessPoint, ThatCannotBeSavedIsNotTried) {
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig"));
 }
 
+TEST_F(AccessPoint, ThatNobodyHasSetIsNotSavedByDisablingIt) {
+  library::MEROWirelessGetAPConfig = [](const char*, PMERO_AP_CONF conf) { return *conf = MERO_AP_CONF{}, 0; };
+  EXPECT_EQ(Tool({"ap", "disable"}).out, "the access point is disabled\n");
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessAPDisable"));
+}
+
 TEST_F(AccessPoint, ThatThereNeverWasIsDisabled) {
   library::MEROWirelessAPDisable = [] {
     return library::Report("wireless_ap_disable", "File[/etc/sysconfig/network-scripts/ifcfg-wlan0] does not exist."),

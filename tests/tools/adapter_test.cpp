@@ -309,6 +309,16 @@ TEST_F(RadioSwitch, ThatCannotBeSavedIsNotMoved) {
   EXPECT_EQ(Soft(), "0");
 }
 
+TEST_F(RadioSwitch, ThatCannotBeSavedAsOnStaysOff) {
+  WriteText(std::string(kSwitch) + "soft", "1");
+  WriteText("/tmp/unblock", "no");
+  library::PLIBCFileSetSectionValue = [](const char*, const char*, const char*, const char*, const char*) {
+    return -1;
+  };
+  EXPECT_THAT(Tool({"radio", "on"}).err, HasSubstr("merowireless: the radio could not be switched: "));
+  EXPECT_EQ(Soft(), "1");
+}
+
 TEST_F(RadioSwitch, ThatAHandHasMovedIsNotSwitchedOn) {
   WriteText(std::string(kSwitch) + "hard", "1");
   const Ran ran = Tool({"radio", "on"});

@@ -292,7 +292,8 @@ TEST_F(Import, RefusesWhatIsNoDocument) {
   std::string many = "7";
   for (int i = 0; i < 1000; ++i) many += ",7";
   ExpectRefused(Networks(many), "the document is wrong at networks: there are too many networks: ");
-  EXPECT_THAT(Tool({"import", "/tmp/nowhere"}).err, HasSubstr("the document cannot be read from /tmp/nowhere: "));
+  EXPECT_THAT(Tool({"import", "/tmp/nowhere"}).err,
+              HasSubstr("the document cannot be read from /tmp/nowhere: No such file or directory: "));
 }
 
 TEST_F(Import, OfANetworkWhoseSectionHasAnotherNameIsRefused) {

@@ -88,6 +88,15 @@ TEST_F(Messages, TellOfNetworksWhyTheyAreNotListed) {
        },
        {"scan"},
        "the adapter's interface cannot be brought up"},
+      {[] {
+         library::MEROWirelessCheckBlock = [] { return 0; };
+         library::MEROWirelessNetworkScan = [](WIRELESS_SCAN, WIRELESS_LIST* head) {
+           head->q_forw = head->q_back = head;
+           return library::Report("wireless_network_scan", "Failed to activate network interface wlan0"), -1;
+         };
+       },
+       {"scan"},
+       "the radio is switched off"},
   });
 }
 
@@ -98,6 +107,11 @@ TEST_F(Messages, TellOfAddressesWhyTheyAreNotSet) {
       {AsItIs, {"address", "10.0.0.9", "--mask", "255.0.255.0"}, "this is no netmask: 255.0.255.0"},
       {AsItIs, {"address", "none"}, "none is no address"},
       {AsItIs, {"address", "DHCP", "--mask", "255.0.0.0"}, "a static address and its netmask go together"},
+      {AsItIs, {"address", "10.0.0.0", "--mask", "255.0.0.0"}, "no host can have this address"},
+      {AsItIs, {"save", "Home", "--ip", "10.255.255.255", "--mask", "255.0.0.0"}, "no host can have this address"},
+      {AsItIs, {"save", "Home", "--ip", "127.0.0.1", "--mask", "255.0.0.0"}, "no host can have this address"},
+      {AsItIs, {"save", "Home", "--ip", "224.0.0.1", "--mask", "255.255.255.0"}, "no host can have this address"},
+      {AsItIs, {"save", "Home", "--ip", "0.0.0.1", "--mask", "255.255.255.0"}, "no host can have this address"},
       {AsItIs, {"save", "Home", "--mask", "255.0.0.0"}, "a static address and its netmask go together"},
       {AsItIs, {"save", "Home", "--gateway", "10.0.0.1"}, "only a static address has a gateway of its own"},
       {AsItIs, {"gateway", "there"}, "the gateway is no IPv4 address"},
@@ -191,6 +205,8 @@ TEST_F(Messages, TellOfAnAccessPointWhyItIsNotSetSo) {
       {{"--auth-server-addr", "10.0.0.1"}, "only EAP has a RADIUS server"},
       {{"--encryption", "eap", "--auth-server-addr", "there"}, "the RADIUS server's address is none"},
       {{"--bridge", "../x"}, "this is no bridge's name"},
+      {{"--bridge", "gbr"}, "this bridge is the guests'"},
+      {{"--bridge", "lo"}, "there is an interface of this name, and it is no bridge"},
       {{"--wifi-sched", "/no/such/file"}, "the schedule cannot be read from /no/such/file"},
       {{"--wifi-sched", kWeek}, "the schedule is not 168 hours"},
       {{"--guest-net-encryption", "eap"}, "a guest network cannot have EAP"},

@@ -74,8 +74,11 @@ void TakeDown(const Program& program) {
   throw Failed("the access point could not be taken down whole");
 }
 
+// Where nothing was saved, nothing is: a section with the switch alone would be one that does not say whether the radio
+// may be used.
 void Disable(const Program& program, const ApConf& conf) {
-  SaveApSwitch(conf, false);
+  ApConf saved{};
+  if (ReadSavedAp(saved)) SaveApSwitch(conf, false);
   TakeDown(program);
 }
 

@@ -208,12 +208,24 @@ std::string SwitchOff(const Program& program) {
   return "the radio is off: no network will be joined";
 }
 
-std::string SwitchOn(const Program& program) {
-  const std::string model = AdapterModel();
+// The kernel's block is as it was when the settings cannot be changed.
+void LiftBlockAndSave(const std::string& model) {
+  const std::string interface = MEROWirelessAPInterfaceGet();
+  const bool wasSet = KernelBlockOf(interface) == KernelBlock::kSet;
   LiftBlock();
   RequireNoBlock();  // by a switch that only hands can move
+  try {
+    SaveSwitch(model, true);
+  } catch (const Failure&) {
+    if (wasSet) SetBlock();
+    throw;
+  }
+}
+
+std::string SwitchOn(const Program& program) {
+  const std::string model = AdapterModel();
   const RadioUse use = NotedRadioUse();
-  SaveSwitch(model, true);
+  LiftBlockAndSave(model);
   ForgetRadioUse();
   return "the radio is on" + BringBack(program, use);
 }

@@ -48,7 +48,6 @@ void SetAddress(KnownNetwork& network, const NetworkToEdit& wanted) {
   if (wanted.mask) addressing.mask = *wanted.mask;
   if (wanted.gateway) addressing.gateway = NoneAsEmpty(*wanted.gateway);
   SetAddressing(network, addressing);
-  RequireSound(network);
 }
 
 void SetExtras(Extras& extras, const NetworkToEdit& wanted) {

@@ -231,8 +231,10 @@ class FormerSettings {
 std::string ReadDocument(const Program& program, const std::string& path) {
   const bool isStandardInput = path == "-";
   const Descriptor file(isStandardInput ? -1 : ::open(path.c_str(), O_RDONLY | O_CLOEXEC));
-  const auto text = TextOf(isStandardInput ? STDIN_FILENO : file.get(), kLongestDocument);
-  if (text) return *text;
+  if (isStandardInput || file.valid()) {
+    const auto text = TextOf(isStandardInput ? STDIN_FILENO : file.get(), kLongestDocument);
+    if (text) return *text;
+  }
   const std::string shown = isStandardInput ? "the standard input" : program.output.Name(path);
   throw Failure(Exit::kFailed, "the document cannot be read from " + shown + ": " + std::strerror(errno),
                 "check the file");

@@ -27,11 +27,15 @@ std::uint32_t NumberOf(const std::string& address) {
   return ntohl(number.s_addr);
 }
 
-// Whether an address is a host's in its subnet: neither the network's nor the broadcast address.
+// Whether an address is a host's in its subnet: neither the network's nor the broadcast address, and none of a group's
+// or of the machine itself.
 bool IsHost(const std::string& ip, const std::string& mask) {
+  constexpr std::uint32_t kLoopback = 127;
+  constexpr std::uint32_t kFirstOfGroups = 224;
   const std::uint32_t others = ~NumberOf(mask);
   const std::uint32_t host = NumberOf(ip) & others;
-  return others <= 1 || (host != 0 && host != others);
+  const std::uint32_t first = NumberOf(ip) >> 24;
+  return first != 0 && first != kLoopback && first < kFirstOfGroups && (others <= 1 || (host != 0 && host != others));
 }
 
 bool IsInSubnet(const std::string& gateway, const std::string& ip, const std::string& mask) {
@@ -53,6 +57,12 @@ void RequireStatic(const Addressing& addressing) {
   if (!IsNetmask(addressing.mask)) {
     throw Wrong("this is no netmask: " + Harmless(addressing.mask, false), "give one such as 255.255.255.0");
   }
+}
+
+void RequireSound(const KnownNetwork& config) {
+  const Soundness soundness = SoundnessOf(config);
+  if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at --ip and --mask");
+  if (soundness == Soundness::kGatewayOutside) throw Wrong("the gateway is not in this subnet", "look at --gateway");
 }
 
 // The kernel's table begins with a line of titles; an address in it is a hexadecimal number in the byte order of
@@ -92,6 +102,7 @@ void SetAddressing(KnownNetwork& config, const Addressing& addressing) {
   SetText(config.szIp, isNone ? "" : isDhcp ? "DHCP" : addressing.ip, "the address");
   SetText(config.szMask, addressing.mask, "the netmask");
   SetText(config.szGateway, addressing.gateway, "the gateway");
+  RequireSound(config);
 }
 
 Soundness SoundnessOf(const KnownNetwork& config) {
@@ -101,12 +112,6 @@ Soundness SoundnessOf(const KnownNetwork& config) {
   if (!IsIpAddress(ip) || !IsNetmask(mask) || !IsHost(ip, mask)) return Soundness::kNoHost;
   if (gateway.empty() || (IsIpAddress(gateway) && IsInSubnet(gateway, ip, mask))) return Soundness::kSound;
   return Soundness::kGatewayOutside;
-}
-
-void RequireSound(const KnownNetwork& config) {
-  const Soundness soundness = SoundnessOf(config);
-  if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at --ip and --mask");
-  if (soundness == Soundness::kGatewayOutside) throw Wrong("the gateway is not in this subnet", "look at --gateway");
 }
 
 void RequireAddressing(const KnownNetwork& config) {

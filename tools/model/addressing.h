@@ -21,9 +21,6 @@ void SetAddressing(KnownNetwork& config, const Addressing& addressing);
 enum class Soundness { kSound, kNoHost, kGatewayOutside };
 Soundness SoundnessOf(const KnownNetwork& config);
 
-// Fails when an address that is to be saved is none that the network can have.
-void RequireSound(const KnownNetwork& config);
-
 // Fails when a network was saved with an address that it cannot have.
 void RequireAddressing(const KnownNetwork& config);
 

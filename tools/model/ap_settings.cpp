@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cctype>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <stdexcept>
@@ -112,6 +113,13 @@ void SetBridge(ApConf& conf, const std::string& text) {
   const bool plain = std::ranges::all_of(text, [](unsigned char c) { return std::isgraph(c) != 0 && c != '/'; });
   if (text.empty() || !plain || text == "." || text == "..")
     throw Wrong("this is no bridge's name", "such as " + std::string(kNatBridge));
+  if (text == kGuestBridge)
+    throw Wrong("this bridge is the guests'", "give another one, such as " + std::string(kNatBridge));
+  const std::filesystem::path interface = "/sys/class/net/" + text;
+  if (std::filesystem::exists(interface) && !std::filesystem::exists(interface / "bridge")) {
+    throw Wrong("there is an interface of this name, and it is no bridge",
+                "give a bridge, such as " + std::string(kNatBridge));
+  }
   SetText(conf.hostapConf.szBridge, text, "the bridge");
 }
 

@@ -65,6 +65,7 @@ int Unpack(const std::string& bytes, std::vector<Record>& records) {
 Failure ScanFailed() {
   if (MEROWirelessAdapterNum() <= 0) return NoAdapter();
   if (WasReported(Report::kInterfaceStaysDown)) {
+    RefuseWhileRadioIsOff();
     return Failed("the adapter's interface cannot be brought up", "plug the adapter out and in, and try again");
   }
   return Failed("the adapter gave no scan results", "try again with --renew; -v shows what the library reports");

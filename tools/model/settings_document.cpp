@@ -219,10 +219,7 @@ DocumentedNetwork NetworkIn(const Json& record, const std::string& place) {
       row->read(in, value);
     });
   }
-  At(Below(place, "ip"), [&] {
-    SetAddressing(network.network, in.addressing);
-    RequireSound(network.network);
-  });
+  At(Below(place, "ip"), [&] { SetAddressing(network.network, in.addressing); });
   At(place, [&] { RequireUsable(network.network); });
   return network;
 }
