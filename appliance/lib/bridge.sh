@@ -222,7 +222,7 @@ is_finished() {
 
 # is_running INTERFACE: whether its access point is on the air, with all that belongs to it.
 is_running() {
-	daemon_of hostapd "$hostapd_run-$1.pid" && is_finished "$1"
+	daemon_of hostapd "$hostapd_run-$1.pid" && is_finished "$1" && has_rules
 }
 
 # undo_killed_start INTERFACE BRIDGE: gives the wire back what it had before a start that was killed, since the next one

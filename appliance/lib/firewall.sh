@@ -40,6 +40,11 @@ clear_firewall() {
 	remove_files "$guest_rights" "$forwarding_before"
 }
 
+# has_rules: whether those that were set are there still. Who loads other rules may have removed all that there were.
+has_rules() {
+	[ ! -s "$forwarding_before" ] || nft list table inet mero_ap >/dev/null 2>&1
+}
+
 # rights_of_guests: prints what the settings let guests reach, or keep them from; nothing for a start without guests.
 rights_of_guests() {
 	[ -n "$guests" ] || return 0

@@ -87,9 +87,9 @@ TEST_F(KitCost, OfAnEndIsThirteenProcessesAndTheWaitForItsDaemons) {
   EXPECT_EQ(ProgramsOf("restart wlan0 lbr0"), "find flock rm rm nft rm mero-settings rm ip ip ip iw rm\n");
 }
 
-TEST_F(KitCost, OfAnHourWithoutAChangeIsThreeProcesses) {
+TEST_F(KitCost, OfAnHourWithoutAChangeIsFourProcesses) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
-  EXPECT_EQ(ProgramsOf("schedule wlan0"), "find flock mero-settings\n");
+  EXPECT_EQ(ProgramsOf("schedule wlan0"), "find flock nft mero-settings\n");
 }
 
 TEST_F(KitCost, OfABootIsTwoProcessesForEachBridge) {

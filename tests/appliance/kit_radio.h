@@ -21,7 +21,7 @@ class KitRadio : public Kit {
     StandIn("hostapd", Daemon("hostapd", "-P"));
     StandIn("hostapd_cli", "echo state=ENABLED\n");
     StandIn("dnsmasq", "for word; do case $word in --pid-file=*) file=${word#*=} ;; esac; done\n" + Launch("dnsmasq"));
-    StandIn("nft", "cat >/tmp/rules\n");
+    StandIn("nft", "[ \"$1\" != list ] || exec grep -qF 'mero_ap {' /tmp/rules\ncat >/tmp/rules\n");
     StandIn("iw", "");
     StandInForIp();
     RunInShell("echo phy0 >/tmp/phy; sed -i 's,/sys/class/net/$1/phy80211/name,/tmp/phy,' /usr/mero/lib/network/*.sh");

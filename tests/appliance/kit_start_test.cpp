@@ -313,6 +313,17 @@ TEST_F(KitAccessPoint, IsStartedUnlessItRunsWithAllThatBelongsToIt) {
   EXPECT_EQ(Daemons(), OnAir());
 }
 
+// A reload of another firewall left guests without rules, and nobody noticed.
+TEST_F(KitAccessPoint, GetsTheRulesBackThatSomebodyHasRemoved) {
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  for (const char* szWords : {"schedule wlan0", "ensure wlan0 lbr0"}) {
+    WriteText("/tmp/rules", "");
+    EXPECT_EQ(Script(szWords).out, "");
+    EXPECT_THAT(ReadText("/tmp/rules"), HasSubstr("table inet mero_ap {")) << szWords;
+    EXPECT_EQ(Daemons(), OnAir());
+  }
+}
+
 // Who asked while a start was under way made another one, which took the access point off the air at once.
 TEST_F(KitAccessPoint, IsStartedOnceByTwoWhoWantIt) {
   WriteText("/tmp/calls", "");
@@ -330,7 +341,7 @@ TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   WriteText("/etc/hostapd/hostapd-wlan0-guest.info", "enable=\"yes\"\n");
   WriteText("/etc/hostapd/hostapd-wlan0-guest.conf", "bss=gwlan\nbssid=\nssid=visitors\n");
-  BreakOnce("nft");
+  BreakOnce("nft", "-f");
   EXPECT_EQ(Script("schedule wlan0").out, "rc.network: cannot set the rules between networks: nft is broken\n");
   EXPECT_EQ(Daemons(), "");
   EXPECT_EQ(Script("schedule wlan0").out, "");
@@ -339,7 +350,7 @@ TEST_F(KitAccessPoint, IsStartedAgainInTheNextHourWhenItsScheduleFailed) {
 
   // An access point that is ended meanwhile stays off.
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
-  BreakOnce("nft");
+  BreakOnce("nft", "-f");
   EXPECT_EQ(Script("schedule wlan0").status, 1);
   EXPECT_EQ(Script("restart wlan0 lbr0").out, "");
   EXPECT_EQ(Script("schedule wlan0").out, "");
