@@ -72,7 +72,10 @@ constexpr Field<Found> kFoundFields[] = {
 
 Value AddressesOf(const SavedNetwork& of) {
   std::string addresses;
-  for (const Address& address : of.addresses) addresses += (addresses.empty() ? "" : " ") + AddressText(address);
+  for (const Address& address : of.addresses) {
+    if (!addresses.empty()) addresses += ' ';
+    addresses += AddressText(address);
+  }
   return addresses;
 }
 

@@ -43,7 +43,7 @@ std::string Escaped(std::string_view text) {
 
 // A text of hexadecimal digits alone would be taken for the bytes that they stand for, so it has quotes.
 std::string TextField(std::string_view text) {
-  return IsHexadecimal(text) ? "\"" + std::string(text) + "\"" : Escaped(text);
+  return IsHexadecimal(text) ? std::string(1, '"').append(text).append(1, '"') : Escaped(text);
 }
 
 // A WEP key and a key of WPA may be given as their bytes.

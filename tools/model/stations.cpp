@@ -106,7 +106,7 @@ std::string ShortText(std::int64_t bytes) {
     ++unit;
   }
   std::string text = std::to_string(bytes / kThousand);
-  if (bytes < 10 * kThousand) text += "." + std::to_string(bytes % kThousand / 100);
+  if (bytes < 10 * kThousand) text.append(1, '.').append(std::to_string(bytes % kThousand / 100));
   return text + kUnits[unit];
 }
 

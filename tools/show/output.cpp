@@ -172,7 +172,7 @@ std::string Beside(const std::string& value, std::size_t titles, std::size_t wid
   bool fits = true;
   for (std::string line; std::getline(lines, line);) fits = fits && WidthOf(line, utf8) <= width;
   if (fits) return wrapped.substr(column);
-  return "\n" + Wrapped(std::string(kIndent, ' ') + value, width, kIndent, utf8);
+  return std::string(1, '\n').append(Wrapped(std::string(kIndent, ' ') + value, width, kIndent, utf8));
 }
 
 }  // namespace
