@@ -21,6 +21,7 @@ struct Tally {
   int calls = 0;
   int commands = 0;
   int kills = 0;
+  int unmet = 0;  // faults that the call did not meet, since it took another way
 
   int done = 0;      // it has done its work all the same,
   int less = 0;      // or as much as its contract says,
