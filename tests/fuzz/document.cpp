@@ -1,5 +1,6 @@
 // The document of `merowireless import`: whatever the text is, it is refused in words that steer no terminal, or what
-// it holds can be saved, is read back as it was, and is written as a document that holds the same.
+// it holds can be saved, is read back as it was, and is written as a document that holds the same. What the program
+// keeps of a network beside the library, such as name servers, is not followed so far.
 //
 // Runs: 4000
 // Covers: tools/model/settings_document.cpp
