@@ -86,7 +86,7 @@ TEST_P(KitSweepOfAccessPoint, Restart) {
 TEST_P(KitSweepOfAccessPoint, Schedule) {
   Hour("00");
   Run(kStart);
-  BreakOnce("nft");
+  BreakOnce("nft", "-f");
   Hour("01");
   Run(kSchedule);
   const std::string late = State();

@@ -4,6 +4,7 @@
 namespace {
 
 using testing::HasSubstr;
+using testing::Not;
 using testing::StartsWith;
 
 class KitWire : public KitRadio {
@@ -80,6 +81,27 @@ TEST_F(KitWire, IsAsItWasBehindAStartThatWasKilled) {
     EXPECT_EQ(Ways(), before) << szWhere;
     EXPECT_EQ(Notes(), "") << szWhere;
   }
+}
+
+// The bridge went without it, also behind further starts.
+TEST_F(KitWire, GivesTheRouteInTheNextStartThatItCouldNotGiveInTheFirst) {
+  SetWire("yes");
+  BreakOnce("ip", "route add");
+  EXPECT_EQ(Script("start wlan0 br0").out,
+            "rc.network: cannot route over br0 as before, 'default via 192.0.2.1 metric 7': ip is broken\n");
+  EXPECT_THAT(Ways(), Not(HasSubstr("default")));
+  EXPECT_EQ(Script("start wlan0 br0").out, "");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep routes-").out, "");
+
+  // It is the wire's again when that leaves the bridge, and nothing is left to be tried.
+  ASSERT_EQ(Script("restart wlan0 br0").out, "");
+  RunInShell("ip link delete br0");
+  SetWire("no");
+  BreakOnce("ip", "route add");
+  EXPECT_EQ(Script("start wlan0 br0").status, 0);
+  EXPECT_EQ(Script("restart wlan0 br0").out, "");
+  EXPECT_EQ(RunInShell("ls /run/rc.network | grep routes-").out, "");
 }
 
 TEST_F(KitWire, MayBeGoneBehindAStartThatWasKilled) {

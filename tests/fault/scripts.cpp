@@ -43,6 +43,15 @@ constexpr char kPlugIn[] =
     "printf '#!/bin/sh\\ncase \"$*\" in *info) printf \"\\\\tSupported interface modes:\\\\n\\\\t\\\\t * AP\\\\n\" ;; "
     "esac\\n' >/tmp/bin/iw";
 
+// A bridge that takes over the address and the way out of its first member.
+constexpr char kWiredBridge[] =
+    "printf 'DEVICE=br0\\nTYPE=Bridge\\nPRIMARY=eth0\\nBOOTPROTO=static\\nIPADDR=192.0.2.9\\n"
+    "NETMASK=255.255.255.0\\nONBOOT=no\\n' >/etc/sysconfig/network-scripts/ifcfg-br0";
+constexpr char kWire[] =
+    "/etc/rc.network restart wlan0 br0; ip link delete br0; ip address flush dev eth0; "
+    "ip link set wire up; ip link set eth0 up; until grep -qx up /sys/class/net/eth0/operstate; do sleep 0.02; done; "
+    "ip address add 192.0.2.9/24 dev eth0; ip route replace default via 192.0.2.1 metric 7";
+
 constexpr char kInstallLease[] = "cp " APPLIANCE_KIT
                                  "/sbin/udhcpc.lease /usr/mero/sbin/udhcpc.lease; ip link set wlan0 up; "
                                  "echo 'nameserver 192.0.2.2' >/etc/resolv.conf";
@@ -51,6 +60,7 @@ const std::vector<KitScript>& AllScripts() {
   static const std::string hotPlug = kHotPlug;
   static const std::vector<KitScript> all = {
       {"rc.network start", "", kRestart, kStart},
+      {"rc.network start with a wire", kWiredBridge, kWire, "/etc/rc.network start wlan0 br0"},
       {"rc.network restart", "", kStart, kRestart},
       {"rc.network schedule", "", std::string("echo 00 >/tmp/hour; ") + kStart + "; echo 01 >/tmp/hour",
        "/etc/rc.network schedule wlan0"},
