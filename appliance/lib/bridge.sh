@@ -118,24 +118,20 @@ plan_member() { # INTERFACE BRIDGE
 	plan "cannot bring $1 up" "link set dev $1 up"
 }
 
-# move_routes BRIDGE TEXT: gives the bridge the default routes that its first member had, a line each, and those that it
-# could not be given before. A bridge of another subnet cannot have them; otherwise the next start tries again.
+# move_routes BRIDGE TEXT: gives the bridge the default routes that its first member had, a line each. A bridge of another
+# subnet cannot have them.
 move_routes() {
-	kept=''
-	[ ! -s "$state/routes-$1" ] || kept=$(cat "$state/routes-$1") || cannot_read "$state/routes-$1"
-	unmoved=''
 	while read -r line; do
 		[ -n "$line" ] || continue
 		# shellcheck disable=SC2086  # words
-		said=$(ip -4 route add $line dev "$1" 2>&1) || {
-			warn "cannot route over $1 as before, '$line': $said"
-			unmoved=$unmoved$line$newline
-		}
+		said=$(ip -4 route add $line dev "$1" 2>&1) && continue
+		case $said in
+		*gateway* | *unreachable*) warn "cannot route over $1 as before, '$line': $said" ;;
+		*) fail "cannot route over $1 as before, '$line': $said" ;;
+		esac
 	done <<-END
-		$kept
 		$2
 	END
-	if [ -n "$unmoved" ]; then note "$state/routes-$1" "${unmoved%"$newline"}"; else remove_files "$state/routes-$1"; fi
 }
 
 # note_wire INTERFACE BRIDGE: notes the addresses, the routes and the lease of an interface before it becomes the first
@@ -297,7 +293,6 @@ has_members() { # BRIDGE
 
 remove_bridge() { # BRIDGE
 	end_lease "$1"
-	remove_files "$state/routes-$1"
 	[ -e "/sys/class/net/$1/bridge" ] || return 0
 	attempt "cannot remove the bridge $1" ip link delete dev "$1" type bridge
 }
