@@ -206,6 +206,7 @@ TEST_F(Messages, TellOfAnAccessPointWhyItIsNotSetSo) {
       {{"--encryption", "eap", "--auth-server-addr", "there"}, "the RADIUS server's address is none"},
       {{"--bridge", "../x"}, "this is no bridge's name"},
       {{"--bridge", "gbr"}, "this bridge is the guests'"},
+      {{"--bridge", std::string(300, 'x')}, "the bridge cannot be used"},
       {{"--bridge", "lo"}, "there is an interface of this name, and it is no bridge"},
       {{"--wifi-sched", "/no/such/file"}, "the schedule cannot be read from /no/such/file"},
       {{"--wifi-sched", kWeek}, "the schedule is not 168 hours"},

@@ -109,18 +109,20 @@ void SetRadiusPort(ApConf& conf, const std::string& text) {
 
 // ---- Bridges and schedules ----
 
+// A bridge that is not there yet is made.
+bool IsNoBridge(const char* szInterface) {
+  const std::filesystem::path interface = std::filesystem::path("/sys/class/net") / szInterface;
+  return std::filesystem::exists(interface) && !std::filesystem::exists(interface / "bridge");
+}
+
 void SetBridge(ApConf& conf, const std::string& text) {
+  const std::string advice = "such as " + std::string(kNatBridge);
   const bool plain = std::ranges::all_of(text, [](unsigned char c) { return std::isgraph(c) != 0 && c != '/'; });
-  if (text.empty() || !plain || text == "." || text == "..")
-    throw Wrong("this is no bridge's name", "such as " + std::string(kNatBridge));
-  if (text == kGuestBridge)
-    throw Wrong("this bridge is the guests'", "give another one, such as " + std::string(kNatBridge));
-  const std::filesystem::path interface = "/sys/class/net/" + text;
-  if (std::filesystem::exists(interface) && !std::filesystem::exists(interface / "bridge")) {
-    throw Wrong("there is an interface of this name, and it is no bridge",
-                "give a bridge, such as " + std::string(kNatBridge));
-  }
+  if (text.empty() || !plain || text == "." || text == "..") throw Wrong("this is no bridge's name", advice);
+  if (text == kGuestBridge) throw Wrong("this bridge is the guests'", "give another one, " + advice);
   SetText(conf.hostapConf.szBridge, text, "the bridge");
+  if (!IsNoBridge(conf.hostapConf.szBridge)) return;
+  throw Wrong("there is an interface of this name, and it is no bridge", "give a bridge, " + advice);
 }
 
 // The hours of a week as 168 zeros and ones.
