@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <iterator>
 #include <sstream>
+#include <tuple>
 
 #include "base/text.h"
 #include "common/paths.h"
@@ -217,17 +218,17 @@ TEST_F(AccessPoint, IsNotEnabledAsNobodyHasSetIt) {
 }
 
 TEST_F(AccessPoint, ThatCannotBeEnabledSaysWhy) {
-  const std::pair<const char*, const char*> reports[] = {
-      {"Another ap construction is going", "is being set up already"},
-      {"Failed to restart /etc/rc.network", "the network start script failed"},
-      {"Failed to enable AP.", "could not be enabled"},
+  const std::tuple<const char*, int, const char*> reports[] = {
+      {"Another ap construction is going", 8, "is being set up already"},
+      {"Failed to restart /etc/rc.network", 1, "the network start script failed"},
+      {"Failed to enable AP.", 1, "could not be enabled"},
   };
-  for (const auto& [szReport, szSentence] : reports) {
+  for (const auto& [szReport, status, szSentence] : reports) {
     library::MEROWirelessAPEnable = [szText = szReport] {
       return library::Report("wireless_ap_enable", szText), FALSE;
     };
     const Ran ran = Tool({"ap", "enable"});
-    EXPECT_EQ(ran.status, 1);
+    EXPECT_EQ(ran.status, status);
     EXPECT_THAT(ran.err, HasSubstr(szSentence));
   }
 }
@@ -248,7 +249,7 @@ TEST_F(AccessPoint, ThatAnotherSetsUpIsLeftToIt) {
   library::MEROWirelessAPEnable = [] {
     return library::Report("wireless_ap_enable", "Another ap construction is going"), FALSE;
   };
-  EXPECT_EQ(Tool({"ap", "enable"}).status, 1);
+  EXPECT_EQ(Tool({"ap", "enable"}).status, 8);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable"));
 }
 
@@ -488,7 +489,9 @@ TEST_F(AccessPoint, IsEnabledAfterAnAttemptThatWasKilled) {
 // The library would have taken the marker of whoever was at it.
 TEST_F(AccessPoint, ThatSomebodySetsUpIsNotTouched) {
   WriteText(kApMarkerPath, "");
-  EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("merowireless: an access point is being set up already, or "));
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 8);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: an access point is being set up already, or "));
   EXPECT_TRUE(Exists(kApMarkerPath));
   EXPECT_THAT(library::Calls(), IsEmpty());
 }

@@ -110,6 +110,28 @@ TEST_F(FormerConnection, ThatNobodyKnowsCannotBeBroughtBack) {
   EXPECT_THAT(Tool({"connect", "Office"}).err, HasSubstr("could not be brought back\n"));
 }
 
+// The adapter was a client's without a network afterwards, and nothing told of that.
+TEST_F(FormerConnection, IsBackAfterAnAccessPointThatFailed) {
+  library::SavedAp(library::Office());
+  library::MEROWirelessAPEnable = [] { return FALSE; };
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.err, std::string(kBack) +
+                         "merowireless: the access point could not be enabled: -v shows what the library reports\n");
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable",
+                                            "MEROWirelessSetAPConfig", "MEROWirelessAPDisable",
+                                            "MEROWirelessNetworkDisconnect", "MEROWirelessNetworkConnect", kHomeTold));
+}
+
+TEST_F(FormerConnection, IsLeftToWhoeverSetsUpAnAccessPoint) {
+  library::SavedAp(library::Office());
+  library::MEROWirelessAPEnable = [] {
+    return library::Report("wireless_ap_enable", "Another ap construction is going"), FALSE;
+  };
+  EXPECT_EQ(Tool({"ap", "enable"}).status, 8);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable"));
+}
+
 TEST_F(FormerConnection, IsMissedByNobodyWhereThereWasNone) {
   library::MEROWirelessConnStatusGet = [] { return WIRELESS_STATUS_DISCONNECTED; };
   const Ran ran = Tool({"connect", "Office"});

@@ -13,6 +13,7 @@
 #include "model/ap_saving.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
+#include "model/former_connection.h"
 #include "model/join_lock.h"
 #include "model/library.h"
 #include "model/library_lines.h"
@@ -99,7 +100,8 @@ bool IsAnothers() {
 }
 
 Failure Anothers() {
-  return Failed("an access point is being set up already, or an attempt was cut off", "wait a moment and try again");
+  return {Exit::kBusy, "an access point is being set up already, or an attempt was cut off",
+          "wait a moment and try again"};
 }
 
 // The access point that there was is on the air again, or there was none.
@@ -124,6 +126,22 @@ void TakeBack(const Program& program, const ApConf& conf, const std::optional<Fo
   if (back && ReadApStatus(conf).isRunning()) return;
   Disable(program, conf);
   throw Failed("the access point that was on the air could not be brought back, and is disabled");
+}
+
+void PutOnAir(const Program& program, const ApConf& conf) {
+  const ApStatus before = ReadApStatus(conf);
+  std::optional<FormerAp> former;
+  if (before.isRunning()) former.emplace(before.interface, conf.hostapConf.szBridge);
+
+  Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
+  task.szMarker = kApMarkerPath;
+  task.undo = [&] { TakeBack(program, conf, former); };
+  const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
+  if (start == Start::kNotSaved) throw ApNotSaved();
+  if (start == Start::kFailed) {
+    if (!IsAnothers()) Undo(task);
+    throw EnableFailed(former && ReadApStatus(conf).isRunning());
+  }
 }
 
 // A process that was killed leaves its marker behind, and the library would refuse the next attempt.
@@ -177,18 +195,11 @@ void EnableAp(const Program& program) {
   RefuseWhileRadioIsOff();
   (void)CheckChannel(conf);  // what nobody can tell beforehand, the attempt shows
   RequireNobodyAtIt();
-  const ApStatus before = ReadApStatus(conf);
-  std::optional<FormerAp> former;
-  if (before.isRunning()) former.emplace(before.interface, conf.hostapConf.szBridge);
-
-  Task task = program.Doing("setting up " + program.output.Name(conf.hostapConf.szSSID));
-  task.szMarker = kApMarkerPath;
-  task.undo = [&] { TakeBack(program, conf, former); };
-  const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
-  if (start == Start::kNotSaved) throw ApNotSaved();
-  if (start == Start::kFailed) {
-    if (!IsAnothers()) Undo(task);
-    throw EnableFailed(former && ReadApStatus(conf).isRunning());
+  const FormerConnection client(program);
+  if (client.exists()) {
+    client.Try([&] { PutOnAir(program, conf); });
+  } else {
+    PutOnAir(program, conf);
   }
   SayEnabled(program, ReadApSettings());
 }

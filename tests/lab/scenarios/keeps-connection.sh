@@ -90,9 +90,18 @@ expect_station shy nas
 on nas merowireless disconnect
 expect_nothing_left nas
 
-say '-- an access point stays on the air'
+say '-- an access point that cannot be put on the air'
 plug_in nas
-on nas merowireless ap set --ssid office --encryption wpa2 --key-file /var/lib/home.key --channel 11
+on nas merowireless connect home
+kept=$(state)
+on nas merowireless ap set --ssid office --encryption open --channel 11 --bridge br0
+ends_with nas 1 ap enable
+expect_back
+expect_home
+on nas merowireless disconnect
+
+say '-- an access point stays on the air'
+on nas merowireless ap set --ssid office --encryption wpa2 --key-file /var/lib/home.key --channel 11 --bridge lbr0
 on nas merowireless ap enable
 processes=$(processes_of nas)
 refuses() {
