@@ -100,6 +100,18 @@ TEST_F(Addresses, ThatAreNoneAreNotTried) {
   EXPECT_THAT(library::Calls(), IsEmpty());
 }
 
+// The bridge of an access point has the addresses. One on the interface would keep the bridge from being reached.
+TEST_F(Addresses, OfAnAccessPointAreItsBridges) {
+  kernel::BecomeAccessPoint("Office");
+  for (const std::vector<std::string>& arguments :
+       {std::vector<std::string>{"address", "DHCP"}, std::vector<std::string>{"gateway", "10.0.0.1"}}) {
+    const Ran ran = Tool(arguments);
+    EXPECT_EQ(ran.status, 8);
+    EXPECT_THAT(ran.err, HasSubstr("the adapter is an access point, whose addresses are its bridge's"));
+  }
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
 // The library reports no command that the kernel refuses.
 TEST_F(Addresses, OfGatewaysThatCannotBeReachedAreAFailure) {
   const Ran ran = Tool({"gateway", "203.0.113.1"});

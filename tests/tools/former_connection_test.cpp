@@ -323,6 +323,8 @@ TEST_F(KnownBeforehand, IsAnAddressThatNoHostCanHave) {
   std::strcpy(office.szIp, "10.0.0.9");
   std::strcpy(office.szGateway, "10.0.1.1");
   Expect(office, 1, "the network was saved with a gateway that is not in its subnet");
+  std::strcpy(office.szGateway, "10.0.0.9");
+  Expect(office, 1, "the network was saved with its own address as its gateway");
 }
 
 }  // namespace

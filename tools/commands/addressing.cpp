@@ -2,9 +2,21 @@
 #include "commands/addressing.h"
 
 #include "base/text.h"
+#include "model/ap_state.h"
 #include "model/join_lock.h"
 #include "model/network_extras.h"
 #include "model/status.h"
+
+namespace {
+
+// In the bridge of an access point, an address of the interface's own would only keep the bridge from being reached.
+void RequireClient() {
+  if (!IsAccessPoints()) return;
+  throw Failure(Exit::kBusy, "the adapter is an access point, whose addresses are its bridge's",
+                "the bridge's network-script file has them");
+}
+
+}  // namespace
 
 void SetAddress(const Program& program, const Addressing& addressing) {
   if (IsWord(addressing.ip, "none"))
@@ -13,6 +25,7 @@ void SetAddress(const Program& program, const Addressing& addressing) {
   SetAddressing(config, addressing);
   RequireAdapter();
   const JoinLock lock(JoinLockFor::kAddressing);
+  RequireClient();
   ApplyAddress(SettingAddress(program, config), config);
   if (const auto known = FindKnown(ReadStatus().name)) ApplyNameServers(*known);
   const Status status = ReadStatus();
@@ -24,6 +37,7 @@ void SetGateway(const Program& program, const std::string& gateway) {
   RequireGateway(gateway);
   RequireAdapter();
   const JoinLock lock(JoinLockFor::kAddressing);
+  RequireClient();
   ApplyGateway(gateway);
   program.output.Done("the gateway is " + gateway);
 }

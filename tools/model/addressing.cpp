@@ -63,6 +63,7 @@ void RequireSound(const KnownNetwork& config) {
   const Soundness soundness = SoundnessOf(config);
   if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at --ip and --mask");
   if (soundness == Soundness::kGatewayOutside) throw Wrong("the gateway is not in this subnet", "look at --gateway");
+  if (soundness == Soundness::kOwnGateway) throw Wrong("the gateway is the address itself", "look at --gateway");
 }
 
 // The kernel's table begins with a line of titles; an address in it is a hexadecimal number in the byte order of
@@ -110,8 +111,9 @@ Soundness SoundnessOf(const KnownNetwork& config) {
       std::tuple<std::string, std::string, std::string>(config.szIp, config.szMask, config.szGateway);
   if (ip.empty() || IsDhcp(config)) return Soundness::kSound;
   if (!IsIpAddress(ip) || !IsNetmask(mask) || !IsHost(ip, mask)) return Soundness::kNoHost;
-  if (gateway.empty() || (IsIpAddress(gateway) && IsInSubnet(gateway, ip, mask))) return Soundness::kSound;
-  return Soundness::kGatewayOutside;
+  if (gateway.empty()) return Soundness::kSound;
+  if (!IsIpAddress(gateway) || !IsInSubnet(gateway, ip, mask)) return Soundness::kGatewayOutside;
+  return NumberOf(gateway) == NumberOf(ip) ? Soundness::kOwnGateway : Soundness::kSound;
 }
 
 void RequireAddressing(const KnownNetwork& config) {
@@ -123,6 +125,8 @@ void RequireAddressing(const KnownNetwork& config) {
       throw Failed("the network was saved with an address that no host can have", advice);
     case Soundness::kGatewayOutside:
       throw Failed("the network was saved with a gateway that is not in its subnet", advice);
+    case Soundness::kOwnGateway:
+      throw Failed("the network was saved with its own address as its gateway", advice);
   }
 }
 
