@@ -31,6 +31,7 @@ struct KitScript {
   std::string bring;
   std::string words;
   std::string left = "";  // how a new file begins that a kill leaves: its name cannot be foreseen, nobody looks for it
+  std::string kept = "";  // a note that a run leaves to the next one when it fails
 };
 
 // An adapter whose device and radio are files, as there is no radio.
@@ -63,7 +64,7 @@ const std::vector<KitScript>& AllScripts() {
       {"rc.network start with a wire", kWiredBridge, kWire, "/etc/rc.network start wlan0 br0"},
       {"rc.network restart", "", kStart, kRestart},
       {"rc.network schedule", "", std::string("echo 00 >/tmp/hour; ") + kStart + "; echo 01 >/tmp/hour",
-       "/etc/rc.network schedule wlan0"},
+       "/etc/rc.network schedule wlan0", "", "/run/rc.network/late-wlan0"},
       {"rc.network boot",
        "printf "
        "'TYPE=Bridge\\nPRIMARY=eth0\\nBOOTPROTO=static\\nIPADDR=192.0.2.1\\nNETMASK=255.255.255.0\\nONBOOT=yes\\n' "
@@ -171,8 +172,18 @@ class ScriptTrial : public CountedKit {
     }
     const std::set<std::string> left = Leftovers();
     if (!left.empty()) ++tally_.left;
+    if (what != Turn::kKills) CheckNothingLeft(fault, left, ran.status != 0);
     const bool wasRunAgain = CheckAgain(fault, state);
     CheckLeftovers(fault, what == Turn::kKills, wasRunAgain);
+  }
+
+  // A run that comes to its end leaves nothing that the next one would have to remove, if it can remove anything.
+  void CheckNothingLeft(const std::string& fault, const std::set<std::string>& left, bool hasFailed) {
+    if (fault == "rm is missing") return;
+    for (const std::string& path : left) {
+      if (hasFailed && path == script_.kept) continue;
+      Lose(fault, path + " was left over by a run that was not killed");
+    }
   }
 
   // One more run makes everything good: it is made once for each state that it meets. False where it was made before.
