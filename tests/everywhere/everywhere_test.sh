@@ -20,6 +20,7 @@ safe  trixie    amd64  clang,clang++  -    asan
 arm   bookworm  armhf  arm-linux-gnueabihf-gcc,arm-linux-gnueabihf-g++  -  unit
 END
 printf 'any cmake\nany g++\namd64 lintian\n' >work/packages
+echo abcdef0 >work/sources
 
 # A system is a directory.
 cat >tests/support/debian.sh <<'END'
@@ -62,9 +63,9 @@ export PATH=$house/bin:$PATH CALLS=$house/calls SAYS=$house/says
 
 everywhere() { tests/everywhere/everywhere "$house/work" "$@" >out 2>said; }
 
-# The lines of a row, without its words, the seconds and the day.
+# The lines of a row, without its words, the seconds, the day and the commit.
 lines() { # FILE ROW
-  grep "^$2"$'\t' "$1" | cut -f 1,6- | sed -E 's/\t[0-9]+\t([^\t]*)\t[-0-9]+$/\t\1/'
+  grep "^$2"$'\t' "$1" | cut -f 1,6- | sed -E 's/\t[0-9]+\t([^\t]*)\t[-0-9]+\tabcdef0$/\t\1/'
 }
 
 fails() {

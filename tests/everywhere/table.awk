@@ -1,6 +1,6 @@
 # What was seen of the rows, as a table in Markdown: of the rows, as `rows` has them, and of lines with tabs between
 #
-#   row  suite  processor  compilers  options  level  passed  failed  skipped  seconds  notes  day
+#   row  suite  processor  compilers  options  level  passed  failed  skipped  seconds  notes  day  sources
 #
 # in any order, with the words that the row had when it was run. Notes are what failed and what was skipped, with a bar
 # between two; under the table, each stands once.
@@ -38,15 +38,15 @@ function told(figure, texts, kind,    n, i, text, numbers) {
 }
 
 END {
-	print "| row | system | processor | compiler | level | passed | failed | skipped | s | day |"
-	print "| --- | --- | --- | --- | --- | --- | --- | --- | --- | --- |"
+	print "| row | system | processor | compiler | level | passed | failed | skipped | s | day | commit |"
+	print "| --- | --- | --- | --- | --- | --- | --- | --- | --- | --- | --- |"
 	for (r = 1; r <= count; r++) {
 		name = names[r]
-		if (!lines[name]) printf "| %s | %s | not run yet | - | - | - | - | - |\n", name, where[name]
+		if (!lines[name]) printf "| %s | %s | not run yet | - | - | - | - | - | - |\n", name, where[name]
 		for (l = 1; l <= lines[name]; l++) {
 			split(line[name, l], f, "\t")
-			printf "| %s | %s | %s | %d | %s | %s | %d | %s |\n", name, told_of(f[2], f[3], f[4], f[5]), f[6], f[7],
-				told(f[8], f[11], "failed"), told(f[9], f[11], "skipped"), f[10], f[12]
+			printf "| %s | %s | %s | %d | %s | %s | %d | %s | %s |\n", name, told_of(f[2], f[3], f[4], f[5]), f[6], f[7],
+				told(f[8], f[11], "failed"), told(f[9], f[11], "skipped"), f[10], f[12], f[13]
 		}
 	}
 	if (note_count) printf "\n"

@@ -14,18 +14,18 @@ new trixie amd64 clang,clang++ -O3 unit
 next trixie arm64 gcc,g++ - unit
 END
 {
-	printf 'new\ttrixie\tamd64\tclang,clang++\t-O3\tunit\t10\t1\t2\t33\tfailed: unit.A.B|skipped: unit.C.D: there is no air\t2026-01-02\n'
-	printf 'old\tbookworm\ti386\tgcc,g++\t-\tbuild\t1\t0\t0\t200\t\t2026-01-01\n'
-	printf 'old\tbookworm\ti386\tgcc,g++\t-\tunit\t12\t0\t1\t40\tskipped: unit.C.D: there is no air\t2026-01-01\n'
+	printf 'new\ttrixie\tamd64\tclang,clang++\t-O3\tunit\t10\t1\t2\t33\tfailed: unit.A.B|skipped: unit.C.D: there is no air\t2026-01-02\tabcdef0+\n'
+	printf 'old\tbookworm\ti386\tgcc,g++\t-\tbuild\t1\t0\t0\t200\t\t2026-01-01\tabcdef0\n'
+	printf 'old\tbookworm\ti386\tgcc,g++\t-\tunit\t12\t0\t1\t40\tskipped: unit.C.D: there is no air\t2026-01-01\tabcdef0\n'
 } >"$work/results"
 
 cat >"$work/expected" <<'END'
-| row | system | processor | compiler | level | passed | failed | skipped | s | day |
-| --- | --- | --- | --- | --- | --- | --- | --- | --- | --- |
-| old | Debian 12 | i386 | gcc | build | 1 | 0 | 0 | 200 | 2026-01-01 |
-| old | Debian 12 | i386 | gcc | unit | 12 | 0 | 1 (1) | 40 | 2026-01-01 |
-| new | Debian 13 | amd64 | clang -O3 | unit | 10 | **1** (2) | 2 (1) | 33 | 2026-01-02 |
-| next | Debian 13 | arm64 | gcc | not run yet | - | - | - | - | - |
+| row | system | processor | compiler | level | passed | failed | skipped | s | day | commit |
+| --- | --- | --- | --- | --- | --- | --- | --- | --- | --- | --- |
+| old | Debian 12 | i386 | gcc | build | 1 | 0 | 0 | 200 | 2026-01-01 | abcdef0 |
+| old | Debian 12 | i386 | gcc | unit | 12 | 0 | 1 (1) | 40 | 2026-01-01 | abcdef0 |
+| new | Debian 13 | amd64 | clang -O3 | unit | 10 | **1** (2) | 2 (1) | 33 | 2026-01-02 | abcdef0+ |
+| next | Debian 13 | arm64 | gcc | not run yet | - | - | - | - | - | - |
 
 1. unit.C.D: there is no air
 2. unit.A.B

@@ -80,6 +80,8 @@ expect_calls() { lines "$@" | diff - calls; }
 
 expect_packages() { lines "$@" | sort | diff - <(sort -u packages); }
 
+expect_sources() { diff - build/everywhere/sources <<<"$1"; }
+
 # What the packages are built with, and a compiler, which who makes packages has anyway.
 build_packages() {
   echo g++
@@ -212,6 +214,18 @@ case $1 in
     grep -qx 'amd64 qemu' build/everywhere/packages
     grep -qx 'lib/unit.cpp' build/everywhere/files
     [[ $(grep -c '^build/' build/everywhere/files) -eq 0 ]]
+    expect_sources '-+'
+    git add run && git -c user.name=me -c user.email=me@example.org commit --quiet -m 'A first one'
+    commit=$(git rev-parse --short=7 HEAD)
+    run everywhere new
+    expect_sources "$commit+"
+    echo 'What grows here is not of the sources.' >.git/info/exclude && echo '*' >>.git/info/exclude
+    run everywhere new
+    expect_sources "$commit"
+    touch tests/everywhere/seen.tsv && git add -f tests/everywhere/seen.tsv
+    run everywhere new
+    expect_sources "$commit"
+    : >calls
     # Two at a time had the same systems, sources and results.
     if (flock 9 && run everywhere) 9>build/everywhere/lock; then exit 1; fi
     expect_calls
