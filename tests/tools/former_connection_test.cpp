@@ -311,6 +311,28 @@ TEST_F(KnownBeforehand, IsASecretThatCanBeNone) {
   Expect(office, 5, "the secret that was saved for Office can be none");
 }
 
+// The supplicant was told of another name or secret: what stood before the '#'.
+TEST_F(KnownBeforehand, IsATextOfWhichTheSupplicantWouldReadABeginning) {
+  WIRELESS_NETWORK_CONFIG office = Office();
+  for (const char* szText : {"a \"quoted #1", "\"\"\"# and more"}) {
+    std::strcpy(office.szKey, szText);
+    Expect(office, 10, "the supplicant would take the end of the secret of Office for a comment");
+  }
+  office = Office();
+  std::strcpy(office.network.szEssid, "5\" #2");
+  library::InRange({office.network});
+  Expect(office, 10, "the supplicant would take the end of the name 5\" #2 for a comment", "5\" #2");
+}
+
+TEST_F(FormerConnection, GivesWayToANetworkWhoseTextsTheSupplicantReadsToTheirEnds) {
+  WIRELESS_NETWORK_CONFIG office = Office();
+  for (const char* szText : {"number #1", "a \"quoted\" #1", "#1 of \"all"}) {
+    std::strcpy(office.szKey, szText);
+    library::Known({library::Home(), office});
+    EXPECT_EQ(Tool({"connect", "Office"}).status, 9) << szText;
+  }
+}
+
 TEST_F(KnownBeforehand, IsAnAddressThatNoHostCanHave) {
   WIRELESS_NETWORK_CONFIG office = Office();
   for (const auto& [szIp, szMask] :

@@ -57,6 +57,7 @@ Target ToBeJoined(const Program& program, const NetworkToJoin& wanted) {
   RequireFreeAdapterNow();
   Target target = TargetOf(program, wanted);
   RequireSavedSecret(program, target.config);
+  RequireTellable(program, target.config);
   if (!wanted.noAddress) RequireAddressing(target.config);
   return target;
 }

@@ -2,6 +2,7 @@
 #include "model/join_failures.h"
 
 #include <optional>
+#include <string_view>
 
 #include "model/library.h"
 #include "model/library_lines.h"
@@ -42,6 +43,21 @@ std::optional<Failure> Refused(const std::string& name, Verdict verdict) {
   return std::nullopt;
 }
 
+// Whether the supplicant takes the end of a text, which stands between quotation marks, for a comment.
+bool IsCutShort(std::string_view text) {
+  bool isQuoted = true;
+  for (const char c : text) {
+    if (c == '"') isQuoted = !isQuoted;
+    if (c == '#' && !isQuoted) return true;
+  }
+  return false;
+}
+
+Failure NotTellable(const std::string& what) {
+  return {Exit::kUnsupported, "the supplicant would take the end of " + what + " for a comment",
+          "it can be told of no \" that stands alone before a #; the access point needs another one"};
+}
+
 }  // namespace
 
 Failure Unsupported(const std::string& name) {
@@ -58,6 +74,14 @@ Failure Unsupported(const Program& program, const Network& accessPoint) {
 
 void RequireJoinable(const Program& program, const Network& network) {
   if (!CanBeJoined(network)) throw Unsupported(program, network);
+}
+
+void RequireTellable(const Program& program, const KnownNetwork& config) {
+  if (config.network.opmode == WIRELESS_OPMODE_ADHOC) return;  // the supplicant is not told
+  const std::string name = program.output.Name(config.network.szEssid);
+  if (IsCutShort(config.network.szEssid)) throw NotTellable("the name " + name);
+  if (IsCutShort(config.szKey)) throw NotTellable("the secret of " + name);
+  if (IsCutShort(config.szUser)) throw NotTellable("the user of " + name);
 }
 
 Failure JoinFailed(const std::string& name, Verdict verdict) {

@@ -21,6 +21,10 @@ Failure Unsupported(const Program& program, const Network& accessPoint);
 // Fails when an access point, or a network as it was saved, cannot be joined whatever its secret.
 void RequireJoinable(const Program& program, const Network& network);
 
+// Fails when the supplicant cannot be told of a network: in its settings a '#' behind an odd number of '"' begins a
+// comment, and the text before it, which is left, is another network's name or secret.
+void RequireTellable(const Program& program, const KnownNetwork& config);
+
 // Why an attempt of the library failed, by its reports and by what the supplicant said.
 Failure JoinFailed(const std::string& name, Verdict verdict);
 

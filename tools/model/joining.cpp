@@ -61,6 +61,7 @@ void EndFormerSupplicant(const Program& program) {
 
 // Once the supplicant has refused the secret for good, the library would only wait until its time is over.
 void Join(const Program& program, const KnownNetwork& config) {
+  RequireTellable(program, config);
   const std::string name = program.output.Name(config.network.szEssid);
   EndFormerSupplicant(program);
   SupplicantListener listener(SupplicantSocket(), [&] { SpareScan(config); });
