@@ -320,9 +320,47 @@ TEST_F(AccessPoint, WhoseChangeIsInterruptedHasItsSwitchAsItWas) {
 
 TEST_F(AccessPoint, ThatTheKernelDoesNotHaveAfterwardsWasNotEnabled) {
   library::MEROWirelessAPEnable = [] { return TRUE; };
+  RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
   const Ran ran = Tool({"ap", "enable"});
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point Office was started, and is not on the air: "));
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point was started, and did not come on the air: "));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable",
+                                            "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
+}
+
+// It was left on the air, and told to be disabled.
+TEST_F(AccessPoint, ThatCannotBeTakenBackIsToldToBeOnTheAir) {
+  library::MEROWirelessAPEnable = [] {
+    kernel::BecomeAccessPoint("Office");
+    return library::Report("wireless_ap_enable", "Failed to restart /etc/rc.network"), FALSE;
+  };
+  library::MEROWirelessAPDisable = [] { return FALSE; };
+  const Ran ran = Tool({"ap", "enable"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, HasSubstr("the access point could not be enabled, and an access point is left on the air: "));
+}
+
+TEST_F(AccessPoint, WhoseSwitchCannotBeSavedIsTakenDownAllTheSame) {
+  library::MEROWirelessAPEnable = [] { return FALSE; };
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF conf) { return conf->blEnable; };
+  EXPECT_THAT(Tool({"ap", "enable"}).err, HasSubstr("merowireless: the settings could not be saved\n"));
+  EXPECT_EQ(library::Calls().back(), "MEROWirelessAPDisable");
+  EXPECT_EQ(Tool({"ap", "disable"}).status, 1);
+  EXPECT_EQ(library::Calls().back(), "MEROWirelessAPDisable");
+}
+
+// Nobody can tell any more whose the settings are: what was begun was left as it was.
+TEST_F(AccessPoint, WhoseAdapterIsPulledMeanwhileIsTakenBack) {
+  static constexpr char kPulled[] = "/tmp/pulled";
+  library::MEROWirelessAPEnable = [] { return WriteText(kPulled, ""), FALSE; };
+  library::MEROWirelessApConfigSecNameGet = [known = library::MEROWirelessApConfigSecNameGet](char* szName,
+                                                                                              size_t size) {
+    return Exists(kPulled) ? FALSE : known(szName, size);
+  };
+  EXPECT_EQ(Tool({"ap", "enable"}).status, 1);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable",
+                                            "MEROWirelessSetAPConfig", "MEROWirelessAPDisable"));
+  std::filesystem::remove(kPulled);
 }
 
 TEST_F(AccessPoint, ThatTheKernelHasAfterwardsWasNotDisabled) {

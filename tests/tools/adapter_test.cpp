@@ -320,10 +320,12 @@ TEST_F(RadioSwitch, ThatCannotBeSavedAsOnStaysOff) {
 }
 
 TEST_F(RadioSwitch, ThatAHandHasMovedIsNotSwitchedOn) {
+  WriteText(std::string(kSwitch) + "soft", "1");
   WriteText(std::string(kSwitch) + "hard", "1");
   const Ran ran = Tool({"radio", "on"});
   EXPECT_EQ(ran.status, 6);
   EXPECT_THAT(ran.err, HasSubstr("merowireless: a switch of the hardware has the radio blocked: "));
+  EXPECT_EQ(Soft(), "1") << "or the radio would be on when the hand moves it, whatever the settings say";
 }
 
 TEST_F(RadioSwitch, OfTheKernelKeepsWhatNeedsTheRadioFromBeingBegun) {

@@ -1,7 +1,9 @@
 // address, gateway, and how a joined network is addressed.
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 
+#include "common/paths.h"
 #include "running.h"
 
 using library::Network;
@@ -109,6 +111,10 @@ TEST_F(Addresses, OfAnAccessPointAreItsBridges) {
     EXPECT_EQ(ran.status, 8);
     EXPECT_THAT(ran.err, HasSubstr("the adapter is an access point, whose addresses are its bridge's"));
   }
+  kernel::BecomeClient();
+  WriteText(kApMarkerPath, "");
+  EXPECT_THAT(Tool({"address", "DHCP"}).err, HasSubstr("the adapter is about to be an access point, whose addresses"));
+  std::filesystem::remove(kApMarkerPath);
   EXPECT_THAT(library::Calls(), IsEmpty());
 }
 

@@ -124,7 +124,9 @@ TEST_F(Edit, TakesTheMaskAndGatewayAwayWithAStaticAddress) {
 TEST_F(Edit, RefusesAddressesThatDoNotGoTogether) {
   ExpectRefused({"edit", "square", "--ip", "10.0.0.0"}, 2, "no host can have this address");
   ExpectRefused({"edit", "square", "--ip", "10.1.0.5"}, 2, "the gateway is not in this subnet");
-  ExpectRefused({"edit", "square", "--gateway", "10.0.0.5"}, 2, "the gateway is the address itself");
+  for (const char* szGateway : {"10.0.0.5", "10.0.0.0", "10.0.0.255"}) {
+    ExpectRefused({"edit", "square", "--gateway", szGateway}, 2, "no other host can have the gateway's address");
+  }
   ExpectRefused({"edit", "Home", "--mask", "255.255.0.0"}, 2, "a static address and its netmask go together");
   ExpectRefused({"edit", "Home", "--ip", "10.0.0.6"}, 2, "a static address and its netmask go together");
 }

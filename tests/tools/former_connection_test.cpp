@@ -21,6 +21,8 @@ constexpr char kSettings[] = "/usr/mero/etc/wpa_supplicant.conf";
 constexpr char kSupplicantPid[] = "/var/run/wpa_supplicant.pid";
 constexpr char kDhcpClientPid[] = "/var/run/udhcpc-wlan0.pid";
 
+constexpr char kLost[] = "/tmp/connection.lost";
+
 constexpr char kBack[] = "merowireless: the former connection, to Home, is back\n";
 
 // Home, as it was joined last: with another secret than the known one.
@@ -110,10 +112,23 @@ TEST_F(FormerConnection, ThatNobodyKnowsCannotBeBroughtBack) {
   EXPECT_THAT(Tool({"connect", "Office"}).err, HasSubstr("could not be brought back\n"));
 }
 
+// The connection is lost while there is that file, and there again when a network is joined.
+void CanBeLost() {
+  std::filesystem::remove(kLost);
+  library::MEROWirelessConnStatusGet = [] {
+    return Exists(kLost) ? WIRELESS_STATUS_DISCONNECTED : WIRELESS_STATUS_CONNECTED_MANAGED;
+  };
+  library::MEROWirelessNetworkConnect = [](const WIRELESS_NETWORK_CONFIG* config) {
+    std::filesystem::remove(kLost);
+    return library::Record(Told(*config)), 0;
+  };
+}
+
 // The adapter was a client's without a network afterwards, and nothing told of that.
 TEST_F(FormerConnection, IsBackAfterAnAccessPointThatFailed) {
   library::SavedAp(library::Office());
-  library::MEROWirelessAPEnable = [] { return FALSE; };
+  library::MEROWirelessAPEnable = [] { return WriteText(kLost, ""), FALSE; };
+  CanBeLost();
   const Ran ran = Tool({"ap", "enable"});
   EXPECT_EQ(ran.status, 1);
   EXPECT_EQ(ran.err, std::string(kBack) +
@@ -121,6 +136,38 @@ TEST_F(FormerConnection, IsBackAfterAnAccessPointThatFailed) {
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable",
                                             "MEROWirelessSetAPConfig", "MEROWirelessAPDisable",
                                             "MEROWirelessNetworkDisconnect", "MEROWirelessNetworkConnect", kHomeTold));
+}
+
+TEST_F(FormerConnection, IsBackAfterAModeThatFailed) {
+  constexpr char kInfo[] = "/etc/hostapd/hostapd-wlan0.info";
+  WriteText(kInfo, "enable=\"no\"\n");
+  library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return WriteText(kLost, ""), FALSE; };
+  CanBeLost();
+  const Ran ran = Tool({"mode", "ap"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, testing::StartsWith(kBack));
+  std::filesystem::remove(kInfo);
+}
+
+// It was ended and joined again, which may come to nothing.
+TEST_F(FormerConnection, ThatAnAccessPointThatFailedHasNotTouchedIsLeftAlone) {
+  library::SavedAp(library::Office());
+  library::MEROWirelessSetAPConfig = [](PMERO_AP_CONF) { return FALSE; };
+  EXPECT_THAT(Tool({"ap", "enable"}).err, Not(HasSubstr("former")));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig"));
+}
+
+// The library joined a network by the interface of an access point.
+TEST_F(FormerConnection, IsNotBroughtBackOnAnAccessPoint) {
+  library::SavedAp(library::Office());
+  library::MEROWirelessAPEnable = [] { return kernel::BecomeAccessPoint("Office"), FALSE; };
+  library::MEROWirelessAPDisable = [] { return FALSE; };
+  library::MEROWirelessConnStatusGet = [] {
+    return kernel::Main().type == NL80211_IFTYPE_AP ? WIRELESS_STATUS_DISCONNECTED : WIRELESS_STATUS_CONNECTED_MANAGED;
+  };
+  EXPECT_THAT(Tool({"ap", "enable"}).err,
+              HasSubstr("the former connection, to Home, is not brought back: the adapter is an access point\n"));
+  EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessNetworkConnect")));
 }
 
 TEST_F(FormerConnection, IsLeftToWhoeverSetsUpAnAccessPoint) {
@@ -346,7 +393,7 @@ TEST_F(KnownBeforehand, IsAnAddressThatNoHostCanHave) {
   std::strcpy(office.szGateway, "10.0.1.1");
   Expect(office, 1, "the network was saved with a gateway that is not in its subnet");
   std::strcpy(office.szGateway, "10.0.0.9");
-  Expect(office, 1, "the network was saved with its own address as its gateway");
+  Expect(office, 1, "the network was saved with a gateway whose address no other host can have");
 }
 
 }  // namespace

@@ -113,8 +113,25 @@ TEST_F(SavedNetworks, AreNotTakenForAnAccessPointWhoseAddressTheyBearAsTheirName
   EXPECT_EQ(Tried({"connect", kAddress}, {evil, home}, {Heard(9, -20, kAddress), Heard(1, -90)}),
             "Home|1|open sesame|this one");
   EXPECT_EQ(Tried({"connect", kAddress, "--no-save"}, {}, {Open(9, -20, kAddress), Open(1, -90)}), "Home|1||this one");
-  const Ran ran = Tool({"connect", "0A:0A:0A:0A:0A:02"});
-  EXPECT_EQ(ran.status, 4);
+  library::InRange({Open(9, -20, "0A:0A:0A:0A:0A:02")});
+  EXPECT_EQ(Tool({"connect", "0A:0A:0A:0A:0A:02"}).status, 4);
+}
+
+// Its name was looked up as the address of a known network, whose secret it was given.
+TEST_F(SavedNetworks, LendNoSecretToWhoeverBearsTheirAddressAsItsName) {
+  const auto home = Saved(Heard(1, -50), 7);
+  library::Known({home});
+  library::InRange({Heard(9, -20, "0A:0A:0A:0A:0A:01")});
+  const Ran ran = Tool({"connect", "0A:0A:0A:0A:0A:09"});
+  EXPECT_EQ(ran.status, 2);
+  EXPECT_THAT(ran.err, HasSubstr("0A:0A:0A:0A:0A:01 needs a secret, and there is no terminal to ask on"));
+  EXPECT_THAT(library::Calls(), IsEmpty());
+}
+
+TEST_F(SavedNetworks, AreNotSavedUnderAnAddress) {
+  EXPECT_EQ(Tool({"save", "0A:0A:0A:0A:0A:01", "--bssid", "0A:0A:0A:0A:0A:09", "--security", "open"}).status, 2);
+  EXPECT_EQ(Tool({"adhoc", "0A:0A:0A:0A:0A:01"}).status, 2);
+  EXPECT_THAT(library::Calls(), IsEmpty());
 }
 
 TEST_F(SavedNetworks, AreJoinedAsTheyWereSavedWhenNoScanShowsThem) {

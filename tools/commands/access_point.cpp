@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <optional>
 
+#include "base/signals.h"
 #include "base/text.h"
 #include "commands/channels.h"
 #include "common/ap_settings.h"
@@ -12,6 +13,7 @@
 #include "model/ap_former.h"
 #include "model/ap_saving.h"
 #include "model/ap_settings.h"
+#include "model/ap_state.h"
 #include "model/ap_status.h"
 #include "model/former_connection.h"
 #include "model/join_lock.h"
@@ -75,11 +77,14 @@ void TakeDown(const Program& program) {
   throw Failed("the access point could not be taken down whole");
 }
 
-// Where nothing was saved, nothing is: a section with the switch alone would be one that does not say whether the radio
-// may be used.
+// Takes the access point down also where its switch cannot be saved.
 void Disable(const Program& program, const ApConf& conf) {
-  ApConf saved{};
-  if (ReadSavedAp(saved)) SaveApSwitch(conf, false);
+  try {
+    SaveApSwitch(conf, false);
+  } catch (const Failure&) {
+    TakeDown(program);
+    throw;
+  }
   TakeDown(program);
 }
 
@@ -112,6 +117,10 @@ Failure EnableFailed(bool hasFormer) {
     return Failed("the access point could not be enabled, and the one that was on the air is there again",
                   "the settings stay saved; -v shows what is wrong with them");
   }
+  if (IsAccessPoints()) {
+    return Failed("the access point could not be enabled, and an access point is left on the air",
+                  "`merowireless ap disable` takes it down");
+  }
   if (WasReported(Report::kScriptFailed)) {
     return Failed("the network start script failed, and the access point is disabled", "-v shows what it says");
   }
@@ -128,7 +137,9 @@ void TakeBack(const Program& program, const ApConf& conf, const std::optional<Fo
   throw Failed("the access point that was on the air could not be brought back, and is disabled");
 }
 
+// Puts the access point on the air, or leaves what was there before.
 void PutOnAir(const Program& program, const ApConf& conf) {
+  const Signals signals;
   const ApStatus before = ReadApStatus(conf);
   std::optional<FormerAp> former;
   if (before.isRunning()) former.emplace(before.interface, conf.hostapConf.szBridge);
@@ -138,10 +149,13 @@ void PutOnAir(const Program& program, const ApConf& conf) {
   task.undo = [&] { TakeBack(program, conf, former); };
   const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
   if (start == Start::kNotSaved) throw ApNotSaved();
-  if (start == Start::kFailed) {
-    if (!IsAnothers()) Undo(task);
-    throw EnableFailed(former && ReadApStatus(conf).isRunning());
-  }
+  if (start == Start::kFailed && IsAnothers()) throw Anothers();
+  const bool isInterrupted = signals.HasCome();
+  if (start == Start::kDone && !isInterrupted && IsAccessPoints()) return;
+  Undo(task);
+  if (isInterrupted) throw Interrupted{};
+  if (start == Start::kFailed) throw EnableFailed(former && ReadApStatus(conf).isRunning());
+  throw Failed("the access point was started, and did not come on the air", "-v shows what the library reports");
 }
 
 // A process that was killed leaves its marker behind, and the library would refuse the next attempt.
@@ -154,10 +168,6 @@ void RequireNobodyAtIt() {
 void SayEnabled(const Program& program, const ApConf& conf) {
   const ApStatus status = ReadApStatus(conf);
   const std::string name = program.output.Name(status.name);
-  if (status.state == ApState::kOff) {
-    throw Failed("the access point " + name + " was started, and is not on the air",
-                 "-v shows what the library reports");
-  }
   const std::string more = status.state == ApState::kOnAir ? "" : ", and " + WhatBecameOf(status);
   program.output.Done<ApStatus>("the access point " + name + " is enabled" + more, "access_point", ApStatusFields(),
                                 status);
@@ -195,18 +205,17 @@ void EnableAp(const Program& program) {
   RefuseWhileRadioIsOff();
   (void)CheckChannel(conf);  // what nobody can tell beforehand, the attempt shows
   RequireNobodyAtIt();
-  const FormerConnection client(program);
-  if (client.exists()) {
-    client.Try([&] { PutOnAir(program, conf); });
-  } else {
-    PutOnAir(program, conf);
-  }
+  FormerConnection(program).Guard([&] { PutOnAir(program, conf); });
   SayEnabled(program, ReadApSettings());
 }
 
+// Where nothing was saved, nothing is: a section with the switch alone would be one that does not say whether the radio
+// may be used.
 void DisableAp(const Program& program) {
   const JoinLock lock;
-  Disable(program, ReadApSettings());
+  const Signals signals;
+  ApConf saved{};
+  ReadSavedAp(saved) ? Disable(program, saved) : TakeDown(program);
   const ApStatus status = ReadApStatus(ReadApSettings());
   if (status.isRunning()) {
     throw Failed("the access point is disabled, and the kernel has one on the air",

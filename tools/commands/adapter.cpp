@@ -9,6 +9,7 @@
 #include "model/ap_files.h"
 #include "model/ap_settings.h"
 #include "model/ap_status.h"
+#include "model/former_connection.h"
 #include "model/join_lock.h"
 #include "model/kernel_switch.h"
 #include "model/library.h"
@@ -105,10 +106,11 @@ void BecomeAccessPoint(const Program& program) {
                   "`merowireless ap enable` makes the adapter one");
   }
   RefuseWhileRadioIsOff();
-  if (!Change(program, WIRELESS_AP_MODE)) throw NotChanged();
-  const ApStatus after = ReadApStatus(conf);
-  if (!after.isRunning()) throw Failed("the mode was changed, and no access point is on the air");
-  Say(program, "the adapter is an access point's now: " + Described(program, after), {"ap", true});
+  FormerConnection(program).Guard([&] {
+    if (!Change(program, WIRELESS_AP_MODE)) throw NotChanged();
+    if (!ReadApStatus(conf).isRunning()) throw Failed("the mode was changed, and no access point is on the air");
+  });
+  Say(program, "the adapter is an access point's now: " + Described(program, ReadApStatus(conf)), {"ap", true});
 }
 
 // One that is switched on and does not run would come back by itself.
@@ -167,7 +169,7 @@ std::string BringBackAccessPoint(const Program& program) {
 std::string BringBackConnection(const Program& program, const std::string& network) {
   const std::string name = program.output.Name(network);
   if (ReadStatus().name == network) return ", and connected to " + name;
-  if (!FindKnown(network)) return "; " + name + " is not among the known networks, and was not joined again";
+  if (!FindCalled(network)) return "; " + name + " is not among the known networks, and was not joined again";
   try {
     JoinAgain(program, network);
   } catch (const Failure& failure) {
@@ -211,13 +213,16 @@ std::string SwitchOff(const Program& program) {
 // The kernel's block is as it was when the settings cannot be changed.
 void LiftBlockAndSave(const std::string& model) {
   const std::string interface = MEROWirelessAPInterfaceGet();
-  const bool wasSet = KernelBlockOf(interface) == KernelBlock::kSet;
+  const KernelBlock before = KernelBlockOf(interface);
+  if (before == KernelBlock::kOfHardware) RequireNoBlock();  // only hands can move that switch
   LiftBlock();
-  RequireNoBlock();  // by a switch that only hands can move
   try {
+    RequireNoBlock();
     SaveSwitch(model, true);
   } catch (const Failure&) {
-    if (wasSet) SetBlock();
+    if (before == KernelBlock::kSet && SetKernelBlock(interface, true) != 0) {
+      Remark("merowireless: the kernel's block of the radio could not be set again");
+    }
     throw;
   }
 }

@@ -11,8 +11,10 @@ namespace {
 
 // In the bridge of an access point, an address of the interface's own would only keep the bridge from being reached.
 void RequireClient() {
-  if (!IsAccessPoints()) return;
-  throw Failure(Exit::kBusy, "the adapter is an access point, whose addresses are its bridge's",
+  const ApState state = ReadApState();
+  if (state == ApState::kOff) return;
+  const std::string is = state == ApState::kSettingUp ? "is about to be" : "is";
+  throw Failure(Exit::kBusy, "the adapter " + is + " an access point, whose addresses are its bridge's",
                 "the bridge's network-script file has them");
 }
 
@@ -27,7 +29,7 @@ void SetAddress(const Program& program, const Addressing& addressing) {
   const JoinLock lock(JoinLockFor::kAddressing);
   RequireClient();
   ApplyAddress(SettingAddress(program, config), config);
-  if (const auto known = FindKnown(ReadStatus().name)) ApplyNameServers(*known);
+  if (const auto known = FindCalled(ReadStatus().name)) ApplyNameServers(*known);
   const Status status = ReadStatus();
   program.output.Done("the address is " + (status.ip.empty() ? "not known yet" : status.ip), "status", StatusFields(),
                       status);

@@ -178,6 +178,7 @@ void ShowStatus(const Program& program) {
 }
 
 void MakeCell(const Program& program, const CellToMake& wanted) {
+  RequireName(wanted.name);
   RequireFreeAdapterNow();
   KnownNetwork config{};
   SetNetworkName(config.network.szEssid, wanted.name);

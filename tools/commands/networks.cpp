@@ -138,6 +138,7 @@ Network Described(const NetworkToSave& wanted) {
   }
   Network network{};
   std::ranges::copy(*address, network.bssid);
+  RequireName(wanted.name);
   SetNetworkName(network.szEssid, wanted.name);
   if (!SetSecurity(network, wanted.security)) {
     throw Failure(Exit::kUsage, "with --bssid, --security says how the network is protected", kSecurityNames);

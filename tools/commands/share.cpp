@@ -24,14 +24,14 @@ namespace {
 KnownNetwork Joined(const std::string& name, const std::string& shown) {
   const auto configured = ConfiguredNetwork(TextOfFile(kSupplicantConfigPath).value_or(""));
   if (configured && name == configured->network.szEssid) return *configured;
-  const auto known = FindKnown(name);
+  const auto known = FindCalled(name);
   if (known) return *known;
   throw Failed("the secret of " + shown + ", which is joined, is not known");
 }
 
 KnownNetwork KnownAs(const std::string& name, const std::string& shown) {
-  const auto known = FindKnown(name);
-  if (known) return *known;
+  const auto known = AllKnown(name);
+  if (!known.empty()) return known.front();
   throw Failure(Exit::kOutOfRange, shown + " cannot be shared, since no such network is known",
                 "`merowireless known` lists those that are");
 }

@@ -61,9 +61,10 @@ void RequireStatic(const Addressing& addressing) {
 
 void RequireSound(const KnownNetwork& config) {
   const Soundness soundness = SoundnessOf(config);
-  if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at --ip and --mask");
+  if (soundness == Soundness::kNoHost) throw Wrong("no host can have this address", "look at the address and its mask");
   if (soundness == Soundness::kGatewayOutside) throw Wrong("the gateway is not in this subnet", "look at --gateway");
-  if (soundness == Soundness::kOwnGateway) throw Wrong("the gateway is the address itself", "look at --gateway");
+  if (soundness == Soundness::kNoGateway)
+    throw Wrong("no other host can have the gateway's address", "look at --gateway");
 }
 
 // The kernel's table begins with a line of titles; an address in it is a hexadecimal number in the byte order of
@@ -113,7 +114,8 @@ Soundness SoundnessOf(const KnownNetwork& config) {
   if (!IsIpAddress(ip) || !IsNetmask(mask) || !IsHost(ip, mask)) return Soundness::kNoHost;
   if (gateway.empty()) return Soundness::kSound;
   if (!IsIpAddress(gateway) || !IsInSubnet(gateway, ip, mask)) return Soundness::kGatewayOutside;
-  return NumberOf(gateway) == NumberOf(ip) ? Soundness::kOwnGateway : Soundness::kSound;
+  const bool isOthers = IsHost(gateway, mask) && NumberOf(gateway) != NumberOf(ip);
+  return isOthers ? Soundness::kSound : Soundness::kNoGateway;
 }
 
 void RequireAddressing(const KnownNetwork& config) {
@@ -125,8 +127,8 @@ void RequireAddressing(const KnownNetwork& config) {
       throw Failed("the network was saved with an address that no host can have", advice);
     case Soundness::kGatewayOutside:
       throw Failed("the network was saved with a gateway that is not in its subnet", advice);
-    case Soundness::kOwnGateway:
-      throw Failed("the network was saved with its own address as its gateway", advice);
+    case Soundness::kNoGateway:
+      throw Failed("the network was saved with a gateway whose address no other host can have", advice);
   }
 }
 

@@ -18,7 +18,7 @@ struct Addressing {
 void SetAddressing(KnownNetwork& config, const Addressing& addressing);
 
 // Whether a network can have its address and gateway.
-enum class Soundness { kSound, kNoHost, kGatewayOutside, kOwnGateway };
+enum class Soundness { kSound, kNoHost, kGatewayOutside, kNoGateway };
 Soundness SoundnessOf(const KnownNetwork& config);
 
 // Fails when a network was saved with an address that it cannot have.

@@ -8,6 +8,7 @@
 #include "base/whole_file.h"
 #include "common/paths.h"
 #include "common/text.h"
+#include "model/ap_state.h"
 #include "model/join_failures.h"
 #include "model/name_servers.h"
 #include "model/supplicant_settings.h"
@@ -20,7 +21,7 @@ namespace {
 // The supplicant's settings are those of the connection, unless somebody else has made it.
 std::optional<KnownNetwork> Joined(const Status& status) {
   std::optional<KnownNetwork> network = ConfiguredNetwork(TextOfFile(kSupplicantConfigPath).value_or(""));
-  if (!network || network->network.szEssid != status.name) return FindKnown(status.name);
+  if (!network || network->network.szEssid != status.name) return FindCalled(status.name);
   if (status.auth != WIRELESS_AUTH_UNKNOWN) network->network.auth = status.auth;
   network->network.protocol = status.protocol;
   const auto accessPoint = AccessPointOf(status.interface);
@@ -68,12 +69,20 @@ FormerConnection::FormerConnection(const Program& program)
       routes_(Routes::Of(status_.interface)),
       nameServers_(SavedNameServersOf(status_.interface)) {}
 
-// Signals are held all the time, so that none comes between two steps; each step that takes time ends with one.
 void FormerConnection::Try(const std::function<void()>& attempt) const {
+  Attempt(attempt, [&] { BringBack(); });
+}
+
+void FormerConnection::Guard(const std::function<void()>& attempt) const {
+  Attempt(attempt, [&] { BringBackWhatHasEnded(); });
+}
+
+// Signals are held all the time, so that none comes between two steps; each step that takes time ends with one.
+void FormerConnection::Attempt(const std::function<void()>& attempt, const std::function<void()>& takeBack) const {
   const Signals signals;
   const auto undo = [&] {
     Task task = program_.Doing("");
-    task.undo = [&] { BringBack(); };
+    task.undo = takeBack;
     Undo(task);
     while (signals.HasCome()) continue;  // it has been told, or nothing was left to be interrupted
   };
@@ -90,6 +99,18 @@ void FormerConnection::Try(const std::function<void()>& attempt) const {
     undo();
     throw;
   }
+}
+
+bool FormerConnection::Stands() const {
+  const Status status = ReadStatus();
+  return status.isLetIn && status.state == status_.state && status.name == status_.name && status.ip == status_.ip;
+}
+
+void FormerConnection::BringBackWhatHasEnded() const {
+  if (!exists() || Stands()) return;
+  if (!IsAccessPoints()) return BringBack();
+  Remark("merowireless: the former connection, to " + program_.output.Name(status_.name) +
+         ", is not brought back: the adapter is an access point");
 }
 
 void FormerConnection::BringBack() const {

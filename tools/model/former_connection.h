@@ -23,7 +23,14 @@ class FormerConnection {
   // missing.
   void Try(const std::function<void()>& attempt) const;
 
+  // Runs something else that may end the connection. When it fails or is interrupted, the connection is brought back,
+  // unless it still stands, or the adapter is an access point. Where there was none, nothing is done.
+  void Guard(const std::function<void()>& attempt) const;
+
  private:
+  void Attempt(const std::function<void()>& attempt, const std::function<void()>& takeBack) const;
+  bool Stands() const;
+  void BringBackWhatHasEnded() const;
   void BringBack() const;
   bool Rejoin(const KnownNetwork& network) const;
   bool Readdress(const KnownNetwork& network) const;

@@ -138,6 +138,10 @@ bool IsNamed(const Network& network, const std::string& name) {
   return address ? std::ranges::equal(*address, network.bssid) : name == network.szEssid;
 }
 
+void RequireName(const std::string& name) {
+  if (ParseAddress(name)) throw Wrong("a text that is an address can be no name", "give the network another one");
+}
+
 Network FindInRange(const Program& program, const std::string& name) {
   RequireScanning();
   const auto isWanted = [&](const Network& network) { return IsNamed(network, name); };
@@ -154,8 +158,14 @@ std::vector<KnownNetwork> AllKnown(const std::string& name) {
   return known;
 }
 
-std::optional<KnownNetwork> FindKnown(const std::string& name) {
-  const std::vector<KnownNetwork> known = AllKnown(name);
+std::vector<KnownNetwork> AllCalled(const std::string& essid) {
+  std::vector<KnownNetwork> known = Known(Order::kByTime);
+  std::erase_if(known, [&](const KnownNetwork& other) { return essid != other.network.szEssid; });
+  return known;
+}
+
+std::optional<KnownNetwork> FindCalled(const std::string& essid) {
+  const std::vector<KnownNetwork> known = AllCalled(essid);
   return known.empty() ? std::nullopt : std::optional(known.front());
 }
 

@@ -42,14 +42,22 @@ std::vector<Network> LookFor(const Program& program, const std::string& name,
 // call a network like somebody else's access point.
 bool IsNamed(const Network& network, const std::string& name);
 
+// Fails when a text is an address: what is saved or made under it could never be named.
+void RequireName(const std::string& name);
+
 // The strongest access point in range of this name, or the one of this address; fails when there is none.
 Network FindInRange(const Program& program, const std::string& name);
 
-// The first of AllKnown().
-std::optional<KnownNetwork> FindKnown(const std::string& name);
-
-// All sections that were saved under a name, or the one of an address, the one saved last first.
+// All sections that were saved under a name that somebody has given, or the one of an address, the one saved last
+// first.
 std::vector<KnownNetwork> AllKnown(const std::string& name);
+
+// All sections of a name that the kernel, the air or the settings tell, the one saved last first. It is a name even
+// where it looks like an address: anybody may call a network so.
+std::vector<KnownNetwork> AllCalled(const std::string& essid);
+
+// The first of AllCalled().
+std::optional<KnownNetwork> FindCalled(const std::string& essid);
 
 // Fails when there is no adapter.
 void RequireAdapter();

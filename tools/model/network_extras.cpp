@@ -48,7 +48,7 @@ Extras ExtrasIn(const Section& section) {
 Extras ExtrasOf(const KnownNetwork& network) {
   Section section = SectionOf(network);
   if (!section) {
-    const auto known = FindKnown(network.network.szEssid);
+    const auto known = FindCalled(network.network.szEssid);
     if (known) section = SectionOf(*known);
   }
   return section ? ExtrasIn(section) : Extras{};

@@ -106,15 +106,17 @@ std::vector<SavedNetwork> SavedNetworks(Order order) {
 }
 
 std::vector<SavedNetwork> SavedAs(const std::string& name) {
+  if (!ParseAddress(name)) return SavedUnder(name);
   std::vector<SavedNetwork> networks;
-  if (!ParseAddress(name)) {
-    networks = SavedNetworks(Order::kByTime);
-    std::erase_if(networks, [&](const SavedNetwork& network) { return name != network.newest.network.szEssid; });
-    return networks;
-  }
   for (const KnownNetwork& section : AllKnown(name)) {
     networks.push_back({.newest = section, .addresses = {AddressOf(section)}, .others = {}, .isOneAccessPoint = true});
   }
+  return networks;
+}
+
+std::vector<SavedNetwork> SavedUnder(const std::string& essid) {
+  std::vector<SavedNetwork> networks = SavedNetworks(Order::kByTime);
+  std::erase_if(networks, [&](const SavedNetwork& network) { return essid != network.newest.network.szEssid; });
   return networks;
 }
 

@@ -25,8 +25,12 @@ struct SavedNetwork {
 
 std::vector<SavedNetwork> SavedNetworks(Order order);
 
-// Those that were saved under a name, the newest first; or else the access point of this address alone.
+// Those that were saved under a name that somebody has given, the newest first; or else the access point of this
+// address alone.
 std::vector<SavedNetwork> SavedAs(const std::string& name);
+
+// Those of a name that the kernel, the air or the settings tell, also where it looks like an address.
+std::vector<SavedNetwork> SavedUnder(const std::string& essid);
 
 // Those that are joined without being asked for, in the order in which they are tried: by their priority, and then the
 // newest first.

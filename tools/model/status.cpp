@@ -172,7 +172,7 @@ WIRELESS_AUTH AuthOfSupplicant(const std::string& name) {
   const auto given = ConfiguredNetwork(TextOfFile(kSupplicantConfigPath).value_or(""));
   if (!given || name != given->network.szEssid) return WIRELESS_AUTH_UNKNOWN;
   try {
-    for (const KnownNetwork& known : AllKnown(name)) {
+    for (const KnownNetwork& known : AllCalled(name)) {
       const bool isSame =
           known.network.encrypt == given->network.encrypt && std::strcmp(known.szKey, given->szKey) == 0;
       if (isSame) return known.network.auth;

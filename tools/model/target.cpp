@@ -42,7 +42,7 @@ KnownNetwork AsHeard(const Network& accessPoint, bool isByName) {
 // An access point of a known name, but of an address that it was not saved with, may be one of that network.
 Target FromTheAir(const Program& program, const std::string& name, bool isChanged) {
   const Network accessPoint = FindInRange(program, name);
-  auto known = SavedAs(accessPoint.szEssid);
+  auto known = SavedUnder(accessPoint.szEssid);
   for (SavedNetwork& saved : known) saved.LeaveOnly(accessPoint);
   if (!known.empty()) return TargetAmong(program, known, {accessPoint}, isChanged);
   return {.config = AsHeard(accessPoint, !ParseAddress(name)), .isInRange = true};
@@ -50,8 +50,8 @@ Target FromTheAir(const Program& program, const std::string& name, bool isChange
 
 }  // namespace
 
-Target SavedTarget(const Program& program, const std::string& name) {
-  return FromWhatIsKnown(program, SavedAs(name), false);
+Target SavedTarget(const Program& program, const std::string& essid) {
+  return FromWhatIsKnown(program, SavedUnder(essid), false);
 }
 
 Target FindTarget(const Program& program, const std::string& name, bool isChanged) {

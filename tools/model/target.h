@@ -13,8 +13,8 @@ struct Target {
   std::vector<Network> trusted = {};  // access points that are tried alone where another one refuses the secret
 };
 
-// A network that was saved under a name.
-Target SavedTarget(const Program& program, const std::string& name);
+// A network that was saved under a name, of those that there are.
+Target SavedTarget(const Program& program, const std::string& essid);
 
 // The network that was saved under a name, or with an access point of this address; or else one in range. With
 // `isChanged` the protection on the air is accepted, whatever was saved. Fails when it cannot be joined, when one that
