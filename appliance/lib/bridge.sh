@@ -38,7 +38,8 @@ is_there() { # INTERFACE
 
 # make_bridge BRIDGE [undoable]: makes the bridge with its address and its first member, if that one is wired; a
 # wireless member comes in when its access point starts. Without its first member the bridge is made all the same, and
-# that is a failure. A new bridge that is undoable has noted what give_wire_back needs.
+# that is a failure. A new bridge that is undoable has noted what give_wire_back needs. The note of the routes that are
+# moved is left to the caller to remove.
 make_bridge() {
 	is_bridge "$1" || fail "$scripts/ifcfg-$1 describes no bridge"
 	undoable=${2-}
@@ -47,8 +48,8 @@ make_bridge() {
 	missing='' routes=''
 	if [ -n "$primary" ] && ! is_wireless "$primary"; then
 		if is_there "$primary"; then
-			routes=$(ip -4 route show default dev "$primary") || fail "cannot tell the routes of $primary"
 			[ -z "$undoable" ] || note_wire "$primary" "$1"
+			recall_routes "$1" "$primary"
 			plan_member "$primary" "$1"
 		else
 			missing=yes
@@ -71,6 +72,7 @@ make_bridge_of_boot() {
 	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1" && ! waits_for_access_point "$1"; then
 		[ -z "$primary" ] || await $(($2 - $(uptime_seconds))) is_there "$primary"
 		make_bridge "$1"
+		remove_files "$state/routes-$1"
 	fi
 }
 
@@ -118,48 +120,122 @@ plan_member() { # INTERFACE BRIDGE
 	plan "cannot bring $1 up" "link set dev $1 up"
 }
 
-# move_routes BRIDGE TEXT: gives the bridge the default routes that its first member had, a line each. A bridge of another
-# subnet cannot have them.
+# routes_of INTERFACE [default]: puts its routes into $routes, a line each, as ip takes them: it prints conditions of a route
+# too. Those of the kernel's own come and go with the addresses.
+routes_of() {
+	said=$(ip -4 route show ${2:+"$2"} dev "$1") || fail "cannot tell the routes of $1"
+	routes=''
+	set -f
+	while read -r line; do
+		case " $line " in *' proto kernel '*) continue ;; esac
+		words=''
+		for word in $line; do
+			case $word in dead | linkdown | offload | trap | rt_offload | rt_trap | pervasive | unresolved) continue ;; esac
+			words="$words$word "
+		done
+		[ -z "$words" ] || routes=$routes$words$newline
+	done <<-END
+		$said
+	END
+	set +f
+}
+
+# recall_routes BRIDGE INTERFACE: puts the default routes that the interface has, or had in a run that has not come to its
+# end, into $routes, and notes them: as a member the interface loses them.
+recall_routes() {
+	routes_of "$2" default
+	[ ! -s "$state/routes-$1" ] || while read -r line; do
+		case $newline$routes in *"$newline$line "*) ;; *) routes="$routes$line $newline" ;; esac
+	done <"$state/routes-$1"
+	[ -z "$routes" ] || note "$state/routes-$1" "${routes%"$newline"}"
+}
+
+# move_routes BRIDGE TEXT: gives the bridge the default routes that its first member had, a line each. What the kernel
+# refuses, such as a gateway in another subnet, cannot be had, and is reported. What could not be asked for is a failure,
+# but none before the other routes have been moved.
 move_routes() {
+	unmoved=''
+	[ -n "$2" ] || return 0
+	routes_of "$1" default
 	while read -r line; do
 		[ -n "$line" ] || continue
-		# shellcheck disable=SC2086  # words
-		said=$(ip -4 route add $line dev "$1" 2>&1) && continue
-		case $said in
-		*gateway* | *unreachable*) warn "cannot route over $1 as before, '$line': $said" ;;
-		*) fail "cannot route over $1 as before, '$line': $said" ;;
-		esac
+		case $newline$routes in *"$newline$line $newline"*) continue ;; esac
+		add_route "$1" "$line" && continue
+		text="cannot route over $1 as before, '$line': $said"
+		if is_refusal; then warn "$text"; else unmoved=${unmoved:-$text}; fi
 	done <<-END
 		$2
 	END
+	[ -z "$unmoved" ] || fail "$unmoved"
+}
+
+# add_route INTERFACE WORDS: adds a route; from another address than before where the interface has not that one.
+# shellcheck disable=SC2086  # words
+add_route() {
+	said=$(ip -4 route add $2 dev "$1" 2>&1) && return
+	case $2 in *' src '*) ;; *) return 1 ;; esac
+	source=${2#* src } source=${source%% *}
+	ip -4 route add ${2%% src *} ${2#* src "$source"} dev "$1" >/dev/null 2>&1
+}
+
+# is_refusal: whether what ip has $said is the kernel's last word.
+is_refusal() {
+	case $said in
+	*'annot allocate memory'* | *'o buffer space'*) return 1 ;;
+	'RTNETLINK answers: '* | 'Error: '*) ;;
+	*) return 1 ;;
+	esac
 }
 
 # note_wire INTERFACE BRIDGE: notes the addresses, the routes and the lease of an interface before it becomes the first
-# member of a new bridge. give_wire_back restores them if the start fails.
+# member of a new bridge. give_wire_back restores them if the start fails. The number tells the interface from another
+# one that has its name later.
 note_wire() {
 	leased=''
 	if daemon_of busybox "$lease_run-$1.pid"; then leased=yes; fi
+	{ read -r number <"/sys/class/net/$1/ifindex"; } 2>/dev/null || fail "cannot tell the number of $1"
 	ip -4 address save dev "$1" >"$state/wire-$2.addresses" || fail "cannot note the addresses of $1"
-	ip -4 route save dev "$1" >"$state/wire-$2.routes" || fail "cannot note the routes of $1"
-	note "$state/wire-$2" "$1 $leased"
+	routes_of "$1"
+	note "$state/wire-$2.routes" "${routes%"$newline"}"
+	note "$state/wire-$2" "$1 $number $leased"
 }
 
-forget_wire() { # BRIDGE [FILE]
-	remove_files "$state/wire-$1" "$state/wire-$1.addresses" "$state/wire-$1.routes" "${2-}"
+forget_wire() { # BRIDGE [FILE...]
+	bridge=$1
+	shift
+	remove_files "$state/wire-$bridge" "$state/wire-$bridge.addresses" "$state/wire-$bridge.routes" "$@"
 }
 
 # give_wire_back BRIDGE: removes the bridge, and gives its first member back what note_wire has noted, unless that one is
-# gone.
+# gone. One that is in no bridge and has an address has been given it by somebody else since.
 give_wire_back() {
-	read -r wire leased <"$state/wire-$1" || cannot_read "$state/wire-$1"
+	read -r wire number leased <"$state/wire-$1" || cannot_read "$state/wire-$1"
+	is_bare=''
+	[ ! -e "/sys/class/net/$1/brif/$wire" ] || is_bare=yes
 	end_dnsmasq "$1"
 	remove_bridge "$1"
-	if is_there "$wire"; then
-		said=$(ip address restore <"$state/wire-$1.addresses" 2>&1) || fail "cannot give $wire its addresses back: $said"
-		said=$(ip route restore <"$state/wire-$1.routes" 2>&1) || fail "cannot give $wire its routes back: $said"
+	if has_number "$wire" "$number"; then
+		[ -n "$is_bare" ] || [ -n "$(ip -4 -oneline address show dev "$wire")" ] || is_bare=yes
+		[ -z "$is_bare" ] || restore_wire "$wire" "$1"
 		[ -z "$leased" ] || lease_address "$wire"
 	fi
-	forget_wire "$1"
+	forget_wire "$1" "$state/routes-$1"
+}
+
+has_number() { # INTERFACE NUMBER
+	{ read -r index <"/sys/class/net/$1/ifindex"; } 2>/dev/null && [ "$index" = "$2" ]
+}
+
+restore_wire() { # INTERFACE BRIDGE
+	attempt "cannot bring $1 up" ip link set dev "$1" up
+	said=$(ip address restore <"$state/wire-$2.addresses" 2>&1) || fail "cannot give $1 its addresses back: $said"
+	while read -r line; do
+		[ -n "$line" ] || continue
+		# shellcheck disable=SC2086  # words
+		said=$(ip -4 route replace $line dev "$1" 2>&1) && continue
+		is_refusal || fail "cannot give $1 its routes back: $said"
+		warn "cannot give $1 its route back, '$line': $said"
+	done <"$state/wire-$2.routes"
 }
 
 # set_address INTERFACE ADDRESS/MASK: sets the interface's only address. An interface that has it already keeps it, and
@@ -225,18 +301,33 @@ is_finished() {
 	read -r noted condition <"$bridge_note-$1" && [ -z "$condition" ]
 }
 
-# is_running INTERFACE: whether its access point is on the air, with all that belongs to it.
-is_running() {
-	daemon_of hostapd "$hostapd_run-$1.pid" && is_finished "$1" && has_rules
+# is_begun BRIDGE: whether an access point's start in that bridge has not come to its end.
+is_begun() {
+	for file in "$bridge_note"-*; do
+		noted='' condition=''
+		[ ! -s "$file" ] || read -r noted condition <"$file"
+		[ "$noted $condition" != "$1 begun" ] || return 0
+	done
+	return 1
 }
 
-# undo_killed_start INTERFACE BRIDGE: gives the wire back what it had before a start that was killed, since the next one
-# would take what is left for what it was. Of a start that was killed at its very end the note alone is left.
+# is_running INTERFACE: whether its access point is on the air, started to the end, and its rules stand. Its bridge is in
+# $noted.
+is_running() {
+	daemon_of hostapd "$hostapd_run-$1.pid" && is_finished "$1" || return 1
+	has_rules || {
+		warn "somebody has removed the rules between networks: $1 is started anew"
+		return 1
+	}
+}
+
+# undo_killed_start BRIDGE: gives the wire back what it had before a start that was killed, since the next one would take
+# what is left for what it was. Of a start that was killed at its very end the note alone is left.
 undo_killed_start() {
-	if is_finished "$1"; then
-		forget_wire "$2"
-	elif [ -s "$state/wire-$2" ]; then
-		give_wire_back "$2"
+	if ! is_begun "$1"; then
+		forget_wire "$1"
+	elif [ -s "$state/wire-$1" ]; then
+		give_wire_back "$1"
 	fi
 }
 
@@ -268,20 +359,21 @@ leave_bridge() { # INTERFACE BRIDGE
 	attempt "cannot take $1 out of $2" ip link set dev "$1" nomaster
 }
 
-# give_up_bridge BRIDGE [undo]: removes the bridge, unless it comes up at boot and has other members, whom it may serve.
-# With "undo", a bridge that was made for the start that failed goes in any case.
+# give_up_bridge BRIDGE: removes the bridge, unless it comes up at boot and has other members, whom it may serve. One that
+# was made for a start that has not come to its end goes in any case.
 give_up_bridge() {
-	if [ -n "${2-}" ] && [ -s "$state/wire-$1" ]; then
+	if [ -s "$state/wire-$1" ] && is_begun "$1"; then
 		give_wire_back "$1"
 		return
 	fi
 	if comes_up_at_boot "$1" && has_members "$1"; then
 		serve_addresses "$1"
+		forget_wire "$1"
 	else
 		end_dnsmasq "$1"
 		remove_bridge "$1"
+		forget_wire "$1" "$state/routes-$1"
 	fi
-	forget_wire "$1"
 }
 
 has_members() { # BRIDGE

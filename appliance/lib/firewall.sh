@@ -40,9 +40,16 @@ clear_firewall() {
 	remove_files "$guest_rights" "$forwarding_before"
 }
 
-# has_rules: whether those that were set are there still. Who loads other rules may have removed all that there were.
+# has_rules: whether those that were set are there still. Who loads other rules may have removed all that there were, or
+# what is in their table. Where that cannot be told, nobody is thrown off for it.
 has_rules() {
-	[ ! -s "$forwarding_before" ] || nft list table inet mero_ap >/dev/null 2>&1
+	[ -s "$forwarding_before" ] || return 0
+	said=$(nft list table inet mero_ap 2>&1) || {
+		case $said in *'No such file'*) return 1 ;; esac
+		warn "cannot tell whether the rules between networks are there: ${said:-nft ended with a failure}"
+		return 0
+	}
+	case $said in *'chain '*) ;; *) return 1 ;; esac
 }
 
 # rights_of_guests: prints what the settings let guests reach, or keep them from; nothing for a start without guests.

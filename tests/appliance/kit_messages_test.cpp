@@ -56,11 +56,18 @@ TEST_F(KitMessage, OfAWireSaysWhatCannotBeGivenBack) {
   WriteScript("/usr/mero/sbin/udhcpc.lease", "exit 1\n");
   const std::string noted = "note_wire eth0 lbr0; ";
   const std::string gives = noted + "give_wire_back lbr0";
+  const std::string routes =
+      noted + "echo 203.0.113.0/24 via 198.51.100.1 >/run/rc.network/wire-lbr0.routes; give_wire_back lbr0";
   ExpectMessages({
       {"note_wire eth0 lbr0", "ip", "address save", "cannot note the addresses of eth0"},
-      {"note_wire eth0 lbr0", "ip", "route save", "cannot note the routes of eth0"},
+      {"note_wire eth0 lbr0", "ip", "route show", "cannot tell the routes of eth0"},
+      {"note_wire eth9 lbr0", "", "", "cannot tell the number of eth9"},
       {gives.c_str(), "ip", "address restore", "cannot give eth0 its addresses back: ip is broken"},
-      {gives.c_str(), "ip", "route restore", "cannot give eth0 its routes back: ip is broken"},
+      {gives.c_str(), "ip", "eth0 up", "cannot bring eth0 up: ip is broken"},
+      {routes.c_str(), "ip", "route replace", "cannot give eth0 its routes back: ip is broken"},
+      {routes.c_str(), "", "",
+       "cannot give eth0 its route back, '203.0.113.0/24 via 198.51.100.1': Error: Nexthop has "
+       "invalid gateway."},
       {"chmod 755 /usr/mero/sbin/udhcpc.lease; end_lease eth0", "", "", "what eth0 had leased is not all given back"},
       {"take_down wlan0", "ip", "wlan0 down", "cannot take wlan0 down: ip is broken"},
       {"make_client wlan0", "iw", "managed", "cannot make wlan0 a client's: iw is broken"},

@@ -21,11 +21,14 @@ class KitRadio : public Kit {
     StandIn("hostapd", Daemon("hostapd", "-P"));
     StandIn("hostapd_cli", "echo state=ENABLED\n");
     StandIn("dnsmasq", "for word; do case $word in --pid-file=*) file=${word#*=} ;; esac; done\n" + Launch("dnsmasq"));
-    StandIn("nft", "[ \"$1\" != list ] || exec grep -qF 'mero_ap {' /tmp/rules\ncat >/tmp/rules\n");
+    StandIn("nft",
+            "[ \"$1\" = list ] || exec cat >/tmp/rules\n"
+            "grep -F -A 1 'mero_ap {' /tmp/rules || { echo 'Error: No such file or directory' >&2; exit 1; }\n");
     StandIn("iw", "");
     StandInForIp();
     RunInShell("echo phy0 >/tmp/phy; sed -i 's,/sys/class/net/$1/phy80211/name,/tmp/phy,' /usr/mero/lib/network/*.sh");
     RunInShell("ip link add wlan0 type veth peer name air; ip link add eth0 type veth peer name wire");
+    WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
     WriteText("/etc/hostapd/hostapd-wlan0-host.conf",
               "interface=wlan0\nssid=home\nwpa=2\nwpa_passphrase=deux croissants\n");
     WriteText("/etc/sysconfig/network-scripts/ifcfg-wlan0", "DEVICE=wlan0\nBRIDGE=lbr0\n");

@@ -301,7 +301,7 @@ TEST_F(KitAccessPoint, IsStartedAgainWhenItsStartWasKilled) {
   EXPECT_EQ(ReadText("/run/rc.network/bridge-wlan0"), "lbr0\n");
 }
 
-TEST_F(KitAccessPoint, IsStartedUnlessItRunsWithAllThatBelongsToIt) {
+TEST_F(KitAccessPoint, IsStartedUnlessItRunsAndWasStartedToTheEnd) {
   EXPECT_EQ(Script("ensure wlan0 lbr0").out, "");
   EXPECT_EQ(Daemons(), OnAir());
   const std::string daemon = ReadText("/run/rc.network/hostapd-wlan0.pid");
@@ -311,26 +311,97 @@ TEST_F(KitAccessPoint, IsStartedUnlessItRunsWithAllThatBelongsToIt) {
   EXPECT_EQ(Script("ensure wlan0 lbr0").out, "");
   EXPECT_NE(ReadText("/run/rc.network/hostapd-wlan0.pid"), daemon);
   EXPECT_EQ(Daemons(), OnAir());
+
+  RunInShell("cd /etc/sysconfig/network-scripts && sed s/lbr0/br0/ ifcfg-lbr0 >ifcfg-br0");
+  EXPECT_EQ(Script("ensure wlan0 br0").out, "");
+  EXPECT_EQ(ReadText("/run/rc.network/bridge-wlan0"), "br0\n");
+  EXPECT_EQ(Script("restart wlan0 br0").out, "");
+
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  EXPECT_EQ(Script("ensure wlan0 lbr0").out, "") << "somebody has switched it off meanwhile";
+  EXPECT_EQ(Daemons(), "");
 }
 
 // A reload of another firewall left guests without rules, and nobody noticed.
 TEST_F(KitAccessPoint, GetsTheRulesBackThatSomebodyHasRemoved) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   for (const char* szWords : {"schedule wlan0", "ensure wlan0 lbr0"}) {
-    WriteText("/tmp/rules", "");
-    EXPECT_EQ(Script(szWords).out, "");
-    EXPECT_THAT(ReadText("/tmp/rules"), HasSubstr("table inet mero_ap {")) << szWords;
-    EXPECT_EQ(Daemons(), OnAir());
+    for (const char* szLeft : {"", "table inet mero_ap {\n}\n"}) {
+      WriteText("/tmp/rules", szLeft);
+      EXPECT_EQ(Script(szWords).out,
+                "rc.network: somebody has removed the rules between networks: wlan0 is started anew\n");
+      EXPECT_THAT(ReadText("/tmp/rules"), HasSubstr("table inet mero_ap {\nchain ")) << szWords;
+      EXPECT_EQ(Daemons(), OnAir());
+    }
   }
+}
+
+// A command that could not be run was taken for rules that are gone, and everybody was thrown off.
+TEST_F(KitAccessPoint, StaysOnTheAirWhenItsRulesCannotBeLookedAt) {
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  const std::string daemon = ReadText("/run/rc.network/hostapd-wlan0.pid");
+  Break("nft");
+  const Ran ran = Script("schedule wlan0");
+  EXPECT_EQ(ran.out, "rc.network: cannot tell whether the rules between networks are there: nft is broken\n");
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_EQ(ReadText("/run/rc.network/hostapd-wlan0.pid"), daemon);
+}
+
+// The hour put an access point on the air again that was switched off, and whose end had failed.
+TEST_F(KitAccessPoint, IsEndedByTheNextHourWhenItsEndHasFailed) {
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  Break("iw");
+  EXPECT_EQ(Script("restart wlan0 lbr0").status, 1);
+  Mend();
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(Daemons(), "");
+  EXPECT_FALSE(fs::exists("/run/rc.network/bridge-wlan0"));
+}
+
+// An adapter whose radio is a file, as there is no radio.
+void PlugIn() {
+  RunInShell(
+      "mkdir -p /tmp/adapters/wlan0/phy80211; echo phy0 >/tmp/adapters/wlan0/phy80211/name; "
+      "sed -i 's,/sys/class/net/\\*/phy80211,/tmp/adapters/*/phy80211,; "
+      "s,\"/sys/class/net/$1/phy80211/name\",/tmp/phy,' /usr/mero/lib/network/adapter.sh");
+}
+
+constexpr char kHotPlug[] = "/usr/mero/hotplug/usb.wireless.function";
+
+TEST_F(KitAccessPoint, IsLeftAloneByAChangeToTheModeThatItIsIn) {
+  PlugIn();
+  StandIn("iw", "printf '\\tSupported interface modes:\\n\\t\\t * AP\\n'\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  const std::string daemon = ReadText("/run/rc.network/hostapd-wlan0.pid");
+  EXPECT_EQ(Run(kHotPlug + std::string(" change-mode ap")).out, "");
+  EXPECT_EQ(ReadText("/run/rc.network/hostapd-wlan0.pid"), daemon);
+}
+
+// It was put on the air by whoever had looked before it was switched off, and came behind that.
+TEST_F(KitAccessPoint, StaysOffWhenItIsSwitchedOffWhileSomebodyIsAboutToStartIt) {
+  PlugIn();
+  StandIn("iw", "printf '\\tSupported interface modes:\\n\\t\\t * AP\\n'\n");
+  Install("find",
+          "case $(tr '\\0' ' ' </proc/$PPID/cmdline) in *ensure*) touch /tmp/looked; "
+          "until [ -e /tmp/off ]; do sleep 0.02; done ;; esac\nexec /usr/bin/find \"$@\"\n");
+  const std::string hotPlug(kHotPlug);
+  const std::string both = hotPlug + " change-mode ap & until [ -e /tmp/looked ]; do sleep 0.02; done; " + hotPlug +
+                           " change-mode client; touch /tmp/off; wait";
+  EXPECT_EQ(RunInShell("mkdir -p -m 700 /run/rc.network; PATH=/tmp/bin:$PATH; " + both).out, "");
+  EXPECT_EQ(ReadText("/etc/hostapd/hostapd-wlan0.info"), "enable=\"no\"\n");
+  EXPECT_EQ(Daemons(), "");
 }
 
 // Who asked while a start was under way made another one, which took the access point off the air at once.
 TEST_F(KitAccessPoint, IsStartedOnceByTwoWhoWantIt) {
   WriteText("/tmp/calls", "");
   Install("hostapd_cli", "until [ -e /tmp/go ]; do sleep 0.02; done\necho state=ENABLED\n");
+  Install("flock", "echo flock >>/tmp/calls\nexec /usr/bin/flock \"$@\"\n");
   const std::string both =
       "/etc/rc.network start wlan0 lbr0 & until grep -q ^hostapd /tmp/calls; do sleep 0.02; done; "
-      "/etc/rc.network ensure wlan0 lbr0 & sleep 0.2; touch /tmp/go; wait";
+      "/etc/rc.network ensure wlan0 lbr0 & until [ $(grep -c ^flock /tmp/calls) = 2 ]; do sleep 0.02; done; "
+      "touch /tmp/go; wait";
   EXPECT_EQ(RunInShell("PATH=/tmp/bin:$PATH; " + both).out, "");
   EXPECT_EQ(RunInShell("grep -c '^hostapd ' /tmp/calls").out, "1\n");
   EXPECT_EQ(Daemons(), OnAir());

@@ -28,9 +28,9 @@ class KitWire : public KitRadio {
   static std::string Notes() { return RunInShell("ls /run/rc.network | grep wire").out; }
 
   // Has the script killed where it runs a command of ip.
-  static void KillStart(const std::string& where) {
+  static void KillStart(const std::string& where, const std::string& words = "start wlan0 br0") {
     Install("ip", "case $* in *'" + where + "'*) kill -s KILL 0 ;; esac\nexec /usr/sbin/ip \"$@\"\n");
-    EXPECT_NE(RunInShell("PATH=/tmp/bin:$PATH setsid -w /etc/rc.network start wlan0 br0").status, 0);
+    EXPECT_NE(RunInShell("PATH=/tmp/bin:$PATH setsid -w /etc/rc.network " + words).status, 0);
     StandInForIp();
   }
 };
@@ -138,9 +138,128 @@ TEST_F(KitWire, StaysInItsBridgeWhateverAStartThatWasKilledAtItsEndHasLeft) {
   Mend();
   ASSERT_EQ(Script("start wlan0 br0").out, "");
   ASSERT_EQ(RunInShell(leave).status, 0);
+  WriteText("/usr/mero/etc/wireless_country.conf", "country=\"xx1\"\n");
+  EXPECT_EQ(Script("start wlan0 br0").status, 1);
+  fs::remove("/usr/mero/etc/wireless_country.conf");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+  EXPECT_EQ(Notes(), "");
+
+  ASSERT_EQ(Script("start wlan0 br0").out, "");
+  ASSERT_EQ(RunInShell(leave).status, 0);
   EXPECT_EQ(Script("restart wlan0 br0").out, "");
   EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
   EXPECT_EQ(Notes(), "");
+}
+
+// ip tells that there is no carrier in each route, and takes none back that says so: no access point could be started,
+// and behind a failure none ever again.
+TEST_F(KitWire, MayHaveNoCable) {
+  SetWire("yes");
+  const std::string before = Ways();
+  RunInShell("ip link set wire down; until ip route | grep -q linkdown; do sleep 0.02; done");
+  BreakOnce("hostapd");
+  EXPECT_EQ(Script("start wlan0 br0").out, "rc.network: cannot start the access point on wlan0: hostapd is broken\n");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev eth0 metric 7"));
+  KillStart("route add");
+  EXPECT_EQ(Script("start wlan0 br0").out, "");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7 linkdown"));
+  EXPECT_EQ(Script("restart wlan0 br0").out, "");
+  RunInShell("ip link delete br0; ip link set wire up");
+  SetWire("yes");
+  EXPECT_EQ(Ways(), before);
+}
+
+// A command was refused for the address that routes had come from, at each start.
+TEST_F(KitWire, GivesItsRoutesWithoutAnAddressThatTheBridgeHasNot) {
+  SetWire("yes");
+  RunInShell(
+      "ip address add 192.0.2.55/24 dev eth0; ip route delete default; "
+      "ip route add default via 192.0.2.1 proto dhcp src 192.0.2.55 metric 202");
+  EXPECT_EQ(Script("start wlan0 br0").out, "");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 proto dhcp metric 202"));
+}
+
+// One route that cannot be had kept those behind it from being tried.
+TEST_F(KitWire, GivesTheRoutesThatTheBridgeCanHave) {
+  SetWire("yes");
+  RunInShell("ip route add 203.0.113.1 dev eth0; ip route add default via 203.0.113.1 dev eth0 metric 3");
+  const Ran ran = Script("start wlan0 br0");
+  EXPECT_EQ(
+      ran.out,
+      "rc.network: cannot route over br0 as before, 'default via 203.0.113.1 metric 3': Error: Nexthop has invalid "
+      "gateway.\n");
+  EXPECT_EQ(ran.status, 0);
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+}
+
+// What had been noted names an interface by its number: each start behind it failed.
+TEST_F(KitWire, MayBeAnotherBehindAStartThatWasKilled) {
+  SetWire("yes");
+  KillStart("route add");
+  RunInShell(
+      "ip link delete eth0; ip link delete br0; ip link add eth0 type veth peer name wire; "
+      "ip link set eth0 up; ip link set wire up; ip address add 192.0.2.77/24 dev eth0");
+  BreakOnce("hostapd");
+  EXPECT_EQ(Script("start wlan0 br0").out, "rc.network: cannot start the access point on wlan0: hostapd is broken\n");
+  EXPECT_THAT(Ways(), HasSubstr("192.0.2.77/24"));
+  EXPECT_THAT(Ways(), Not(HasSubstr("192.0.2.9/24")));
+}
+
+TEST_F(KitWire, MayHaveBeenTakenDownBehindAStartThatWasKilled) {
+  SetWire("yes");
+  KillStart("route add");
+  RunInShell("ip link set eth0 down");
+  EXPECT_EQ(Script("start wlan0 br0").out, "");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
+}
+
+// It was given its former address besides, and a second way out.
+TEST_F(KitWire, IsLeftToWhoeverHasMendedItBehindAStartThatWasKilled) {
+  SetWire("yes");
+  KillStart("route add");
+  RunInShell(
+      "ip link delete br0; ip address add 192.0.2.77/24 dev eth0; "
+      "ip route add default via 192.0.2.254 dev eth0 metric 7");
+  const std::string mended = Ways();
+  BreakOnce("hostapd");
+  EXPECT_EQ(Script("start wlan0 br0").status, 1);
+  EXPECT_EQ(Ways(), mended);
+}
+
+// Of a bridge that is there already nothing was noted: its way out was lost.
+TEST_F(KitWire, GivesItsRoutesToABridgeInTheRunBehindAFailure) {
+  const std::string route = "default via 192.0.2.1 dev br0 metric 7";
+  SetWire("yes");
+  KillStart("route add", "boot");
+  EXPECT_THAT(Ways(), Not(HasSubstr(route)));
+  EXPECT_EQ(Script("boot").out, "");
+  EXPECT_THAT(Ways(), HasSubstr(route));
+
+  for (const bool isKilled : {true, false}) {
+    RunInShell(
+        "ip link set eth0 nomaster; ip route delete default; ip address add 192.0.2.8/24 dev eth0; "
+        "ip link set eth0 up; ip route add default via 192.0.2.1 dev eth0 metric 7");
+    if (isKilled) {
+      KillStart("route add");
+    } else {
+      BreakOnce("ip", "route add");
+      EXPECT_EQ(Script("start wlan0 br0").status, 1);
+    }
+    EXPECT_EQ(Script("start wlan0 br0").out, "");
+    EXPECT_THAT(Ways(), HasSubstr(route)) << isKilled;
+    EXPECT_EQ(RunInShell("ls /run/rc.network | grep -e wire -e routes").out, "");
+  }
+}
+
+// The note of one interface's access point was asked about another's start.
+TEST_F(KitWire, IsAsItWasBehindAStartOfAnotherInterfaceThatWasKilled) {
+  SetWire("yes");
+  RunInShell(
+      "ip link add wlan1 type veth peer name air1; "
+      "cp /etc/hostapd/hostapd-wlan0-host.conf /etc/hostapd/hostapd-wlan1-host.conf");
+  KillStart("route add");
+  EXPECT_EQ(Script("start wlan1 br0").out, "");
+  EXPECT_THAT(Ways(), HasSubstr("default via 192.0.2.1 dev br0 metric 7"));
 }
 
 // A signal that came while the notes were removed failed the start, and nobody knew any more what the wire had had: it

@@ -62,6 +62,9 @@ const std::vector<KitScript>& AllScripts() {
   static const std::vector<KitScript> all = {
       {"rc.network start", "", kRestart, kStart},
       {"rc.network start with a wire", kWiredBridge, kWire, "/etc/rc.network start wlan0 br0"},
+      {"rc.network start with a wire without a cable", kWiredBridge,
+       std::string(kWire) + "; ip link set wire down; until ip route | grep -q linkdown; do sleep 0.02; done",
+       "/etc/rc.network start wlan0 br0"},
       {"rc.network restart", "", kStart, kRestart},
       {"rc.network schedule", "", std::string("echo 00 >/tmp/hour; ") + kStart + "; echo 01 >/tmp/hour",
        "/etc/rc.network schedule wlan0", "", "/run/rc.network/late-wlan0"},
