@@ -115,8 +115,9 @@ static_assert(CountTurns() + RowsAtTurn(0) == std::size(kSettingRows), "each tur
 template <class Visit>
 void ForEachRead(Visit visit) {
   for (int turn = 1; turn <= CountTurns(); ++turn) {
-    const auto isNext = [=](const SettingRow& row) { return row.turn == turn; };
-    visit(std::find_if(std::begin(kSettingRows), std::end(kSettingRows), isNext)->setting);
+    for (const SettingRow& row : kSettingRows) {
+      if (row.turn == turn) visit(row.setting);
+    }
   }
 }
 

@@ -49,6 +49,15 @@ constexpr bool EndsWith(std::string_view text, std::string_view end) {
   return text.size() >= end.size() && Slice(text, text.size() - end.size()) == end;
 }
 
+// Whether all of a text or an array is so; unlike std::all_of(), which libstdc++ unrolls.
+template <class Range, class Condition>
+constexpr bool All(const Range& range, Condition is) {
+  for (const auto& element : range) {
+    if (!is(element)) return false;
+  }
+  return true;
+}
+
 // White space and letters of ASCII: the caller's locale must not change how files and names on the air are read.
 constexpr bool IsSpace(char c) {
   return c == ' ' || (c >= '\t' && c <= '\r');

@@ -25,7 +25,7 @@ ShellWord::ShellWord(std::string_view value) {
   const auto put = [&](std::string_view text) { to = std::copy(text.begin(), text.end(), to); };
 
   value = Slice(value, 0, (sizeof szWord_ - 3) / kQuoteInside.size());
-  const bool ordinary = !value.empty() && std::all_of(value.begin(), value.end(), IsOrdinary);
+  const bool ordinary = !value.empty() && All(value, IsOrdinary);
   if (!ordinary) put("'");
   for (const char c : value) put(c == '\'' ? kQuoteInside : std::string_view(&c, 1));
   if (!ordinary) put("'");

@@ -1,7 +1,6 @@
 // Joins a network: an ad-hoc cell directly, any other through the supplicant.
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -29,7 +28,7 @@ using LongCommand = Command<1024>;
 BOOL CheckBssid(const WIRELESS_NETWORK_CONFIG* pNetCfg) {
   if (pNetCfg == nullptr) return LOG("Bad parameters"), FALSE;
   const auto& bssid = pNetCfg->network.bssid;
-  const bool known = std::any_of(std::begin(bssid), std::end(bssid), [](unsigned char octet) { return octet != 0; });
+  const bool known = !All(bssid, [](unsigned char octet) { return octet == 0; });
   return known && pNetCfg->noneBssid == 0 ? TRUE : FALSE;
 }
 

@@ -13,7 +13,7 @@
 
 bool IsInterfaceName(std::string_view name) {
   if (name.empty() || name.size() >= IFNAMSIZ || name == "." || name == "..") return false;
-  return std::none_of(name.begin(), name.end(), [](char c) { return c == '/' || c == ':' || IsSpace(c); });
+  return All(name, [](char c) { return c != '/' && c != ':' && !IsSpace(c); });
 }
 
 Result<Descriptor> OpenControl() {

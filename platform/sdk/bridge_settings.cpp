@@ -1,7 +1,6 @@
 // Bridges as their network-script files describe them.
 #include <netinet/ether.h>
 
-#include <algorithm>
 #include <cstring>
 #include <iterator>
 
@@ -71,7 +70,7 @@ bool IsWord(const char* szField, size_t cbField) {
     constexpr char kSpecial[] = "\"'\\`$&|;<>()#*?[]{}~!";
     return static_cast<unsigned char>(c) > ' ' && c != '\x7f' && std::strchr(kSpecial, c) == nullptr;
   };
-  return size < cbField && std::all_of(szField, szField + size, isOrdinary);
+  return size < cbField && All(std::string_view(szField, size), isOrdinary);
 }
 
 template <size_t kSize>
@@ -115,7 +114,7 @@ void SetOrRemove(NetworkScript& script, const char* szKey, const char* szValue) 
 }
 
 void SetHardwareAddress(NetworkScript& script, const NETINFO& netInfo) {
-  const bool known = std::any_of(std::begin(netInfo.rgbMac), std::end(netInfo.rgbMac), [](auto b) { return b != 0; });
+  const bool known = !All(netInfo.rgbMac, [](auto b) { return b == 0; });
   char szAddress[sizeof "00:00:00:00:00:00"] = "";
   if (known) MEROWirelessBssidStringGet(netInfo.rgbMac, szAddress, sizeof szAddress);
   SetOrRemove(script, kHardwareKey, szAddress);

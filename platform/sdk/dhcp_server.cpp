@@ -1,5 +1,4 @@
 // The files of a DHCP server: the configuration that dnsmasq reads, and the settings that dnsmasq does not have.
-#include <algorithm>
 #include <cstdio>
 #include <cstring>
 #include <iterator>
@@ -118,7 +117,7 @@ bool CanWrite(std::string_view text, const Part& part) {
   if (part.kind != Kind::kText && text.find(',') != std::string_view::npos) return false;
   if (part.kind == Kind::kTagged && IsTagWord(text)) return false;
   if (part.kind == Kind::kMask && SecondsOf(text)) return false;
-  return std::all_of(text.begin(), text.end(), IsOrdinary);
+  return All(text, IsOrdinary);
 }
 
 bool IsTag(std::string_view tag) {
