@@ -209,7 +209,7 @@ case $1 in
   everywhere)
     run everywhere -k new
     expect_calls 'everywhere build/everywhere -k new'
-    expect_packages e2fsprogs git mmdebstrap
+    expect_packages arch-test e2fsprogs git mmdebstrap
     sort build/everywhere/packages | grep -qx 'any cmake'
     grep -qx 'amd64 qemu' build/everywhere/packages
     grep -qx 'lib/unit.cpp' build/everywhere/files
