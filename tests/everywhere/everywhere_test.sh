@@ -142,7 +142,7 @@ END
   failed) # A later ctest has the labels of a test behind it.
     printf '%s\n' 'testing (unit)' 'unit         33 s   769 passed     3 failed     0 skipped' \
       $'\t 12 - unit.A.C (Failed)' $'\t 13 - unit.A.D (ILLEGAL) unit' \
-      $'\t 14 - unit.B/E.F/0  # GetParam() = ("x (y)", 7) (Failed) unit' >says
+      $'\t 14 - unit.B/E.F/0  # GetParam() = ("x (y)", 7) (Failed) unit' $'\t 15 - unit.G.H (Skipped)' >says
     fails everywhere new
     lines work/seen.tsv new | tail -n 1 | diff <(printf 'new\tunit\t769\t3\t0\tfailed: unit.A.C|failed: unit.A.D|failed: unit.B/E.F/0\n') -
     grep -q '^everywhere: new, unit: 3 failed; its log is in .*/rows/new$' said

@@ -28,7 +28,8 @@ result() { # LEVEL PASSED FAILED SKIPPED SECONDS NOTES
 # What is known of the tests of a level that failed or were skipped, by what ./run says while it tests that.
 notes() { # LOG LEVEL
   sed -n "/^testing ($2)\$/,/^testing (/p" "$1" |
-    sed -nE 's/^\s+[0-9]+ - (\S+)( +# GetParam\(\) = .*)? \([^()]*\)( .*)?$/failed: \1/p; s/^not ok /failed: /p
+    sed -nE '/ \(Skipped\)/d; s/^\s+[0-9]+ - (\S+)( +# GetParam\(\) = .*)? \([^()]*\)( .*)?$/failed: \1/p
+      s/^not ok /failed: /p
       /^skipped: /p' | sort -u | paste --serial --delimiters='|'
 }
 

@@ -99,7 +99,7 @@ TEST(InstalledProgram, DoesNotShowASecretThatIsTypedAfterItWasStopped) {
 
 // Has a shared library be a file that is none.
 void SpoilLibrary(const std::string& soname) {
-  Shell("mount --bind /dev/null $(ldconfig -p | awk '$1 == \"" + soname + "\" { print $NF; exit }')");
+  Shell("ldconfig -p | awk '$1 == \"" + soname + "\" { print $NF }' | xargs -n 1 mount --bind /dev/null");
 }
 
 // All of them were loaded at every start, and there was no start without them.
