@@ -38,8 +38,7 @@ is_there() { # INTERFACE
 
 # make_bridge BRIDGE [undoable]: makes the bridge with its address and its first member, if that one is wired; a
 # wireless member comes in when its access point starts. Without its first member the bridge is made all the same, and
-# that is a failure. A new bridge that is undoable has noted what give_wire_back needs. The note of the routes that are
-# moved is left to the caller to remove.
+# that is a failure. A new bridge that is undoable has noted what give_wire_back needs.
 make_bridge() {
 	is_bridge "$1" || fail "$scripts/ifcfg-$1 describes no bridge"
 	undoable=${2-}
@@ -49,7 +48,7 @@ make_bridge() {
 	if [ -n "$primary" ] && ! is_wireless "$primary"; then
 		if is_there "$primary"; then
 			[ -z "$undoable" ] || note_wire "$primary" "$1"
-			recall_routes "$1" "$primary"
+			[ "$static" != yes ] || recall_routes "$1" "$primary"
 			plan_member "$primary" "$1"
 		else
 			missing=yes
@@ -58,6 +57,7 @@ make_bridge() {
 	if [ "$static" = yes ]; then
 		set_address "$1" "$address/$mask"
 		move_routes "$1" "$routes"
+		remove_files "$state/routes-$1"
 	else
 		lease_address "$1"
 	fi
@@ -72,7 +72,6 @@ make_bridge_of_boot() {
 	if is_file_of_interface "$1" && is_bridge "$1" && comes_up_at_boot "$1" && ! waits_for_access_point "$1"; then
 		[ -z "$primary" ] || await $(($2 - $(uptime_seconds))) is_there "$primary"
 		make_bridge "$1"
-		remove_files "$state/routes-$1"
 	fi
 }
 
@@ -121,17 +120,18 @@ plan_member() { # INTERFACE BRIDGE
 }
 
 # routes_of INTERFACE [default]: puts its routes into $routes, a line each, as ip takes them: it prints conditions of a route
-# too. Those of the kernel's own come and go with the addresses.
+# too.
 routes_of() {
 	said=$(ip -4 route show ${2:+"$2"} dev "$1") || fail "cannot tell the routes of $1"
 	routes=''
 	set -f
 	while read -r line; do
-		case " $line " in *' proto kernel '*) continue ;; esac
 		words=''
 		for word in $line; do
-			case $word in dead | linkdown | offload | trap | rt_offload | rt_trap | pervasive | unresolved) continue ;; esac
-			words="$words$word "
+			case $word in
+			dead | linkdown | notify | offload | pervasive | rt_offload | rt_offload_failed | rt_trap | trap | unresolved) ;;
+			*) words="$words$word " ;;
+			esac
 		done
 		[ -z "$words" ] || routes=$routes$words$newline
 	done <<-END
@@ -145,7 +145,7 @@ routes_of() {
 recall_routes() {
 	routes_of "$2" default
 	[ ! -s "$state/routes-$1" ] || while read -r line; do
-		case $newline$routes in *"$newline$line "*) ;; *) routes="$routes$line $newline" ;; esac
+		case $newline$routes in *"$newline$line $newline"*) ;; *) routes="$routes$line $newline" ;; esac
 	done <"$state/routes-$1"
 	[ -z "$routes" ] || note "$state/routes-$1" "${routes%"$newline"}"
 }
@@ -175,7 +175,7 @@ add_route() {
 	said=$(ip -4 route add $2 dev "$1" 2>&1) && return
 	case $2 in *' src '*) ;; *) return 1 ;; esac
 	source=${2#* src } source=${source%% *}
-	ip -4 route add ${2%% src *} ${2#* src "$source"} dev "$1" >/dev/null 2>&1
+	said=$(ip -4 route add ${2%% src *} ${2#* src "$source"} dev "$1" 2>&1)
 }
 
 # is_refusal: whether what ip has $said is the kernel's last word.
@@ -191,7 +191,7 @@ is_refusal() {
 # member of a new bridge. give_wire_back restores them if the start fails. The number tells the interface from another
 # one that has its name later.
 note_wire() {
-	leased=''
+	leased=no
 	if daemon_of busybox "$lease_run-$1.pid"; then leased=yes; fi
 	{ read -r number <"/sys/class/net/$1/ifindex"; } 2>/dev/null || fail "cannot tell the number of $1"
 	ip -4 address save dev "$1" >"$state/wire-$2.addresses" || fail "cannot note the addresses of $1"
@@ -207,19 +207,29 @@ forget_wire() { # BRIDGE [FILE...]
 }
 
 # give_wire_back BRIDGE: removes the bridge, and gives its first member back what note_wire has noted, unless that one is
-# gone. One that is in no bridge and has an address has been given it by somebody else since.
+# gone, or somebody has given it something else since. That it is to be given back is noted first: a step may fail, and
+# what was done before it is not somebody else's when all are taken again.
 give_wire_back() {
-	read -r wire number leased <"$state/wire-$1" || cannot_read "$state/wire-$1"
-	is_bare=''
-	[ ! -e "/sys/class/net/$1/brif/$wire" ] || is_bare=yes
+	read -r wire number leased bare <"$state/wire-$1" || cannot_read "$state/wire-$1"
 	end_dnsmasq "$1"
+	if [ -z "$bare" ] && is_bare "$wire" "$1"; then
+		bare=bare
+		note "$state/wire-$1" "$wire $number $leased $bare"
+	fi
 	remove_bridge "$1"
 	if has_number "$wire" "$number"; then
-		[ -n "$is_bare" ] || [ -n "$(ip -4 -oneline address show dev "$wire")" ] || is_bare=yes
-		[ -z "$is_bare" ] || restore_wire "$wire" "$1"
-		[ -z "$leased" ] || lease_address "$wire"
+		[ -z "$bare" ] || restore_wire "$wire" "$1"
+		[ "$leased" != yes ] || lease_address "$wire"
 	fi
 	forget_wire "$1" "$state/routes-$1"
+}
+
+# is_bare INTERFACE BRIDGE: whether it is what a start makes of it: in that bridge, or in none and without an address.
+is_bare() {
+	[ ! -e "/sys/class/net/$2/brif/$1" ] || return 0
+	if [ -e "/sys/class/net/$1/master" ] || ! is_there "$1"; then return 1; fi
+	said=$(ip -4 -oneline address show dev "$1" 2>&1) || fail "cannot tell the addresses of $1: $said"
+	[ -z "$said" ]
 }
 
 has_number() { # INTERFACE NUMBER
@@ -229,13 +239,26 @@ has_number() { # INTERFACE NUMBER
 restore_wire() { # INTERFACE BRIDGE
 	attempt "cannot bring $1 up" ip link set dev "$1" up
 	said=$(ip address restore <"$state/wire-$2.addresses" 2>&1) || fail "cannot give $1 its addresses back: $said"
+	restore_routes "$1" "$state/wire-$2.routes" direct
+	restore_routes "$1" "$state/wire-$2.routes" ''
+}
+
+# restore_routes INTERFACE FILE KIND: adds those that lead to neighbours, or those by way of one, which have to be neighbours
+# by then. Some are there with the addresses already.
+restore_routes() {
 	while read -r line; do
-		[ -n "$line" ] || continue
+		case " $line " in
+		'  ') continue ;;
+		*' via '*) kind='' ;;
+		*) kind=direct ;;
+		esac
+		[ "$kind" = "$3" ] || continue
 		# shellcheck disable=SC2086  # words
-		said=$(ip -4 route replace $line dev "$1" 2>&1) && continue
+		said=$(ip -4 route add $line dev "$1" 2>&1) && continue
+		case $said in *'File exists'*) continue ;; esac
 		is_refusal || fail "cannot give $1 its routes back: $said"
 		warn "cannot give $1 its route back, '$line': $said"
-	done <"$state/wire-$2.routes"
+	done <"$2"
 }
 
 # set_address INTERFACE ADDRESS/MASK: sets the interface's only address. An interface that has it already keeps it, and
@@ -322,7 +345,7 @@ is_running() {
 }
 
 # undo_killed_start BRIDGE: gives the wire back what it had before a start that was killed, since the next one would take
-# what is left for what it was. Of a start that was killed at its very end the note alone is left.
+# what is left for what it was. Notes of a start that has come to its end are of nothing any more.
 undo_killed_start() {
 	if ! is_begun "$1"; then
 		forget_wire "$1"

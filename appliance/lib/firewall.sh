@@ -41,15 +41,15 @@ clear_firewall() {
 }
 
 # has_rules: whether those that were set are there still. Who loads other rules may have removed all that there were, or
-# what is in their table. Where that cannot be told, nobody is thrown off for it.
+# what is in their table; with each set of them an address is translated. Where that cannot be told, nobody is thrown off for it.
 has_rules() {
 	[ -s "$forwarding_before" ] || return 0
 	said=$(nft list table inet mero_ap 2>&1) || {
-		case $said in *'No such file'*) return 1 ;; esac
-		warn "cannot tell whether the rules between networks are there: ${said:-nft ended with a failure}"
+		case $said in *'Error: No such file'*) return 1 ;; esac
+		warn "cannot tell whether the rules between networks are there: $said"
 		return 0
 	}
-	case $said in *'chain '*) ;; *) return 1 ;; esac
+	case $said in *masquerade*) ;; *) return 1 ;; esac
 }
 
 # rights_of_guests: prints what the settings let guests reach, or keep them from; nothing for a start without guests.

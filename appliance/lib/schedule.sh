@@ -6,8 +6,10 @@
 read_schedules() {
 	known_settings='wifi_sched_enabled wifi_sched guest_net_sched_enable guest_net_sched'
 	# shellcheck disable=SC2086  # words
-	ask access-point $known_settings -- check "$hostapd_files-$1-guest.info" enable yes || : # they are off
-	into setting_wifi_sched_enabled setting_wifi_sched setting_guest_net_sched_enable setting_guest_net_sched has_guests
+	ask access-point $known_settings -- check "$hostapd_files-$1-guest.info" enable yes -- \
+		check "$hostapd_files-$1.info" enable yes || : # they are off
+	into setting_wifi_sched_enabled setting_wifi_sched setting_guest_net_sched_enable setting_guest_net_sched has_guests \
+		is_switched_on
 	known_guests=$1
 }
 

@@ -89,7 +89,7 @@ TEST_F(KitCost, OfAnEndIsThirteenProcessesAndTheWaitForItsDaemons) {
 
 TEST_F(KitCost, OfAnHourWithoutAChangeIsFourProcesses) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
-  EXPECT_EQ(ProgramsOf("schedule wlan0"), "find flock nft mero-settings\n");
+  EXPECT_EQ(ProgramsOf("schedule wlan0"), "find flock mero-settings nft\n");
 }
 
 TEST_F(KitCost, OfABootIsTwoProcessesForEachBridge) {

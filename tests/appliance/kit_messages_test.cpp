@@ -64,7 +64,7 @@ TEST_F(KitMessage, OfAWireSaysWhatCannotBeGivenBack) {
       {"note_wire eth9 lbr0", "", "", "cannot tell the number of eth9"},
       {gives.c_str(), "ip", "address restore", "cannot give eth0 its addresses back: ip is broken"},
       {gives.c_str(), "ip", "eth0 up", "cannot bring eth0 up: ip is broken"},
-      {routes.c_str(), "ip", "route replace", "cannot give eth0 its routes back: ip is broken"},
+      {routes.c_str(), "ip", "route add", "cannot give eth0 its routes back: ip is broken"},
       {routes.c_str(), "", "",
        "cannot give eth0 its route back, '203.0.113.0/24 via 198.51.100.1': Error: Nexthop has "
        "invalid gateway."},

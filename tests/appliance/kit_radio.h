@@ -23,7 +23,8 @@ class KitRadio : public Kit {
     StandIn("dnsmasq", "for word; do case $word in --pid-file=*) file=${word#*=} ;; esac; done\n" + Launch("dnsmasq"));
     StandIn("nft",
             "[ \"$1\" = list ] || exec cat >/tmp/rules\n"
-            "grep -F -A 1 'mero_ap {' /tmp/rules || { echo 'Error: No such file or directory' >&2; exit 1; }\n");
+            "grep -q -F 'mero_ap {' /tmp/rules && exec cat /tmp/rules || { echo 'Error: No such file or directory' "
+            ">&2; exit 1; }\n");
     StandIn("iw", "");
     StandInForIp();
     RunInShell("echo phy0 >/tmp/phy; sed -i 's,/sys/class/net/$1/phy80211/name,/tmp/phy,' /usr/mero/lib/network/*.sh");

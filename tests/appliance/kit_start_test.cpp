@@ -326,7 +326,8 @@ TEST_F(KitAccessPoint, IsStartedUnlessItRunsAndWasStartedToTheEnd) {
 TEST_F(KitAccessPoint, GetsTheRulesBackThatSomebodyHasRemoved) {
   ASSERT_EQ(Script("start wlan0 lbr0").out, "");
   for (const char* szWords : {"schedule wlan0", "ensure wlan0 lbr0"}) {
-    for (const char* szLeft : {"", "table inet mero_ap {\n}\n"}) {
+    for (const char* szLeft :
+         {"", "table inet mero_ap {\n}\n", "table inet mero_ap {\nchain translate-lbr0 {\n}\n}\n"}) {
       WriteText("/tmp/rules", szLeft);
       EXPECT_EQ(Script(szWords).out,
                 "rc.network: somebody has removed the rules between networks: wlan0 is started anew\n");
@@ -356,6 +357,29 @@ TEST_F(KitAccessPoint, IsEndedByTheNextHourWhenItsEndHasFailed) {
   Mend();
   EXPECT_EQ(Script("schedule wlan0").out, "");
   EXPECT_EQ(Daemons(), "");
+  EXPECT_FALSE(fs::exists("/run/rc.network/bridge-wlan0"));
+
+  // Nothing had been done to it, as when another run was in the way.
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"yes\"\n");
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(Daemons(), "");
+}
+
+// The hour took the network from whoever had joined one since.
+TEST_F(KitAccessPoint, LeavesAClientItsNetworkWhenItsEndHasFailed) {
+  ASSERT_EQ(Script("start wlan0 lbr0").out, "");
+  WriteText("/etc/hostapd/hostapd-wlan0.info", "enable=\"no\"\n");
+  Break("iw");
+  EXPECT_EQ(Script("restart wlan0 lbr0").status, 1);
+  Mend();
+  RunInShell(
+      "cp /bin/sleep /tmp/daemons/wpa_supplicant; (/tmp/daemons/wpa_supplicant 100 >/dev/null 2>&1 & "
+      "echo $! >/var/run/wpa_supplicant.pid); ip address add 192.0.2.8/24 dev wlan0");
+  EXPECT_EQ(Script("schedule wlan0").out, "");
+  EXPECT_EQ(RunInShell("kill $(cat /var/run/wpa_supplicant.pid)").status, 0);
+  EXPECT_THAT(RunInShell("ip -4 -brief address show wlan0").out, HasSubstr("192.0.2.8/24"));
   EXPECT_FALSE(fs::exists("/run/rc.network/bridge-wlan0"));
 }
 
