@@ -323,7 +323,7 @@ TEST_F(AccessPoint, ThatTheKernelDoesNotHaveAfterwardsWasNotEnabled) {
   RecordSaves([](const MERO_AP_CONF&) { return std::string(); });
   const Ran ran = Tool({"ap", "enable"});
   EXPECT_EQ(ran.status, 1);
-  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point was started, and did not come on the air: "));
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: the access point could not be enabled: "));
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "on: ", "MEROWirelessAPEnable",
                                             "MEROWirelessSetAPConfig", "off: ", "MEROWirelessAPDisable"));
 }

@@ -1,6 +1,10 @@
 // The commands about the adapter as a whole: mode, radio.
+#include <unistd.h>
+
+#include <algorithm>
 #include <csignal>
 #include <cstring>
+#include <filesystem>
 #include <utility>
 
 #include "running.h"
@@ -89,11 +93,26 @@ TEST_F(Mode, ThatTheKernelDoesNotShowWasNotChanged) {
   library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE) { return TRUE; };
   EXPECT_THAT(Tool({"mode", "ap"}).err,
               HasSubstr("merowireless: the mode was changed, and no access point is on the air: "));
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessModeChange", "MEROWirelessModeChange")) << "there and back";
   kernel::BecomeAccessPoint("Office");
   const Ran ran = Tool({"mode", "client"});
   EXPECT_EQ(ran.status, 1);
   EXPECT_THAT(ran.err,
               HasSubstr("merowireless: the mode was changed, and the adapter is an access point's all the same: "));
+}
+
+// The start script was killed half way, and the next hour put the access point on the air.
+TEST_F(Mode, ThatIsInterruptedIsTheClients) {
+  library::MEROWirelessModeChange = [](MERO_WIRELESS_MODE mode) {
+    library::Record(mode == WIRELESS_AP_MODE ? "ap" : "client");
+    while (mode == WIRELESS_AP_MODE) ::pause();
+    return TRUE;
+  };
+  StartedTool tool({"mode", "ap"});
+  ASSERT_TRUE(Soon([] { return std::ranges::count(library::Calls(), "ap") > 0; }));
+  ::kill(tool.pid(), SIGINT);
+  EXPECT_EQ(tool.Wait().status, 130);
+  EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessModeChange", "ap", "MEROWirelessModeChange", "client"));
 }
 
 TEST_F(Mode, IsNobodysWithoutAnAdapter) {
@@ -317,6 +336,19 @@ TEST_F(RadioSwitch, ThatCannotBeSavedAsOnStaysOff) {
   };
   EXPECT_THAT(Tool({"radio", "on"}).err, HasSubstr("merowireless: the radio could not be switched: "));
   EXPECT_EQ(Soft(), "1");
+}
+
+// Why it could not be saved was hidden by what failed behind that.
+TEST_F(RadioSwitch, ThatCannotBeSavedNorPutBackTellsBoth) {
+  WriteText(std::string(kSwitch) + "soft", "1");
+  library::PLIBCFileSetSectionValue = [](const char*, const char*, const char*, const char*, const char*) {
+    std::filesystem::remove(std::string(kSwitch) + "soft");
+    return -1;
+  };
+  const Ran ran = Tool({"radio", "on"});
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_THAT(ran.err, testing::StartsWith("merowireless: the kernel's block of the radio could not be set again\n"
+                                           "merowireless: the radio could not be switched: "));
 }
 
 TEST_F(RadioSwitch, ThatAHandHasMovedIsNotSwitchedOn) {

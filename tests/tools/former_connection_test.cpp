@@ -165,16 +165,19 @@ TEST_F(FormerConnection, IsNotBroughtBackOnAnAccessPoint) {
   library::MEROWirelessConnStatusGet = [] {
     return kernel::Main().type == NL80211_IFTYPE_AP ? WIRELESS_STATUS_DISCONNECTED : WIRELESS_STATUS_CONNECTED_MANAGED;
   };
-  EXPECT_THAT(Tool({"ap", "enable"}).err,
-              HasSubstr("the former connection, to Home, is not brought back: the adapter is an access point\n"));
+  EXPECT_THAT(
+      Tool({"ap", "enable"}).err,
+      HasSubstr("merowireless: the former connection, to Home, is not brought back: the adapter is an access point\n"));
   EXPECT_THAT(library::Calls(), Not(Contains("MEROWirelessNetworkConnect")));
 }
 
 TEST_F(FormerConnection, IsLeftToWhoeverSetsUpAnAccessPoint) {
   library::SavedAp(library::Office());
   library::MEROWirelessAPEnable = [] {
+    WriteText(kLost, "");
     return library::Report("wireless_ap_enable", "Another ap construction is going"), FALSE;
   };
+  CanBeLost();
   EXPECT_EQ(Tool({"ap", "enable"}).status, 8);
   EXPECT_THAT(library::Calls(), ElementsAre("MEROWirelessSetAPConfig", "MEROWirelessAPEnable"));
 }

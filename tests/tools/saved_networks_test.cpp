@@ -130,7 +130,9 @@ TEST_F(SavedNetworks, LendNoSecretToWhoeverBearsTheirAddressAsItsName) {
 
 TEST_F(SavedNetworks, AreNotSavedUnderAnAddress) {
   EXPECT_EQ(Tool({"save", "0A:0A:0A:0A:0A:01", "--bssid", "0A:0A:0A:0A:0A:09", "--security", "open"}).status, 2);
-  EXPECT_EQ(Tool({"adhoc", "0A:0A:0A:0A:0A:01"}).status, 2);
+  const Ran ran = Tool({"adhoc", "0A:0A:0A:0A:0A:01"});
+  EXPECT_EQ(ran.status, 2);
+  EXPECT_THAT(ran.err, HasSubstr("merowireless: a text that is an address can be no name: "));
   EXPECT_THAT(library::Calls(), IsEmpty());
 }
 

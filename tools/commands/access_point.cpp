@@ -150,12 +150,12 @@ void PutOnAir(const Program& program, const ApConf& conf) {
   const auto start = Run<Start>(task, [&] { return TryToStart(conf); });
   if (start == Start::kNotSaved) throw ApNotSaved();
   if (start == Start::kFailed && IsAnothers()) throw Anothers();
+  const bool isOnAir = start == Start::kDone && IsAccessPoints();
   const bool isInterrupted = signals.HasCome();
-  if (start == Start::kDone && !isInterrupted && IsAccessPoints()) return;
+  if (isOnAir && !isInterrupted) return;
   Undo(task);
   if (isInterrupted) throw Interrupted{};
-  if (start == Start::kFailed) throw EnableFailed(former && ReadApStatus(conf).isRunning());
-  throw Failed("the access point was started, and did not come on the air", "-v shows what the library reports");
+  throw EnableFailed(former && ReadApStatus(conf).isRunning());
 }
 
 // A process that was killed leaves its marker behind, and the library would refuse the next attempt.

@@ -91,8 +91,27 @@ Failure NotChanged() {
   return Failed("the mode could not be changed, and the adapter is a client's");
 }
 
+Task Changing(const Program& program) {
+  return program.Doing("changing the mode");
+}
+
+bool Change(const Task& task, MERO_WIRELESS_MODE mode) {
+  return Run<BOOL>(task, [mode] { return MEROWirelessModeChange(mode); }) != FALSE;
+}
+
 bool Change(const Program& program, MERO_WIRELESS_MODE mode) {
-  return Run<BOOL>(program.Doing("changing the mode"), [mode] { return MEROWirelessModeChange(mode); }) != FALSE;
+  return Change(Changing(program), mode);
+}
+
+// Switches the access point on that the client has taken the place of, or leaves it switched off. One that was switched
+// on before, and did not run, stays so.
+void TryToBeAccessPoint(const Program& program, const ApConf& conf, bool wasOn) {
+  Task task = Changing(program);
+  if (!wasOn) task.undo = [&] { (void)Change(program, WIRELESS_CLIENT_MODE); };
+  if (!Change(task, WIRELESS_AP_MODE)) throw NotChanged();
+  if (ReadApStatus(conf).isRunning()) return;
+  Undo(task);
+  throw Failed("the mode was changed, and no access point is on the air");
 }
 
 void BecomeAccessPoint(const Program& program) {
@@ -101,15 +120,14 @@ void BecomeAccessPoint(const Program& program) {
   if (before.isRunning()) {
     return Say(program, "the adapter is an access point's already: " + Described(program, before), {"ap", false});
   }
-  if (ApSwitchOf(before.interface) == ApSwitch::kNone) {
+  const ApSwitch apSwitch = ApSwitchOf(before.interface);
+  if (apSwitch == ApSwitch::kNone) {
     throw Failure(Exit::kUsage, "no access point is enabled, and the change would only end a connection",
                   "`merowireless ap enable` makes the adapter one");
   }
   RefuseWhileRadioIsOff();
-  FormerConnection(program).Guard([&] {
-    if (!Change(program, WIRELESS_AP_MODE)) throw NotChanged();
-    if (!ReadApStatus(conf).isRunning()) throw Failed("the mode was changed, and no access point is on the air");
-  });
+  const bool wasOn = apSwitch == ApSwitch::kOn;
+  FormerConnection(program).Guard([&] { TryToBeAccessPoint(program, conf, wasOn); });
   Say(program, "the adapter is an access point's now: " + Described(program, ReadApStatus(conf)), {"ap", true});
 }
 

@@ -70,15 +70,20 @@ FormerConnection::FormerConnection(const Program& program)
       nameServers_(SavedNameServersOf(status_.interface)) {}
 
 void FormerConnection::Try(const std::function<void()>& attempt) const {
-  Attempt(attempt, [&] { BringBack(); });
+  const auto attemptToTheEnd = [&](const Signals& signals) {
+    attempt();
+    if (signals.HasCome()) throw Interrupted{};
+  };
+  Attempt(attemptToTheEnd, [&] { BringBack(); });
 }
 
 void FormerConnection::Guard(const std::function<void()>& attempt) const {
-  Attempt(attempt, [&] { BringBackWhatHasEnded(); });
+  Attempt([&](const Signals&) { attempt(); }, [&] { BringBackWhatHasEnded(); });
 }
 
 // Signals are held all the time, so that none comes between two steps; each step that takes time ends with one.
-void FormerConnection::Attempt(const std::function<void()>& attempt, const std::function<void()>& takeBack) const {
+void FormerConnection::Attempt(const std::function<void(const Signals&)>& attempt,
+                               const std::function<void()>& takeBack) const {
   const Signals signals;
   const auto undo = [&] {
     Task task = program_.Doing("");
@@ -87,8 +92,7 @@ void FormerConnection::Attempt(const std::function<void()>& attempt, const std::
     while (signals.HasCome()) continue;  // it has been told, or nothing was left to be interrupted
   };
   try {
-    attempt();
-    if (signals.HasCome()) throw Interrupted{};
+    attempt(signals);
   } catch (const Failure& failure) {
     if (!StaysAsItIs(failure)) undo();
     throw;
@@ -109,8 +113,8 @@ bool FormerConnection::Stands() const {
 void FormerConnection::BringBackWhatHasEnded() const {
   if (!exists() || Stands()) return;
   if (!IsAccessPoints()) return BringBack();
-  Remark("merowireless: the former connection, to " + program_.output.Name(status_.name) +
-         ", is not brought back: the adapter is an access point");
+  const std::string name = program_.output.Name(status_.name);
+  Remark("merowireless: the former connection, to " + name + ", is not brought back: the adapter is an access point");
 }
 
 void FormerConnection::BringBack() const {

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 
+#include "base/signals.h"
 #include "model/library.h"
 #include "model/status.h"
 #include "work/program.h"
@@ -28,7 +29,7 @@ class FormerConnection {
   void Guard(const std::function<void()>& attempt) const;
 
  private:
-  void Attempt(const std::function<void()>& attempt, const std::function<void()>& takeBack) const;
+  void Attempt(const std::function<void(const Signals&)>& attempt, const std::function<void()>& takeBack) const;
   bool Stands() const;
   void BringBackWhatHasEnded() const;
   void BringBack() const;
