@@ -1,6 +1,8 @@
 # The other use of a wireless interface: a station of somebody else's access point.
 # shellcheck shell=sh
 
+supplicant_run=/var/run/wpa_supplicant.pid
+
 # end_client INTERFACE: ends the supplicant and the DHCP client, and removes the addresses.
 end_client() {
 	plan_end_of_client "$1"
@@ -8,7 +10,7 @@ end_client() {
 }
 
 plan_end_of_client() { # INTERFACE
-	end_daemon wpa_supplicant /var/run/wpa_supplicant.pid
+	end_daemon wpa_supplicant "$supplicant_run"
 	end_lease "$1"
 	plan_no_addresses "$1"
 }
